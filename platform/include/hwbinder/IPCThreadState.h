@@ -1,0 +1,37 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <sys/types.h>
+
+#include <cstdint>
+
+namespace android::hardware {
+
+/** Who is calling: the identity behind the call that the current thread is serving. */
+class IPCThreadState {
+  public:
+    /** @return the state of the current thread. */
+    static IPCThreadState* self();
+
+    /** @return process id of the caller; this process's own outside a call. */
+    pid_t getCallingPid() const { return mCallingPid; }
+    /** @return uid of the caller; this process's own outside a call. */
+    uid_t getCallingUid() const { return mCallingUid; }
+
+    /**
+     * Makes this process its own caller until the identity is restored.
+     *
+     * @return token for restoreCallingIdentity: the uid in the upper, the pid in the lower 32 bits.
+     */
+    int64_t clearCallingIdentity();
+    /** Takes the identity of a token that clearCallingIdentity gave. */
+    void restoreCallingIdentity(int64_t token);
+
+  private:
+    IPCThreadState();
+
+    pid_t mCallingPid;
+    uid_t mCallingUid;
+};
+
+}  // namespace android::hardware
