@@ -1,0 +1,83 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Log.h"
+#include "MotorType.h"
+#include "NodePaths.h"
+#include "Vibrator.h"
+
+#include <vector>
+
+namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
+namespace {
+
+using AmplitudeList = std::vector<uint32_t>;
+
+const AmplitudeList kNone;
+const AmplitudeList kW = {0, 1000, 5000, 9000};
+const AmplitudeList kX = {0, 2000, 4000, 6000, 8000, 10000};
+const AmplitudeList kY = {0, 3400, 4900, 6500, 8200, 10000};
+const AmplitudeList kZ = {0, 3000, 4000, 6000, 8000, 10000};
+
+/** The lists for TYPE_0, for TYPE_1, and for TYPE_1 without patterns selected by index. */
+struct AmplitudeLists {
+    const AmplitudeList& type0;
+    const AmplitudeList& type1;
+    const AmplitudeList& type1WithoutIndex;
+};
+
+/** Indexed by motor type number. */
+const AmplitudeLists kListsOfMotor[kMotorTypeCount] = {
+        {kNone, kNone, kNone},  // NONE
+        {kNone, kNone, kNone},  // COINDC
+        {kX, kY, kY},           // LINEAR
+        {kW, kW, kW},           // COINDC_PMIC
+        {kNone, kNone, kNone},  // COINDC_INDEX
+        {kZ, kX, kX},           // LINEAR_INDEX
+        {kZ, kX, kX},           // LINEAR_0832RC
+        {kZ, kX, kX},           // LINEAR_1040
+        {kX, kY, kY},           // LINEAR_RCVMOT
+        {kX, kX, kY},           // LINEAR_1030
+};
+
+const AmplitudeList& selectList(int32_t motor, DaxAmplitudeType type, bool hasIndex) {
+    const AmplitudeLists& lists = kListsOfMotor[motor];
+    if (type == DaxAmplitudeType::TYPE_0) return lists.type0;
+    return hasIndex ? lists.type1 : lists.type1WithoutIndex;
+}
+
+}  // namespace
+
+Return<void> Vibrator::daxGetAmplitudeList(DaxAmplitudeType type, daxGetAmplitudeList_cb _hidl_cb) {
+    if (checkCallerPermission() != kCallerPermitted) {
+        _hidl_cb(false, {});
+        return Void();
+    }
+    int32_t motor = getMotorIndex();
+    if (motor <= kMotorNone) {
+        motor = getMotorIndexbyMethod();
+        LOG_DEBUG("Vibrator motor type is NONE. but ran vib method fallback : %d", motor);
+    }
+    LOG_DEBUG("daxGetAmplitudeList type: %d : %d", static_cast<int>(type), motor);
+    if (type > DaxAmplitudeType::TYPE_1) {
+        LOG_ERROR("daxGetAmplitudeList is abnormal %d", static_cast<int>(type));
+        _hidl_cb(false, {});
+        return Void();
+    }
+
+    const bool hasIndex = isNodeExist(THE_DEVICE_HAPTIC_ENGINE_INDEX);
+    LOG_DEBUG("daxGetAmplitudeList %s index method", hasIndex ? "support" : "NOT support");
+    AmplitudeList list = selectList(motor, type, hasIndex);
+    if (list.empty()) {
+        LOG_DEBUG("daxGetAmplitudeList false");
+        _hidl_cb(false, {});
+        return Void();
+    }
+
+    LOG_DEBUG("daxGetAmplitudeList list size: %d", static_cast<int>(list.size()));
+    hidl_vec<uint32_t> reply;
+    reply.setToExternal(list.data(), list.size());
+    LOG_DEBUG("daxGetAmplitudeList list_outputsize size: %d", static_cast<int>(reply.size()));
+    _hidl_cb(true, reply);
+    return Void();
+}
+
+}  // namespace vendor::velmora::hardware::vibrator::V2_1::implementation

@@ -1,0 +1,59 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Log.h"
+#include "NodePaths.h"
+#include "TextNode.h"
+#include "Vibrator.h"
+
+#include <fcntl.h>
+
+#include <cstring>
+
+namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
+namespace {
+
+const std::string FOLDER_OPEN_COMMAND = "FOLDER_OPEN\n";
+const std::string FOLDER_CLOSE_COMMAND = "FOLDER_CLOSE\n";
+
+}  // namespace
+
+Return<bool> Vibrator::daxSupportsFolderStatusSetting() {
+    LOG_DEBUG("daxSupportsFolderStatusSetting starts");
+    if (checkCallerPermission() != kCallerPermitted) return false;
+
+    char text[512];
+    if (!readTextNode("daxSupportsFolderStatusSetting", THE_DEVICE_EVENT_CMD, O_RDWR, text,
+                      sizeof(text))) {
+        return false;
+    }
+    // A driver that takes fold events shows one of its commands: any of these letters will do.
+    const bool supports = strpbrk(text, "DFLO") != nullptr;
+    LOG_DEBUG("daxSupportsFolderStatusSetting %s", supports ? "TRUE" : "FALSE");
+    return supports;
+}
+
+Return<Status> Vibrator::daxSetFolderStatus(DaxFolderStatus status) {
+    LOG_DEBUG("daxSetFolderStatus starts");
+    if (checkCallerPermission() != kCallerPermitted) return Status::UNKNOWN_ERROR;
+    if (status > DaxFolderStatus::FOLDER_CLOSE) {
+        LOG_DEBUG("daxSetFolderStatus BAD_VALUE");
+        return Status::BAD_VALUE;
+    }
+
+    const std::string& command =
+            status == DaxFolderStatus::FOLDER_OPEN ? FOLDER_OPEN_COMMAND : FOLDER_CLOSE_COMMAND;
+    const auto length = static_cast<int>(command.size());
+    LOG_DEBUG("%s", command.c_str());
+    LOG_DEBUG("length : %d", length);
+    const auto written = writeTextNode("daxSetFolderStatus", THE_DEVICE_EVENT_CMD, command.c_str(),
+                                       command.size());
+    if (!written) return Status::UNKNOWN_ERROR;
+    LOG_DEBUG("ret : %d", static_cast<int>(*written));
+    if (*written != length) {
+        LOG_DEBUG("daxSetFolderStatus error");
+        return Status::UNKNOWN_ERROR;
+    }
+    LOG_DEBUG("daxSetFolderStatus end");
+    return Status::OK;
+}
+
+}  // namespace vendor::velmora::hardware::vibrator::V2_1::implementation

@@ -1,0 +1,33 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <sys/types.h>
+
+#include <cstddef>
+#include <optional>
+#include <string>
+
+/** The one way in which operations exchange text, rather than a number, with a node. */
+namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
+
+/**
+ * Reads a node's text, less one final newline.
+ *
+ * @param operation name that the log lines begin with.
+ * @param mode O_RDONLY or O_RDWR.
+ * @param text buffer for at most size - 1 bytes of text; always terminated.
+ * @return whether at least one byte could be read; if not, the reason has been logged.
+ */
+bool readTextNode(const char* operation, const std::string& node, int mode, char* text,
+                  size_t size);
+
+/**
+ * Writes a text to a node in one go.
+ *
+ * @param operation name that the log line of a failed open begins with.
+ * @return what write returned; nothing when the node could not be opened, which has been logged.
+ */
+std::optional<ssize_t> writeTextNode(const char* operation, const std::string& node,
+                                     const char* text, size_t length);
+
+}  // namespace vendor::velmora::hardware::vibrator::V2_1::implementation
