@@ -1,0 +1,338 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Driver.h"
+
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <charconv>
+#include <climits>
+#include <cstdint>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <ctime>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+#include <string_view>
+
+namespace simulator {
+namespace {
+
+namespace fs = std::filesystem;
+
+/** The most that sysfs takes in one write. */
+constexpr size_t kPageSize = 4096;
+
+constexpr std::string_view kTimedOutputDirectory = "/sys/class/timed_output/vibrator/";
+constexpr std::string_view kLedTriggerDirectory = "/sys/class/leds/vibrator/";
+
+/** Holds, beside the nodes, when the motor stops: nanoseconds of the monotonic clock. */
+constexpr char kDeadlineFile[] = ".deadline";
+
+std::string readFile(const std::string& path) {
+    std::ostringstream text;
+    text << std::ifstream(path).rdbuf();
+    return text.str();
+}
+
+bool writeFile(const std::string& path, std::string_view text) {
+    std::ofstream file(path, std::ios::trunc);
+    file << text;
+    return static_cast<bool>(file.flush());
+}
+
+int64_t now() {
+    timespec time{};
+    clock_gettime(CLOCK_MONOTONIC, &time);
+    return int64_t{time.tv_sec} * 1'000'000'000 + time.tv_nsec;
+}
+
+/** The motor's one-shot timer, beside the given node's file. */
+class Timer {
+  public:
+    explicit Timer(const Node& node) : mFile(fs::path(node.file).replace_filename(kDeadlineFile)) {}
+
+    void start(int64_t milliseconds) {
+        constexpr int64_t kMost = 1'000'000'000'000;
+        writeFile(mFile, std::to_string(now() + std::min(milliseconds, kMost) * 1'000'000));
+    }
+    void stop() { writeFile(mFile, "0"); }
+
+    /** @return the time left in ms, rounded up; 0 when the motor does not run. */
+    int64_t remaining() const {
+        int64_t deadline = 0;
+        const std::string text = readFile(mFile);
+        std::from_chars(text.data(), text.data() + text.size(), deadline);
+        return std::max<int64_t>(0, (deadline - now() + 999'999) / 1'000'000);
+    }
+
+  private:
+    std::string mFile;
+};
+
+/**
+ * Parses a number as the kernel's kstrto functions do: the whole text, a sign, one final newline.
+ *
+ * @return 0, -EINVAL for what is no number, -ERANGE for one out of range.
+ */
+int parseKernelNumber(std::string_view text, int64_t least, int64_t most, int64_t* number) {
+    text = text.substr(0, text.find('\0'));
+    if (!text.empty() && text.back() == '\n') text.remove_suffix(1);
+    if (!text.empty() && text.front() == '+') {
+        text.remove_prefix(1);
+        if (!text.empty() && text.front() == '-') return -EINVAL;
+    }
+    if (least >= 0 && !text.empty() && text.front() == '-') return -EINVAL;
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), *number);
+    if (error == std::errc::invalid_argument || end != text.data() + text.size()) return -EINVAL;
+    if (error != std::errc() || *number < least || *number > most) return -ERANGE;
+    return 0;
+}
+
+int hold(const Node& node, int64_t number) {
+    return writeFile(node.file, std::to_string(number) + "\n") ? 0 : -EIO;
+}
+
+/** Holds a number from a range that the driver checks. */
+template <int64_t least, int64_t most>
+int storeNumber(const Node& node, std::string_view text) {
+    int64_t number = 0;
+    int error = parseKernelNumber(text, INT_MIN, INT_MAX, &number);
+    if (error == 0 && (number < least || number > most)) error = -EINVAL;
+    return error != 0 ? error : hold(node, number);
+}
+
+/** The timed-output class: a number of ms starts the motor, 0 or less stops it. */
+int storeEnable(const Node& node, std::string_view text) {
+    int milliseconds = 0;
+    if (sscanf(std::string(text).c_str(), "%d", &milliseconds) != 1) return -EINVAL;
+    if (milliseconds > 0) {
+        Timer(node).start(milliseconds);
+    } else {
+        Timer(node).stop();
+    }
+    return 0;
+}
+
+std::string showEnable(const Node& node) {
+    return std::to_string(Timer(node).remaining()) + "\n";
+}
+
+/** The transient LED trigger: 1 starts the timer unless it runs or is 0 long, 0 cancels it. */
+int storeActivate(const Node& node, std::string_view text) {
+    int64_t state = 0;
+    const int error = parseKernelNumber(text, 0, INT64_MAX, &state);
+    if (error != 0) return error;
+    if (state > 1) return -EINVAL;
+    Timer timer(node);
+    if (state == 0) {
+        timer.stop();
+    } else if (timer.remaining() == 0) {
+        const fs::path duration = fs::path(node.file).replace_filename("duration");
+        timer.start(strtoll(readFile(duration).c_str(), nullptr, 10));
+    }
+    return 0;
+}
+
+std::string showActivate(const Node& node) {
+    return Timer(node).remaining() > 0 ? "1\n" : "0\n";
+}
+
+/** The transient LED trigger: kept for the next start; a running timer goes on as it is. */
+int storeDuration(const Node& node, std::string_view text) {
+    int64_t milliseconds = 0;
+    const int error = parseKernelNumber(text, 0, INT64_MAX, &milliseconds);
+    return error != 0 ? error : hold(node, milliseconds);
+}
+
+int storeText(const Node& node, std::string_view text) {
+    return writeFile(node.file, text) ? 0 : -EIO;
+}
+
+/** "COUNT v v v v ...\n": COUNT values follow, four a packet. */
+int storeHapticEngine(const Node& node, std::string_view text) {
+    std::string_view rest = text;
+    if (rest.empty() || rest.back() != '\n') return -EINVAL;
+    rest.remove_suffix(1);
+    int64_t announced = -1;
+    int64_t count = 0;
+    for (bool more = true; more;) {
+        const size_t blank = rest.find(' ');
+        more = blank != std::string_view::npos;
+        int64_t value = 0;
+        const std::string_view word = rest.substr(0, blank);
+        if (!word.empty() && word.back() == '\n') return -EINVAL;
+        if (parseKernelNumber(word, INT_MIN, INT_MAX, &value) != 0) return -EINVAL;
+        if (announced < 0) {
+            announced = value;
+            if (announced < 0 || announced % 4 != 0) return -EINVAL;
+        } else {
+            ++count;
+        }
+        if (more) rest.remove_prefix(blank + 1);
+    }
+    return count == announced ? storeText(node, text) : -EINVAL;
+}
+
+/** "PATTERN.PERCENT, REPEATS, DELAY~" and a zero byte. */
+int storeQueue(const Node& node, std::string_view text) {
+    const bool ends = text.size() > 1 && text.back() == '\0' && text[text.size() - 2] == '~';
+    return ends ? storeText(node, text) : -EINVAL;
+}
+
+int storeEventCommand(const Node& node, std::string_view text) {
+    const bool known = text == "FOLDER_OPEN\n" || text == "FOLDER_CLOSE\n";
+    return known ? storeText(node, text) : -EINVAL;
+}
+
+/** An attribute that the driver only shows. */
+int storeNothing(const Node& /* node */, std::string_view /* text */) {
+    return -EIO;
+}
+
+struct Attribute {
+    const char* leaf;
+    /** The feature that it belongs to; nullptr for what every driver of its layout has. */
+    const char* feature;
+    mode_t mode;
+    const char* initial;
+    int (*store)(const Node&, std::string_view);
+    /** nullptr: shows what the file holds. */
+    std::string (*show)(const Node&);
+};
+
+constexpr Attribute kTimedOutputAttributes[] = {
+        {"enable", nullptr, 0644, "0\n", storeEnable, showEnable},
+};
+
+constexpr Attribute kLedTriggerAttributes[] = {
+        {"activate", nullptr, 0644, "0\n", storeActivate, showActivate},
+        {"duration", nullptr, 0644, "0\n", storeDuration, nullptr},
+        {"state", nullptr, 0644, "0\n", storeNumber<0, 1>, nullptr},
+};
+
+constexpr Attribute kCommonAttributes[] = {
+        {"intensity", "intensity", 0644, "10000\n", storeNumber<0, 10000>, nullptr},
+        {"force_touch_intensity", "force-touch", 0644, "10000\n", storeNumber<0, 10000>, nullptr},
+        {"multi_freq", "frequency", 0644, "0\n", storeNumber<0, 4>, nullptr},
+        {"haptic_engine", "haptic-engine", 0644, "0\n", storeHapticEngine, nullptr},
+        {"pattern_length", "haptic-engine", 0444, "1356\n", storeNothing, nullptr},
+        {"cp_trigger_index", "prebaked", 0644, "0\n", storeNumber<0, 65535>, nullptr},
+        {"cp_trigger_queue", "prebaked", 0644, "\n", storeQueue, nullptr},
+        {"num_waves", "prebaked", 0444, "0\n", storeNothing, nullptr},
+        {"motor_type", "motor-name", 0644, "NONE\n", storeNothing, nullptr},
+        {"event_cmd", "fold", 0644, "FOLDER_OPEN\n", storeEventCommand, nullptr},
+        {"ext_control", "external-control", 0644, "0\n", storeNumber<0, 1>, nullptr},
+};
+
+template <size_t N>
+const Attribute* find(const Attribute (&attributes)[N], const std::string& leaf) {
+    const auto* found = std::find_if(std::begin(attributes), std::end(attributes),
+                                     [&](const auto& each) { return leaf == each.leaf; });
+    return found == std::end(attributes) ? nullptr : found;
+}
+
+const Attribute* findAttribute(const Node& node) {
+    const std::string leaf = node.leaf();
+    if (const Attribute* common = find(kCommonAttributes, leaf)) return common;
+    const bool isLed = node.path.compare(0, kLedTriggerDirectory.size(), kLedTriggerDirectory) == 0;
+    return isLed ? find(kLedTriggerAttributes, leaf) : find(kTimedOutputAttributes, leaf);
+}
+
+}  // namespace
+
+std::string sysfsDirectory(Layout layout) {
+    return std::string(layout == Layout::kTimedOutput ? kTimedOutputDirectory
+                                                      : kLedTriggerDirectory);
+}
+
+std::vector<std::string> featureNames() {
+    std::vector<std::string> names;
+    for (const Attribute& attribute : kCommonAttributes) {
+        if (std::find(names.begin(), names.end(), attribute.feature) == names.end()) {
+            names.emplace_back(attribute.feature);
+        }
+    }
+    return names;
+}
+
+int createDriver(const std::string& directory, Layout layout, const Features& features) {
+    const std::string nodes = directory + sysfsDirectory(layout);
+    std::error_code error;
+    fs::create_directories(nodes, error);
+    if (!error) fs::create_directories(directory + "/faults", error);
+    if (error) return error.value();
+
+    const auto create = [&](const Attribute& attribute) {
+        const std::string file = nodes + attribute.leaf;
+        fs::remove(file, error);
+        if (attribute.feature != nullptr && features.names.count(attribute.feature) == 0) return 0;
+        std::string initial = attribute.initial;
+        if (file == nodes + "motor_type") initial = features.motor + "\n";
+        if (file == nodes + "num_waves") initial = std::to_string(features.waves) + "\n";
+        if (!writeFile(file, initial) || chmod(file.c_str(), attribute.mode) != 0) return EIO;
+        return 0;
+    };
+    int result = 0;
+    const auto createAll = [&](const auto& attributes) {
+        for (const Attribute& attribute : attributes) {
+            if (result == 0) result = create(attribute);
+        }
+    };
+    createAll(kCommonAttributes);
+    if (layout == Layout::kTimedOutput) {
+        createAll(kTimedOutputAttributes);
+    } else {
+        createAll(kLedTriggerAttributes);
+    }
+    return result;
+}
+
+std::string Node::name() const {
+    return path.substr(strlen("/sys/class/"), path.find("/vibrator/") - strlen("/sys/class/")) +
+           "/" + leaf();
+}
+
+std::string Node::leaf() const {
+    return path.substr(path.rfind('/') + 1);
+}
+
+bool findNode(const std::string& directory, const char* path, Node* node) {
+    for (const std::string_view place : {kTimedOutputDirectory, kLedTriggerDirectory}) {
+        if (strncmp(path, place.data(), place.size()) != 0) continue;
+        *node = {path, directory + path};
+        return true;
+    }
+    return false;
+}
+
+std::vector<Node> listNodes(const std::string& directory) {
+    std::vector<Node> nodes;
+    for (const std::string_view place : {kTimedOutputDirectory, kLedTriggerDirectory}) {
+        std::error_code error;
+        for (const auto& entry : fs::directory_iterator(directory + std::string(place), error)) {
+            const std::string leaf = entry.path().filename();
+            if (leaf != kDeadlineFile) nodes.push_back({std::string(place) + leaf, entry.path()});
+        }
+    }
+    std::sort(nodes.begin(), nodes.end(),
+              [](const Node& a, const Node& b) { return a.path < b.path; });
+    return nodes;
+}
+
+std::string show(const Node& node) {
+    const Attribute* attribute = findAttribute(node);
+    if (attribute != nullptr && attribute->show != nullptr) return attribute->show(node);
+    return readFile(node.file);
+}
+
+ssize_t store(const Node& node, const std::string& bytes) {
+    const std::string_view taken = std::string_view(bytes).substr(0, kPageSize);
+    const Attribute* attribute = findAttribute(node);
+    const int error = attribute == nullptr ? storeText(node, taken) : attribute->store(node, taken);
+    return error != 0 ? error : static_cast<ssize_t>(taken.size());
+}
+
+}  // namespace simulator

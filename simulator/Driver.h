@@ -1,0 +1,63 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <sys/types.h>
+
+#include <cstddef>
+#include <set>
+#include <string>
+#include <vector>
+
+/**
+ * The model of the kernel vibrator driver. Its state is a directory of plain files, one for each
+ * sysfs attribute, so that a daemon, a test and a person see the same driver.
+ */
+namespace simulator {
+
+enum class Layout { kTimedOutput, kLedTrigger };
+
+/** @return where the kernel has the nodes of a layout; ends in a slash. */
+std::string sysfsDirectory(Layout layout);
+
+/** What a driver offers beside running its motor. */
+struct Features {
+    /** Names of featureNames(); each stands for one or more nodes. */
+    std::set<std::string> names;
+    /** Text of the motor_type node. */
+    std::string motor = "LINEAR_1040";
+    /** Number of patterns stored in the driver. */
+    int waves = 12;
+};
+
+/** @return all features that a driver can have. */
+std::vector<std::string> featureNames();
+
+/** Makes the nodes of a driver below a directory. @return an errno, 0 for success. */
+int createDriver(const std::string& directory, Layout layout, const Features& features);
+
+/** A node of the simulated driver. */
+struct Node {
+    /** Its path on a device. */
+    std::string path;
+    /** The file that holds its state. */
+    std::string file;
+
+    /** @return its place as the trace names it, like "leds/intensity". */
+    std::string name() const;
+    /** @return the last part of its path, like "intensity". */
+    std::string leaf() const;
+};
+
+/** @return whether a path lies where the driver's nodes are; then *node is that node. */
+bool findNode(const std::string& directory, const char* path, Node* node);
+
+/** @return the names, like "leds/intensity", of the nodes that exist below a directory. */
+std::vector<Node> listNodes(const std::string& directory);
+
+/** @return what reading the node yields now. */
+std::string show(const Node& node);
+
+/** Hands the node what was written. @return the number of bytes taken, or a negative errno. */
+ssize_t store(const Node& node, const std::string& bytes);
+
+}  // namespace simulator

@@ -1,0 +1,236 @@
+// SPDX-License-Identifier: Apache-2.0
+
+/**
+ * Stands in for the C library's open, read, write and close, and takes those that concern the
+ * driver's nodes to the simulated driver below $VIBRATOR_SIM_DIR. Everything else goes on to the
+ * kernel. Preloaded into a daemon or linked into a test, which then need not know of it.
+ */
+#undef _FORTIFY_SOURCE
+#include "Driver.h"
+#include "Faults.h"
+#include "Trace.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <sys/syscall.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <atomic>
+#include <cerrno>
+#include <cstdarg>
+#include <cstdlib>
+#include <cstring>
+#include <map>
+#include <mutex>
+
+namespace {
+
+using simulator::Node;
+
+int kernelOpen(const char* path, int flags, mode_t mode) {
+    return static_cast<int>(syscall(SYS_openat, AT_FDCWD, path, flags | O_LARGEFILE, mode));
+}
+ssize_t kernelRead(int file, void* buffer, size_t size) {
+    return syscall(SYS_read, file, buffer, size);
+}
+ssize_t kernelWrite(int file, const void* buffer, size_t size) {
+    return syscall(SYS_write, file, buffer, size);
+}
+int kernelClose(int file) {
+    return static_cast<int>(syscall(SYS_close, file));
+}
+
+/** A node that is open; its descriptor is one of the file that holds its state. */
+struct OpenNode {
+    std::string directory;
+    Node node;
+    size_t offset = 0;
+};
+
+/** The nodes that are open in this process. */
+class OpenNodes {
+  public:
+    static OpenNodes& instance() {
+        // Never destroyed: other threads and destructors may use files until the very end.
+        static auto* nodes = new OpenNodes;
+        return *nodes;
+    }
+
+    /** @return whether any node is open; does without a lock in the common case that none is. */
+    static bool any() { return sCount.load(std::memory_order_acquire) > 0; }
+
+    void add(int file, OpenNode node) {
+        const std::lock_guard<std::mutex> lock(mMutex);
+        mNodes[file] = std::move(node);
+        sCount = static_cast<int>(mNodes.size());
+    }
+    void remove(int file) {
+        const std::lock_guard<std::mutex> lock(mMutex);
+        mNodes.erase(file);
+        sCount = static_cast<int>(mNodes.size());
+    }
+    /** @return the node behind a descriptor, nullptr where it is something else. */
+    OpenNode* find(int file) {
+        const std::lock_guard<std::mutex> lock(mMutex);
+        const auto entry = mNodes.find(file);
+        return entry == mNodes.end() ? nullptr : &entry->second;
+    }
+
+  private:
+    static std::atomic<int> sCount;
+
+    std::mutex mMutex;
+    std::map<int, OpenNode> mNodes;
+};
+
+std::atomic<int> OpenNodes::sCount{0};
+
+OpenNode* findOpenNode(int file) {
+    return OpenNodes::any() ? OpenNodes::instance().find(file) : nullptr;
+}
+
+/** Turns a result into what a system call returns: -1 and errno for a negative errno. */
+template <typename T>
+T answer(T result) {
+    if (result >= 0) return result;
+    errno = static_cast<int>(-result);
+    return -1;
+}
+
+const char* accessName(int flags) {
+    constexpr const char* kNames[] = {"O_RDONLY", "O_WRONLY", "O_RDWR", "O_ACCMODE"};
+    return kNames[flags & O_ACCMODE];
+}
+
+/** Opens a node as the kernel would. @return a descriptor, or a negative errno. */
+int openNode(const Node& node, int flags) {
+    struct stat info;
+    if (stat(node.file.c_str(), &info) != 0) return -errno;
+    // Root is let into any plain file, but the driver's own mode binds root too.
+    const bool reads = (flags & O_ACCMODE) != O_WRONLY;
+    const bool writes = (flags & O_ACCMODE) != O_RDONLY;
+    if ((reads && (info.st_mode & 0444) == 0) || (writes && (info.st_mode & 0222) == 0)) {
+        return -EACCES;
+    }
+    const int file = kernelOpen(node.file.c_str(), flags & (O_ACCMODE | O_CLOEXEC | O_NONBLOCK), 0);
+    return file < 0 ? -errno : file;
+}
+
+int simulateOpen(const std::string& directory, const Node& node, int flags) {
+    const std::string access = node.name() + " open " + accessName(flags);
+    const auto fault = simulator::takeFault(directory, node.leaf(), "open");
+    const int file = fault ? -fault->error : openNode(node, flags);
+    simulator::trace(directory, access, std::min(file, 0));
+    if (file >= 0) OpenNodes::instance().add(file, {directory, node});
+    return answer(file);
+}
+
+ssize_t simulateRead(OpenNode& open, void* buffer, size_t size) {
+    const auto fault = simulator::takeFault(open.directory, open.node.leaf(), "read");
+    ssize_t result = 0;
+    if (fault && fault->error != 0) {
+        result = -fault->error;
+    } else {
+        const std::string text = simulator::show(open.node);
+        const size_t start = std::min(open.offset, text.size());
+        size_t length = std::min(size, text.size() - start);
+        if (fault) length = std::min(length, fault->bytes);
+        memcpy(buffer, text.data() + start, length);
+        open.offset = start + length;
+        result = static_cast<ssize_t>(length);
+    }
+    const auto shown = static_cast<size_t>(std::max<ssize_t>(result, 0));
+    simulator::trace(open.directory, open.node.name() + " read " + std::to_string(size), result,
+                     result < 0 ? "" : simulator::quote({static_cast<char*>(buffer), shown}));
+    return answer(result);
+}
+
+ssize_t simulateWrite(const OpenNode& open, const void* buffer, size_t size) {
+    const std::string bytes(static_cast<const char*>(buffer), size);
+    const auto fault = simulator::takeFault(open.directory, open.node.leaf(), "write");
+    ssize_t result = 0;
+    if (!fault) {
+        result = simulator::store(open.node, bytes);
+    } else {
+        // A driver that is cut short has not taken the value.
+        result = fault->error != 0 ? -fault->error
+                                   : static_cast<ssize_t>(std::min(size, fault->bytes));
+    }
+    simulator::trace(open.directory, open.node.name() + " write " + simulator::quote(bytes),
+                     result);
+    return answer(result);
+}
+
+int simulateClose(int file, const OpenNode& open) {
+    const auto fault = simulator::takeFault(open.directory, open.node.leaf(), "close");
+    const int result = fault ? -fault->error : 0;
+    simulator::trace(open.directory, open.node.name() + " close", result);
+    OpenNodes::instance().remove(file);
+    kernelClose(file);
+    return answer(result);
+}
+
+bool takesMode(int flags) {
+    return (flags & O_CREAT) != 0 || (flags & O_TMPFILE) == O_TMPFILE;
+}
+
+int openAnything(const char* path, int flags, mode_t mode) {
+    const char* directory = getenv("VIBRATOR_SIM_DIR");
+    Node node;
+    if (directory != nullptr && path != nullptr && simulator::findNode(directory, path, &node)) {
+        return simulateOpen(directory, node, flags);
+    }
+    return kernelOpen(path, flags, mode);
+}
+
+}  // namespace
+
+extern "C" {
+
+// NOLINTBEGIN(readability-inconsistent-declaration-parameter-name): the C library's names are
+// reserved ones.
+
+int open(const char* path, int flags, ...) {
+    mode_t mode = 0;
+    if (takesMode(flags)) {
+        va_list arguments;
+        va_start(arguments, flags);
+        mode = va_arg(arguments, mode_t);  // NOLINT(clang-analyzer-valist.Uninitialized): it is not
+        va_end(arguments);
+    }
+    return openAnything(path, flags, mode);
+}
+int open64(const char* path, int flags, ...) __attribute__((alias("open")));
+
+// What a fortified program calls in place of open and read.
+int __open_2(const char* path, int flags);
+int __open_2(const char* path, int flags) {
+    return openAnything(path, flags, 0);
+}
+int __open64_2(const char* path, int flags) __attribute__((alias("__open_2")));
+
+ssize_t read(int file, void* buffer, size_t size) {
+    OpenNode* node = findOpenNode(file);
+    return node == nullptr ? kernelRead(file, buffer, size) : simulateRead(*node, buffer, size);
+}
+
+ssize_t __read_chk(int file, void* buffer, size_t size, size_t room);
+ssize_t __read_chk(int file, void* buffer, size_t size, size_t room) {
+    if (size > room) abort();
+    return read(file, buffer, size);
+}
+
+ssize_t write(int file, const void* buffer, size_t size) {
+    const OpenNode* node = findOpenNode(file);
+    return node == nullptr ? kernelWrite(file, buffer, size) : simulateWrite(*node, buffer, size);
+}
+
+int close(int file) {
+    const OpenNode* node = findOpenNode(file);
+    return node == nullptr ? kernelClose(file) : simulateClose(file, *node);
+}
+
+// NOLINTEND(readability-inconsistent-declaration-parameter-name)
+
+}  // extern "C"

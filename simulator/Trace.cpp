@@ -1,0 +1,60 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Trace.h"
+
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <cstring>
+#include <ctime>
+
+namespace simulator {
+
+std::string traceFile(const std::string& directory) {
+    return directory + "/trace";
+}
+
+std::string quote(std::string_view bytes) {
+    std::string quoted = "\"";
+    for (const char c : bytes) {
+        if (c == '\n') {
+            quoted += "\\n";
+        } else if (c == '\0') {
+            quoted += "\\0";
+        } else if (c == '"' || c == '\\') {
+            quoted += '\\';
+            quoted += c;
+        } else if (c < 0x20 || c == 0x7f) {
+            char hex[8];
+            snprintf(hex, sizeof(hex), "\\x%02x", static_cast<unsigned char>(c));
+            quoted += hex;
+        } else {
+            quoted += c;
+        }
+    }
+    return quoted + '"';
+}
+
+void trace(const std::string& directory, const std::string& access, long result,
+           const std::string& shown) {
+    timespec time{};
+    clock_gettime(CLOCK_MONOTONIC, &time);
+    char clock[32];
+    snprintf(clock, sizeof(clock), "%lld.%06ld ", static_cast<long long>(time.tv_sec),
+             time.tv_nsec / 1000);
+    std::string line = clock + access + " = ";
+    line += result < 0 ? std::string("-1 ") + strerrorname_np(static_cast<int>(-result))
+                       : std::to_string(result);
+    if (!shown.empty()) line += " " + shown;
+    line += '\n';
+
+    const int file =
+            open(traceFile(directory).c_str(), O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC, 0666);
+    if (file < 0) return;
+    // One write a line, so that the lines of several processes do not mix. There is nobody to
+    // complain to when it fails.
+    [[maybe_unused]] const ssize_t written = write(file, line.data(), line.size());
+    close(file);
+}
+
+}  // namespace simulator
