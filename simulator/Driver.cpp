@@ -300,12 +300,12 @@ std::string Node::leaf() const {
 }
 
 bool findNode(const std::string& directory, const char* path, Node* node) {
-    for (const std::string_view place : {kTimedOutputDirectory, kLedTriggerDirectory}) {
-        if (strncmp(path, place.data(), place.size()) != 0) continue;
-        *node = {path, directory + path};
-        return true;
-    }
-    return false;
+    const auto liesIn = [&](std::string_view place) {
+        return strncmp(path, place.data(), place.size()) == 0;
+    };
+    if (!liesIn(kTimedOutputDirectory) && !liesIn(kLedTriggerDirectory)) return false;
+    *node = {path, directory + path};
+    return true;
 }
 
 std::vector<Node> listNodes(const std::string& directory) {

@@ -90,12 +90,13 @@ OpenNode* findOpenNode(int file) {
     return OpenNodes::any() ? OpenNodes::instance().find(file) : nullptr;
 }
 
-/** Turns a result into what a system call returns: -1 and errno for a negative errno. */
-template <typename T>
-T answer(T result) {
-    if (result >= 0) return result;
-    errno = static_cast<int>(-result);
-    return -1;
+/** Makes of a result, or negative errno, what a system call returns; success leaves errno alone. */
+template <typename Call>
+auto answer(Call call) {
+    const int before = errno;
+    const auto result = call();
+    errno = result < 0 ? static_cast<int>(-result) : before;
+    return std::max<decltype(call())>(result, -1);
 }
 
 const char* accessName(int flags) {
@@ -123,7 +124,7 @@ int simulateOpen(const std::string& directory, const Node& node, int flags) {
     const int file = fault ? -fault->error : openNode(node, flags);
     simulator::trace(directory, access, std::min(file, 0));
     if (file >= 0) OpenNodes::instance().add(file, {directory, node});
-    return answer(file);
+    return file;
 }
 
 ssize_t simulateRead(OpenNode& open, void* buffer, size_t size) {
@@ -143,7 +144,7 @@ ssize_t simulateRead(OpenNode& open, void* buffer, size_t size) {
     const auto shown = static_cast<size_t>(std::max<ssize_t>(result, 0));
     simulator::trace(open.directory, open.node.name() + " read " + std::to_string(size), result,
                      result < 0 ? "" : simulator::quote({static_cast<char*>(buffer), shown}));
-    return answer(result);
+    return result;
 }
 
 ssize_t simulateWrite(const OpenNode& open, const void* buffer, size_t size) {
@@ -159,7 +160,7 @@ ssize_t simulateWrite(const OpenNode& open, const void* buffer, size_t size) {
     }
     simulator::trace(open.directory, open.node.name() + " write " + simulator::quote(bytes),
                      result);
-    return answer(result);
+    return result;
 }
 
 int simulateClose(int file, const OpenNode& open) {
@@ -168,7 +169,7 @@ int simulateClose(int file, const OpenNode& open) {
     simulator::trace(open.directory, open.node.name() + " close", result);
     OpenNodes::instance().remove(file);
     kernelClose(file);
-    return answer(result);
+    return result;
 }
 
 bool takesMode(int flags) {
@@ -179,7 +180,7 @@ int openAnything(const char* path, int flags, mode_t mode) {
     const char* directory = getenv("VIBRATOR_SIM_DIR");
     Node node;
     if (directory != nullptr && path != nullptr && simulator::findNode(directory, path, &node)) {
-        return simulateOpen(directory, node, flags);
+        return answer([&] { return simulateOpen(directory, node, flags); });
     }
     return kernelOpen(path, flags, mode);
 }
@@ -212,7 +213,8 @@ int __open64_2(const char* path, int flags) __attribute__((alias("__open_2")));
 
 ssize_t read(int file, void* buffer, size_t size) {
     OpenNode* node = findOpenNode(file);
-    return node == nullptr ? kernelRead(file, buffer, size) : simulateRead(*node, buffer, size);
+    return node == nullptr ? kernelRead(file, buffer, size)
+                           : answer([&] { return simulateRead(*node, buffer, size); });
 }
 
 ssize_t __read_chk(int file, void* buffer, size_t size, size_t room);
@@ -223,12 +225,13 @@ ssize_t __read_chk(int file, void* buffer, size_t size, size_t room) {
 
 ssize_t write(int file, const void* buffer, size_t size) {
     const OpenNode* node = findOpenNode(file);
-    return node == nullptr ? kernelWrite(file, buffer, size) : simulateWrite(*node, buffer, size);
+    return node == nullptr ? kernelWrite(file, buffer, size)
+                           : answer([&] { return simulateWrite(*node, buffer, size); });
 }
 
 int close(int file) {
     const OpenNode* node = findOpenNode(file);
-    return node == nullptr ? kernelClose(file) : simulateClose(file, *node);
+    return node == nullptr ? kernelClose(file) : answer([&] { return simulateClose(file, *node); });
 }
 
 // NOLINTEND(readability-inconsistent-declaration-parameter-name)

@@ -1,0 +1,163 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "support/VibratorTest.h"
+
+#include <cerrno>
+#include <climits>
+
+namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
+namespace {
+
+class NodePrimitivesTest : public VibratorTest {
+  protected:
+    NodePrimitivesTest() { start(Layout::kLedTrigger); }
+
+    Status write(const std::string& leaf, int value) {
+        return VibratorPeer::writeNode(*mVibrator, path(leaf), value);
+    }
+    int32_t readNumber(const std::string& leaf) {
+        return VibratorPeer::readNode(*mVibrator, path(leaf));
+    }
+};
+
+TEST_F(NodePrimitivesTest, WritesDecimalTextAndNewline) {
+    // A node that the driver does not know takes any text.
+    setNode("scratch", "");
+    const std::pair<int, std::string> cases[] = {{0, "0\n"},
+                                                 {-1, "-1\n"},
+                                                 {500, "500\n"},
+                                                 {INT_MAX, "2147483647\n"},
+                                                 {INT_MIN, "-2147483648\n"}};
+    for (const auto& [value, text] : cases) {
+        EXPECT_EQ(write("scratch", value), Status::OK) << value;
+        EXPECT_EQ(trace(), written("scratch", text));
+        EXPECT_EQ(log(), writeLog("scratch", value));
+    }
+}
+
+TEST_F(NodePrimitivesTest, FailedWriteIsUnknownErrorWithItsErrno) {
+    fail("intensity", "write", "EIO");
+    errno = 0;
+    EXPECT_EQ(write("intensity", 5), Status::UNKNOWN_ERROR);
+    EXPECT_EQ(errno, EIO);
+    EXPECT_EQ(trace(),
+              (Lines{"leds/intensity open O_RDWR = 0", "leds/intensity write \"5\\n\" = -1 EIO",
+                     "leds/intensity close = 0"}));
+    EXPECT_EQ(log(), writeLog("intensity", 5, false));
+}
+
+TEST_F(NodePrimitivesTest, ShortWriteIsNotContinued) {
+    fail("intensity", "write", "short=2");
+    EXPECT_EQ(write("intensity", 500), Status::UNKNOWN_ERROR);
+    EXPECT_EQ(trace(), (Lines{"leds/intensity open O_RDWR = 0",
+                              "leds/intensity write \"500\\n\" = 2", "leds/intensity close = 0"}));
+    EXPECT_EQ(log(), writeLog("intensity", 500, false));
+}
+
+TEST_F(NodePrimitivesTest, ValueThatTheDriverRejectsIsUnknownError) {
+    EXPECT_EQ(write("intensity", 10001), Status::UNKNOWN_ERROR);
+    EXPECT_EQ(log(), writeLog("intensity", 10001, false));
+}
+
+TEST_F(NodePrimitivesTest, NodeThatCannotBeOpenedIsUnknownErrorWithItsErrno) {
+    removeNode("intensity");
+    errno = 0;
+    EXPECT_EQ(write("intensity", 7), Status::UNKNOWN_ERROR);
+    EXPECT_EQ(errno, ENOENT);
+    EXPECT_EQ(log(), openFailedLog("intensity", 7, ENOENT));
+    EXPECT_EQ(readNumber("intensity"), -1);
+    EXPECT_EQ(log(), (Lines{"D >> readNode node:" + path("intensity") + " ",
+                            "E node: " + path("intensity") + " open failed. errno: 2"}));
+    EXPECT_EQ(VibratorPeer::writeNode(*mVibrator, "", 1), Status::UNKNOWN_ERROR);
+    EXPECT_EQ(log(), (Lines{"D >> writeNode node: val:1", "E node:  open failed. errno: 2"}));
+}
+
+TEST_F(NodePrimitivesTest, InterruptedCallsAreIssuedAgain) {
+    for (const char* operation : {"open", "write"})
+        fail("intensity", operation, "EINTR", 3);
+    EXPECT_EQ(write("intensity", 9), Status::OK);
+    EXPECT_EQ(trace(), join({{3, "leds/intensity open O_RDWR = -1 EINTR"},
+                             {"leds/intensity open O_RDWR = 0"},
+                             {3, "leds/intensity write \"9\\n\" = -1 EINTR"},
+                             {"leds/intensity write \"9\\n\" = 2", "leds/intensity close = 0"}}));
+    for (const char* operation : {"open", "read"})
+        fail("intensity", operation, "EINTR", 1000);
+    EXPECT_EQ(readNumber("intensity"), 9);
+    EXPECT_EQ(trace().size(), 2003U);
+    // Closing is not repeated: the descriptor is gone whatever close says.
+    fail("intensity", "close", "EINTR", 1);
+    EXPECT_EQ(write("intensity", 10), Status::OK);
+    EXPECT_EQ(trace().back(), "leds/intensity close = -1 EINTR");
+}
+
+struct Number {
+    std::string text;
+    int32_t value;
+};
+
+TEST_F(NodePrimitivesTest, ReadsTheLeadingNumberOfSevenBytes) {
+    const Number cases[] = {
+            {"  42\n", 42},
+            {"7\n", 7},
+            {"-5", -5},
+            {"+3\n", 3},
+            {"\t\n 8 9\n", 8},
+            {"12ms\n", 12},
+            {"00012", 12},
+            {"12345678", 1234567},
+            {"-1\n", -1},
+            {"1 2", 1},
+            {"0x1F", 0},
+            {"5.7", 5},
+            // No number at all.
+            {"", -1},
+            {"\n", -1},
+            {"word\n", -1},
+            {"-", -1},
+            {"+", -1},
+            {"+-5", -1},
+            {"- 5", -1},
+            {"       5", -1},
+            {std::string("\0005", 2), -1},
+    };
+    for (const auto& [text, value] : cases) {
+        setNode("intensity", text);
+        EXPECT_EQ(readNumber("intensity"), value) << testing::PrintToString(text);
+        EXPECT_EQ(trace(), read("intensity", text.substr(0, 7), 7));
+        EXPECT_EQ(log(), readLog("intensity"));
+    }
+}
+
+TEST_F(NodePrimitivesTest, FailedReadIsMinusOne) {
+    fail("intensity", "read", "EIO");
+    EXPECT_EQ(readNumber("intensity"), -1);
+    EXPECT_EQ(trace(), (Lines{"leds/intensity open O_RDONLY = 0", "leds/intensity read 7 = -1 EIO",
+                              "leds/intensity close = 0"}));
+    EXPECT_EQ(log(), (Lines{"D >> readNode node:" + path("intensity") + " ",
+                            "E node: " + path("intensity") + " read failed. errno: 5"}));
+}
+
+TEST_F(NodePrimitivesTest, ProbesTellWhetherTheNodeOpensInTheirMode) {
+    const struct {
+        unsigned mode;
+        bool forWriting;
+        bool forReading;
+    } cases[] = {{0644, true, true}, {0444, false, true}, {0200, false, false}};
+    for (const auto& [mode, forWriting, forReading] : cases) {
+        setMode("intensity", mode);
+        EXPECT_EQ(VibratorPeer::isNodeExist(*mVibrator, path("intensity")), forWriting) << mode;
+        EXPECT_EQ(log(), probeLog("intensity", forWriting));
+        EXPECT_EQ(VibratorPeer::isNodeExistForRead(*mVibrator, path("intensity")), forReading);
+        EXPECT_EQ(log(), (Lines{"D isNodeExistForRead node:" + path("intensity") + " ",
+                                forReading ? "D true" : "D false"}));
+    }
+    setMode("intensity", 0644);
+    trace();
+    VibratorPeer::isNodeExist(*mVibrator, path("intensity"));
+    VibratorPeer::isNodeExistForRead(*mVibrator, path("intensity"));
+    VibratorPeer::isNodeExist(*mVibrator, path("absent"));
+    EXPECT_EQ(trace(),
+              join({probed("intensity"), probed("intensity", "O_RDONLY"), missing("absent")}));
+}
+
+}  // namespace
+}  // namespace vendor::velmora::hardware::vibrator::V2_1::implementation
