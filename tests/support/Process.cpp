@@ -1,0 +1,145 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "support/Process.h"
+
+#include <fcntl.h>
+#include <grp.h>
+#include <sys/mman.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <csignal>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+#include <thread>
+
+namespace {
+
+/** Exit code of a child that could not even become what it should. */
+constexpr int kNotStarted = 126;
+
+int exitCodeOf(pid_t pid) {
+    int status = 0;
+    while (waitpid(pid, &status, 0) < 0 && errno == EINTR) {
+    }
+    return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status);
+}
+
+void becomeUser(uid_t uid) {
+    if (uid == geteuid()) return;
+    if (setgroups(0, nullptr) != 0 || setgid(uid) != 0 || setuid(uid) != 0) _exit(kNotStarted);
+}
+
+[[noreturn]] void execute(const std::vector<std::string>& command) {
+    std::vector<char*> arguments;
+    for (const std::string& word : command)
+        arguments.push_back(const_cast<char*>(word.c_str()));
+    arguments.push_back(nullptr);
+    execv(arguments[0], arguments.data());
+    _exit(kNotStarted);
+}
+
+int memoryFile(const std::string& text) {
+    const int file = memfd_create("text", MFD_CLOEXEC);
+    if (write(file, text.data(), text.size()) < 0) abort();
+    lseek(file, 0, SEEK_SET);
+    return file;
+}
+
+std::string takeText(int file) {
+    std::string text(static_cast<size_t>(lseek(file, 0, SEEK_END)), '\0');
+    if (pread(file, text.data(), text.size(), 0) < 0) text = "unreadable";
+    close(file);
+    return text;
+}
+
+}  // namespace
+
+Outcome runProgram(const std::vector<std::string>& command, uid_t uid, const std::string& input) {
+    const int in = memoryFile(input);
+    const int out = memoryFile("");
+    const int err = memoryFile("");
+    const pid_t pid = fork();
+    if (pid == 0) {
+        dup2(in, STDIN_FILENO);
+        dup2(out, STDOUT_FILENO);
+        dup2(err, STDERR_FILENO);
+        becomeUser(uid);
+        execute(command);
+    }
+    const int code = exitCodeOf(pid);
+    close(in);
+    return {code, takeText(out), takeText(err)};
+}
+
+int runAs(uid_t uid, const std::function<int()>& function) {
+    const pid_t pid = fork();
+    if (pid == 0) {
+        becomeUser(uid);
+        _exit(function());
+    }
+    return exitCodeOf(pid);
+}
+
+void ChildProcess::start(const std::function<void(const std::function<void()>& ready)>& function) {
+    int channel[2];
+    if (pipe(channel) != 0) abort();
+    mPid = fork();
+    if (mPid == 0) {
+        close(channel[0]);
+        function([&] { close(channel[1]); });
+        _exit(0);
+    }
+    close(channel[1]);
+    char nothing = 0;
+    // Ends with the child's end of the pipe, be it closed or the child dead.
+    if (read(channel[0], &nothing, 1) != 0) abort();
+    close(channel[0]);
+}
+
+void ChildProcess::startProgram(const std::vector<std::string>& command, const std::string& logFile,
+                                const std::vector<std::string>& environment) {
+    const int log = open(logFile.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0644);
+    mPid = fork();
+    if (mPid == 0) {
+        dup2(log, STDERR_FILENO);
+        for (const std::string& each : environment)
+            putenv(const_cast<char*>(each.c_str()));
+        execute(command);
+    }
+    close(log);
+}
+
+void ChildProcess::kill() {
+    if (mPid < 0) return;
+    ::kill(mPid, SIGKILL);
+    exitCodeOf(mPid);
+    mPid = -1;
+}
+
+bool ChildProcess::isAlive() const {
+    siginfo_t info{};
+    return waitid(P_PID, static_cast<id_t>(mPid), &info, WEXITED | WNOHANG | WNOWAIT) == 0 &&
+           info.si_pid == 0;
+}
+
+size_t ChildProcess::descriptors() const {
+    const std::filesystem::directory_iterator files("/proc/" + std::to_string(mPid) + "/fd");
+    return static_cast<size_t>(std::distance(begin(files), end(files)));
+}
+
+bool eventually(const std::function<bool()>& condition) {
+    for (int attempt = 0; attempt < 2000; ++attempt) {
+        if (condition()) return true;
+        std::this_thread::sleep_for(std::chrono::milliseconds(5));
+    }
+    return false;
+}
+
+std::string readFile(const std::string& path) {
+    std::ostringstream text;
+    text << std::ifstream(path).rdbuf();
+    return text.str();
+}

@@ -1,0 +1,53 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <sys/types.h>
+
+#include <functional>
+#include <string>
+#include <vector>
+
+/** What came of a program that has ended. */
+struct Outcome {
+    /** Its exit code; 128 and the signal's number where a signal ended it. */
+    int exitCode;
+    std::string output;
+    std::string errors;
+};
+
+/** Runs a program to its end, as another user where asked for, with text on standard input. */
+Outcome runProgram(const std::vector<std::string>& command, uid_t uid = 0,
+                   const std::string& input = {});
+
+/** Runs a function in a process of its own and another uid. @return its exit code. */
+int runAs(uid_t uid, const std::function<int()>& function);
+
+/** A process that goes on until it is killed, in the destructor at the latest. */
+class ChildProcess {
+  public:
+    /** Runs a function in a child; it must call ready() before start returns. */
+    void start(const std::function<void(const std::function<void()>& ready)>& function);
+    /** Runs a program with standard error in a file, and more environment, as NAME=VALUE. */
+    void startProgram(const std::vector<std::string>& command, const std::string& logFile,
+                      const std::vector<std::string>& environment);
+
+    ChildProcess() = default;
+    ChildProcess(const ChildProcess&) = delete;
+    ChildProcess& operator=(const ChildProcess&) = delete;
+    ~ChildProcess() { kill(); }
+
+    void kill();
+    bool isAlive() const;
+    pid_t pid() const { return mPid; }
+    /** @return how many descriptors the process has open. */
+    size_t descriptors() const;
+
+  private:
+    pid_t mPid = -1;
+};
+
+/** Waits up to ten seconds for something to become true. @return whether it has. */
+bool eventually(const std::function<bool()>& condition);
+
+/** @return what a file holds. */
+std::string readFile(const std::string& path);
