@@ -350,12 +350,13 @@ int Client::engine() {
     }
     if (!mFile.empty()) {
         std::ifstream file(mFile);
-        if (mFile != "-" && !file) {
+        std::ostringstream text;
+        text << (mFile == "-" ? std::cin : file).rdbuf();
+        // An empty file makes the copy fail too, but not go bad.
+        if (mFile != "-" && (!file || text.bad())) {
             std::cerr << "vibratorctl: " << mFile << ": cannot be read\n";
             return kUsage;
         }
-        std::ostringstream text;
-        text << (mFile == "-" ? std::cin : file).rdbuf();
         if (!parsePackets(text.str(), &packets, &error)) {
             std::cerr << "vibratorctl: " << mFile << ": " << error << '\n';
             return kUsage;

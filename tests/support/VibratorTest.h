@@ -6,6 +6,7 @@
 #include "Vibrator.h"
 #include "support/LogCapture.h"
 #include "support/TemporaryDirectory.h"
+#include "support/VibratorPeer.h"
 
 #include <gtest/gtest.h>
 
@@ -25,27 +26,6 @@ inline void PrintTo(Status status, std::ostream* out) {
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 
 using simulator::Layout;
-
-/** What is private to the service object. */
-struct VibratorPeer {
-    static Status writeNode(Vibrator& vibrator, const std::string& node, int value) {
-        return vibrator.writeNode(node, value);
-    }
-    static int32_t readNode(Vibrator& vibrator, const std::string& node) {
-        return vibrator.readNode(node);
-    }
-    static bool isNodeExist(Vibrator& vibrator, const std::string& node) {
-        return vibrator.isNodeExist(node);
-    }
-    static bool isNodeExistForRead(Vibrator& vibrator, const std::string& node) {
-        return vibrator.isNodeExistForRead(node);
-    }
-    static bool isVibrating(Vibrator& vibrator) { return vibrator.isVibrating(); }
-    static int32_t getMotorIndex(Vibrator& vibrator) { return vibrator.getMotorIndex(); }
-    static int32_t getMotorIndexbyMethod(Vibrator& vibrator) {
-        return vibrator.getMotorIndexbyMethod();
-    }
-};
 
 /** Makes this thread's calls look like another uid's. */
 class CallerIdentity {

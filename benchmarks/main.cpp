@@ -1,0 +1,18 @@
+// SPDX-License-Identifier: Apache-2.0
+
+/**
+ * Each subject stands beside its floor, the least that any code doing the same would take, as
+ * "NAME" and "NAME/floor"; scripts/bench runs them interleaved and prints the ratios.
+ */
+#include <benchmark/benchmark.h>
+
+#include <cstdlib>
+
+int main(int argc, char** argv) {
+    // The log is no part of what is measured.
+    setenv("ANDROID_LOG_TAGS", "*:S", 1);
+    benchmark::Initialize(&argc, argv);
+    if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 2;
+    benchmark::RunSpecifiedBenchmarks();
+    return 0;
+}

@@ -1,0 +1,66 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "log/LogFilter.h"
+#include "support/LogCapture.h"
+
+#include <android/log.h>
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <cerrno>
+
+namespace {
+
+using android::log::LogFilter;
+
+TEST(LogFilterTest, RulesDecideByTagAndPriority) {
+    const struct {
+        const char* rules;
+        int priority;
+        const char* tag;
+        bool shown;
+    } cases[] = {
+            {"", ANDROID_LOG_VERBOSE, "A", true},
+            {"*:S", ANDROID_LOG_FATAL, "A", false},
+            {"*:S A:D", ANDROID_LOG_DEBUG, "A", true},
+            {"*:S A:D", ANDROID_LOG_VERBOSE, "A", false},
+            {"*:S A:D", ANDROID_LOG_FATAL, "AB", false},
+            {"A:w,*:e", ANDROID_LOG_WARN, "A", true},
+            {"A:w,*:e", ANDROID_LOG_WARN, "B", false},
+            {"A:w,*:e", ANDROID_LOG_ERROR, "B", true},
+            {"*:I A", ANDROID_LOG_VERBOSE, "A", true},
+            {"*", ANDROID_LOG_VERBOSE, "A", false},
+            {"*", ANDROID_LOG_DEBUG, "A", true},
+            {"  A:S\t", ANDROID_LOG_FATAL, "A", false},
+            {"A:F", ANDROID_LOG_ERROR, "A", false},
+    };
+    for (const auto& [rules, priority, tag, shown] : cases) {
+        EXPECT_EQ(LogFilter(rules).shows(priority, tag), shown) << rules << ' ' << tag;
+        EXPECT_EQ(LogFilter(rules).firstBadRule(), "");
+    }
+    for (const char* bad : {"A:", "A:X", "A:DD", ":D", "A:3"}) {
+        EXPECT_EQ(LogFilter(std::string("B:E ") + bad + " C:!").firstBadRule(), bad);
+        EXPECT_FALSE(LogFilter(std::string("B:E ") + bad).shows(ANDROID_LOG_WARN, "B"));
+    }
+}
+
+TEST(LogTest, LineHasTheBriefForm) {
+    LogCapture log;
+    const std::string pid = std::to_string(getpid());
+    const std::string shown = std::string(pid.size() < 5 ? 5 - pid.size() : 0, ' ') + pid;
+    errno = 33;
+    EXPECT_EQ(__android_log_print(ANDROID_LOG_ERROR, "Tag", "%d of %s", 7, "nine"), 1);
+    EXPECT_EQ(errno, 33);
+    EXPECT_EQ(log.takeText(), "E/Tag     (" + shown + "): 7 of nine\n");
+    __android_log_print(ANDROID_LOG_DEBUG, "QorVibrator-HAL2.1", "a\nb\x1b[31m\x7f\xc3\xa9");
+    EXPECT_EQ(log.takeText(), "D/QorVibrator-HAL2.1(" + shown + "): a\\nb\\x1b[31m\\x7f\xc3\xa9\n");
+    __android_log_print(ANDROID_LOG_DEBUG, "T", "%s", std::string(5000, '\n').c_str());
+    const std::string longest = log.takeText();
+    EXPECT_EQ(longest.substr(longest.find("): ") + 3), [] {
+        std::string text;
+        for (int i = 0; i < 1023; ++i)
+            text += "\\n";
+        return text + "\n";
+    }());
+}
+
+}  // namespace

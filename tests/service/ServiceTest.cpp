@@ -1,0 +1,138 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "support/ServiceTest.h"
+
+#include "support/LogCapture.h"
+
+#include <algorithm>
+#include <regex>
+
+namespace {
+
+using Status = ::android::hardware::vibrator::V1_0::Status;
+
+TEST_F(ServiceTest, StartsInItsOrder) {
+    createDriver({"--features", "none"});
+    start();
+    Lines lines = cutDown(log());
+    ASSERT_GE(lines.size(), 11U);
+    const std::regex startLine(
+            "D/vendor\\.velmora\\.hardware\\.vibrator@2\\.1-service\\( *[0-9]+\\): "
+            "qor-vibrator-2-1 starts");
+    EXPECT_TRUE(std::regex_match(lines[0], startLine)) << lines[0];
+    EXPECT_EQ(lines[1], "D !@QOR VIB HAL init");
+    EXPECT_EQ(lines[10], "D Vibrator using LED trigger");
+    EXPECT_EQ(lines.back(),
+              "D Vibrator THE_DEVICE_EXT_CONTROL /sys/class/leds/vibrator/ext_control");
+    EXPECT_EQ(lines.size(), 22U);
+}
+
+TEST_F(ServiceTest, RegistersWithoutADriver) {
+    start();
+    const Lines lines = cutDown(log());
+    EXPECT_EQ(std::count(lines.begin(), lines.end(),
+                         "D Vibrator driver does not exist. Remove VIB HAL or Setup Vibrator "
+                         "Driver"),
+              1);
+    EXPECT_EQ(lines.back(), "D Vibrator THE_DEVICE_EXT_CONTROL ");
+    EXPECT_EQ(Status(IDaxVibrator::getService()->on(5)), Status::UNKNOWN_ERROR);
+}
+
+TEST_F(ServiceTest, ServesTheMotorAndItsStrength) {
+    createDriver();
+    start();
+    const auto vibrator = IDaxVibrator::getService();
+    EXPECT_EQ(Status(vibrator->on(60000)), Status::OK);
+    EXPECT_EQ(node("duration"), "60000\n");
+    EXPECT_EQ(runProgram({VIBRATOR_SIM, "show"}).output.find("activate \"1\\n\""),
+              std::string("/sys/class/leds/vibrator/").size());
+    EXPECT_EQ(Status(vibrator->off()), Status::OK);
+    EXPECT_EQ(Status(vibrator->daxPerformHapticEngine({{1, 2, 3, 4}}, 10000)), Status::OK);
+    EXPECT_EQ(node("haptic_engine"), "4 1 2 3 4\n");
+    bool answered = false;
+    vibrator->daxGetAmplitudeList(
+            ::vendor::velmora::hardware::vibrator::V2_1::DaxAmplitudeType::TYPE_1,
+            [&](bool supported, const android::hardware::hidl_vec<uint32_t>& list) {
+                answered = supported;
+                EXPECT_EQ(std::vector<uint32_t>(list),
+                          (std::vector<uint32_t>{0, 2000, 4000, 6000, 8000, 10000}));
+            });
+    EXPECT_TRUE(answered);
+}
+
+TEST_F(ServiceTest, GateJudgesTheRealCaller) {
+    if (geteuid() != 0) GTEST_SKIP() << "only root can become somebody else";
+    createDriver();
+    start();
+    const std::pair<uid_t, bool> callers[] = {
+            {0, true}, {1000, true}, {1001, false}, {2000, false}, {10123, false}};
+    for (const auto& [uid, permitted] : callers) {
+        const bool expected = permitted;
+        EXPECT_EQ(runAs(uid,
+                        [expected] {
+                            const auto vibrator = IDaxVibrator::getService();
+                            const bool dax = vibrator->daxSupportsHapticEngine();
+                            const bool standard = vibrator->supportsAmplitudeControl();
+                            const Status set = vibrator->daxSetAmplitude(4321);
+                            const Status bad = vibrator->daxSetAmplitude(0);
+                            const Status on = vibrator->on(1);
+                            return dax == expected && standard == expected &&
+                                                   set == (expected ? Status::OK
+                                                                    : Status::UNKNOWN_ERROR) &&
+                                                   bad == (expected ? Status::BAD_VALUE
+                                                                    : Status::UNKNOWN_ERROR) &&
+                                                   on == Status::OK
+                                           ? 0
+                                           : 1;
+                        }),
+                  0)
+                << uid;
+        EXPECT_EQ(node("intensity"), permitted ? "4321\n" : "10000\n") << uid;
+        const std::string refusal = "Pemission denied (" + std::to_string(uid) + ")";
+        EXPECT_EQ(log().find(refusal) != std::string::npos, !permitted) << uid;
+        createDriver();
+    }
+}
+
+TEST_F(ServiceTest, RefusedRegistrationIsNotFatal) {
+    createDriver();
+    start();
+    ChildProcess second;
+    startThrough(second, {SERVICE});
+    EXPECT_TRUE(eventually([&] { return log().find("is not registered: ") != std::string::npos; }));
+    EXPECT_TRUE(second.isAlive());
+    // The first goes on, and is not in the way of a third once it is dead.
+    EXPECT_TRUE(IDaxVibrator::getService()->ping().isOk());
+    mService.kill();
+    const auto unreachable = IDaxVibrator::getService()->ping();
+    EXPECT_TRUE(unreachable.isDeadObject());
+    start();
+    EXPECT_TRUE(second.isAlive());
+}
+
+TEST_F(ServiceTest, LogIsFilteredAsTheEnvironmentSays) {
+    createDriver();
+    start({"ANDROID_LOG_TAGS=*:S QorVibrator-HAL2.1:E"});
+    EXPECT_EQ(log(), "");
+    EXPECT_EQ(Status(IDaxVibrator::getService()->daxSetAmplitude(0)), Status::BAD_VALUE);
+    EXPECT_EQ(cutDown(log()), Lines{"E daxSetAmplitude amplitude is abnormal 0"});
+}
+
+TEST_F(ServiceTest, SurvivesTheLossOfItsLog) {
+    // Closed: the nodes that are opened must not get the log's descriptor, and its lines with it.
+    // A pipe that nobody reads from: it must neither kill nor hold up the daemon.
+    const std::string ways[] = {"exec \"$0\" 2>&-", "exec \"$0\" 2> >(exec true)",
+                                "exec \"$0\" 2> >(exec sleep 20)"};
+    for (const std::string& way : ways) {
+        SCOPED_TRACE(way);
+        createDriver();
+        startThrough(mService, {"/bin/bash", "-c", way, SERVICE});
+        ASSERT_TRUE(eventually([] { return IDaxVibrator::getService()->ping().isOk(); }));
+        const auto vibrator = IDaxVibrator::getService();
+        for (uint32_t i = 1; i <= 1000; ++i)
+            ASSERT_EQ(Status(vibrator->on(i)), Status::OK);
+        EXPECT_EQ(node("duration"), "1000\n");
+        mService.kill();
+    }
+}
+
+}  // namespace

@@ -1,0 +1,60 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "support/Process.h"
+#include "support/TemporaryDirectory.h"
+
+#include <gtest/gtest.h>
+#include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
+
+#include <cstdlib>
+#include <string>
+#include <vector>
+
+/** The real daemon, in a process of its own, on a simulated driver. */
+class ServiceTest : public ::testing::Test {
+  protected:
+    using IDaxVibrator = ::vendor::velmora::hardware::vibrator::V2_1::IDaxVibrator;
+
+    ServiceTest() {
+        setenv("HWBINDER_DIR", socketDirectory().c_str(), 1);
+        setenv("VIBRATOR_SIM_DIR", mDirectory.path().c_str(), 1);
+    }
+    ~ServiceTest() override {
+        unsetenv("HWBINDER_DIR");
+        unsetenv("VIBRATOR_SIM_DIR");
+    }
+
+    /** Makes a driver, with more options of the simulator's create command. */
+    void createDriver(const std::vector<std::string>& options = {}) const {
+        std::vector<std::string> command = {VIBRATOR_SIM, "create"};
+        command.insert(command.end(), options.begin(), options.end());
+        const Outcome outcome = runProgram(command);
+        ASSERT_EQ(outcome.exitCode, 0) << outcome.errors;
+    }
+
+    /** Starts the daemon, and waits until it answers. */
+    void start(const std::vector<std::string>& environment = {}) {
+        startThrough(mService, {SERVICE}, environment);
+        ASSERT_TRUE(eventually([] { return IDaxVibrator::getService()->ping().isOk(); })) << log();
+    }
+
+    /** Starts the daemon, maybe through another program. */
+    void startThrough(ChildProcess& process, const std::vector<std::string>& command,
+                      std::vector<std::string> environment = {}) const {
+        environment.emplace_back(std::string("LD_PRELOAD=") + PRELOAD);
+        // A sanitizer's own library does not come first in a process with a preloaded one.
+        environment.emplace_back("ASAN_OPTIONS=verify_asan_link_order=0");
+        process.startProgram(command, logFile(), environment);
+    }
+
+    std::string socketDirectory() const { return mDirectory.path() + "/sockets"; }
+    std::string logFile() const { return mDirectory.path() + "/log"; }
+    std::string log() const { return readFile(logFile()); }
+    std::string node(const std::string& leaf) const {
+        return readFile(mDirectory.path() + "/sys/class/leds/vibrator/" + leaf);
+    }
+
+    TemporaryDirectory mDirectory;
+    ChildProcess mService;
+};
