@@ -350,13 +350,14 @@ int Client::engine() {
     }
     if (!mFile.empty()) {
         std::ifstream file(mFile);
-        std::ostringstream text;
-        text << (mFile == "-" ? std::cin : file).rdbuf();
-        // An empty file makes the copy fail too, but not go bad.
-        if (mFile != "-" && (!file || text.bad())) {
+        std::istream& input = mFile == "-" ? std::cin : file;
+        input.peek();
+        if (input.bad() || (mFile != "-" && !file.is_open())) {
             std::cerr << "vibratorctl: " << mFile << ": cannot be read\n";
             return kUsage;
         }
+        std::ostringstream text;
+        text << input.rdbuf();
         if (!parsePackets(text.str(), &packets, &error)) {
             std::cerr << "vibratorctl: " << mFile << ": " << error << '\n';
             return kUsage;

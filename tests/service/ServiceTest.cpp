@@ -4,7 +4,6 @@
 #include "support/LogCapture.h"
 
 #include <algorithm>
-#include <regex>
 
 namespace {
 
@@ -15,10 +14,8 @@ TEST_F(ServiceTest, StartsInItsOrder) {
     start();
     Lines lines = cutDown(log());
     ASSERT_GE(lines.size(), 11U);
-    const std::regex startLine(
-            "D/vendor\\.velmora\\.hardware\\.vibrator@2\\.1-service\\( *[0-9]+\\): "
-            "qor-vibrator-2-1 starts");
-    EXPECT_TRUE(std::regex_match(lines[0], startLine)) << lines[0];
+    EXPECT_EQ(lines[0].find("D/vendor.velmora.hardware.vibrator@2.1-service("), 0U) << lines[0];
+    EXPECT_NE(lines[0].find("): qor-vibrator-2-1 starts"), std::string::npos) << lines[0];
     EXPECT_EQ(lines[1], "D !@QOR VIB HAL init");
     EXPECT_EQ(lines[10], "D Vibrator using LED trigger");
     EXPECT_EQ(lines.back(),

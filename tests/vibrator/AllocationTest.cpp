@@ -14,16 +14,17 @@ namespace {
 size_t allocations = 0;
 }
 
-void* operator new(size_t size) {
+// Not inlined, or the compiler would see malloc and free where it expects new and delete.
+__attribute__((noinline)) void* operator new(size_t size) {
     ++allocations;
     void* memory = malloc(size);
     if (memory == nullptr) abort();
     return memory;
 }
-void operator delete(void* memory) noexcept {
+__attribute__((noinline)) void operator delete(void* memory) noexcept {
     free(memory);
 }
-void operator delete(void* memory, size_t /* size */) noexcept {
+__attribute__((noinline)) void operator delete(void* memory, size_t /* size */) noexcept {
     free(memory);
 }
 
