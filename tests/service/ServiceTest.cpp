@@ -94,7 +94,7 @@ TEST_F(ServiceTest, RefusedRegistrationIsNotFatal) {
     createDriver();
     start();
     ChildProcess second;
-    startThrough(second, {SERVICE});
+    startDaemon(second);
     EXPECT_TRUE(eventually([&] { return log().find("is not registered: ") != std::string::npos; }));
     EXPECT_TRUE(second.isAlive());
     // The first goes on, and is not in the way of a third once it is dead.
@@ -117,12 +117,11 @@ TEST_F(ServiceTest, LogIsFilteredAsTheEnvironmentSays) {
 TEST_F(ServiceTest, SurvivesTheLossOfItsLog) {
     // Closed: the nodes that are opened must not get the log's descriptor, and its lines with it.
     // A pipe that nobody reads from: it must neither kill nor hold up the daemon.
-    const std::string ways[] = {"exec \"$0\" 2>&-", "exec \"$0\" 2> >(exec true)",
-                                "exec \"$0\" 2> >(exec sleep 20)"};
-    for (const std::string& way : ways) {
+    for (const std::string way :
+         {"2>&-", "2> >(exec true)", "2> >(exec sleep 20 >/dev/null 2>&1)"}) {
         SCOPED_TRACE(way);
         createDriver();
-        startThrough(mService, {"/bin/bash", "-c", way, SERVICE});
+        startDaemon(mService, way);
         ASSERT_TRUE(eventually([] { return IDaxVibrator::getService()->ping().isOk(); }));
         const auto vibrator = IDaxVibrator::getService();
         for (uint32_t i = 1; i <= 1000; ++i)

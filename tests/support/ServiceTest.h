@@ -35,17 +35,18 @@ class ServiceTest : public ::testing::Test {
 
     /** Starts the daemon, and waits until it answers. */
     void start(const std::vector<std::string>& environment = {}) {
-        startThrough(mService, {SERVICE}, environment);
+        startDaemon(mService, "", environment);
         ASSERT_TRUE(eventually([] { return IDaxVibrator::getService()->ping().isOk(); })) << log();
     }
 
-    /** Starts the daemon, maybe through another program. */
-    void startThrough(ChildProcess& process, const std::vector<std::string>& command,
-                      std::vector<std::string> environment = {}) const {
-        environment.emplace_back(std::string("LD_PRELOAD=") + PRELOAD);
+    /** Starts a daemon, with its standard error redirected as a shell does. */
+    void startDaemon(ChildProcess& daemon, const std::string& redirection = {},
+                     std::vector<std::string> environment = {}) const {
         // A sanitizer's own library does not come first in a process with a preloaded one.
         environment.emplace_back("ASAN_OPTIONS=verify_asan_link_order=0");
-        process.startProgram(command, logFile(), environment);
+        daemon.startProgram(
+                {"/bin/bash", "-c", "LD_PRELOAD=$1 exec \"$0\" " + redirection, SERVICE, PRELOAD},
+                logFile(), environment);
     }
 
     std::string socketDirectory() const { return mDirectory.path() + "/sockets"; }

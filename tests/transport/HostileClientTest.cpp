@@ -160,7 +160,6 @@ TEST_F(HostileClientTest, MessageWithoutMeasureCostsTheConnection) {
 
 TEST_F(HostileClientTest, ClientsThatVanishLeaveNothingBehind) {
     serve();
-    ASSERT_TRUE(answers());
     const size_t before = mServer.descriptors();
     Message message;
     makeRequest(message, kV10, kOn, uint32_t{3});
