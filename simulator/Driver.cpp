@@ -6,7 +6,6 @@
 #include <algorithm>
 #include <cerrno>
 #include <charconv>
-#include <climits>
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
@@ -54,9 +53,10 @@ class Timer {
   public:
     explicit Timer(const Node& node) : mFile(fs::path(node.file).replace_filename(kDeadlineFile)) {}
 
-    void start(int64_t milliseconds) {
-        constexpr int64_t kMost = 1'000'000'000'000;
-        writeFile(mFile, std::to_string(now() + std::min(milliseconds, kMost) * 1'000'000));
+    void start(uint64_t milliseconds) {
+        constexpr uint64_t kMost = 1'000'000'000'000;
+        const auto time = static_cast<int64_t>(std::min(milliseconds, kMost));
+        writeFile(mFile, std::to_string(now() + time * 1'000'000));
     }
     void stop() { writeFile(mFile, "0"); }
 
@@ -75,31 +75,31 @@ class Timer {
 /**
  * Parses a number as the kernel's kstrto functions do: the whole text, a sign, one final newline.
  *
- * @return 0, -EINVAL for what is no number, -ERANGE for one out of range.
+ * @return 0, -EINVAL for what is no number of the type, -ERANGE for one beyond it.
  */
-int parseKernelNumber(std::string_view text, int64_t least, int64_t most, int64_t* number) {
+template <typename Number>
+int parseKernelNumber(std::string_view text, Number* number) {
     text = text.substr(0, text.find('\0'));
     if (!text.empty() && text.back() == '\n') text.remove_suffix(1);
     if (!text.empty() && text.front() == '+') {
         text.remove_prefix(1);
         if (!text.empty() && text.front() == '-') return -EINVAL;
     }
-    if (least >= 0 && !text.empty() && text.front() == '-') return -EINVAL;
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), *number);
     if (error == std::errc::invalid_argument || end != text.data() + text.size()) return -EINVAL;
-    if (error != std::errc() || *number < least || *number > most) return -ERANGE;
-    return 0;
+    return error == std::errc() ? 0 : -ERANGE;
 }
 
-int hold(const Node& node, int64_t number) {
+template <typename Number>
+int hold(const Node& node, Number number) {
     return writeFile(node.file, std::to_string(number) + "\n") ? 0 : -EIO;
 }
 
 /** Holds a number from a range that the driver checks. */
-template <int64_t least, int64_t most>
+template <int least, int most>
 int storeNumber(const Node& node, std::string_view text) {
-    int64_t number = 0;
-    int error = parseKernelNumber(text, INT_MIN, INT_MAX, &number);
+    int number = 0;
+    int error = parseKernelNumber(text, &number);
     if (error == 0 && (number < least || number > most)) error = -EINVAL;
     return error != 0 ? error : hold(node, number);
 }
@@ -109,7 +109,7 @@ int storeEnable(const Node& node, std::string_view text) {
     int milliseconds = 0;
     if (sscanf(std::string(text).c_str(), "%d", &milliseconds) != 1) return -EINVAL;
     if (milliseconds > 0) {
-        Timer(node).start(milliseconds);
+        Timer(node).start(static_cast<uint64_t>(milliseconds));
     } else {
         Timer(node).stop();
     }
@@ -122,8 +122,8 @@ std::string showEnable(const Node& node) {
 
 /** The transient LED trigger: 1 starts the timer unless it runs or is 0 long, 0 cancels it. */
 int storeActivate(const Node& node, std::string_view text) {
-    int64_t state = 0;
-    const int error = parseKernelNumber(text, 0, INT64_MAX, &state);
+    unsigned long state = 0;
+    const int error = parseKernelNumber(text, &state);
     if (error != 0) return error;
     if (state > 1) return -EINVAL;
     Timer timer(node);
@@ -131,7 +131,7 @@ int storeActivate(const Node& node, std::string_view text) {
         timer.stop();
     } else if (timer.remaining() == 0) {
         const fs::path duration = fs::path(node.file).replace_filename("duration");
-        timer.start(strtoll(readFile(duration).c_str(), nullptr, 10));
+        timer.start(strtoull(readFile(duration).c_str(), nullptr, 10));
     }
     return 0;
 }
@@ -142,8 +142,8 @@ std::string showActivate(const Node& node) {
 
 /** The transient LED trigger: kept for the next start; a running timer goes on as it is. */
 int storeDuration(const Node& node, std::string_view text) {
-    int64_t milliseconds = 0;
-    const int error = parseKernelNumber(text, 0, INT64_MAX, &milliseconds);
+    unsigned long milliseconds = 0;
+    const int error = parseKernelNumber(text, &milliseconds);
     return error != 0 ? error : hold(node, milliseconds);
 }
 
@@ -156,15 +156,15 @@ int storeHapticEngine(const Node& node, std::string_view text) {
     std::string_view rest = text;
     if (rest.empty() || rest.back() != '\n') return -EINVAL;
     rest.remove_suffix(1);
-    int64_t announced = -1;
-    int64_t count = 0;
+    int announced = -1;
+    int count = 0;
     for (bool more = true; more;) {
         const size_t blank = rest.find(' ');
         more = blank != std::string_view::npos;
-        int64_t value = 0;
+        int value = 0;
         const std::string_view word = rest.substr(0, blank);
         if (!word.empty() && word.back() == '\n') return -EINVAL;
-        if (parseKernelNumber(word, INT_MIN, INT_MAX, &value) != 0) return -EINVAL;
+        if (parseKernelNumber(word, &value) != 0) return -EINVAL;
         if (announced < 0) {
             announced = value;
             if (announced < 0 || announced % 4 != 0) return -EINVAL;
@@ -329,6 +329,8 @@ std::string show(const Node& node) {
 }
 
 ssize_t store(const Node& node, const std::string& bytes) {
+    // The kernel does not trouble the driver with nothing.
+    if (bytes.empty()) return 0;
     const std::string_view taken = std::string_view(bytes).substr(0, kPageSize);
     const Attribute* attribute = findAttribute(node);
     const int error = attribute == nullptr ? storeText(node, taken) : attribute->store(node, taken);

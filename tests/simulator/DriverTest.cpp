@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "support/TransientTrigger.h"
 #include "support/VibratorTest.h"
 
 #include <fcntl.h>
@@ -13,24 +14,10 @@ namespace {
 
 class SimulatedDriverTest : public VibratorTest {
   protected:
-    /** Writes as a program would. @return 0, or the errno. */
     int put(const std::string& leaf, const std::string& text) const {
-        const int file = ::open(path(leaf).c_str(), O_RDWR);
-        if (file < 0) return errno;
-        const ssize_t size = ::write(file, text.data(), text.size());
-        const int error = size < 0 ? errno : 0;
-        ::close(file);
-        return error;
+        return putNode(path(leaf), text);
     }
-    std::string get(const std::string& leaf) const {
-        const int file = ::open(path(leaf).c_str(), O_RDONLY);
-        char text[64];
-        const ssize_t size = ::read(file, text, sizeof(text));
-        // A second read finds the end.
-        EXPECT_EQ(::read(file, text + size, sizeof(text) - static_cast<size_t>(size)), 0);
-        ::close(file);
-        return {text, static_cast<size_t>(size)};
-    }
+    std::string get(const std::string& leaf) const { return getNode(path(leaf)); }
     static void sleep(int milliseconds) {
         std::this_thread::sleep_for(std::chrono::milliseconds(milliseconds));
     }
@@ -52,22 +39,9 @@ TEST_F(SimulatedDriverTest, TimedOutputCountsDown) {
     EXPECT_EQ(get("enable"), "0\n");
 }
 
-TEST_F(SimulatedDriverTest, TransientTriggerIsOneShot) {
+TEST_F(SimulatedDriverTest, TransientTriggerIsTheKernels) {
     start(Layout::kLedTrigger);
-    EXPECT_EQ(put("activate", "1\n"), 0);
-    EXPECT_EQ(get("activate"), "0\n") << "nothing runs without a duration";
-    put("duration", "60\n");
-    put("activate", "1\n");
-    EXPECT_EQ(get("activate"), "1\n");
-    // A running timer is neither prolonged nor replaced.
-    put("duration", "100000\n");
-    put("activate", "1\n");
-    sleep(80);
-    EXPECT_EQ(get("activate"), "0\n");
-    EXPECT_EQ(get("duration"), "100000\n") << "kept for the next time";
-    put("activate", "1\n");
-    EXPECT_EQ(put("activate", "0\n"), 0);
-    EXPECT_EQ(get("activate"), "0\n");
+    expectTransientTrigger(sysfsDirectory(Layout::kLedTrigger));
 }
 
 TEST_F(SimulatedDriverTest, ValuesAreCheckedAsTheKernelDoes) {
@@ -77,14 +51,6 @@ TEST_F(SimulatedDriverTest, ValuesAreCheckedAsTheKernelDoes) {
         std::string text;
         int error;
     } cases[] = {
-            {"duration", "-1\n", EINVAL},
-            {"duration", "5\n\n", EINVAL},
-            {"duration", "", EINVAL},
-            {"duration", " 5", EINVAL},
-            {"duration", "+5", 0},
-            {"duration", "99999999999999999999", ERANGE},
-            {"activate", "2", EINVAL},
-            {"state", "2", EINVAL},
             {"intensity", "10000\n", 0},
             {"intensity", "10001\n", EINVAL},
             {"intensity", "-1", EINVAL},

@@ -100,13 +100,14 @@ void ChildProcess::start(const std::function<void(const std::function<void()>& r
 }
 
 void ChildProcess::startProgram(const std::vector<std::string>& command, const std::string& logFile,
-                                const std::vector<std::string>& environment) {
+                                const std::vector<std::string>& environment, uid_t uid) {
     const int log = open(logFile.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0644);
     mPid = fork();
     if (mPid == 0) {
         dup2(log, STDERR_FILENO);
         for (const std::string& each : environment)
             putenv(const_cast<char*>(each.c_str()));
+        becomeUser(uid);
         execute(command);
     }
     close(log);

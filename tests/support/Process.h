@@ -27,9 +27,12 @@ class ChildProcess {
   public:
     /** Runs a function in a child; it must call ready() before start returns. */
     void start(const std::function<void(const std::function<void()>& ready)>& function);
-    /** Runs a program with standard error in a file, and more environment, as NAME=VALUE. */
+    /**
+     * Runs a program with standard error in a file, and more environment, as NAME=VALUE; as another
+     * user where asked for.
+     */
     void startProgram(const std::vector<std::string>& command, const std::string& logFile,
-                      const std::vector<std::string>& environment);
+                      const std::vector<std::string>& environment, uid_t uid = 0);
 
     ChildProcess() = default;
     ChildProcess(const ChildProcess&) = delete;
