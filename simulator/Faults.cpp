@@ -44,7 +44,8 @@ bool setFault(const std::string& directory, const std::string& leaf, const std::
         return !error;
     }
     std::ofstream file(path, std::ios::trunc);
-    file << fault->error << ' ' << fault->bytes << ' ' << fault->times << '\n';
+    file << fault->error << ' ' << fault->bytes << ' ' << fault->times << ' ' << fault->after
+         << '\n';
     return static_cast<bool>(file.flush());
 }
 
@@ -52,7 +53,12 @@ std::optional<Fault> takeFault(const std::string& directory, const std::string& 
                                const std::string& operation) {
     Fault fault;
     std::ifstream file(faultFile(directory, leaf, operation));
-    if (!(file >> fault.error >> fault.bytes >> fault.times)) return std::nullopt;
+    if (!(file >> fault.error >> fault.bytes >> fault.times >> fault.after)) return std::nullopt;
+    if (fault.after > 0) {
+        --fault.after;
+        setFault(directory, leaf, operation, fault);
+        return std::nullopt;
+    }
     if (fault.times > 0) {
         Fault left = fault;
         --left.times;

@@ -15,6 +15,8 @@ struct Fault {
     size_t bytes = 0;
     /** How often it still happens; 0 for ever. */
     unsigned times = 0;
+    /** How often the operation still goes well before. */
+    unsigned after = 0;
 };
 
 /** @return the fault that a text stands for: an errno's name like "EINVAL", or "short=BYTES". */

@@ -42,13 +42,14 @@ int printTrace(const std::string& directory) {
 }
 
 int setFault(const std::string& directory, const std::string& leaf, const std::string& operation,
-             const std::string& text, unsigned times) {
+             const std::string& text, unsigned times, unsigned after) {
     std::optional<simulator::Fault> fault;
     if (text != "none") {
         fault = simulator::parseFault(text);
         if (!fault)
             return fail("\"" + text + "\" is no fault: an errno's name, short=BYTES or none");
         fault->times = times;
+        fault->after = after;
     }
     if (simulator::setFault(directory, leaf, operation, fault)) return 0;
     return fail(directory + ": no simulated driver that could be written to");
@@ -90,6 +91,7 @@ int run(int argc, char** argv) {
     std::string operation;
     std::string fault;
     unsigned times = 0;
+    unsigned after = 0;
     faultCommand->add_option("NODE", leaf, "the node, like intensity")->required();
     faultCommand->add_option("OPERATION", operation, "open, read, write or close")
             ->required()
@@ -97,6 +99,7 @@ int run(int argc, char** argv) {
     faultCommand->add_option("FAULT", fault, "an errno like EINVAL, short=BYTES, or none")
             ->required();
     faultCommand->add_option("--times", times, "how often (default: until it is set to none)");
+    faultCommand->add_option("--after", after, "how often it still goes well before (default: 0)");
 
     try {
         app.parse(argc, argv);
@@ -109,7 +112,7 @@ int run(int argc, char** argv) {
     }
     if (*showCommand) return show(directory);
     if (*traceCommand) return printTrace(directory);
-    return setFault(directory, leaf, operation, fault, times);
+    return setFault(directory, leaf, operation, fault, times, after);
 }
 
 }  // namespace

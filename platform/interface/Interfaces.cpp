@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "interface/Stubs.h"
+
 #include "interface/Proxies.h"
 #include "transport/Connection.h"
-#include "transport/Stub.h"
 #include "transport/TransactionCodes.h"
 
 #include <cstddef>
@@ -79,8 +80,12 @@ constexpr Stub kVibrator13Stub = makeStub("android.hardware.vibrator@1.3::IVibra
                                           kVibrator13Operations, &kVibrator12Stub);
 constexpr Stub kDax20Stub = makeStub("vendor.velmora.hardware.vibrator@2.0::IDaxVibrator",
                                      kDax20Operations, &kVibrator13Stub);
+}  // namespace
+
 constexpr Stub kDax21Stub = makeStub("vendor.velmora.hardware.vibrator@2.1::IDaxVibrator",
                                      kDax21Operations, &kDax20Stub);
+
+namespace {
 
 Return<void> chainOf(const Stub& stub, const IBase::interfaceChain_cb& callback) {
     std::vector<hidl_string> descriptors;

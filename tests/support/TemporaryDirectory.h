@@ -5,11 +5,11 @@
 #include <filesystem>
 #include <string>
 
-/** A new directory that everybody may enter; gone, with all that is in it, in the end. */
+/** A new directory, held in memory, that everybody may enter; gone in the end with all in it. */
 class TemporaryDirectory {
   public:
     TemporaryDirectory() {
-        char path[] = "/tmp/vibrator-test-XXXXXX";
+        char path[] = "/dev/shm/vibrator-test-XXXXXX";
         mPath = mkdtemp(path);
         std::filesystem::permissions(mPath, std::filesystem::perms(0755));
     }

@@ -69,10 +69,11 @@ void VibratorTest::setMode(const std::string& leaf, unsigned mode) const {
 }
 
 void VibratorTest::fail(const std::string& leaf, const std::string& operation,
-                        const std::string& fault, unsigned times) const {
+                        const std::string& fault, unsigned times, unsigned after) const {
     auto parsed = simulator::parseFault(fault);
     ASSERT_TRUE(parsed) << fault;
     parsed->times = times;
+    parsed->after = after;
     ASSERT_TRUE(simulator::setFault(mDirectory.path(), leaf, operation, parsed));
 }
 

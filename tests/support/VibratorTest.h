@@ -23,6 +23,12 @@ inline void PrintTo(Status status, std::ostream* out) {
 }
 }  // namespace android::hardware::vibrator::V1_0
 
+namespace simulator {
+inline void PrintTo(Layout layout, std::ostream* out) {
+    *out << (layout == Layout::kTimedOutput ? "TimedOutput" : "LedTrigger");
+}
+}  // namespace simulator
+
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 
 using simulator::Layout;
@@ -54,9 +60,9 @@ class VibratorTest : public ::testing::Test {
     void setNode(const std::string& leaf, const std::string& text) const;
     void removeNode(const std::string& leaf) const;
     void setMode(const std::string& leaf, unsigned mode) const;
-    /** Makes the next accesses of a node fail; times 0 is for ever. */
+    /** Makes accesses of a node fail, some time after now; times 0 is for ever. */
     void fail(const std::string& leaf, const std::string& operation, const std::string& fault,
-              unsigned times = 0) const;
+              unsigned times = 0, unsigned after = 0) const;
 
     /** @return where the node is on a device. */
     std::string path(const std::string& leaf) const { return sysfsDirectory(mLayout) + leaf; }
@@ -94,7 +100,7 @@ class VibratorTest : public ::testing::Test {
 class BothLayoutsTest : public VibratorTest, public ::testing::WithParamInterface<Layout> {};
 
 inline std::string layoutName(const ::testing::TestParamInfo<Layout>& info) {
-    return info.param == Layout::kTimedOutput ? "TimedOutput" : "LedTrigger";
+    return ::testing::PrintToString(info.param);
 }
 
 #define INSTANTIATE_FOR_BOTH_LAYOUTS(Suite)                                                \

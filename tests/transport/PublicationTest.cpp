@@ -112,6 +112,13 @@ TEST_F(PublicationTest, DirectoryOfAnotherUserIsNotUsed) {
     EXPECT_NE(log.takeText().find("belongs to uid 2000"), std::string::npos);
 }
 
+TEST_F(PublicationTest, DirectoryThatCannotBeWrittenIsAClearError) {
+    if (geteuid() != 0) GTEST_SKIP() << "only root can become somebody else";
+    LogCapture log;
+    EXPECT_EQ(runAs(2000, [&] { return tryToRegister() == -EACCES ? 0 : 1; }), 0);
+    EXPECT_NE(log.takeText().find("Permission denied"), std::string::npos);
+}
+
 TEST_F(PublicationTest, UserWithoutADirectoryIsToldSo) {
     if (geteuid() != 0) GTEST_SKIP() << "only root can become somebody else";
     unsetenv("HWBINDER_DIR");

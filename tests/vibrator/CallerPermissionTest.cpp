@@ -15,6 +15,10 @@ struct GatedCall {
     std::string entryLine;
 };
 
+void PrintTo(const GatedCall& call, std::ostream* out) {
+    *out << call.name;
+}
+
 std::function<void(Vibrator&)> answersFalse(Return<bool> (Vibrator::*query)()) {
     return [query](Vibrator& vibrator) {
         const Return<bool> answer = (vibrator.*query)();

@@ -1,8 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "support/VibratorTest.h"
 
+#include <sys/stat.h>
+#include <unistd.h>
+
 #include <cerrno>
 #include <climits>
+#include <filesystem>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 namespace {
@@ -134,6 +138,41 @@ TEST_F(NodePrimitivesTest, FailedReadIsMinusOne) {
                               "leds/intensity close = 0"}));
     EXPECT_EQ(log(), (Lines{"D >> readNode node:" + path("intensity") + " ",
                             "E node: " + path("intensity") + " read failed. errno: 5"}));
+}
+
+TEST_F(NodePrimitivesTest, WhateverStandsInANodesPlaceIsJudgedByTheKernel) {
+    const std::string place = mDirectory.path() + "/";
+    ASSERT_EQ(mkdir((place + "directory").c_str(), 0755), 0);
+    ASSERT_EQ(symlink("loop", (place + "loop").c_str()), 0);
+    ASSERT_EQ(symlink("nowhere", (place + "dangling").c_str()), 0);
+    const struct {
+        std::string path;
+        Status write;
+        int32_t read;
+        bool forWriting;
+        bool forReading;
+    } cases[] = {
+            {place + "directory", Status::UNKNOWN_ERROR, -1, false, true},
+            {place + "loop", Status::UNKNOWN_ERROR, -1, false, false},
+            {place + "dangling", Status::UNKNOWN_ERROR, -1, false, false},
+            {place + std::string(5000, 'x'), Status::UNKNOWN_ERROR, -1, false, false},
+            {"/proc/version/x", Status::UNKNOWN_ERROR, -1, false, false},
+            {"/dev/full", Status::UNKNOWN_ERROR, -1, true, true},
+            {"/dev/null", Status::OK, -1, true, true},
+    };
+    for (const auto& [path, write, read, forWriting, forReading] : cases) {
+        SCOPED_TRACE(path);
+        EXPECT_EQ(Status(VibratorPeer::writeNode(*mVibrator, path, 5)), write);
+        EXPECT_EQ(VibratorPeer::readNode(*mVibrator, path), read);
+        EXPECT_EQ(VibratorPeer::isNodeExist(*mVibrator, path), forWriting);
+        EXPECT_EQ(VibratorPeer::isNodeExistForRead(*mVibrator, path), forReading);
+    }
+    EXPECT_FALSE(std::filesystem::exists(place + "nowhere")) << "a node is never created";
+    // A pipe without a reader is no obstacle to a writer that opens it for reading, too. Only a
+    // reader would wait, as open says it does, and sysfs has no pipes.
+    ASSERT_EQ(mkfifo((place + "pipe").c_str(), 0600), 0);
+    EXPECT_EQ(Status(VibratorPeer::writeNode(*mVibrator, place + "pipe", 5)), Status::OK);
+    EXPECT_TRUE(VibratorPeer::isNodeExist(*mVibrator, place + "pipe"));
 }
 
 TEST_F(NodePrimitivesTest, ProbesTellWhetherTheNodeOpensInTheirMode) {

@@ -1,0 +1,71 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "MotorType.h"
+#include "NodePaths.h"
+#include "support/VibratorPeer.h"
+
+#include <sys/mman.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <string>
+
+using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
+
+namespace {
+
+/** What a node's text is after a reader has taken its part of it and one newline from the end. */
+std::string textOf(const std::string& content, size_t most) {
+    std::string text = content.substr(0, most);
+    if (!text.empty() && text.back() == '\n') text.pop_back();
+    return text.substr(0, text.find('\0'));
+}
+
+int32_t numberOf(const std::string& content) {
+    int32_t number = -1;
+    char text[8] = {};
+    memcpy(text, content.data(), std::min<size_t>(content.size(), 7));
+    return sscanf(text, "%d", &number) == 1 ? number : -1;
+}
+
+int32_t motorOf(const std::string& content) {
+    const std::string text = textOf(content, 31);
+    for (int32_t type = 1; type < kMotorTypeCount; ++type) {
+        if (text == MotorTypeNames[type]) return type;
+    }
+    return 0;
+}
+
+}  // namespace
+
+/** Any bytes as the content of a node, against the plainest way to read it. */
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+    [[maybe_unused]] static const int quiet = setenv("ANDROID_LOG_TAGS", "*:S", 1);
+    static const ::android::sp<Vibrator> vibrator = new Vibrator;
+    static const int file = memfd_create("node", 0);
+    static const std::string node = "/proc/self/fd/" + std::to_string(file);
+    THE_DEVICE_MOTOR_TYPE = THE_DEVICE_EVENT_CMD = THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES = node;
+    const std::string content(reinterpret_cast<const char*>(data), size);
+    if (ftruncate(file, 0) != 0 || pwrite(file, data, size, 0) != static_cast<ssize_t>(size))
+        abort();
+
+    const int32_t number = numberOf(content);
+    if (VibratorPeer::readNode(*vibrator, node) != number) abort();
+    int answers = 0;
+    vibrator->daxGetNumberOfPrebakedHapticPattern([&](Status status, uint32_t count) {
+        const bool isCount = number != -1;
+        if ((status == Status::OK) != isCount) abort();
+        if (count != (isCount ? static_cast<uint32_t>(number) : 0)) abort();
+        ++answers;
+    });
+    if (answers != 1) abort();
+
+    if (VibratorPeer::getMotorIndex(*vibrator) != motorOf(content)) abort();
+    const bool enhanced = vibrator->daxSupportsEnhancedVelmoraHapticPattern();
+    if (enhanced != (textOf(content, 31) == "LINEAR_1040")) abort();
+    const bool folds = vibrator->daxSupportsFolderStatusSetting();
+    if (folds != (textOf(content, 511).find_first_of("DFLO") != std::string::npos)) abort();
+    return 0;
+}

@@ -1,0 +1,30 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Packets.h"
+
+#include <cstdlib>
+
+/** Any bytes as the client's packet file: refused with a reason, or taken and told again the same.
+ */
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+    const std::string text(reinterpret_cast<const char*>(data), size);
+    HapticEnginePackets packets;
+    std::string error;
+    if (!parsePackets(text, &packets, &error)) {
+        if (error.empty()) abort();
+        return 0;
+    }
+    std::string again;
+    for (const auto& packet : packets) {
+        again += std::to_string(packet.param0) + "," + std::to_string(packet.intensity) + "," +
+                 std::to_string(packet.param2) + "," + std::to_string(packet.param3) + "\n";
+    }
+    HapticEnginePackets same;
+    if (!parsePackets(again, &same, &error) || same.size() != packets.size()) abort();
+    for (size_t i = 0; i < same.size(); ++i) {
+        if (same[i].param0 != packets[i].param0 || same[i].intensity != packets[i].intensity ||
+            same[i].param2 != packets[i].param2 || same[i].param3 != packets[i].param3) {
+            abort();
+        }
+    }
+    return 0;
+}
