@@ -1,63 +1,79 @@
 // SPDX-License-Identifier: Apache-2.0
+
+/** A call from one process to another, beside the least that any transport takes for it. */
+#include "Child.h"
 #include "support/FakeVibrator.h"
+#include "support/TemporaryDirectory.h"
 
 #include <benchmark/benchmark.h>
 #include <hidl/HidlTransportSupport.h>
 #include <sys/socket.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
-#include <csignal>
 #include <cstdlib>
-#include <filesystem>
-#include <string>
+#include <memory>
+#include <vector>
 
 namespace {
 
 using ::vendor::velmora::hardware::vibrator::V2_1::IDaxVibrator;
 
-/** A child process, killed in the end. */
-class Child {
+/** A process that serves an object, and a directory for its socket. */
+class Server {
   public:
-    template <typename Function>
-    explicit Child(Function function) : mPid(fork()) {
-        if (mPid == 0) {
-            function();
-            _exit(0);
-        }
-    }
-    Child(const Child&) = delete;
-    Child& operator=(const Child&) = delete;
-    ~Child() {
-        kill(mPid, SIGKILL);
-        waitpid(mPid, nullptr, 0);
-    }
-
-  private:
-    pid_t mPid;
-};
-
-void call(benchmark::State& state) {
-    char directory[] = "/tmp/vibrator-bench-XXXXXX";
-    if (mkdtemp(directory) == nullptr) abort();
-    setenv("HWBINDER_DIR", directory, 1);
-    {
-        const Child server([] {
+    Server() {
+        setenv("HWBINDER_DIR", mDirectory.path().c_str(), 1);
+        mChild.emplace_back(new Child([] {
             const android::sp<IDaxVibrator> vibrator = new FakeVibrator;
             if (vibrator->registerAsService() != android::OK) _exit(1);
             android::hardware::joinRpcThreadpool();
-        });
-        android::sp<IDaxVibrator> vibrator;
-        do {
-            vibrator = IDaxVibrator::getService();
-        } while (!vibrator->ping().isOk());
-        for (auto _ : state) {
-            if (vibrator->on(6) != FakeVibrator::Status::BAD_VALUE) abort();
+        }));
+        while (!IDaxVibrator::getService()->ping().isOk()) {
         }
     }
-    std::filesystem::remove_all(directory);
+
+  private:
+    TemporaryDirectory mDirectory;
+    std::vector<std::unique_ptr<Child>> mChild;
+};
+
+void callOnce(IDaxVibrator& vibrator) {
+    if (vibrator.on(6) != FakeVibrator::Status::BAD_VALUE) abort();
+}
+
+void call(benchmark::State& state) {
+    const Server server;
+    const auto vibrator = IDaxVibrator::getService();
+    for (auto _ : state)
+        callOnce(*vibrator);
 }
 BENCHMARK(call)->UseRealTime();
+
+/** Calls one after the other by as many connected clients as the argument says. */
+void callOfManyClients(benchmark::State& state) {
+    const Server server;
+    std::vector<android::sp<IDaxVibrator>> clients;
+    for (int64_t i = 0; i < state.range(0); ++i) {
+        clients.push_back(IDaxVibrator::getService());
+        callOnce(*clients.back());
+    }
+    size_t next = 0;
+    for (auto _ : state) {
+        callOnce(*clients[next]);
+        next = (next + 1) % clients.size();
+    }
+}
+BENCHMARK(callOfManyClients)->Name("clients")->Arg(1)->Arg(64)->UseRealTime();
+
+/** Calls to a daemon that has answered as many before as the argument says. */
+void callAfterManyCalls(benchmark::State& state) {
+    const Server server;
+    const auto vibrator = IDaxVibrator::getService();
+    for (int64_t i = 0; i < state.range(0); ++i)
+        callOnce(*vibrator);
+    for (auto _ : state)
+        callOnce(*vibrator);
+}
+BENCHMARK(callAfterManyCalls)->Name("calls")->Arg(1)->Arg(100'000)->UseRealTime();
 
 /** Messages of the same sizes to and fro, and nothing else. */
 void callFloor(benchmark::State& state) {

@@ -6,10 +6,8 @@
 #include <sys/mman.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
-#include <cstring>
 #include <string>
 
 using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
@@ -25,9 +23,7 @@ std::string textOf(const std::string& content, size_t most) {
 
 int32_t numberOf(const std::string& content) {
     int32_t number = -1;
-    char text[8] = {};
-    memcpy(text, content.data(), std::min<size_t>(content.size(), 7));
-    return sscanf(text, "%d", &number) == 1 ? number : -1;
+    return sscanf(content.substr(0, 7).c_str(), "%d", &number) == 1 ? number : -1;
 }
 
 int32_t motorOf(const std::string& content) {

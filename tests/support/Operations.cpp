@@ -10,41 +10,42 @@ namespace platform = ::android::hardware::vibrator;
 
 using Accesses = std::vector<Access>;
 
-std::string inWords(bool answer) {
-    return answer ? "true" : "false";
-}
-std::string inWords(Status status) {
-    const char* const names[] = {"OK", "UNKNOWN_ERROR", "BAD_VALUE", "UNSUPPORTED_OPERATION"};
-    return names[static_cast<size_t>(status)];
-}
-
 template <typename T>
-std::string inWords(const Return<T>& result) {
-    return result.isOk() ? inWords(static_cast<T>(result)) : "transport error";
+Answer answerOf(const Return<T>& result) {
+    if (!result.isOk()) return {};
+    return {static_cast<T>(result), 1, true};
 }
 
-/** Collects what an operation calls back with. */
-class Answers {
-  public:
-    auto status() {
-        return [this](Status status, uint32_t number) {
-            mText += "(" + inWords(status) + ", " + std::to_string(number) + ")";
-        };
-    }
-    auto list() {
-        return [this](bool supported, const hidl_vec<uint32_t>& list) {
-            mText += inWords(supported) + " [";
-            for (const uint32_t number : list)
-                mText += " " + std::to_string(number);
-            mText += " ]";
-        };
-    }
-    std::string text(const Return<void>& result) const {
-        return result.isOk() ? mText : "transport error";
-    }
+/** @return what an operation calls back with; Given is the type of its arguments together. */
+template <typename Given, typename Call>
+Answer answerTo(Call call) {
+    Answer answer;
+    const Return<void> result = call([&](const auto&... given) {
+        answer.value = Given(given...);
+        ++answer.times;
+    });
+    answer.isOk = result.isOk();
+    return answer;
+}
 
-  private:
-    std::string mText;
+using StatusAndNumber = std::pair<Status, uint32_t>;
+using List = std::pair<bool, hidl_vec<uint32_t>>;
+
+struct InWords {
+    std::string operator()(bool answer) const { return answer ? "true" : "false"; }
+    std::string operator()(Status status) const {
+        const char* const names[] = {"OK", "UNKNOWN_ERROR", "BAD_VALUE", "UNSUPPORTED_OPERATION"};
+        return names[static_cast<size_t>(status)];
+    }
+    std::string operator()(const StatusAndNumber& answer) const {
+        return "(" + (*this)(answer.first) + ", " + std::to_string(answer.second) + ")";
+    }
+    std::string operator()(const List& answer) const {
+        std::string text = (*this)(answer.first) + " [";
+        for (const uint32_t number : answer.second)
+            text += " " + std::to_string(number);
+        return text + " ]";
+    }
 };
 
 Access probe(const std::string& leaf, const std::string& failed, int mode = O_RDWR) {
@@ -79,13 +80,13 @@ Accesses switchOn(simulator::Layout layout, const std::string& ms, const std::st
 using Query = Return<bool> (Vibrator::*)();
 
 Operation query(const std::string& name, Query operation, const Accesses& accesses) {
-    return {name, [=](Vibrator& vibrator) { return inWords((vibrator.*operation)()); }, "true",
+    return {name, [=](Vibrator& vibrator) { return answerOf((vibrator.*operation)()); }, "true",
             accesses};
 }
 
 Operation setting(const std::string& name, const std::function<Return<Status>(Vibrator&)>& call,
                   const Accesses& accesses) {
-    return {name, [=](Vibrator& vibrator) { return inWords(call(vibrator)); }, "OK", accesses};
+    return {name, [=](Vibrator& vibrator) { return answerOf(call(vibrator)); }, "OK", accesses};
 }
 
 template <typename Effect, typename Callback>
@@ -94,14 +95,20 @@ Operation effect(const std::string& name,
                  const std::string& answer, const Accesses& accesses) {
     return {name,
             [=](Vibrator& vibrator) {
-                Answers answers;
-                return answers.text(
-                        (vibrator.*operation)(Effect{0}, EffectStrength::MEDIUM, answers.status()));
+                return answerTo<StatusAndNumber>([&](const auto& callback) {
+                    return (vibrator.*operation)(Effect{0}, EffectStrength::MEDIUM, callback);
+                });
             },
             answer, accesses};
 }
 
 }  // namespace
+
+std::string Answer::inWords() const {
+    if (!isOk) return "transport error";
+    if (times != 1) return "answered " + std::to_string(times) + " times";
+    return std::visit(InWords(), value);
+}
 
 std::vector<Operation> allOperations(simulator::Layout layout) {
     const bool isTimed = layout == simulator::Layout::kTimedOutput;
@@ -165,8 +172,9 @@ std::vector<Operation> allOperations(simulator::Layout layout) {
                     {write("event_cmd", "FOLDER_CLOSE\n", error)}),
             {"daxGetNumberOfPrebakedHapticPattern",
              [](Vibrator& v) {
-                 Answers answers;
-                 return answers.text(v.daxGetNumberOfPrebakedHapticPattern(answers.status()));
+                 return answerTo<StatusAndNumber>([&](const auto& callback) {
+                     return v.daxGetNumberOfPrebakedHapticPattern(callback);
+                 });
              },
              "(OK, 12)",
              {probe("num_waves", none, O_RDONLY),
@@ -194,9 +202,9 @@ std::vector<Operation> allOperations(simulator::Layout layout) {
             // Without its name the motor is taken for a LINEAR_INDEX, which has another ladder.
             {"daxGetAmplitudeList",
              [](Vibrator& v) {
-                 Answers answers;
-                 return answers.text(
-                         v.daxGetAmplitudeList(DaxAmplitudeType::TYPE_0, answers.list()));
+                 return answerTo<List>([&](const auto& callback) {
+                     return v.daxGetAmplitudeList(DaxAmplitudeType::TYPE_0, callback);
+                 });
              },
              "true [ 0 1000 5000 9000 ]",
              {read("motor_type", "COINDC_PMIC\n", 31, O_RDWR,

@@ -6,6 +6,8 @@
 
 #include <functional>
 #include <string>
+#include <utility>
+#include <variant>
 #include <vector>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
@@ -31,12 +33,24 @@ struct Access {
     std::vector<std::string> writtenAfter;
 };
 
+/** What an operation has answered. */
+struct Answer {
+    std::variant<bool, Status, std::pair<Status, uint32_t>, std::pair<bool, hidl_vec<uint32_t>>>
+            value;
+    /** How often it was given, by callback or as the result. */
+    int times = 0;
+    /** Whether the transport's part of the result was OK. */
+    bool isOk = false;
+
+    /** @return the value, like "OK" or "(OK, 20)"; what is wrong where it is no proper answer. */
+    std::string inWords() const;
+};
+
 /** An operation with certain arguments, and all that it does with the driver. */
 struct Operation {
     std::string name;
-    /** @return the answer in words; of a callback, its arguments once for each time it was called.
-     */
-    std::function<std::string(Vibrator&)> call;
+    std::function<Answer(Vibrator&)> call;
+    /** The answer in words. */
     std::string answer;
     std::vector<Access> accesses;
     /** What motor_type holds. */

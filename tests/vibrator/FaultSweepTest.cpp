@@ -142,7 +142,7 @@ TEST_P(FaultSweepTest, EverySystemCallOfEveryOperationMayFail) {
     for (const Operation& operation : allOperations(GetParam())) {
         const Lines whole = undisturbed(operation);
         rest(operation);
-        EXPECT_EQ(operation.call(*mVibrator), operation.answer) << operation.name;
+        EXPECT_EQ(operation.call(*mVibrator).inWords(), operation.answer) << operation.name;
         EXPECT_EQ(trace(), whole) << operation.name;
         for (size_t i = 0; i < operation.accesses.size(); ++i) {
             for (const Case& each : casesOf(operation, operation.accesses[i])) {
@@ -151,11 +151,12 @@ TEST_P(FaultSweepTest, EverySystemCallOfEveryOperationMayFail) {
                              std::to_string(each.times) + " times");
                 rest(operation);
                 arm(operation, i, each);
-                EXPECT_EQ(operation.call(*mVibrator), each.answer);
+                EXPECT_EQ(operation.call(*mVibrator).inWords(), each.answer);
                 expectTrace(trace(), each, whole);
                 ASSERT_EQ(descriptors(), open);
                 rest(operation);
-                EXPECT_EQ(operation.call(*mVibrator), operation.answer) << "the next call";
+                EXPECT_EQ(operation.call(*mVibrator).inWords(), operation.answer)
+                        << "the next call";
                 ++cases;
                 if (HasFailure()) return;
             }
