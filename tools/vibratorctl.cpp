@@ -1,13 +1,23 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "Completion.h"
+#include "Doctor.h"
+#include "NodeAccess.h"
 #include "Packets.h"
+#include "Plot.h"
 #include "Report.h"
+#include "Score.h"
+#include "Trace.h"
+#include "Watch.h"
 
 #include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
 
+#include <sys/ioctl.h>
 #include <unistd.h>
 
 #include <CLI/CLI.hpp>
+#include <chrono>
 #include <cstdio>
+#include <cstdlib>
 #include <exception>
 #include <fstream>
 #include <functional>
@@ -15,6 +25,7 @@
 #include <map>
 #include <sstream>
 #include <string>
+#include <thread>
 #include <vector>
 
 namespace {
@@ -45,6 +56,7 @@ class Client {
     void addSettingCommands();
     void addPrebakedCommands();
     void addEngineCommand();
+    void addTools();
 
     int answer(const Call& call, const Return<VibratorStatus>& result);
     int effect(uint32_t number, const std::string& version);
@@ -54,6 +66,11 @@ class Client {
     int motor();
     int countPrebaked();
     int engine();
+    int doctor();
+    int watchTraffic();
+    int plot();
+    int play();
+    int playStep(const ScoreStep& step);
 
     CLI::App mApp{"Calls the vibrator service from the command line."};
     std::string mInstance = "default";
@@ -70,6 +87,10 @@ class Client {
     EffectStrength mStrength = EffectStrength::MEDIUM;
     std::vector<std::string> mPackets;
     std::string mFile;
+    std::string mOutput;
+    std::string mSimulation;
+    WatchSource mSource;
+    bool mCheck = false;
 };
 
 int Client::run(int argc, char** argv) {
@@ -88,6 +109,7 @@ int Client::run(int argc, char** argv) {
     addSettingCommands();
     addPrebakedCommands();
     addEngineCommand();
+    addTools();
     try {
         mApp.parse(argc, argv);
     } catch (const CLI::ParseError& error) {
@@ -219,6 +241,48 @@ void Client::addEngineCommand() {
     engineCommand->footer("Packets that begin with a minus sign stand behind --.");
 }
 
+void Client::addTools() {
+    const char* simulation = getenv("VIBRATOR_SIM_DIR");
+    mSimulation = simulation == nullptr ? "" : simulation;
+    command(mApp, "doctor", "examine the driver's nodes, and say what is wrong and what to do",
+            [this] { return doctor(); });
+
+    CLI::App* watchCommand = command(mApp, "watch", "show the service's node traffic as it comes",
+                                     [this] { return watchTraffic(); });
+    watchCommand->add_option("FILE", mFile,
+                             "trace of the simulated driver (default: the one in "
+                             "VIBRATOR_SIM_DIR), - for standard input");
+    watchCommand->add_flag("--log", mSource.isLog, "FILE is the daemon's log, as on a device");
+    watchCommand->add_flag("--all", mSource.fromStart, "show what is there already, too");
+    watchCommand->add_flag("--once", mSource.once, "end instead of waiting for more");
+
+    CLI::App* plotCommand =
+            command(mApp, "plot", "draw what the motor did", [this] { return plot(); });
+    plotCommand->add_option("TRACE", mFile, "trace of the simulated driver, - for standard input")
+            ->required();
+    plotCommand->add_option("-o,--output", mOutput,
+                            "file to draw to, .svg or .png (default: as text on the terminal)");
+
+    CLI::App* playCommand = command(mApp, "play", "play a score", [this] { return play(); });
+    playCommand->add_option("SCORE", mFile, "file with a step a line, - for standard input")
+            ->required();
+    playCommand->add_flag("--check", mCheck, "only say whether it can be played");
+    playCommand->footer(
+            "Steps: click [light|medium|strong], on MS, off, wait MS, amplitude N, intensity N,\n"
+            "pattern N [AMPLITUDE] [repeat], engine AMPLITUDE PACKET... -- a step a line; # begins "
+            "a\n"
+            "comment. The whole score is checked before the first call.");
+
+    CLI::App* completion =
+            command(mApp, "completion", "print a completion script for a shell", [this] {
+                std::cout << completionScript(mApp, "vibratorctl", mWord);
+                return kSuccess;
+            });
+    completion->add_option("SHELL", mWord, "bash or zsh")
+            ->required()
+            ->check(CLI::IsMember({"bash", "zsh"}));
+}
+
 int Client::answer(const Call& call, const Return<VibratorStatus>& result) {
     if (!result.isOk()) return mReport.unreachable(call.operation, result.description());
     return mReport.answer(call, result);
@@ -335,6 +399,21 @@ int Client::countPrebaked() {
     return mReport.answer(call, status, {{"count", count}});
 }
 
+/** Reads a file, or standard input for "-"; complains where it cannot. @return whether it could. */
+bool readInput(const std::string& name, std::string* text) {
+    std::ifstream file(name);
+    std::istream& input = name == "-" ? std::cin : file;
+    input.peek();
+    if (input.bad() || (name != "-" && !file.is_open())) {
+        std::cerr << "vibratorctl: " << name << ": cannot be read\n";
+        return false;
+    }
+    std::ostringstream all;
+    all << input.rdbuf();
+    *text = all.str();
+    return true;
+}
+
 int Client::engine() {
     if (mPackets.empty() && mFile.empty()) {
         std::cerr << "vibratorctl: no packets: give some, or a file of them with --file\n";
@@ -349,16 +428,9 @@ int Client::engine() {
         }
     }
     if (!mFile.empty()) {
-        std::ifstream file(mFile);
-        std::istream& input = mFile == "-" ? std::cin : file;
-        input.peek();
-        if (input.bad() || (mFile != "-" && !file.is_open())) {
-            std::cerr << "vibratorctl: " << mFile << ": cannot be read\n";
-            return kUsage;
-        }
-        std::ostringstream text;
-        text << input.rdbuf();
-        if (!parsePackets(text.str(), &packets, &error)) {
+        std::string text;
+        if (!readInput(mFile, &text)) return kUsage;
+        if (!parsePackets(text, &packets, &error)) {
             std::cerr << "vibratorctl: " << mFile << ": " << error << '\n';
             return kUsage;
         }
@@ -368,6 +440,111 @@ int Client::engine() {
              "at most 339 packets, an amplitude of 1 to 10000, values of at most 8 characters",
              true},
             mVibrator->daxPerformHapticEngine(packets, mAmplitude));
+}
+
+int Client::doctor() {
+    const Return<void> service = mVibrator->ping();
+    const ordered_json found = examine(mSimulation, service.isOk() ? "" : service.description());
+    if (mJson) {
+        mReport.values(found);
+    } else {
+        std::cout << examinationInWords(found);
+    }
+    return found["findings"].empty() ? kSuccess : kRefused;
+}
+
+int Client::watchTraffic() {
+    mSource.file = mFile;
+    if (mFile.empty()) {
+        if (mSource.isLog || mSimulation.empty()) {
+            std::cerr << "vibratorctl: no FILE: name a trace, or a log with --log\n";
+            return kUsage;
+        }
+        mSource.file = simulator::traceFile(mSimulation);
+    }
+    return watch(mSource);
+}
+
+int Client::plot() {
+    std::string text;
+    if (!readInput(mFile, &text)) return kUsage;
+    std::vector<NodeAccess> accesses;
+    TraceReader reader;
+    std::istringstream lines(text);
+    for (std::string line; std::getline(lines, line);) {
+        if (auto access = reader.read(line)) accesses.push_back(std::move(*access));
+    }
+    const Timeline timeline = makeTimeline(accesses);
+    if (timeline.marks.empty()) {
+        std::cerr << "vibratorctl: " << mFile << ": no write that a driver has taken is in it\n";
+        return kUsage;
+    }
+    if (mOutput.empty()) {
+        winsize window{};
+        const bool known = ioctl(STDOUT_FILENO, TIOCGWINSZ, &window) == 0 && window.ws_col > 0;
+        std::cout << plotText(timeline, known ? window.ws_col : 80U);
+        return kSuccess;
+    }
+    const std::string ending =
+            mOutput.size() < 4 ? std::string() : mOutput.substr(mOutput.size() - 4);
+    std::string error;
+    if (ending == ".png") {
+        error = writePng(plotSvg(timeline), mOutput);
+    } else if (ending == ".svg") {
+        std::ofstream file(mOutput);
+        if (!(file << plotSvg(timeline)).flush()) error = "cannot be written";
+    } else {
+        error = "neither .svg nor .png";
+    }
+    if (error.empty()) return kSuccess;
+    std::cerr << "vibratorctl: " << mOutput << ": " << error << '\n';
+    return kUsage;
+}
+
+int Client::play() {
+    std::string text;
+    if (!readInput(mFile, &text)) return kUsage;
+    std::vector<ScoreStep> steps;
+    const std::vector<ScoreError> errors = parseScore(text, &steps);
+    for (const ScoreError& error : errors) {
+        std::cerr << mFile << ':' << error.line << ':' << error.column << ": " << error.what
+                  << '\n';
+    }
+    if (!errors.empty()) return kUsage;
+    if (mCheck) return kSuccess;
+    for (const ScoreStep& step : steps) {
+        const int code = playStep(step);
+        if (code != kSuccess) return code;
+    }
+    return kSuccess;
+}
+
+int Client::playStep(const ScoreStep& step) {
+    switch (step.kind) {
+        case ScoreStep::kClick:
+            mStrength = step.strength;
+            return effect(0, "1.0");
+        case ScoreStep::kOn:
+            return answer({"on"}, mVibrator->on(step.number));
+        case ScoreStep::kOff:
+            return answer({"off"}, mVibrator->off());
+        case ScoreStep::kAmplitude:
+            return answer({"setAmplitude", "1 to 255", true},
+                          mVibrator->setAmplitude(static_cast<uint8_t>(step.number)));
+        case ScoreStep::kIntensity:
+            return answer({"daxSetAmplitude", kAmplitudeRange, true},
+                          mVibrator->daxSetAmplitude(step.number));
+        case ScoreStep::kPattern:
+            return answer({"daxPerformPrebakedHapticPattern", kAmplitudeRange, true},
+                          mVibrator->daxPerformPrebakedHapticPattern(step.number, step.amplitude,
+                                                                     step.repeat));
+        case ScoreStep::kEngine:
+            return answer({"daxPerformHapticEngine", kAmplitudeRange, true},
+                          mVibrator->daxPerformHapticEngine(step.packets, step.amplitude));
+        default:
+            std::this_thread::sleep_for(std::chrono::milliseconds(step.number));
+            return kSuccess;
+    }
 }
 
 }  // namespace

@@ -1,15 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "AmplitudeLists.h"
+
 #include "Log.h"
 #include "MotorType.h"
 #include "NodePaths.h"
 #include "Vibrator.h"
 
-#include <vector>
-
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 namespace {
-
-using AmplitudeList = std::vector<uint32_t>;
 
 const AmplitudeList kNone;
 const AmplitudeList kW = {0, 1000, 5000, 9000};
@@ -38,13 +36,13 @@ const AmplitudeLists kListsOfMotor[kMotorTypeCount] = {
         {kX, kX, kY},           // LINEAR_1030
 };
 
-const AmplitudeList& selectList(int32_t motor, DaxAmplitudeType type, bool hasIndex) {
+}  // namespace
+
+const AmplitudeList& selectAmplitudeList(int32_t motor, DaxAmplitudeType type, bool hasIndex) {
     const AmplitudeLists& lists = kListsOfMotor[motor];
     if (type == DaxAmplitudeType::TYPE_0) return lists.type0;
     return hasIndex ? lists.type1 : lists.type1WithoutIndex;
 }
-
-}  // namespace
 
 Return<void> Vibrator::daxGetAmplitudeList(DaxAmplitudeType type, daxGetAmplitudeList_cb _hidl_cb) {
     if (checkCallerPermission() != kCallerPermitted) {
@@ -65,7 +63,7 @@ Return<void> Vibrator::daxGetAmplitudeList(DaxAmplitudeType type, daxGetAmplitud
 
     const bool hasIndex = isNodeExist(THE_DEVICE_HAPTIC_ENGINE_INDEX);
     LOG_DEBUG("daxGetAmplitudeList %s index method", hasIndex ? "support" : "NOT support");
-    AmplitudeList list = selectList(motor, type, hasIndex);
+    AmplitudeList list = selectAmplitudeList(motor, type, hasIndex);
     if (list.empty()) {
         LOG_DEBUG("daxGetAmplitudeList false");
         _hidl_cb(false, {});
