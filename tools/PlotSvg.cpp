@@ -6,6 +6,7 @@
 #include <cstdio>
 #include <sstream>
 #include <utility>
+#include <vector>
 
 namespace {
 
@@ -63,11 +64,11 @@ class Drawing {
         layOutMarks();
         mTop = 56 + static_cast<double>(mLaneEnds.size()) * kLaneHeight + 8;
         const double height = mTop + kStrip + 56;
-        mOut << "<svg xmlns=\"http://www.w3.org/2000/svg\" width=\"" << kWidth << "\" height=\""
-             << height << "\" viewBox=\"0 0 " << kWidth << ' ' << height
-             << "\" font-family=\"DejaVu Sans Mono, Menlo, Consolas, monospace\" font-size=\""
-             << kFontSize << "\">\n"
-             << "<rect width=\"100%\" height=\"100%\" fill=\"#ffffff\"/>\n";
+        mOut << R"(<svg xmlns="http://www.w3.org/2000/svg" width=")" << kWidth << R"(" height=")"
+             << height << R"(" viewBox="0 0 )" << kWidth << ' ' << height
+             << R"(" font-family="DejaVu Sans Mono, Menlo, Consolas, monospace" font-size=")"
+             << kFontSize << "\">\n";
+        rectangle(0, 0, kWidth, height, "#ffffff");
         drawTitle();
         drawAxes();
         for (const Timeline::Segment& segment : mTimeline.segments)
@@ -81,13 +82,30 @@ class Drawing {
     double x(double time) const { return kLeft + time / mLength * (kWidth - kLeft - kRight); }
     double y(double strength) const { return mTop + (1 - strength) * kStrip; }
 
-    void text(double atX, double atY, const std::string& label, const std::string& more = "") {
-        mOut << "<text x=\"" << number(atX) << "\" y=\"" << number(atY) << "\" fill=\"#222222\" "
-             << more << '>' << escaped(label) << "</text>\n";
+    using Attributes = std::vector<std::pair<const char*, std::string>>;
+
+    void element(const char* name, const Attributes& attributes, const std::string& content = {}) {
+        mOut << '<' << name;
+        for (const auto& [key, value] : attributes)
+            mOut << ' ' << key << "=\"" << value << '"';
+        mOut << '>' << escaped(content) << "</" << name << ">\n";
     }
-    void line(double x1, double y1, double x2, double y2, const char* colour) {
-        mOut << "<line x1=\"" << number(x1) << "\" y1=\"" << number(y1) << "\" x2=\"" << number(x2)
-             << "\" y2=\"" << number(y2) << "\" stroke=\"" << colour << "\"/>\n";
+    void text(double atX, double atY, const std::string& label, Attributes more = {}) {
+        more.insert(more.begin(), {{"x", number(atX)}, {"y", number(atY)}});
+        element("text", more, label);
+    }
+    void rectangle(double left, double top, double width, double height, const char* colour) {
+        element("rect", {{"x", number(left)},
+                         {"y", number(top)},
+                         {"width", number(width)},
+                         {"height", number(height)},
+                         {"fill", colour}});
+    }
+    void line(double x1, double y1, double x2, double y2, Attributes more) {
+        more.insert(
+                more.begin(),
+                {{"x1", number(x1)}, {"y1", number(y1)}, {"x2", number(x2)}, {"y2", number(y2)}});
+        element("line", more);
     }
 
     /** Gives each label a lane in which it meets no other; those for which there is none stay out.
@@ -117,8 +135,7 @@ class Drawing {
                                                               {"#e08a3c", "haptic engine packet"},
                                                               {"#7d5ba6", "stored pattern"}};
         for (const auto& [colour, label] : legend) {
-            mOut << "<rect x=\"" << number(left) << "\" y=\"13\" width=\"14\" height=\"14\" fill=\""
-                 << colour << "\"/>\n";
+            rectangle(left, 13, 14, 14, colour);
             text(left + 20, 25, label);
             left += 20 + widthOf(label) + 30;
         }
@@ -126,35 +143,39 @@ class Drawing {
         if (mUnlabelled > 0) {
             calls += " (" + std::to_string(mUnlabelled) + " without a label, for want of room)";
         }
-        text(kLeft, 48, calls, "fill-opacity=\"0.6\"");
+        text(kLeft, 48, calls, {{"fill-opacity", "0.6"}});
     }
 
     void drawAxes() {
+        const Attributes dark = {{"stroke", "#222222"}};
+        const Attributes middle = {{"text-anchor", "middle"}};
         for (int percent = 0; percent <= 100; percent += 25) {
-            line(kLeft, y(percent / 100.0), kWidth - kRight, y(percent / 100.0), "#dddddd");
-            text(kLeft - 8, y(percent / 100.0) + 4, std::to_string(percent), "text-anchor=\"end\"");
+            const double height = y(percent / 100.0);
+            line(kLeft, height, kWidth - kRight, height, {{"stroke", "#dddddd"}});
+            text(kLeft - 8, height + 4, std::to_string(percent), {{"text-anchor", "end"}});
         }
-        mOut << "<text transform=\"translate(20 " << number(mTop + kStrip / 2)
-             << ") rotate(-90)\" text-anchor=\"middle\" fill=\"#222222\">strength in %</text>\n";
+        element("text",
+                {{"transform", "translate(20 " + number(mTop + kStrip / 2) + ") rotate(-90)"},
+                 {"text-anchor", "middle"}},
+                "strength in %");
         const double unit = mLength < 2 ? 1000 : 1;
         const double step = niceStep(mLength);
         for (int i = 0; i * step <= mLength; ++i) {
-            line(x(i * step), y(0), x(i * step), y(0) + 5, "#222222");
-            text(x(i * step), y(0) + 20, number(i * step * unit), "text-anchor=\"middle\"");
+            line(x(i * step), y(0), x(i * step), y(0) + 5, dark);
+            text(x(i * step), y(0) + 20, number(i * step * unit), middle);
         }
-        line(kLeft, y(0), kWidth - kRight, y(0), "#222222");
+        line(kLeft, y(0), kWidth - kRight, y(0), dark);
         text((kLeft + kWidth - kRight) / 2, y(0) + 42, unit == 1 ? "time in s" : "time in ms",
-             "text-anchor=\"middle\"");
+             middle);
     }
 
     void drawSegment(const Timeline::Segment& segment) {
         constexpr const char* kColours[] = {"#4878b0", "#e08a3c", "#7d5ba6"};
         const double left = x(segment.start);
         const double width = std::max(1.0, x(segment.end) - left);
-        mOut << "<rect x=\"" << number(left) << "\" y=\"" << number(y(segment.strength))
-             << "\" width=\"" << number(width) << "\" height=\""
-             << number(segment.strength * kStrip) << "\" fill=\"" << kColours[segment.kind]
-             << "\" stroke=\"#ffffff\" stroke-width=\"0.5\"/>\n";
+        // A hair's breadth lies between one and the next.
+        rectangle(left, y(segment.strength), std::max(1.0, width - 0.5), segment.strength * kStrip,
+                  kColours[segment.kind]);
         // Above the bar or, where that is too high, inside; not at all where it is too wide.
         std::string label = segment.label;
         if (segment.kind == Timeline::Segment::kPacket) {
@@ -162,10 +183,8 @@ class Drawing {
         }
         if (label.empty() || widthOf(label) + 8 > width) return;
         const bool inside = segment.strength > 0.9;
-        mOut << "<text x=\"" << number(left + width / 2) << "\" y=\""
-             << number(y(segment.strength) + (inside ? 18 : -6))
-             << "\" text-anchor=\"middle\" fill=\"" << (inside ? "#ffffff" : "#222222") << "\">"
-             << escaped(label) << "</text>\n";
+        text(left + width / 2, y(segment.strength) + (inside ? 18 : -6), label,
+             {{"text-anchor", "middle"}, {"fill", inside ? "#ffffff" : "#000000"}});
     }
 
     /** Draws the lines first, so that no line crosses a label. */
@@ -176,17 +195,14 @@ class Drawing {
         for (size_t i = 0; i < mPlaces.size(); ++i) {
             const double at = x(mTimeline.marks[i].time);
             const double top = mPlaces[i].second < 0 ? mTop - 6 : labelY(i);
-            mOut << "<line x1=\"" << number(at) << "\" y1=\"" << number(top) << "\" x2=\""
-                 << number(at) << "\" y2=\"" << number(y(0))
-                 << "\" stroke=\"#222222\" stroke-opacity=\"0.35\" stroke-dasharray=\"2 3\"/>\n";
+            line(at, top, at, y(0),
+                 {{"stroke", "#222222"}, {"stroke-opacity", "0.35"}, {"stroke-dasharray", "2 3"}});
         }
         for (size_t i = 0; i < mPlaces.size(); ++i) {
             if (mPlaces[i].second < 0) continue;
             const std::string& label = mTimeline.marks[i].label;
-            mOut << "<rect x=\"" << number(mPlaces[i].first + 1) << "\" y=\""
-                 << number(labelY(i) - 13) << "\" width=\"" << number(widthOf(label) + 6)
-                 << "\" height=\"16\" fill=\"#ffffff\"/>\n";
-            text(mPlaces[i].first + 4, labelY(i), label, "class=\"call\"");
+            rectangle(mPlaces[i].first + 1, labelY(i) - 13, widthOf(label) + 6, 16, "#ffffff");
+            text(mPlaces[i].first + 4, labelY(i), label, {{"class", "call"}});
         }
     }
 

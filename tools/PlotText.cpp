@@ -7,8 +7,8 @@
 
 namespace {
 
-constexpr int kRows = 5;
-constexpr int kEighths = 8;
+constexpr long kRows = 5;
+constexpr long kEighths = 8;
 /** Width of what stands left of the strip. */
 constexpr size_t kMargin = 6;
 
@@ -33,13 +33,13 @@ std::string plotText(const Timeline& timeline, size_t columns) {
 
     std::string text;
     char line[160];
-    for (int row = kRows - 1; row >= 0; --row) {
-        snprintf(line, sizeof(line), "%3d %% ", (row + 1) * 100 / kRows);
+    for (long row = kRows - 1; row >= 0; --row) {
+        snprintf(line, sizeof(line), "%3ld %% ", (row + 1) * 100 / kRows);
         text += line;
         for (size_t column = 0; column < width; ++column) {
             const double start = static_cast<double>(column) * perColumn;
             const double strength = strengthIn(timeline, start, start + perColumn);
-            const auto eighths = std::lround(strength * kRows * kEighths) - row * kEighths;
+            const long eighths = std::lround(strength * double{kRows * kEighths}) - row * kEighths;
             text += kBlocks[std::clamp<long>(eighths, 0, kEighths)];
         }
         text += '\n';

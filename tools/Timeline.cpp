@@ -11,6 +11,8 @@ namespace {
 
 /** The full strength of the driver's scales. */
 constexpr double kFull = 10000;
+/** The index that makes the driver play its queue. */
+constexpr long long kQueueIndex = 0xFFFE;
 /** A run that nothing ends is shown for so long after the last call, in s. */
 constexpr double kOpenEnd = 1;
 
@@ -20,42 +22,28 @@ class Motor {
     explicit Motor(Timeline* timeline) : mTimeline(*timeline) {}
 
     void write(const NodeAccess& access, double time) {
+        struct Node {
+            const char* leaf;
+            void (Motor::*write)(double time, long long value, const std::string& bytes);
+        };
+        constexpr Node kNodes[] = {
+                {"enable", &Motor::writeEnable},
+                {"duration", &Motor::writeDuration},
+                {"activate", &Motor::writeActivate},
+                {"intensity", &Motor::writeIntensity},
+                {"haptic_engine", &Motor::writeHapticEngine},
+                {"cp_trigger_index", &Motor::writeIndex},
+                {"cp_trigger_queue", &Motor::writeQueue},
+                {"event_cmd", &Motor::writeEvent},
+                {"ext_control", &Motor::writeExternalControl},
+                {"multi_freq", &Motor::writeFrequency},
+                {"force_touch_intensity", &Motor::writeForceTouch},
+        };
         const std::string leaf = access.leaf();
-        const long long value = strtoll(access.bytes.c_str(), nullptr, 10);
-        if (leaf == "enable") {
-            switchMotor(time, value);
-        } else if (leaf == "duration") {
-            mDuration = value;
-        } else if (leaf == "activate") {
-            // While it runs, the trigger goes on as it is; what has been selected is set off.
-            if (value != 0 && time < mEnd && mPattern.empty() && mPackets.empty()) {
-                mark(time, "on " + std::to_string(mDuration) + ", runs already");
-            } else {
-                switchMotor(time, value == 0 ? 0 : mDuration);
-            }
-        } else if (leaf == "intensity") {
-            mark(time, "intensity " + std::to_string(value));
-            setStrength(time, static_cast<double>(value) / kFull);
-        } else if (leaf == "haptic_engine") {
-            readPackets(access.bytes);
-            mark(time, "engine, " + std::to_string(mPackets.size()) + " packets");
-        } else if (leaf == "cp_trigger_index") {
-            mPattern = value == 0 || value == 0xFFFE ? "" : "pattern " + std::to_string(value);
-            if (value != 0xFFFE) mark(time, "pattern " + std::to_string(value));
-        } else if (leaf == "cp_trigger_queue") {
-            const std::string play = access.bytes.substr(0, access.bytes.find(','));
-            const size_t point = play.find('.');
-            mPattern = "pattern " + play.substr(0, point);
-            mQueueStrength = strtod(play.substr(point + 1).c_str(), nullptr) / 100;
-            mark(time, "queue " + play.substr(0, point) + " at " + play.substr(point + 1) + " %");
-        } else if (leaf == "event_cmd") {
-            mark(time, access.bytes == "FOLDER_OPEN\n" ? "fold open" : "fold close");
-        } else if (leaf == "ext_control") {
-            mark(time, value == 0 ? "external off" : "external on");
-        } else if (leaf == "multi_freq") {
-            mark(time, "frequency " + std::to_string(value));
-        } else if (leaf == "force_touch_intensity") {
-            mark(time, "force touch " + std::to_string(value));
+        for (const Node& node : kNodes) {
+            if (leaf != node.leaf) continue;
+            const long long value = strtoll(access.bytes.c_str(), nullptr, 10);
+            (this->*node.write)(time, value, access.bytes);
         }
     }
 
@@ -73,6 +61,54 @@ class Motor {
     }
 
   private:
+    using Bytes = const std::string&;
+
+    void writeEnable(double time, long long value, Bytes /* bytes */) { switchMotor(time, value); }
+    void writeDuration(double /* time */, long long value, Bytes /* bytes */) { mDuration = value; }
+    void writeActivate(double time, long long value, Bytes /* bytes */) {
+        // While it runs, the trigger goes on as it is; what has been selected is set off.
+        if (value != 0 && time < mEnd && mPattern.empty() && mPackets.empty()) {
+            mark(time, "on " + std::to_string(mDuration) + ", runs already");
+        } else {
+            switchMotor(time, value == 0 ? 0 : mDuration);
+        }
+    }
+    void writeIntensity(double time, long long value, Bytes /* bytes */) {
+        mark(time, "intensity " + std::to_string(value));
+        setStrength(time, static_cast<double>(value) / kFull);
+    }
+    void writeHapticEngine(double time, long long /* value */, Bytes bytes) {
+        readPackets(bytes);
+        mark(time, "engine, " + std::to_string(mPackets.size()) + " packets");
+    }
+    void writeIndex(double time, long long value, Bytes /* bytes */) {
+        if (value == kQueueIndex) return;
+        const std::string label = "pattern " + std::to_string(value);
+        mPattern = value == 0 ? "" : label;
+        mark(time, label);
+    }
+    void writeQueue(double time, long long /* value */, Bytes bytes) {
+        const std::string play = bytes.substr(0, bytes.find(','));
+        const size_t point = play.find('.');
+        const std::string number = play.substr(0, point);
+        const std::string percent = point == std::string::npos ? "0" : play.substr(point + 1);
+        mPattern = "pattern " + number;
+        mQueueStrength = std::clamp(strtod(percent.c_str(), nullptr) / 100, 0.0, 1.0);
+        mark(time, "queue " + number + " at " + percent + " %");
+    }
+    void writeEvent(double time, long long /* value */, Bytes bytes) {
+        mark(time, bytes == "FOLDER_OPEN\n" ? "fold open" : "fold close");
+    }
+    void writeExternalControl(double time, long long value, Bytes /* bytes */) {
+        mark(time, value == 0 ? "external off" : "external on");
+    }
+    void writeFrequency(double time, long long value, Bytes /* bytes */) {
+        mark(time, "frequency " + std::to_string(value));
+    }
+    void writeForceTouch(double time, long long value, Bytes /* bytes */) {
+        mark(time, "force touch " + std::to_string(value));
+    }
+
     void mark(double time, const std::string& label) { mTimeline.marks.push_back({time, label}); }
 
     void stop(double time) {
