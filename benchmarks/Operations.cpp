@@ -4,6 +4,7 @@
 #include "support/Operations.h"
 
 #include "PrivateSysfs.h"
+#include "Vibrator.h"
 
 #include <benchmark/benchmark.h>
 #include <fcntl.h>

@@ -102,53 +102,5 @@ TEST_F(DriverModeTest, FixedPathsAreThereFromTheStart) {
     EXPECT_EQ(THE_DEVICE_STATE, "/sys/class/leds/vibrator/state");
 }
 
-/** Without a driver every operation fails in its own way, and none of them finds a node. */
-TEST_F(DriverModeTest, WithoutADriverEveryOperationFails) {
-    construct();
-    trace();
-    log();
-    Vibrator& vibrator = *mVibrator;
-    EXPECT_EQ(Status(vibrator.on(5)), Status::UNKNOWN_ERROR);
-    EXPECT_EQ(Status(vibrator.off()), Status::UNKNOWN_ERROR);
-    EXPECT_FALSE(VibratorPeer::isVibrating(vibrator));
-    EXPECT_EQ(trace(), (Lines{"timed_output/enable open O_RDWR = -1 ENOENT",
-                              "timed_output/enable open O_RDWR = -1 ENOENT",
-                              "timed_output/enable open O_RDONLY = -1 ENOENT"}));
-    EXPECT_FALSE(vibrator.supportsAmplitudeControl());
-    EXPECT_EQ(Status(vibrator.setAmplitude(0)), Status::UNSUPPORTED_OPERATION);
-    EXPECT_FALSE(vibrator.supportsExternalControl());
-    EXPECT_EQ(Status(vibrator.setExternalControl(true)), Status::UNSUPPORTED_OPERATION);
-    EXPECT_FALSE(vibrator.daxSupportsAmplitudeControl());
-    EXPECT_FALSE(vibrator.daxSupportsForceTouchAmplitudeControl());
-    EXPECT_FALSE(vibrator.daxSupportsFrequencyControl());
-    EXPECT_FALSE(vibrator.daxSupportsHapticEngine());
-    EXPECT_FALSE(vibrator.daxSupportsPrebakedHapticPattern());
-    EXPECT_FALSE(vibrator.daxSupportsFolderStatusSetting());
-    EXPECT_FALSE(vibrator.daxSupportsEnhancedVelmoraHapticPattern());
-    EXPECT_EQ(Status(vibrator.daxSetAmplitude(1)), Status::UNKNOWN_ERROR);
-    EXPECT_EQ(Status(vibrator.daxSetForceTouchAmplitude(1)), Status::UNKNOWN_ERROR);
-    EXPECT_EQ(Status(vibrator.daxSetFrequencyType(DaxFrequencyType::TYPE_0)),
-              Status::UNKNOWN_ERROR);
-    EXPECT_EQ(Status(vibrator.daxSetFolderStatus(DaxFolderStatus::FOLDER_OPEN)),
-              Status::UNKNOWN_ERROR);
-    EXPECT_EQ(Status(vibrator.daxPerformHapticEngine({}, 1)), Status::UNKNOWN_ERROR);
-    EXPECT_EQ(Status(vibrator.daxPerformPrebakedHapticPattern(1, 1, false)), Status::UNKNOWN_ERROR);
-    EXPECT_EQ(Status(vibrator.daxPerformPrebakedHapticPattern(1, 1, true)), Status::UNKNOWN_ERROR);
-    int callbacks = 0;
-    vibrator.daxGetNumberOfPrebakedHapticPattern([&](Status status, uint32_t count) {
-        EXPECT_EQ(status, Status::UNSUPPORTED_OPERATION);
-        EXPECT_EQ(count, 0U);
-        ++callbacks;
-    });
-    vibrator.daxGetAmplitudeList(DaxAmplitudeType::TYPE_0,
-                                 [&](bool supported, const hidl_vec<uint32_t>& list) {
-                                     EXPECT_FALSE(supported);
-                                     EXPECT_EQ(list.size(), 0U);
-                                     ++callbacks;
-                                 });
-    EXPECT_EQ(callbacks, 2);
-    EXPECT_EQ(trace(), (Lines{"timed_output/enable open O_RDONLY = -1 ENOENT"}));
-}
-
 }  // namespace
 }  // namespace vendor::velmora::hardware::vibrator::V2_1::implementation

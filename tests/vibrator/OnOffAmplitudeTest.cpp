@@ -39,26 +39,6 @@ TEST_P(OnOffTest, TimeBeyondSignedRangeReachesTheDriverAsNegative) {
     }
 }
 
-TEST_P(OnOffTest, OffStopsTheMotor) {
-    mVibrator->on(100000);
-    EXPECT_EQ(isTimed() ? VibratorPeer::isVibrating(*mVibrator) : true, true);
-    trace();
-    log();
-    EXPECT_EQ(Status(mVibrator->off()), Status::OK);
-    const std::string leaf = isTimed() ? "enable" : "activate";
-    EXPECT_EQ(trace(), written(leaf, "0\n"));
-    EXPECT_EQ(log(), writeLog(leaf, 0));
-}
-
-TEST_P(OnOffTest, FailedOffIsUnknownError) {
-    const std::string leaf = isTimed() ? "enable" : "activate";
-    removeNode(leaf);
-    EXPECT_EQ(Status(mVibrator->off()), Status::UNKNOWN_ERROR);
-    Lines expected = openFailedLog(leaf, 0, ENOENT);
-    if (!isTimed()) expected.emplace_back("E THE_DEVICE_ACTIVATE is impossible");
-    EXPECT_EQ(log(), expected);
-}
-
 TEST_P(OnOffTest, VibratingIsWhatTheDriverSays) {
     const std::string leaf = isTimed() ? "enable" : "duration";
     // With the timed output the remaining time is the driver's own, not what the file holds.
@@ -78,29 +58,6 @@ TEST_P(OnOffTest, VibratingIsWhatTheDriverSays) {
     EXPECT_TRUE(VibratorPeer::isVibrating(*mVibrator));
     removeNode(leaf);
     EXPECT_FALSE(VibratorPeer::isVibrating(*mVibrator));
-}
-
-TEST_F(VibratorTest, OnStopsAtTheFirstNodeThatFails) {
-    const struct {
-        std::string leaf;
-        std::string line;
-        int value;
-        size_t writesBefore;
-    } cases[] = {{"state", "E THE_DEVICE_STATE is impossible", 1, 0},
-                 {"duration", "E THE_DEVICE_DURATION is impossible", 500, 1},
-                 {"activate", "E THE_DEVICE_ACTIVATE is impossible", 1, 2}};
-    for (const auto& [leaf, line, value, writesBefore] : cases) {
-        start(Layout::kLedTrigger);
-        fail(leaf, "open", "EACCES", 1);
-        EXPECT_EQ(Status(mVibrator->on(500)), Status::UNKNOWN_ERROR);
-        const Lines all = switchedOn("500");
-        Lines expected(all.begin(), all.begin() + static_cast<long>(3 * writesBefore));
-        expected.push_back("leds/" + leaf + " open O_RDWR = -1 EACCES");
-        EXPECT_EQ(trace(), expected);
-        const Lines allLogs = onLog(500);
-        const Lines before(allLogs.begin(), allLogs.begin() + static_cast<long>(2 * writesBefore));
-        EXPECT_EQ(log(), join({before, openFailedLog(leaf, value, EACCES), {line}}));
-    }
 }
 
 class AmplitudeTest : public BothLayoutsTest {
@@ -139,25 +96,6 @@ TEST_P(AmplitudeTest, ZeroIsBadValueOnlyWhereAmplitudesCanBeSet) {
     EXPECT_EQ(trace(), missing("intensity"));
     EXPECT_EQ(log(), join({probeLog("intensity", false),
                            {"E setAmplitude is impossible because of intensity"}}));
-}
-
-TEST_P(AmplitudeTest, FailedWriteIsReportedWithItsErrno) {
-    fail("intensity", "write", "ENODEV", 1);
-    EXPECT_EQ(Status(mVibrator->setAmplitude(255)), Status::UNKNOWN_ERROR);
-    EXPECT_EQ(log(), join({probeLog("intensity", true),
-                           {"D Setting amplitude to: 10000"},
-                           writeLog("intensity", 10000, false),
-                           {"E Failed to set amplitude (19): No such device"}}));
-}
-
-TEST_P(AmplitudeTest, SupportIsTheExtendedInterfacesAnswer) {
-    EXPECT_TRUE(mVibrator->supportsAmplitudeControl());
-    EXPECT_EQ(log(),
-              join({probeLog("intensity", true), {"D supportsAmplitudeControl is possible"}}));
-    setMode("intensity", 0444);
-    EXPECT_FALSE(mVibrator->supportsAmplitudeControl());
-    EXPECT_EQ(log(),
-              join({probeLog("intensity", false), {"E supportsAmplitudeControl is impossible"}}));
 }
 
 }  // namespace
