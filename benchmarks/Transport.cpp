@@ -2,7 +2,7 @@
 
 /** A call from one process to another, beside the least that any transport takes for it. */
 #include "Child.h"
-#include "support/FakeVibrator.h"
+#include "Vibrator.h"
 #include "support/TemporaryDirectory.h"
 
 #include <benchmark/benchmark.h>
@@ -15,7 +15,11 @@
 
 namespace {
 
+using ::android::hardware::vibrator::V1_0::EffectStrength;
+using ::android::hardware::vibrator::V1_0::Status;
+using ::android::hardware::vibrator::V1_1::Effect_1_1;
 using ::vendor::velmora::hardware::vibrator::V2_1::IDaxVibrator;
+using ::vendor::velmora::hardware::vibrator::V2_1::implementation::Vibrator;
 
 /** A process that serves an object, and a directory for its socket. */
 class Server {
@@ -23,7 +27,7 @@ class Server {
     Server() {
         setenv("HWBINDER_DIR", mDirectory.path().c_str(), 1);
         mChild.emplace_back(new Child([] {
-            const android::sp<IDaxVibrator> vibrator = new FakeVibrator;
+            const android::sp<IDaxVibrator> vibrator = new Vibrator;
             if (vibrator->registerAsService() != android::OK) _exit(1);
             android::hardware::joinRpcThreadpool();
         }));
@@ -36,8 +40,12 @@ class Server {
     std::vector<std::unique_ptr<Child>> mChild;
 };
 
+/** Calls an operation that answers without a look at the driver. */
 void callOnce(IDaxVibrator& vibrator) {
-    if (vibrator.on(6) != FakeVibrator::Status::BAD_VALUE) abort();
+    Status answer = Status::OK;
+    vibrator.perform_1_1(Effect_1_1::CLICK, EffectStrength::LIGHT,
+                         [&](Status status, uint32_t /* lengthMs */) { answer = status; });
+    if (answer != Status::UNSUPPORTED_OPERATION) abort();
 }
 
 void call(benchmark::State& state) {
@@ -77,8 +85,8 @@ BENCHMARK(callAfterManyCalls)->Name("calls")->Arg(1)->Arg(100'000)->UseRealTime(
 
 /** Messages of the same sizes to and fro, and nothing else. */
 void callFloor(benchmark::State& state) {
-    constexpr size_t kRequest = 64;
-    constexpr size_t kReply = 16;
+    constexpr size_t kRequest = 72;
+    constexpr size_t kReply = 24;
     int sockets[2];
     if (socketpair(AF_UNIX, SOCK_SEQPACKET, 0, sockets) != 0) abort();
     const Child echo([&] {

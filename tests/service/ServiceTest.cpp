@@ -2,8 +2,15 @@
 #include "support/ServiceTest.h"
 
 #include "support/LogCapture.h"
+#include "support/Operations.h"
 
 #include <algorithm>
+#include <chrono>
+#include <csignal>
+#include <filesystem>
+#include <regex>
+#include <sstream>
+#include <thread>
 
 namespace {
 
@@ -34,26 +41,57 @@ TEST_F(ServiceTest, RegistersWithoutADriver) {
     EXPECT_EQ(Status(IDaxVibrator::getService()->on(5)), Status::UNKNOWN_ERROR);
 }
 
-TEST_F(ServiceTest, ServesTheMotorAndItsStrength) {
+TEST_F(ServiceTest, ServesEveryOperationAsTheTableSays) {
+    for (const auto& [name, layout] : {std::pair("led", simulator::Layout::kLedTrigger),
+                                       std::pair("timed", simulator::Layout::kTimedOutput)}) {
+        std::filesystem::remove_all(mDirectory.path() + "/sys");
+        createDriver({"--layout", name});
+        start();
+        const auto vibrator = IDaxVibrator::getService();
+        for (const Operation& operation : allOperations(layout)) {
+            SCOPED_TRACE(operation.name);
+            createDriver({"--layout", name, "--motor",
+                          operation.motor.substr(0, operation.motor.size() - 1)});
+            const size_t before = readFile(mDirectory.path() + "/trace").size();
+            EXPECT_EQ(operation.call(*vibrator).inWords(), operation.answer);
+            std::istringstream trace(readFile(mDirectory.path() + "/trace").substr(before));
+            Lines accesses;
+            for (std::string line; std::getline(trace, line);)
+                accesses.push_back(line.substr(line.find(' ') + 1));
+            EXPECT_EQ(accesses, undisturbedTrace(layout, operation));
+        }
+        mService.kill();
+    }
+}
+
+TEST_F(ServiceTest, CallsAreServedInTheOrderOfTheirDelivery) {
     createDriver();
     start();
-    const auto vibrator = IDaxVibrator::getService();
-    EXPECT_EQ(Status(vibrator->on(60000)), Status::OK);
-    EXPECT_EQ(node("duration"), "60000\n");
-    EXPECT_EQ(runProgram({VIBRATOR_SIM, "show"}).output.find("activate \"1\\n\""),
-              std::string("/sys/class/leds/vibrator/").size());
-    EXPECT_EQ(Status(vibrator->off()), Status::OK);
-    EXPECT_EQ(Status(vibrator->daxPerformHapticEngine({{1, 2, 3, 4}}, 10000)), Status::OK);
-    EXPECT_EQ(node("haptic_engine"), "4 1 2 3 4\n");
-    bool answered = false;
-    vibrator->daxGetAmplitudeList(
-            ::vendor::velmora::hardware::vibrator::V2_1::DaxAmplitudeType::TYPE_1,
-            [&](bool supported, const android::hardware::hidl_vec<uint32_t>& list) {
-                answered = supported;
-                EXPECT_EQ(std::vector<uint32_t>(list),
-                          (std::vector<uint32_t>{0, 2000, 4000, 6000, 8000, 10000}));
-            });
-    EXPECT_TRUE(answered);
+    std::vector<android::sp<IDaxVibrator>> clients;
+    for (int i = 0; i < 10; ++i) {
+        clients.push_back(IDaxVibrator::getService());
+        ASSERT_TRUE(clients.back()->ping().isOk());
+    }
+    // While the daemon rests the calls arrive, that of the latest connection first.
+    kill(mService.pid(), SIGSTOP);
+    std::vector<std::thread> calls;
+    std::string expected;
+    for (uint32_t i = 10; i-- > 0;) {
+        calls.emplace_back([&, i] { clients[i]->on(1000 + i); });
+        expected += std::to_string(1000 + i) + "\n";
+        std::this_thread::sleep_for(std::chrono::milliseconds(20));
+    }
+    kill(mService.pid(), SIGCONT);
+    for (std::thread& each : calls)
+        each.join();
+    std::smatch written;
+    std::string served;
+    for (std::string trace = readFile(mDirectory.path() + "/trace");
+         std::regex_search(trace, written, std::regex("duration write \"(\\d+)"));
+         trace = written.suffix()) {
+        served += written[1].str() + "\n";
+    }
+    EXPECT_EQ(served, expected);
 }
 
 TEST_F(ServiceTest, GateJudgesTheRealCaller) {

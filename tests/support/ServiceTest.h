@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "support/Answer.h"
 #include "support/Process.h"
 #include "support/TemporaryDirectory.h"
 
 #include <gtest/gtest.h>
-#include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
 
 #include <cstdlib>
 #include <string>
@@ -14,8 +14,6 @@
 /** The real daemon, in a process of its own, on a simulated driver. */
 class ServiceTest : public ::testing::Test {
   protected:
-    using IDaxVibrator = ::vendor::velmora::hardware::vibrator::V2_1::IDaxVibrator;
-
     ServiceTest() {
         setenv("HWBINDER_DIR", socketDirectory().c_str(), 1);
         setenv("VIBRATOR_SIM_DIR", mDirectory.path().c_str(), 1);

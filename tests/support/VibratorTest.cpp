@@ -127,22 +127,12 @@ Lines VibratorTest::writeLog(const std::string& leaf, int value, bool succeeds) 
             succeeds ? "D << writeNode node OK" : "D << writeNode node UNKNOWN_ERROR"};
 }
 
-Lines VibratorTest::openFailedLog(const std::string& leaf, int value, int error) const {
-    return {"D >> writeNode node:" + path(leaf) + " val:" + std::to_string(value),
-            "E node: " + path(leaf) + " open failed. errno: " + std::to_string(error)};
-}
-
 Lines VibratorTest::probeLog(const std::string& leaf, bool exists) const {
     return {"D isNodeExist node:" + path(leaf) + " ", exists ? "D true" : "D false"};
 }
 
 Lines VibratorTest::readLog(const std::string& leaf) const {
     return {"D >> readNode node:" + path(leaf) + " ", "D << readNode done"};
-}
-
-Lines VibratorTest::onLog(int ms) const {
-    if (mLayout == Layout::kTimedOutput) return writeLog("enable", ms);
-    return join({writeLog("state", 1), writeLog("duration", ms), writeLog("activate", 1)});
 }
 
 Lines join(const std::vector<Lines>& parts) {

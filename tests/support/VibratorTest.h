@@ -81,10 +81,8 @@ class VibratorTest : public ::testing::Test {
 
     // What the log shows of the node primitives.
     Lines writeLog(const std::string& leaf, int value, bool succeeds = true) const;
-    Lines openFailedLog(const std::string& leaf, int value, int error) const;
     Lines probeLog(const std::string& leaf, bool exists) const;
     Lines readLog(const std::string& leaf) const;
-    Lines onLog(int ms) const;
 
     TemporaryDirectory mDirectory;
     LogCapture mLog;

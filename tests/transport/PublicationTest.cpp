@@ -17,7 +17,7 @@ class PublicationTest : public TransportTest {
   protected:
     /** @return what registering in this process gives. */
     android::status_t tryToRegister(const std::string& instance = "default") {
-        const android::sp<IDaxVibrator> vibrator = new FakeVibrator;
+        const android::sp<IDaxVibrator> vibrator = new Vibrator;
         // In a child: what is registered stays so for the life of the process.
         const int code = runAs(geteuid(), [&] {
             const android::status_t status = vibrator->registerAsService(instance);
@@ -43,20 +43,16 @@ TEST_F(PublicationTest, MissingServiceIsADeadObject) {
     EXPECT_EQ(vibrator->off().withDefault(Status::BAD_VALUE), Status::BAD_VALUE);
 }
 
-TEST_F(PublicationTest, DeathOfTheServiceInMidCallIsSeenAtOnce) {
+TEST_F(PublicationTest, DeadServiceIsInNobodysWay) {
     serve();
     const auto vibrator = IDaxVibrator::getService();
-    EXPECT_TRUE(vibrator->on(1).isOk());
-    const auto dying = vibrator->on(FakeVibrator::kDie);
-    EXPECT_TRUE(dying.isDeadObject());
-    EXPECT_FALSE(dying.description().empty());
-    EXPECT_TRUE(vibrator->off().isDeadObject());
-    // What the dead process left behind is in nobody's way.
-    EXPECT_EQ(IDaxVibrator::getService()->on(1).description().find(mDirectory.path()), 0U);
+    EXPECT_TRUE(call(*vibrator).isOk);
     mServer.kill();
+    EXPECT_TRUE(vibrator->ping().isDeadObject());
+    EXPECT_EQ(IDaxVibrator::getService()->ping().description().find(mDirectory.path()), 0U);
     serve();
     EXPECT_TRUE(answers());
-    EXPECT_FALSE(vibrator->off().isOk());
+    EXPECT_FALSE(vibrator->ping().isOk());
 }
 
 TEST_F(PublicationTest, LivingServiceIsNotReplaced) {
@@ -97,7 +93,7 @@ TEST_F(PublicationTest, UnusableSurroundingsAreAClearError) {
         LogCapture log;
         EXPECT_NE(tryToRegister(instance), android::OK);
         const std::string text = log.takeText();
-        EXPECT_EQ(text.find("E/hwbinder"), 0U) << text;
+        EXPECT_NE(text.find("E/hwbinder"), std::string::npos) << text;
         EXPECT_NE(text.find(complaint), std::string::npos) << text;
         // The client is told as well.
         EXPECT_TRUE(IDaxVibrator::getService(instance)->off().isDeadObject());
@@ -138,7 +134,7 @@ TEST_F(PublicationTest, UserWithoutADirectoryIsToldSo) {
     EXPECT_EQ(runAs(2000,
                     [&] {
                         setenv("XDG_RUNTIME_DIR", runtime.c_str(), 1);
-                        const android::sp<IDaxVibrator> vibrator = new FakeVibrator;
+                        const android::sp<IDaxVibrator> vibrator = new Vibrator;
                         return vibrator->registerAsService() == android::OK ? 0 : 1;
                     }),
               0);

@@ -38,59 +38,13 @@ TEST_F(NodePrimitivesTest, WritesDecimalTextAndNewline) {
     }
 }
 
-TEST_F(NodePrimitivesTest, FailedWriteIsUnknownErrorWithItsErrno) {
-    fail("intensity", "write", "EIO");
+TEST_F(NodePrimitivesTest, EmptyPathIsAMissingNode) {
     errno = 0;
-    EXPECT_EQ(write("intensity", 5), Status::UNKNOWN_ERROR);
-    EXPECT_EQ(errno, EIO);
-    EXPECT_EQ(trace(),
-              (Lines{"leds/intensity open O_RDWR = 0", "leds/intensity write \"5\\n\" = -1 EIO",
-                     "leds/intensity close = 0"}));
-    EXPECT_EQ(log(), writeLog("intensity", 5, false));
-}
-
-TEST_F(NodePrimitivesTest, ShortWriteIsNotContinued) {
-    fail("intensity", "write", "short=2");
-    EXPECT_EQ(write("intensity", 500), Status::UNKNOWN_ERROR);
-    EXPECT_EQ(trace(), (Lines{"leds/intensity open O_RDWR = 0",
-                              "leds/intensity write \"500\\n\" = 2", "leds/intensity close = 0"}));
-    EXPECT_EQ(log(), writeLog("intensity", 500, false));
-}
-
-TEST_F(NodePrimitivesTest, ValueThatTheDriverRejectsIsUnknownError) {
-    EXPECT_EQ(write("intensity", 10001), Status::UNKNOWN_ERROR);
-    EXPECT_EQ(log(), writeLog("intensity", 10001, false));
-}
-
-TEST_F(NodePrimitivesTest, NodeThatCannotBeOpenedIsUnknownErrorWithItsErrno) {
-    removeNode("intensity");
-    errno = 0;
-    EXPECT_EQ(write("intensity", 7), Status::UNKNOWN_ERROR);
+    EXPECT_EQ(Status(VibratorPeer::writeNode(*mVibrator, "", 1)), Status::UNKNOWN_ERROR);
     EXPECT_EQ(errno, ENOENT);
-    EXPECT_EQ(log(), openFailedLog("intensity", 7, ENOENT));
-    EXPECT_EQ(readNumber("intensity"), -1);
-    EXPECT_EQ(log(), (Lines{"D >> readNode node:" + path("intensity") + " ",
-                            "E node: " + path("intensity") + " open failed. errno: 2"}));
-    EXPECT_EQ(VibratorPeer::writeNode(*mVibrator, "", 1), Status::UNKNOWN_ERROR);
     EXPECT_EQ(log(), (Lines{"D >> writeNode node: val:1", "E node:  open failed. errno: 2"}));
-}
-
-TEST_F(NodePrimitivesTest, InterruptedCallsAreIssuedAgain) {
-    for (const char* operation : {"open", "write"})
-        fail("intensity", operation, "EINTR", 3);
-    EXPECT_EQ(write("intensity", 9), Status::OK);
-    EXPECT_EQ(trace(), join({{3, "leds/intensity open O_RDWR = -1 EINTR"},
-                             {"leds/intensity open O_RDWR = 0"},
-                             {3, "leds/intensity write \"9\\n\" = -1 EINTR"},
-                             {"leds/intensity write \"9\\n\" = 2", "leds/intensity close = 0"}}));
-    for (const char* operation : {"open", "read"})
-        fail("intensity", operation, "EINTR", 1000);
-    EXPECT_EQ(readNumber("intensity"), 9);
-    EXPECT_EQ(trace().size(), 2003U);
-    // Closing is not repeated: the descriptor is gone whatever close says.
-    fail("intensity", "close", "EINTR", 1);
-    EXPECT_EQ(write("intensity", 10), Status::OK);
-    EXPECT_EQ(trace().back(), "leds/intensity close = -1 EINTR");
+    EXPECT_EQ(VibratorPeer::readNode(*mVibrator, ""), -1);
+    EXPECT_EQ(log(), (Lines{"D >> readNode node: ", "E node:  open failed. errno: 2"}));
 }
 
 struct Number {
@@ -129,15 +83,6 @@ TEST_F(NodePrimitivesTest, ReadsTheLeadingNumberOfSevenBytes) {
         EXPECT_EQ(trace(), read("intensity", text.substr(0, 7), 7));
         EXPECT_EQ(log(), readLog("intensity"));
     }
-}
-
-TEST_F(NodePrimitivesTest, FailedReadIsMinusOne) {
-    fail("intensity", "read", "EIO");
-    EXPECT_EQ(readNumber("intensity"), -1);
-    EXPECT_EQ(trace(), (Lines{"leds/intensity open O_RDONLY = 0", "leds/intensity read 7 = -1 EIO",
-                              "leds/intensity close = 0"}));
-    EXPECT_EQ(log(), (Lines{"D >> readNode node:" + path("intensity") + " ",
-                            "E node: " + path("intensity") + " read failed. errno: 5"}));
 }
 
 TEST_F(NodePrimitivesTest, WhateverStandsInANodesPlaceIsJudgedByTheKernel) {
