@@ -262,6 +262,9 @@ int createDriver(const std::string& directory, Layout layout, const Features& fe
     const std::string nodes = directory + sysfsDirectory(layout);
     std::error_code error;
     fs::create_directories(nodes, error);
+    // The driver that was there before may be running its motor, and have faults.
+    if (!error) fs::remove(nodes + kDeadlineFile, error);
+    if (!error) fs::remove_all(directory + "/faults", error);
     if (!error) fs::create_directories(directory + "/faults", error);
     if (error) return error.value();
 

@@ -263,7 +263,6 @@ TEST_F(LoadTest, KilledDaemonIsNoticedAtOnceAndReplaced) {
 
     mService.kill();
     createDriver();
-    runProgram({VIBRATOR_SIM, "fault", "state", "write", "none"});
     start();
     EXPECT_TRUE(vibrator->off().isDeadObject()) << "a dead object stays dead";
     EXPECT_EQ(Status(IDaxVibrator::getService()->on(5)), Status::OK);
