@@ -14,6 +14,7 @@ TEST_P(FolderStatusTest, OneOfFourLettersMeansSupport) {
     const std::pair<std::string, bool> cases[] = {
             {"FOLDER_OPEN\n", true},
             {"OFF", true},
+            {"ON\n", true},
             {"D", true},
             {"xFx\n", true},
             {"00L00", true},
