@@ -131,6 +131,10 @@ TEST_F(ToolsTest, DoctorAgreesWithTheService) {
             const auto known = nlohmann::json::parse(run({"motor", "--json"}).output);
             EXPECT_EQ(found["ladders"]["0"], known["ladder0"]);
             EXPECT_EQ(found["ladders"]["1"], known["ladder1"]);
+            EXPECT_NE(log().find("daxGetAmplitudeList type: 0 : " +
+                                 found["motor"]["number"].dump() + "\n"),
+                      std::string::npos);
+            std::filesystem::remove(logFile());
             mService.kill();
         }
     }

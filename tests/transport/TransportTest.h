@@ -22,8 +22,15 @@ class TransportTest : public ::testing::Test {
     using Status = VibratorStatus;
     using Vibrator = ::vendor::velmora::hardware::vibrator::V2_1::implementation::Vibrator;
 
-    TransportTest() { setenv("HWBINDER_DIR", mDirectory.path().c_str(), 1); }
-    ~TransportTest() override { unsetenv("HWBINDER_DIR"); }
+    TransportTest() {
+        setenv("HWBINDER_DIR", mDirectory.path().c_str(), 1);
+        // What the object does is not looked at here.
+        setenv("ANDROID_LOG_TAGS", "QorVibrator-HAL2.1:S", 1);
+    }
+    ~TransportTest() override {
+        unsetenv("HWBINDER_DIR");
+        unsetenv("ANDROID_LOG_TAGS");
+    }
 
     /** @param descriptors the limit that the process has; 0 leaves it as it is. */
     void serve(const std::string& instance = "default", rlim_t descriptors = 0) {
