@@ -68,8 +68,8 @@ bool makeCall(IDaxVibrator& vibrator, bool permitted, uint32_t client, uint32_t 
 }
 
 /** Sends nonsense, reads no reply, and comes again when it is thrown out. */
-[[noreturn]] void behaveBadly(const std::string& socketPath, unsigned seed) {
-    std::mt19937 random(seed);
+[[noreturn]] void behaveBadly(const std::string& socketPath, unsigned number) {
+    std::mt19937 random(number);
     sockaddr_un address{};
     address.sun_family = AF_UNIX;
     memcpy(address.sun_path, socketPath.c_str(), socketPath.size());
