@@ -32,12 +32,15 @@ void becomeUser(uid_t uid) {
     if (setgroups(0, nullptr) != 0 || setgid(uid) != 0 || setuid(uid) != 0) _exit(kNotStarted);
 }
 
-[[noreturn]] void execute(const std::vector<std::string>& command) {
+/** Becomes a program, as another user, who need not be able to reach the folder that it lies in. */
+[[noreturn]] void execute(const std::vector<std::string>& command, uid_t uid) {
+    const int program = open(command[0].c_str(), O_PATH | O_CLOEXEC);
     std::vector<char*> arguments;
     for (const std::string& word : command)
         arguments.push_back(const_cast<char*>(word.c_str()));
     arguments.push_back(nullptr);
-    execv(arguments[0], arguments.data());
+    becomeUser(uid);
+    fexecve(program, arguments.data(), environ);
     _exit(kNotStarted);
 }
 
@@ -66,8 +69,7 @@ Outcome runProgram(const std::vector<std::string>& command, uid_t uid, const std
         dup2(in, STDIN_FILENO);
         dup2(out, STDOUT_FILENO);
         dup2(err, STDERR_FILENO);
-        becomeUser(uid);
-        execute(command);
+        execute(command, uid);
     }
     const int code = exitCodeOf(pid);
     close(in);
@@ -107,8 +109,7 @@ void ChildProcess::startProgram(const std::vector<std::string>& command, const s
         dup2(log, STDERR_FILENO);
         for (const std::string& each : environment)
             putenv(const_cast<char*>(each.c_str()));
-        becomeUser(uid);
-        execute(command);
+        execute(command, uid);
     }
     close(log);
 }
