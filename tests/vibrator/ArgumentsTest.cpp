@@ -20,6 +20,12 @@ struct Case {
     Lines log;
 };
 
+/** A function, whose arguments are laid out as those of one. */
+Case row(const std::function<Answer(Vibrator&)>& call, const std::string& answer,
+         const Lines& writes, const Lines& log) {
+    return {call, answer, writes, log};
+}
+
 class ArgumentsTest : public BothLayoutsTest {
   protected:
     ArgumentsTest() { start(GetParam()); }
@@ -85,26 +91,23 @@ TEST_P(ArgumentsTest, OfSettings) {
     const std::string abnormal = "E daxSetAmplitude amplitude is abnormal ";
     const std::string forceAbnormal = "E daxSetForceTouchAmplitude amplitude is abnormal ";
     const Lines badFold = {"D daxSetFolderStatus starts", "D daxSetFolderStatus BAD_VALUE"};
-    expect({{amplitude(1), "OK", {"intensity=1"}, {}},
-            {amplitude(10000), "OK", {"intensity=10000"}, {}},
-            {amplitude(0), bad, {}, {abnormal + "0"}},
-            {amplitude(10001), bad, {}, {abnormal + "10001"}},
-            {amplitude(4294967295U), bad, {}, {abnormal + "4294967295"}},
-            {force(1), "OK", {"force_touch_intensity=1"}, {}},
-            {force(10000), "OK", {"force_touch_intensity=10000"}, {}},
-            {force(0), bad, {}, {forceAbnormal + "0"}},
-            {force(10001), bad, {}, {forceAbnormal + "10001"}},
-            {frequency(0), "OK", {"multi_freq=0"}, {}},
-            {frequency(4), "OK", {"multi_freq=4"}, {}},
-            {frequency(5), bad, {}, {"E daxSetFrequencyType is abnormal 5"}},
-            {frequency(4294967295U), bad, {}, {"E daxSetFrequencyType is abnormal -1"}},
-            {fold(0),
-             "OK",
-             {"event_cmd=FOLDER_OPEN\\n"},
-             {"D daxSetFolderStatus starts", "D FOLDER_OPEN\\n", "D length : 12", "D ret : 12",
-              "D daxSetFolderStatus end"}},
-            {fold(2), bad, {}, badFold},
-            {fold(4294967295U), bad, {}, badFold}});
+    expect({row(amplitude(1), "OK", {"intensity=1"}, {}),
+            row(amplitude(10000), "OK", {"intensity=10000"}, {}),
+            row(amplitude(0), bad, {}, {abnormal + "0"}),
+            row(amplitude(10001), bad, {}, {abnormal + "10001"}),
+            row(amplitude(4294967295U), bad, {}, {abnormal + "4294967295"}),
+            row(force(1), "OK", {"force_touch_intensity=1"}, {}),
+            row(force(10000), "OK", {"force_touch_intensity=10000"}, {}),
+            row(force(0), bad, {}, {forceAbnormal + "0"}),
+            row(force(10001), bad, {}, {forceAbnormal + "10001"}),
+            row(frequency(0), "OK", {"multi_freq=0"}, {}),
+            row(frequency(4), "OK", {"multi_freq=4"}, {}),
+            row(frequency(5), bad, {}, {"E daxSetFrequencyType is abnormal 5"}),
+            row(frequency(4294967295U), bad, {}, {"E daxSetFrequencyType is abnormal -1"}),
+            row(fold(0), "OK", {"event_cmd=FOLDER_OPEN\\n"},
+                {"D daxSetFolderStatus starts", "D FOLDER_OPEN\\n", "D length : 12", "D ret : 12",
+                 "D daxSetFolderStatus end"}),
+            row(fold(2), bad, {}, badFold), row(fold(4294967295U), bad, {}, badFold)});
 }
 
 TEST_P(ArgumentsTest, OfEffects) {
@@ -122,43 +125,34 @@ TEST_P(ArgumentsTest, OfEffects) {
                ", strength : " + std::to_string(strength);
     };
     const std::string end = "D perform end effect";
-    expect({{perform(0, 0),
-             "(OK, 20)",
-             {"on=20", "intensity=1379"},
-             {start(0, 0), "D Setting amplitude to: 1379", end}},
-            {perform(0, 2),
-             "(OK, 20)",
-             {"on=20", "intensity=10000"},
-             {start(0, 2), "D Setting amplitude to: 10000", end}},
-            {perform(0, 3), none, {}, {start(0, 3)}},
-            {perform(0, 255), none, {}, {start(0, 255)}},
-            {perform(1, 0), none, {}, {start(1, 0), end}},
-            {perform(1, 3), none, {}, {start(1, 3), end}},
-            {perform(4294967295U, 1), none, {}, {start(-1, 1), end}},
-            {[](Vibrator& v) {
-                 return answerTo<StatusAndNumber>([&](const auto& callback) {
-                     return v.perform_1_3(platform::V1_3::Effect::TEXTURE_TICK,
-                                          static_cast<EffectStrength>(9), callback);
-                 });
-             },
-             none,
-             {},
-             {"D perform_1_3 start effect : 21, strength : 9"}}});
+    expect({row(perform(0, 0), "(OK, 20)", {"on=20", "intensity=1379"},
+                {start(0, 0), "D Setting amplitude to: 1379", end}),
+            row(perform(0, 2), "(OK, 20)", {"on=20", "intensity=10000"},
+                {start(0, 2), "D Setting amplitude to: 10000", end}),
+            row(perform(0, 3), none, {}, {start(0, 3)}),
+            row(perform(0, 255), none, {}, {start(0, 255)}),
+            row(perform(1, 0), none, {}, {start(1, 0), end}),
+            row(perform(1, 3), none, {}, {start(1, 3), end}),
+            row(perform(4294967295U, 1), none, {}, {start(-1, 1), end}),
+            row(
+                    [](Vibrator& v) {
+                        return answerTo<StatusAndNumber>([&](const auto& callback) {
+                            return v.perform_1_3(platform::V1_3::Effect::TEXTURE_TICK,
+                                                 static_cast<EffectStrength>(9), callback);
+                        });
+                    },
+                    none, {}, {"D perform_1_3 start effect : 21, strength : 9"})});
 }
 
 TEST_P(ArgumentsTest, OfExternalControl) {
     const auto external = [](bool enabled) {
         return [=](Vibrator& v) { return answerOf(v.setExternalControl(enabled)); };
     };
-    expect({{external(false),
-             "OK",
-             {"ext_control=0"},
-             {"D setExternalControl external control set as false"}},
-            {[](Vibrator& v) { return answerOf(v.on(60000)); }, "OK", {"on=60000"}, {}},
-            {external(true),
-             "UNSUPPORTED_OPERATION",
-             {},
-             {"D setExternalControl external control while vibrating. Not supported"}}});
+    expect({row(external(false), "OK", {"ext_control=0"},
+                {"D setExternalControl external control set as false"}),
+            row([](Vibrator& v) { return answerOf(v.on(60000)); }, "OK", {"on=60000"}, {}),
+            row(external(true), "UNSUPPORTED_OPERATION", {},
+                {"D setExternalControl external control while vibrating. Not supported"})});
 }
 
 TEST_P(ArgumentsTest, OfStoredPatterns) {
@@ -173,14 +167,10 @@ TEST_P(ArgumentsTest, OfStoredPatterns) {
                ", amplitude : " + std::to_string(amplitude);
     };
     std::vector<Case> cases = {
-            {play(0, 1, false),
-             "OK",
-             {"intensity=1", "cp_trigger_index=0"},
-             {entry(0, 1), prefix + "one shoot starts"}},
-            {play(5, 10000, false),
-             "OK",
-             {"intensity=10000", "cp_trigger_index=5", "on=1000"},
-             {entry(5, 10000), prefix + "one shoot starts", prefix + "one shoot end"}}};
+            row(play(0, 1, false), "OK", {"intensity=1", "cp_trigger_index=0"},
+                {entry(0, 1), prefix + "one shoot starts"}),
+            row(play(5, 10000, false), "OK", {"intensity=10000", "cp_trigger_index=5", "on=1000"},
+                {entry(5, 10000), prefix + "one shoot starts", prefix + "one shoot end"})};
     for (const uint32_t amplitude : {0U, 10001U, 4294967295U}) {
         for (const bool repeat : {false, true}) {
             cases.push_back({play(1, amplitude, repeat),
@@ -231,10 +221,8 @@ TEST_P(ArgumentsTest, OfHapticEnginePackets) {
     const Packets tooMany(340, {100000000, 0, 0, 0});
     std::vector<Case> cases = {
             plays({{10, 5000, 150, 0}, {20, 10000, 200, 1}}, 5000, "8 10 2500 150 0 20 5000 200 1"),
-            {engine({}, 10000),
-             "OK",
-             {"haptic_engine=0", "on=1"},
-             {"D daxPerformHapticEngine : 0\\n", "D daxPerformHapticEngine OK"}},
+            row(engine({}, 10000), "OK", {"haptic_engine=0", "on=1"},
+                {"D daxPerformHapticEngine : 0\\n", "D daxPerformHapticEngine OK"}),
             plays({{1, 429496, 2, 3}}, 10000, "4 1 429496 2 3"),
             plays({{0, 9999, 0, 0}}, 1, "4 0 0 0 0"),
             plays({{-5, 1, -9999999, 99999999}}, 10000, "4 -5 1 -9999999 99999999"),
@@ -262,42 +250,36 @@ TEST_P(ArgumentsTest, OfHapticEnginePackets) {
 TEST_P(ArgumentsTest, AreNotLookedAtBeforeTheCaller) {
     const CallerIdentity caller(2000);
     const Lines denied = {"E Pemission denied (2000)"};
-    expect({{[](Vibrator& v) { return answerOf(v.daxSetAmplitude(0)); },
-             "UNKNOWN_ERROR",
-             {},
-             denied},
-            {[](Vibrator& v) {
-                 return answerOf(
-                         v.daxPerformHapticEngine(std::vector<DaxHapticEnginePacket>(340), 0));
-             },
-             "UNKNOWN_ERROR",
-             {},
-             denied},
-            {[](Vibrator& v) {
-                 return answerOf(v.daxPerformPrebakedHapticPattern(4294967295U, 0, true));
-             },
-             "UNKNOWN_ERROR",
-             {},
-             {"D daxPerformPrebakedHapticPattern pattern : -1, amplitude : 0", denied[0]}},
+    expect({row([](Vibrator& v) { return answerOf(v.daxSetAmplitude(0)); }, "UNKNOWN_ERROR", {},
+                denied),
+            row(
+                    [](Vibrator& v) {
+                        return answerOf(v.daxPerformHapticEngine(
+                                std::vector<DaxHapticEnginePacket>(340), 0));
+                    },
+                    "UNKNOWN_ERROR", {}, denied),
+            row(
+                    [](Vibrator& v) {
+                        return answerOf(v.daxPerformPrebakedHapticPattern(4294967295U, 0, true));
+                    },
+                    "UNKNOWN_ERROR", {},
+                    {"D daxPerformPrebakedHapticPattern pattern : -1, amplitude : 0", denied[0]}),
             // The standard operations meet the gate inside; the click does not tell of it.
-            {[](Vibrator& v) { return answerOf(v.supportsAmplitudeControl()); },
-             "false",
-             {},
-             {denied[0], "E supportsAmplitudeControl is impossible"}},
-            {[](Vibrator& v) { return answerOf(v.setAmplitude(100)); },
-             "UNSUPPORTED_OPERATION",
-             {},
-             {denied[0], "E setAmplitude is impossible because of intensity"}},
-            {[](Vibrator& v) {
-                 return answerTo<StatusAndNumber>([&](const auto& callback) {
-                     return v.perform(platform::V1_0::Effect::CLICK, EffectStrength::LIGHT,
-                                      callback);
-                 });
-             },
-             "(OK, 20)",
-             {"on=20"},
-             {"D perform start effect : 0, strength : 0", denied[0],
-              "E setAmplitude is impossible because of intensity", "D perform end effect"}}});
+            row([](Vibrator& v) { return answerOf(v.supportsAmplitudeControl()); }, "false", {},
+                {denied[0], "E supportsAmplitudeControl is impossible"}),
+            row([](Vibrator& v) { return answerOf(v.setAmplitude(100)); }, "UNSUPPORTED_OPERATION",
+                {}, {denied[0], "E setAmplitude is impossible because of intensity"}),
+            row(
+                    [](Vibrator& v) {
+                        return answerTo<StatusAndNumber>([&](const auto& callback) {
+                            return v.perform(platform::V1_0::Effect::CLICK, EffectStrength::LIGHT,
+                                             callback);
+                        });
+                    },
+                    "(OK, 20)", {"on=20"},
+                    {"D perform start effect : 0, strength : 0", denied[0],
+                     "E setAmplitude is impossible because of intensity",
+                     "D perform end effect"})});
 }
 
 TEST_P(ArgumentsTest, OfTheCountAreTheNodesText) {
@@ -309,14 +291,13 @@ TEST_P(ArgumentsTest, OfTheCountAreTheNodesText) {
     for (const auto& [text, answer, shown] : cases) {
         setMode("num_waves", 0644);
         setNode("num_waves", text);
-        expect({{[](Vibrator& v) {
-                     return answerTo<StatusAndNumber>([&](const auto& callback) {
-                         return v.daxGetNumberOfPrebakedHapticPattern(callback);
-                     });
-                 },
-                 answer,
-                 {},
-                 {"D daxGetNumberOfPrebakedHapticPattern value : " + shown}}});
+        expect({row(
+                [](Vibrator& v) {
+                    return answerTo<StatusAndNumber>([&](const auto& callback) {
+                        return v.daxGetNumberOfPrebakedHapticPattern(callback);
+                    });
+                },
+                answer, {}, {"D daxGetNumberOfPrebakedHapticPattern value : " + shown})});
     }
 }
 
