@@ -14,6 +14,7 @@
  * of the daemon, of every fault, and for the benchmarks. Lines of the log are cut down to priority
  * and message, like "E Pemission denied (2000)".
  */
+
 /** One access of a node: open, at most one transfer, close. */
 struct Access {
     enum Kind { kProbe, kRead, kWrite };
