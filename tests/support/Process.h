@@ -2,6 +2,7 @@
 #pragma once
 
 #include <sys/types.h>
+#include <unistd.h>
 
 #include <functional>
 #include <string>
@@ -16,7 +17,7 @@ struct Outcome {
 };
 
 /** Runs a program to its end, as another user where asked for, with text on standard input. */
-Outcome runProgram(const std::vector<std::string>& command, uid_t uid = 0,
+Outcome runProgram(const std::vector<std::string>& command, uid_t uid = geteuid(),
                    const std::string& input = {});
 
 /** Runs a function in a process of its own and another uid. @return its exit code. */
@@ -32,7 +33,7 @@ class ChildProcess {
      * user where asked for.
      */
     void startProgram(const std::vector<std::string>& command, const std::string& logFile,
-                      const std::vector<std::string>& environment, uid_t uid = 0);
+                      const std::vector<std::string>& environment, uid_t uid = geteuid());
 
     ChildProcess() = default;
     ChildProcess(const ChildProcess&) = delete;

@@ -84,6 +84,8 @@ class VibratorTest : public ::testing::Test {
     Lines probeLog(const std::string& leaf, bool exists) const;
     Lines readLog(const std::string& leaf) const;
 
+    /** The system user calls, whoever runs the tests. */
+    CallerIdentity mCaller{1000};
     TemporaryDirectory mDirectory;
     LogCapture mLog;
     Layout mLayout = Layout::kLedTrigger;

@@ -18,7 +18,7 @@ class ToolsTest : public ServiceTest {
   protected:
     static Outcome run(Words words, const std::string& input = {}) {
         words.insert(words.begin(), VIBRATORCTL);
-        return runProgram(words, 0, input);
+        return runProgram(words, geteuid(), input);
     }
     static Outcome runShell(const std::string& command) {
         return runProgram({"/bin/bash", "-c", command, VIBRATORCTL});

@@ -10,7 +10,8 @@ namespace {
 class VibratorctlTest : public ServiceTest {
   protected:
     /** Runs the client with the words of a command line. */
-    static Outcome run(const std::string& line, uid_t uid = 0, const std::string& input = {}) {
+    static Outcome run(const std::string& line, uid_t uid = geteuid(),
+                       const std::string& input = {}) {
         std::istringstream words(line);
         std::vector<std::string> command = {VIBRATORCTL};
         for (std::string word; words >> word;)
@@ -101,7 +102,7 @@ TEST_F(VibratorctlTest, RefusalsAreExplained) {
     };
     for (const auto& each : cases) {
         if (each.uid != 0 && geteuid() != 0) continue;
-        const Outcome outcome = run(each.line, each.uid);
+        const Outcome outcome = run(each.line, each.uid != 0 ? each.uid : geteuid());
         EXPECT_EQ(outcome.exitCode, each.errors.empty() ? 0 : 1) << each.line;
         EXPECT_EQ(outcome.errors, each.errors);
     }
@@ -150,7 +151,7 @@ TEST_F(VibratorctlTest, PacketsComeFromFilesOfEitherKind) {
             {"[]", "0\n"},
     };
     for (const auto& [text, line] : good) {
-        const Outcome outcome = run("engine --file -", 0, text);
+        const Outcome outcome = run("engine --file -", geteuid(), text);
         EXPECT_EQ(outcome.exitCode, 0) << outcome.errors;
         EXPECT_EQ(node("haptic_engine"), line);
     }
@@ -172,7 +173,7 @@ TEST_F(VibratorctlTest, PacketsComeFromFilesOfEitherKind) {
             {std::string(5000, '['), "no JSON list"},
     };
     for (const auto& [text, complaint] : bad) {
-        const Outcome outcome = run("engine --file -", 0, text);
+        const Outcome outcome = run("engine --file -", geteuid(), text);
         EXPECT_EQ(outcome.exitCode, 2);
         EXPECT_NE(outcome.errors.find("-: " + complaint), std::string::npos) << outcome.errors;
     }
