@@ -3,7 +3,7 @@
 
 #include "Log.h"
 #include "MotorType.h"
-#include "NodePaths.h"
+#include "NodePathTable.h"
 #include "Vibrator.h"
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
@@ -62,7 +62,8 @@ Return<void> Vibrator::daxGetAmplitudeList(DaxAmplitudeType type, daxGetAmplitud
     }
 
     const bool hasIndex = isNodeExist(THE_DEVICE_HAPTIC_ENGINE_INDEX);
-    LOG_DEBUG("daxGetAmplitudeList %s index method", hasIndex ? "support" : "NOT support");
+    LOG_DEBUG(hasIndex ? "daxGetAmplitudeList support index method"
+                       : "daxGetAmplitudeList NOT support index method");
     AmplitudeList list = selectAmplitudeList(motor, type, hasIndex);
     if (list.empty()) {
         LOG_DEBUG("daxGetAmplitudeList false");

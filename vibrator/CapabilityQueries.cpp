@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "NodePaths.h"
+#include "NodePathTable.h"
 #include "Vibrator.h"
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {

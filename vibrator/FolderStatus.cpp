@@ -1,11 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Log.h"
-#include "NodePaths.h"
+#include "NodePathTable.h"
 #include "TextNode.h"
 #include "Vibrator.h"
 
 #include <fcntl.h>
 
+#include <cerrno>
 #include <cstring>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
@@ -27,7 +28,8 @@ Return<bool> Vibrator::daxSupportsFolderStatusSetting() {
     }
     // A driver that takes fold events shows one of its commands: any of these letters will do.
     const bool supports = strpbrk(text, "DFLO") != nullptr;
-    LOG_DEBUG("daxSupportsFolderStatusSetting %s", supports ? "TRUE" : "FALSE");
+    LOG_DEBUG(supports ? "daxSupportsFolderStatusSetting TRUE"
+                       : "daxSupportsFolderStatusSetting FALSE");
     return supports;
 }
 
@@ -44,9 +46,11 @@ Return<Status> Vibrator::daxSetFolderStatus(DaxFolderStatus status) {
     const auto length = static_cast<int>(command.size());
     LOG_DEBUG("%s", command.c_str());
     LOG_DEBUG("length : %d", length);
-    const auto written = writeTextNode("daxSetFolderStatus", THE_DEVICE_EVENT_CMD, command.c_str(),
-                                       command.size());
-    if (!written) return Status::UNKNOWN_ERROR;
+    const auto written = writeTextNode(THE_DEVICE_EVENT_CMD, command.c_str(), command.size());
+    if (!written) {
+        LOG_ERROR("daxSetFolderStatus is fail: %d", errno);
+        return Status::UNKNOWN_ERROR;
+    }
     LOG_DEBUG("ret : %d", static_cast<int>(*written));
     if (*written != length) {
         LOG_DEBUG("daxSetFolderStatus error");

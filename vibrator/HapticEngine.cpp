@@ -2,9 +2,11 @@
 #include "Amplitude.h"
 #include "HapticEngineText.h"
 #include "Log.h"
-#include "NodePaths.h"
+#include "NodePathTable.h"
 #include "TextNode.h"
 #include "Vibrator.h"
+
+#include <cerrno>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 namespace {
@@ -33,9 +35,11 @@ Return<Status> Vibrator::daxPerformHapticEngine(const hidl_vec<DaxHapticEnginePa
         return Status::BAD_VALUE;
     }
     LOG_DEBUG("daxPerformHapticEngine : %s", text.c_str());
-    const auto written = writeTextNode("daxPerformHapticEngine", THE_DEVICE_HAPTIC_ENGINE,
-                                       text.c_str(), text.length());
-    if (!written) return Status::UNKNOWN_ERROR;
+    const auto written = writeTextNode(THE_DEVICE_HAPTIC_ENGINE, text.c_str(), text.length());
+    if (!written) {
+        LOG_ERROR("daxPerformHapticEngine is fail: %d", errno);
+        return Status::UNKNOWN_ERROR;
+    }
     if (*written != static_cast<ssize_t>(text.length())) {
         LOG_DEBUG("daxPerformHapticEngine UNKNOWN_ERROR");
         return Status::UNKNOWN_ERROR;

@@ -2,7 +2,7 @@
 #include "MotorType.h"
 
 #include "Log.h"
-#include "NodePaths.h"
+#include "NodePathTable.h"
 #include "TextNode.h"
 #include "Vibrator.h"
 
@@ -53,8 +53,8 @@ Return<bool> Vibrator::daxSupportsEnhancedVelmoraHapticPattern() {
     if (checkCallerPermission() != kCallerPermitted) return false;
     if (!isNodeExistForRead(THE_DEVICE_MOTOR_TYPE)) {
         const bool supports = daxSupportsHapticEngine();
-        LOG_ERROR("daxSupportsEnhancedVelmoraHapticPattern %s",
-                  supports ? "Enhanced supports motor" : "not supports");
+        LOG_ERROR(supports ? "daxSupportsEnhancedVelmoraHapticPattern Enhanced supports motor"
+                           : "daxSupportsEnhancedVelmoraHapticPattern not supports");
         return supports;
     }
 
@@ -64,8 +64,11 @@ Return<bool> Vibrator::daxSupportsEnhancedVelmoraHapticPattern() {
         return false;
     }
     const bool supports = MotorTypeNames[kMotorLinear1040] == name;
-    LOG_DEBUG("daxSupportsEnhancedVelmoraHapticPattern %s",
-              supports ? "LINEAR_1040" : "can not supports. Out of capability");
+    if (supports) {
+        LOG_DEBUG("daxSupportsEnhancedVelmoraHapticPattern LINEAR_1040");
+    } else {
+        LOG_DEBUG("daxSupportsEnhancedVelmoraHapticPattern can not supports. Out of capability");
+    }
     return supports;
 }
 

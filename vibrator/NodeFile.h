@@ -44,12 +44,9 @@ class NodeFile {
         return retryInterrupted([=] { return write(mDescriptor, text, size); });
     }
 
-    /** Closes the node. Leaves errno as the transfer left it. */
+    /** Closes the node. */
     void shut() {
-        if (mDescriptor < 0) return;
-        const int error = errno;
-        close(mDescriptor);
-        errno = error;
+        if (mDescriptor >= 0) close(mDescriptor);
         mDescriptor = -1;
     }
 

@@ -10,14 +10,12 @@
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 namespace {
 
-/** Reads a decimal number as scanf's %d does. @return the number, kReadFailed for none. */
-int32_t parseNumber(const char* text, const char* end) {
+/** Reads a decimal number as scanf's %d does. @return whether there is one. */
+bool parseNumber(const char* text, const char* end, int32_t* number) {
     while (text != end && isspace(static_cast<unsigned char>(*text)) != 0)
         ++text;
     if (end - text > 1 && *text == '+' && text[1] != '-') ++text;
-    int32_t number = kReadFailed;
-    std::from_chars(text, end, number);
-    return number;
+    return std::from_chars(text, end, *number).ec == std::errc();
 }
 
 bool canOpen(const char* path, int mode) {
@@ -28,13 +26,12 @@ bool canOpen(const char* path, int mode) {
 
 }  // namespace
 
-Return<Status> Vibrator::writeNode(std::string node, int value) {
+Return<Status> Vibrator::writeNode(std::string node, int value, int* error) {
     LOG_DEBUG(">> writeNode node:%s val:%d", node.c_str(), value);
     NodeFile file(node.c_str(), O_RDWR);
     if (!file.isOpen()) {
-        const int error = errno;
-        LOG_ERROR("node: %s open failed. errno: %d", node.c_str(), error);
-        errno = error;
+        if (error != nullptr) *error = errno;
+        LOG_ERROR("node: %s open failed. errno: %d", node.c_str(), errno);
         return Status::UNKNOWN_ERROR;
     }
 
@@ -43,18 +40,17 @@ Return<Status> Vibrator::writeNode(std::string node, int value) {
     *end++ = '\n';
     const auto length = static_cast<int32_t>(end - text);
     const auto written = static_cast<int32_t>(file.send(text, static_cast<size_t>(length)));
+    if (error != nullptr) *error = errno;
     file.shut();
     if (written != length) {
-        const int error = errno;
         LOG_DEBUG("<< writeNode node UNKNOWN_ERROR");
-        errno = error;
         return Status::UNKNOWN_ERROR;
     }
     LOG_DEBUG("<< writeNode node OK");
     return Status::OK;
 }
 
-Return<int32_t> Vibrator::readNode(std::string node) {
+Return<int32_t> Vibrator::readNode(std::string node, bool* isNumber) {
     LOG_DEBUG(">> readNode node:%s ", node.c_str());
     NodeFile file(node.c_str(), O_RDONLY);
     if (!file.isOpen()) {
@@ -68,7 +64,9 @@ Return<int32_t> Vibrator::readNode(std::string node) {
         LOG_ERROR("node: %s read failed. errno: %d", node.c_str(), errno);
         return kReadFailed;
     }
-    const int32_t number = parseNumber(text, text + size);
+    int32_t number = kReadFailed;
+    const bool parsed = parseNumber(text, text + size, &number);
+    if (isNumber != nullptr) *isNumber = parsed;
     file.shut();
     LOG_DEBUG("<< readNode done");
     return number;

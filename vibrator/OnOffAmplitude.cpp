@@ -1,9 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Log.h"
-#include "NodePaths.h"
+#include "NodePathTable.h"
 #include "Vibrator.h"
 
-#include <cerrno>
 #include <cmath>
 #include <cstring>
 
@@ -75,8 +74,9 @@ Return<Status> Vibrator::setAmplitude(uint8_t amplitude) {
 
     const long intensity = intensityOf(amplitude);
     LOG_DEBUG("Setting amplitude to: %ld", intensity);
-    if (writeNode(THE_DEVICE_INTENSITY, static_cast<int>(intensity)) != Status::OK) {
-        LOG_ERROR("Failed to set amplitude (%d): %s", errno, strerror(errno));
+    int error = 0;
+    if (writeNode(THE_DEVICE_INTENSITY, static_cast<int>(intensity), &error) != Status::OK) {
+        LOG_ERROR("Failed to set amplitude (%d): %s", error, strerror(error));
         return Status::UNKNOWN_ERROR;
     }
     return Status::OK;

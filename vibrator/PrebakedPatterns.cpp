@@ -1,10 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Amplitude.h"
 #include "Log.h"
-#include "NodePaths.h"
+#include "NodePathTable.h"
 #include "TextNode.h"
 #include "Vibrator.h"
 
+#include <cerrno>
 #include <cstdio>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
@@ -28,13 +29,13 @@ Return<void> Vibrator::daxGetNumberOfPrebakedHapticPattern(
         _hidl_cb(Status::UNSUPPORTED_OPERATION, 0);
         return Void();
     }
-    const int32_t count = readNode(THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES);
+    bool isNumber = false;
+    const int32_t count = readNode(THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES, &isNumber);
     LOG_DEBUG("daxGetNumberOfPrebakedHapticPattern value : %u", static_cast<uint32_t>(count));
-    // A client that took this for a count would believe in 4294967295 patterns.
-    if (count == kReadFailed) {
-        _hidl_cb(Status::UNKNOWN_ERROR, 0);
-    } else {
+    if (isNumber) {
         _hidl_cb(Status::OK, static_cast<uint32_t>(count));
+    } else {
+        _hidl_cb(Status::UNKNOWN_ERROR, 0);
     }
     return Void();
 }
@@ -82,9 +83,11 @@ Status Vibrator::queuePattern(uint32_t pattern, uint32_t amplitude) {
     }
     // The driver wants the terminating zero byte too.
     const auto size = static_cast<size_t>(length) + 1;
-    const auto written = writeTextNode("daxPerformPrebakedHapticPattern",
-                                       THE_DEVICE_HAPTIC_PLAYBACK_QUEUE, queue, size);
-    if (!written) return Status::UNKNOWN_ERROR;
+    const auto written = writeTextNode(THE_DEVICE_HAPTIC_PLAYBACK_QUEUE, queue, size);
+    if (!written) {
+        LOG_ERROR("daxPerformPrebakedHapticPattern is fail: %d", errno);
+        return Status::UNKNOWN_ERROR;
+    }
     LOG_DEBUG("ret : %d", static_cast<int>(*written));
     if (*written != static_cast<ssize_t>(size)) {
         LOG_DEBUG("daxPerformPrebakedHapticPattern repeat error");

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Amplitude.h"
 #include "Log.h"
-#include "NodePaths.h"
+#include "NodePathTable.h"
 #include "Vibrator.h"
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {

@@ -33,13 +33,9 @@ bool readTextNode(const char* operation, const std::string& node, int mode, char
     return true;
 }
 
-std::optional<ssize_t> writeTextNode(const char* operation, const std::string& node,
-                                     const char* text, size_t length) {
-    NodeFile file(node.c_str(), O_RDWR);
-    if (!file.isOpen()) {
-        LOG_ERROR("%s is fail: %d", operation, errno);
-        return std::nullopt;
-    }
+std::optional<ssize_t> writeTextNode(const std::string& node, const char* text, size_t length) {
+    const NodeFile file(node.c_str(), O_RDWR);
+    if (!file.isOpen()) return std::nullopt;
     return file.send(text, length);
 }
 

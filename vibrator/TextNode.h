@@ -24,10 +24,8 @@ bool readTextNode(const char* operation, const std::string& node, int mode, char
 /**
  * Writes a text to a node in one go.
  *
- * @param operation name that the log line of a failed open begins with.
- * @return what write returned; nothing when the node could not be opened, which has been logged.
+ * @return what write returned; nothing, and errno, when the node could not be opened.
  */
-std::optional<ssize_t> writeTextNode(const char* operation, const std::string& node,
-                                     const char* text, size_t length);
+std::optional<ssize_t> writeTextNode(const std::string& node, const char* text, size_t length);
 
 }  // namespace vendor::velmora::hardware::vibrator::V2_1::implementation

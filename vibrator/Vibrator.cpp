@@ -2,7 +2,7 @@
 #include "Vibrator.h"
 
 #include "Log.h"
-#include "NodePaths.h"
+#include "NodePathTable.h"
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 
@@ -18,7 +18,7 @@ Vibrator::Vibrator() {
     } else {
         LOG_DEBUG("Vibrator driver does not exist. Remove VIB HAL or Setup Vibrator Driver");
     }
-    logNodePaths();
+    logNodePathTable();
 }
 
 }  // namespace vendor::velmora::hardware::vibrator::V2_1::implementation

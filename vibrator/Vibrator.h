@@ -117,7 +117,7 @@ class Vibrator : public IDaxVibrator {
      * Counts the stored patterns.
      *
      * @param _hidl_cb called once with OK and the count; with (UNSUPPORTED_OPERATION, 0) when the
-     *     driver does not tell it; with (UNKNOWN_ERROR, 0) when what it tells is no count.
+     *     driver does not tell it; with (UNKNOWN_ERROR, 0) when what it tells is no number.
      */
     Return<void> daxGetNumberOfPrebakedHapticPattern(
             daxGetNumberOfPrebakedHapticPattern_cb _hidl_cb) override;
@@ -153,14 +153,23 @@ class Vibrator : public IDaxVibrator {
     Return<void> daxGetAmplitudeList(DaxAmplitudeType type,
                                      daxGetAmplitudeList_cb _hidl_cb) override;
 
-  private:
-    /** Lets the tests reach what clients cannot. */
-    friend struct VibratorPeer;
+    // What the operations are made of: the driver's nodes, and what they say of the motor.
 
-    /** Writes a number and a newline. @return OK, or UNKNOWN_ERROR with errno as it was left. */
-    Return<Status> writeNode(std::string node, int value);
-    /** @return the number at the beginning of the node's first 7 bytes, or kReadFailed. */
-    Return<int32_t> readNode(std::string node);
+    /**
+     * Writes a number and a newline.
+     *
+     * @param error set to errno as the open that failed, or else the write, left it; errno itself
+     *     may have changed by the time that the caller has the result.
+     * @return OK, or UNKNOWN_ERROR when the node did not take all of it.
+     */
+    Return<Status> writeNode(std::string node, int value, int* error = nullptr);
+    /**
+     * Reads a number.
+     *
+     * @param isNumber set to true when the node holds a number; not touched when it cannot be read.
+     * @return the number at the beginning of the node's first 7 bytes, or kReadFailed.
+     */
+    Return<int32_t> readNode(std::string node, bool* isNumber = nullptr);
     /** @return whether the node can be opened for reading and writing. */
     Return<bool> isNodeExist(std::string node);
     /** @return whether the node can be opened for reading. */
@@ -174,12 +183,13 @@ class Vibrator : public IDaxVibrator {
     /** @return the motor type number, 1 to 9, by the features that the driver offers. */
     Return<int32_t> getMotorIndexbyMethod();
 
+    /** Judges the caller, and logs a refusal. @return kCallerPermitted or kCallerRefused. */
+    Return<uint32_t> checkCallerPermission();
+
+  private:
     // The two ways of daxPerformPrebakedHapticPattern, for an amplitude in range.
     Status playPattern(uint32_t pattern, uint32_t amplitude);
     Status queuePattern(uint32_t pattern, uint32_t amplitude);
-
-    /** Judges the caller, and logs a refusal. @return kCallerPermitted or kCallerRefused. */
-    Return<uint32_t> checkCallerPermission();
 };
 
 }  // namespace vendor::velmora::hardware::vibrator::V2_1::implementation

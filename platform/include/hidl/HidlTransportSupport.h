@@ -1,17 +1,38 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <hidl/HidlBinderSupport.h>
+#include <sched.h>
+
 #include <cstddef>
+
+#ifndef SCHED_NORMAL
+// The kernel's name for it; the C library's is SCHED_OTHER.
+#define SCHED_NORMAL 0
+#endif
 
 namespace android::hardware {
 
 /**
- * Announces how calls will be served. This transport has one way: a single thread, the one that
- * calls joinRpcThreadpool. Anything but (1, true) is logged as an error and served that way too.
+ * Announces how calls will be served.
+ *
+ * @param maxThreads threads that serve calls at the most. This platform always has one, and logs a
+ *     warning if another number is asked for.
+ * @param callerWillJoin whether the caller provides that one with joinRpcThreadpool.
  */
 void configureRpcThreadpool(size_t maxThreads, bool callerWillJoin);
 
-/** Serves calls to the registered objects with the calling thread. Does not return. */
+/** Serves calls with the calling thread. Returns only where that is impossible, with a log line. */
 void joinRpcThreadpool();
 
+namespace details {
+
+/** @return the process's id, for getDebugInfo. */
+int32_t getPidIfSharable();
+/** @return whether callers may learn addresses of this process: never. */
+inline bool debuggable() {
+    return false;
+}
+
+}  // namespace details
 }  // namespace android::hardware

@@ -5,6 +5,7 @@
 #include <utils/Errors.h>
 #include <utils/StrongPointer.h>
 
+#include <cstdint>
 #include <string>
 #include <utility>
 
@@ -13,18 +14,33 @@ namespace android::hardware {
 /** Outcome of the transport of a call; what the operation itself answers is not in it. */
 class Status {
   public:
-    static Status ok() { return {}; }
-    /** @param what what happened, for description(); the error's own text when empty. */
-    static Status fromStatusT(status_t error, std::string what = {});
+    /** The published exception codes that generated code uses; they travel in replies. */
+    enum Exception : int32_t {
+        EX_NONE = 0,
+        EX_ILLEGAL_ARGUMENT = -3,
+        EX_NULL_POINTER = -4,
+        EX_TRANSACTION_FAILED = -129,
+    };
 
-    bool isOk() const { return mError == OK; }
+    Status() = default;
+    static Status ok() { return {}; }
+    static Status fromExceptionCode(int32_t code, std::string message = {});
+    static Status fromStatusT(status_t error);
+
+    /** Becomes what an error of the transport means. */
+    void setFromStatusT(status_t error);
+
+    bool isOk() const { return mException == EX_NONE; }
+    int32_t exceptionCode() const { return mException; }
+    const std::string& exceptionMessage() const { return mMessage; }
     status_t transactionError() const { return mError; }
     /** @return the outcome in words, "No error" for success. */
     std::string description() const;
 
   private:
+    int32_t mException = EX_NONE;
     status_t mError = OK;
-    std::string mWhat;
+    std::string mMessage;
 };
 
 namespace details {
@@ -34,20 +50,14 @@ class return_status {
   public:
     return_status() = default;
     return_status(Status status) : mStatus(std::move(status)) {}  // NOLINT: implicit as published
-    return_status(return_status&&) = default;
-    return_status& operator=(return_status&&) = default;
-    return_status(const return_status&) = delete;
-    return_status& operator=(const return_status&) = delete;
-    ~return_status() = default;
 
     /** @return whether the call reached its object and the answer came back. */
     bool isOk() const { return mStatus.isOk(); }
-    /** @return whether there is no process any more, or none yet, behind the object. */
+    /** @return whether there is no process any more behind the object. */
     bool isDeadObject() const { return mStatus.transactionError() == DEAD_OBJECT; }
+    /** @return the outcome of the transport in words, "No error" for success. */
     std::string description() const { return mStatus.description(); }
-
-  protected:
-    /** Ends the process, as on a device, when the value of a failed call is asked for. */
+    /** Ends the process, as on a device, when the call has failed. */
     void assertOk() const {
         if (!isOk()) abortOnUse();
     }
@@ -77,6 +87,25 @@ class Return : public details::return_status {
 
   private:
     T mValue{};
+};
+
+/** As above; an object may be given and taken as one of its bases, too. */
+template <typename T>
+class Return<sp<T>> : public details::return_status {
+  public:
+    Return(sp<T> value) : mValue(std::move(value)) {}            // NOLINT: implicit as published
+    Return(T* value) : mValue(value) {}                          // NOLINT: implicit as published
+    Return(Status status) : return_status(std::move(status)) {}  // NOLINT: implicit as published
+
+    template <typename U>
+    operator sp<U>() const {  // NOLINT: implicit as published
+        assertOk();
+        return mValue;
+    }
+    sp<T> withDefault(sp<T> other) const { return isOk() ? mValue : other; }
+
+  private:
+    sp<T> mValue;
 };
 
 template <>

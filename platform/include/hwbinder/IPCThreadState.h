@@ -13,7 +13,7 @@ class IPCThreadState {
     /** @return the state of the current thread. */
     static IPCThreadState* self();
 
-    /** @return process id of the caller; this process's own outside a call. */
+    /** @return process id of the caller, 0 where it is unknown; this process's outside a call. */
     pid_t getCallingPid() const { return mCallingPid; }
     /** @return uid of the caller; this process's own outside a call. */
     uid_t getCallingUid() const { return mCallingUid; }
@@ -24,8 +24,11 @@ class IPCThreadState {
      * @return token for restoreCallingIdentity: the uid in the upper, the pid in the lower 32 bits.
      */
     int64_t clearCallingIdentity();
-    /** Takes the identity of a token that clearCallingIdentity gave. */
+    /** Takes the identity of a token that clearCallingIdentity or identityToken gave. */
     void restoreCallingIdentity(int64_t token);
+    static int64_t identityToken(uid_t uid, pid_t pid) {
+        return static_cast<int64_t>(uint64_t{uid} << 32 | static_cast<uint32_t>(pid));
+    }
 
   private:
     IPCThreadState();

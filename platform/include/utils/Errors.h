@@ -6,23 +6,26 @@
 
 namespace android {
 
-/** 0 for success, else a negative error; the values are the platform's. */
+/** 0 for success, else a negative error; the values are the platform's, and travel in replies. */
 using status_t = int32_t;
 
 enum : status_t {
     OK = 0,
     UNKNOWN_ERROR = INT32_MIN,
+    BAD_TYPE = UNKNOWN_ERROR + 1,
+    FAILED_TRANSACTION = UNKNOWN_ERROR + 2,
+    UNEXPECTED_NULL = UNKNOWN_ERROR + 8,
     NO_MEMORY = -ENOMEM,
     INVALID_OPERATION = -ENOSYS,
     BAD_VALUE = -EINVAL,
-    BAD_TYPE = UNKNOWN_ERROR + 1,
     NAME_NOT_FOUND = -ENOENT,
     PERMISSION_DENIED = -EPERM,
     ALREADY_EXISTS = -EEXIST,
+    NO_INIT = -ENODEV,
     DEAD_OBJECT = -EPIPE,
-    FAILED_TRANSACTION = UNKNOWN_ERROR + 2,
     UNKNOWN_TRANSACTION = -EBADMSG,
     NOT_ENOUGH_DATA = -ENODATA,
+    TIMED_OUT = -ETIMEDOUT,
 };
 
 }  // namespace android

@@ -5,26 +5,100 @@
 
 #include <atomic>
 #include <cstdint>
+#include <utility>
 
 namespace android {
 
-/** Base of objects that live as long as one sp<> holds them. There are no weak references. */
+/** Base of objects that live as long as one sp<> holds them, and that wp<> can watch. */
 class RefBase {
   public:
+    /** What outlives the object as long as somebody watches it: its two counts. */
+    class weakref_type {
+      public:
+        explicit weakref_type(RefBase* object) : mObject(object) {}
+
+        void incWeak(const void* id);
+        void decWeak(const void* id);
+        /** Takes a strong reference, unless there is none left. @return whether it did. */
+        bool attemptIncStrong(const void* id);
+
+        /** @return the object, alive or not. */
+        RefBase* refBase() const { return mObject; }
+
+      private:
+        friend class RefBase;
+
+        std::atomic<int32_t> mStrong{0};
+        /** Those who watch, and the object itself. */
+        std::atomic<int32_t> mWeak{1};
+        RefBase* const mObject;
+    };
+
     RefBase(const RefBase&) = delete;
     RefBase& operator=(const RefBase&) = delete;
 
-    void incStrong(const void* /* id */) const { mStrong.fetch_add(1, std::memory_order_relaxed); }
-    void decStrong(const void* /* id */) const {
-        if (mStrong.fetch_sub(1, std::memory_order_acq_rel) == 1) delete this;
+    void incStrong(const void* /* id */) const {
+        mRefs->mStrong.fetch_add(1, std::memory_order_relaxed);
     }
+    void decStrong(const void* /* id */) const {
+        if (mRefs->mStrong.fetch_sub(1, std::memory_order_acq_rel) == 1) delete this;
+    }
+    weakref_type* getWeakRefs() const { return mRefs; }
 
   protected:
-    RefBase() = default;
-    virtual ~RefBase() = default;
+    RefBase() : mRefs(new weakref_type(this)) {}
+    virtual ~RefBase() { mRefs->decWeak(this); }
 
   private:
-    mutable std::atomic<int32_t> mStrong{0};
+    weakref_type* const mRefs;
+};
+
+/** Weak reference: does not keep the object alive, but tells whether it is. */
+template <typename T>
+class wp {
+  public:
+    wp() = default;
+    wp(T* object) : mObject(object) {  // NOLINT(google-explicit-constructor): as published
+        if (mObject != nullptr) {
+            mRefs = mObject->getWeakRefs();
+            mRefs->incWeak(this);
+        }
+    }
+    template <typename U>
+    wp(const sp<U>& object) : wp(object.get()) {}  // NOLINT(google-explicit-constructor)
+    wp(const wp& other) : mObject(other.mObject), mRefs(other.mRefs) {
+        if (mRefs != nullptr) mRefs->incWeak(this);
+    }
+    wp(wp&& other) noexcept
+        : mObject(std::exchange(other.mObject, nullptr)),
+          mRefs(std::exchange(other.mRefs, nullptr)) {}
+    ~wp() {
+        if (mRefs != nullptr) mRefs->decWeak(this);
+    }
+    wp& operator=(wp other) noexcept {
+        std::swap(mObject, other.mObject);
+        std::swap(mRefs, other.mRefs);
+        return *this;
+    }
+
+    /** @return a strong reference; nullptr when the object is gone. */
+    sp<T> promote() const {
+        sp<T> result;
+        if (mRefs != nullptr && mRefs->attemptIncStrong(this)) {
+            result = mObject;
+            mObject->decStrong(this);
+        }
+        return result;
+    }
+    /** @return where the object is or was; only for comparing. */
+    T* unsafe_get() const { return mObject; }
+
+    bool operator==(const wp& other) const { return mRefs == other.mRefs; }
+    bool operator!=(const wp& other) const { return mRefs != other.mRefs; }
+
+  private:
+    T* mObject = nullptr;
+    RefBase::weakref_type* mRefs = nullptr;
 };
 
 }  // namespace android

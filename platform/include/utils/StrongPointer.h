@@ -18,6 +18,8 @@ class sp {
     sp(sp&& other) noexcept : mObject(std::exchange(other.mObject, nullptr)) {}
     template <typename U>
     sp(const sp<U>& other) : sp(other.get()) {}  // NOLINT(google-explicit-constructor)
+    template <typename U>
+    sp(U* object) : sp(static_cast<T*>(object)) {}  // NOLINT(google-explicit-constructor)
     ~sp() {
         if (mObject != nullptr) mObject->decStrong(this);
     }

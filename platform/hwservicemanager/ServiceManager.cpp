@@ -1,0 +1,195 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "ServiceManager.h"
+
+#include <android/log.h>
+#include <hidl/HidlTransportSupport.h>
+#include <hwbinder/IPCThreadState.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <functional>
+#include <utility>
+
+namespace {
+
+using ::android::sp;
+using ::android::wp;
+using ::android::hardware::getOrCreateCachedBinder;
+using ::android::hardware::hidl_death_recipient;
+using ::android::hardware::IPCThreadState;
+
+constexpr char kTag[] = "hwservicemanager";
+
+/** AID_SYSTEM of the platform's android_filesystem_config.h. */
+constexpr uid_t kSystemUid = 1000;
+
+/** Notifications that one user may ask for at the most: each takes memory of the manager. */
+constexpr ptrdiff_t kMostListenersPerUid = 64;
+/** No name of an interface or an instance is longer, in characters. */
+constexpr size_t kLongestName = 1024;
+
+/** Calls a function when a remote object has died. */
+class WhenDead : public hidl_death_recipient {
+  public:
+    explicit WhenDead(std::function<void()> call) : mCall(std::move(call)) {}
+    void serviceDied(uint64_t /* cookie */,
+                     const wp<::android::hidl::base::V1_0::IBase>& /* who */) override {
+        mCall();
+    }
+
+  private:
+    const std::function<void()> mCall;
+};
+
+/** @return whether the caller may add services. */
+bool mayAdd(const std::string& name) {
+    const uid_t uid = IPCThreadState::self()->getCallingUid();
+    if (uid == 0 || uid == kSystemUid || uid == getuid()) return true;
+    __android_log_print(ANDROID_LOG_WARN, kTag, "uid %u may not add a service \"%s\"", uid,
+                        name.c_str());
+    return false;
+}
+
+/** @return whether two proxies, or objects, are of the same object. */
+template <typename First, typename Second>
+bool isSame(const sp<First>& first, const sp<Second>& second) {
+    return getOrCreateCachedBinder(first.get()) == getOrCreateCachedBinder(second.get());
+}
+
+}  // namespace
+
+ServiceManager::Service::~Service() {
+    object->unlinkToDeath(recipient);
+}
+
+ServiceManager::Return<sp<ServiceManager::Interface>> ServiceManager::get(const Text& interface,
+                                                                          const Text& name) {
+    const auto found = mServices.find({interface, name});
+    return found == mServices.end() ? sp<Interface>() : found->second->object;
+}
+
+ServiceManager::Return<bool> ServiceManager::add(const Text& name, const sp<Interface>& service) {
+    // Checked first: to ask a hostile object for its interfaces could take for ever.
+    return mayAdd(name) && ServiceManagerBase::add(name, service).withDefault(false);
+}
+
+ServiceManager::Return<bool> ServiceManager::addWithChain(
+        const Text& name, const sp<Interface>& service,
+        const ::android::hardware::hidl_vec<Text>& chain) {
+    if (!mayAdd(name) || service == nullptr || chain.size() == 0 || name.empty()) return false;
+    auto added = std::make_shared<Service>();
+    added->object = service;
+    added->pid = IPCThreadState::self()->getCallingPid();
+    added->recipient = new WhenDead([this, key = added.get()] { removeService(key); });
+    if (service->isRemote() && !service->linkToDeath(added->recipient, 0).withDefault(false)) {
+        return false;
+    }
+    for (const Text& interface : chain) {
+        if (interface == Interface::descriptor) continue;
+        mServices[{interface, name}] = added;
+        for (const Listener& listener : mListeners) {
+            if (listener.name.first == std::string(interface) &&
+                (listener.name.second.empty() || listener.name.second == std::string(name))) {
+                listener.callback->onRegistration(interface, name, false);
+            }
+        }
+    }
+    __android_log_print(ANDROID_LOG_INFO, kTag, "added %s/%s of process %d", chain[0].c_str(),
+                        name.c_str(), added->pid);
+    return true;
+}
+
+void ServiceManager::removeService(const Service* service) {
+    for (auto each = mServices.begin(); each != mServices.end();) {
+        each = each->second.get() == service ? mServices.erase(each) : std::next(each);
+    }
+}
+
+ServiceManager::Return<void> ServiceManager::list(list_cb callback) {
+    std::vector<Text> names;
+    for (const auto& [name, service] : mServices)
+        names.emplace_back(name.first + "/" + name.second);
+    callback(names);
+    return ::android::hardware::Void();
+}
+
+ServiceManager::Return<void> ServiceManager::listByInterface(const Text& interface,
+                                                             listByInterface_cb callback) {
+    std::vector<Text> instances;
+    for (const auto& [name, service] : mServices) {
+        if (interface == name.first) instances.emplace_back(name.second);
+    }
+    callback(instances);
+    return ::android::hardware::Void();
+}
+
+ServiceManager::Return<void> ServiceManager::debugDump(debugDump_cb callback) {
+    std::vector<InstanceDebugInfo> infos;
+    for (const auto& [name, service] : mServices) {
+        InstanceDebugInfo info{};
+        info.interfaceName = name.first;
+        info.instanceName = name.second;
+        info.pid = service->pid;
+        infos.push_back(info);
+    }
+    callback(infos);
+    return ::android::hardware::Void();
+}
+
+ServiceManager::Return<bool> ServiceManager::registerForNotifications(
+        const Text& interface, const Text& name, const sp<Notification>& callback) {
+    const uid_t uid = IPCThreadState::self()->getCallingUid();
+    const auto count = std::count_if(mListeners.begin(), mListeners.end(),
+                                     [&](const Listener& each) { return each.uid == uid; });
+    if (callback == nullptr || interface.empty() || count >= kMostListenersPerUid ||
+        interface.size() > kLongestName || name.size() > kLongestName) {
+        return false;
+    }
+    const sp<hidl_death_recipient> recipient =
+            new WhenDead([this, callback = wp<Notification>(callback)] {
+                removeListeners({}, callback.promote());
+            });
+    if (callback->isRemote() && !callback->linkToDeath(recipient, 0).withDefault(false)) {
+        return false;
+    }
+    mListeners.push_back({{interface, name}, callback, uid, recipient});
+    for (const auto& [known, service] : mServices) {
+        if (interface == known.first && (name.empty() || name == known.second)) {
+            callback->onRegistration(known.first, known.second, true);
+        }
+    }
+    return true;
+}
+
+ServiceManager::Return<bool> ServiceManager::unregisterForNotifications(
+        const Text& interface, const Text& name, const sp<Notification>& callback) {
+    return callback != nullptr && removeListeners({interface, name}, callback) > 0;
+}
+
+size_t ServiceManager::removeListeners(const Name& name, const sp<Notification>& callback) {
+    const size_t before = mListeners.size();
+    const auto isMeant = [&](const Listener& each) {
+        if (!(name.first.empty() || each.name == name) || callback == nullptr ||
+            !isSame(each.callback, callback)) {
+            return false;
+        }
+        each.callback->unlinkToDeath(each.recipient);
+        return true;
+    };
+    mListeners.erase(std::remove_if(mListeners.begin(), mListeners.end(), isMeant),
+                     mListeners.end());
+    return before - mListeners.size();
+}
+
+ServiceManager::Return<bool> ServiceManager::tryUnregister(const Text& interface, const Text& name,
+                                                           const sp<Interface>& service) {
+    const auto found = mServices.find({interface, name});
+    if (found == mServices.end() || service == nullptr ||
+        found->second->pid != IPCThreadState::self()->getCallingPid() ||
+        !isSame(found->second->object, service)) {
+        return false;
+    }
+    const std::shared_ptr<Service> last = found->second;
+    removeService(last.get());
+    return true;
+}

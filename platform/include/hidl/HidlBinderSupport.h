@@ -1,0 +1,106 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <android/hidl/base/1.0/IBase.h>
+#include <hidl/HidlSupport.h>
+#include <hidl/Static.h>
+#include <hidl/Status.h>
+#include <hwbinder/Binder.h>
+#include <hwbinder/BpHwBinder.h>
+#include <hwbinder/IInterface.h>
+#include <hwbinder/Parcel.h>
+
+#include <cstddef>
+#include <cstdint>
+
+// How the types of interfaces get into parcels and out of them, and objects of interfaces become
+// binders and back.
+
+namespace android::hardware {
+
+/** Tells the recipient of an interface what that of its binder is told. */
+class hidl_binder_death_recipient : public IBinder::DeathRecipient {
+  public:
+    hidl_binder_death_recipient(const sp<hidl_death_recipient>& recipient, uint64_t cookie,
+                                const sp<::android::hidl::base::V1_0::IBase>& base)
+        : mRecipient(recipient), mCookie(cookie), mBase(base) {}
+
+    void binderDied(const wp<IBinder>& /* who */) override {
+        mRecipient->serviceDied(mCookie, mBase);
+    }
+    const sp<hidl_death_recipient>& getRecipient() const { return mRecipient; }
+
+  private:
+    const sp<hidl_death_recipient> mRecipient;
+    const uint64_t mCookie;
+    const wp<::android::hidl::base::V1_0::IBase> mBase;
+};
+
+/** Writes the buffer of a string or list that lies in another buffer. */
+status_t writeEmbeddedToParcel(const hidl_string& text, Parcel* parcel, size_t parentHandle,
+                               size_t parentOffset);
+template <typename T>
+status_t writeEmbeddedToParcel(const hidl_vec<T>& list, Parcel* parcel, size_t parentHandle,
+                               size_t parentOffset, size_t* handle) {
+    return parcel->writeEmbeddedBuffer(list.data(), list.size() * sizeof(T), handle, parentHandle,
+                                       parentOffset + hidl_vec<T>::kOffsetOfBuffer);
+}
+
+/**
+ * Checks the buffer of a string or list that lies in another buffer of a received parcel: it is as
+ * long as the string or list says, and a string ends with its zero.
+ */
+status_t readEmbeddedFromParcel(const hidl_string& text, const Parcel& parcel, size_t parentHandle,
+                                size_t parentOffset);
+template <typename T>
+status_t readEmbeddedFromParcel(const hidl_vec<T>& list, const Parcel& parcel, size_t parentHandle,
+                                size_t parentOffset, size_t* handle) {
+    // Cannot overflow: the count has 32 bits, and an element is small.
+    const void* buffer = nullptr;
+    return parcel.readEmbeddedBuffer(list.size() * sizeof(T), handle, parentHandle,
+                                     parentOffset + hidl_vec<T>::kOffsetOfBuffer, &buffer);
+}
+
+/** Writes the word, and the text if there is one, that a reply begins with. */
+status_t writeToParcel(const Status& status, Parcel* parcel);
+status_t readFromParcel(Status* status, const Parcel& parcel);
+
+/** @return the binder of an object: its proxy's, or a stub, of which each object has one. */
+sp<IBinder> getOrCreateCachedBinder(::android::hidl::base::V1_0::IBase* object);
+
+namespace details {
+
+/** @return the object of this process behind its stub. */
+sp<::android::hidl::base::V1_0::IBase> localObject(const sp<IBinder>& binder);
+
+/** @return whether an object has an interface, going by its chain. */
+Return<bool> canCastInterface(::android::hidl::base::V1_0::IBase* object, const char* interface,
+                              bool emitError = false);
+
+/** @return the object as a more specific interface; nullptr when it has not got it. */
+template <typename Child, typename Parent, typename BpChild>
+Return<sp<Child>> castInterface(const sp<Parent>& parent, const char* interface, bool emitError) {
+    if (parent == nullptr) return sp<Child>();
+    const Return<bool> canCast = canCastInterface(parent.get(), interface, emitError);
+    if (!canCast.isOk()) return Status::fromStatusT(DEAD_OBJECT);
+    if (!canCast) return sp<Child>();
+    if (parent->isRemote()) return sp<Child>(new BpChild(getOrCreateCachedBinder(parent.get())));
+    return sp<Child>(static_cast<Child*>(parent.get()));
+}
+
+}  // namespace details
+
+/** @return the object of an interface behind a binder: a proxy, or the object itself. */
+template <typename Interface, typename Proxy, typename Stub>
+sp<Interface> fromBinder(const sp<IBinder>& binder) {
+    if (binder == nullptr) return nullptr;
+    if (binder->localBinder() == nullptr) return new Proxy(binder);
+    // What is local is a stub, and every stub is one of the base interface.
+    const sp<::android::hidl::base::V1_0::IBase> base = details::localObject(binder);
+    if (!details::canCastInterface(base.get(), Interface::descriptor).withDefault(false)) {
+        return nullptr;
+    }
+    return static_cast<Interface*>(base.get());
+}
+
+}  // namespace android::hardware

@@ -1,0 +1,42 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <cstdint>
+#include <string>
+#include <utility>
+#include <vector>
+
+namespace android::hardware::details {
+
+/** Marks of the four kinds of classes that the interface compiler makes. */
+struct i_tag {};
+struct bnhw_tag {};
+struct bphw_tag {};
+struct bs_tag {};
+
+// The wire has 64-bit pointers, and the types below are laid out as on the wire.
+static_assert(sizeof(void*) == 8, "this platform is for 64-bit processes");
+
+/** @return a number like "0x1f". */
+template <typename T>
+std::string toHexString(T number) {
+    constexpr char kDigits[] = "0123456789abcdef";
+    auto rest = static_cast<uint64_t>(number);
+    if constexpr (sizeof(T) < sizeof(rest)) rest &= (uint64_t{1} << 8 * sizeof(T)) - 1;
+    std::string digits;
+    do {
+        digits.insert(digits.begin(), kDigits[rest % 16]);
+        rest /= 16;
+    } while (rest != 0);
+    return "0x" + digits;
+}
+
+/** Base of generated classes that could report their calls; this platform has no instruments. */
+class HidlInstrumentor {
+  public:
+    HidlInstrumentor(const std::string& /* package */, const std::string& /* interface */) {}
+
+    void configureInstrumentation() {}
+};
+
+}  // namespace android::hardware::details

@@ -1,0 +1,78 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <hwbinder/Binder.h>
+#include <utils/RefBase.h>
+
+#include <functional>
+#include <map>
+#include <mutex>
+#include <string>
+#include <utility>
+
+namespace android::hidl::base::V1_0 {
+struct IBase;
+}
+
+/** What generated code keeps for the life of the process. */
+namespace android::hardware::details {
+
+/** A map that threads share. */
+template <typename Key, typename Value>
+class ConcurrentMap {
+  public:
+    void set(Key key, Value value) {
+        const std::lock_guard<std::mutex> lock(mMutex);
+        mMap[std::move(key)] = std::move(value);
+    }
+    /** @return the value of a key, or another one where it has none. */
+    Value get(const Key& key, Value otherwise) const {
+        const std::lock_guard<std::mutex> lock(mMutex);
+        const auto found = mMap.find(key);
+        return found == mMap.end() ? otherwise : found->second;
+    }
+    void erase(const Key& key) {
+        const std::lock_guard<std::mutex> lock(mMutex);
+        mMap.erase(key);
+    }
+    /** Erases a key, unless its value is another one by now. */
+    void eraseIfEqual(const Key& key, const void* object) {
+        const std::lock_guard<std::mutex> lock(mMutex);
+        const auto found = mMap.find(key);
+        if (found != mMap.end() && found->second.unsafe_get() == object) mMap.erase(found);
+    }
+
+  private:
+    mutable std::mutex mMutex;
+    std::map<Key, Value> mMap;
+};
+
+/** Settings of objects that nothing here changes: every object has the given default. */
+template <typename Value>
+struct DefaultsOnly {
+    template <typename Object>
+    Value get(const Object& /* object */, Value otherwise) const {
+        return otherwise;
+    }
+};
+
+struct SchedPrio {
+    int sched_policy;
+    int prio;
+};
+
+using BnConstructorMap = ConcurrentMap<std::string, std::function<sp<IBinder>(void*)>>;
+using BsConstructorMap =
+        ConcurrentMap<std::string, std::function<sp<::android::hidl::base::V1_0::IBase>(void*)>>;
+
+/** Makers of stubs, by the descriptor of their interface. */
+BnConstructorMap& getBnConstructorMap();
+/** Makers of wrappers for objects of the same process. */
+BsConstructorMap& getBsConstructorMap();
+
+/** The stub of each object that has one. */
+extern ConcurrentMap<const ::android::hidl::base::V1_0::IBase*, wp<BHwBinder>>* const gBnMap;
+extern const DefaultsOnly<SchedPrio>* const gServicePrioMap;
+extern const DefaultsOnly<bool>* const gServiceSidMap;
+
+}  // namespace android::hardware::details

@@ -1,0 +1,51 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <utils/Errors.h>
+#include <utils/RefBase.h>
+
+#include <cstdint>
+#include <functional>
+
+namespace android::hardware {
+
+class BHwBinder;
+class BpHwBinder;
+class Parcel;
+
+/** What calls go to: an object of this process or of another one. */
+class IBinder : public virtual RefBase {
+  public:
+    /** Takes the reply while the results that it refers to are still there. */
+    using TransactCallback = std::function<void(Parcel&)>;
+
+    /** Flag of a call that has no reply and is not waited for. */
+    static constexpr uint32_t FLAG_ONEWAY = 0x01;
+
+    /** Is told when the process of a remote object has ended. */
+    class DeathRecipient : public virtual RefBase {
+      public:
+        virtual void binderDied(const wp<IBinder>& who) = 0;
+    };
+
+    /**
+     * Makes a call.
+     *
+     * @param callback called with the reply if the operation has results.
+     * @return OK, or why the call failed.
+     */
+    virtual status_t transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags = 0,
+                              TransactCallback callback = nullptr) = 0;
+
+    /** @return OK; DEAD_OBJECT when it is too late; INVALID_OPERATION for a local object. */
+    virtual status_t linkToDeath(const sp<DeathRecipient>& recipient) = 0;
+    /** @return OK, or NAME_NOT_FOUND when it was not linked, or has been told already. */
+    virtual status_t unlinkToDeath(const sp<DeathRecipient>& recipient) = 0;
+
+    /** @return this as an object of this process; nullptr when it is remote. */
+    virtual BHwBinder* localBinder() { return nullptr; }
+    /** @return this as an object of another process; nullptr when it is local. */
+    virtual BpHwBinder* remoteBinder() { return nullptr; }
+};
+
+}  // namespace android::hardware

@@ -1,0 +1,131 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <cutils/native_handle.h>
+#include <hwbinder/Binder.h>
+#include <linux/android/binder.h>
+#include <utils/Errors.h>
+
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace android::hardware {
+
+/**
+ * The content of a call or a reply: values one after the other, and among them objects that refer
+ * to buffers elsewhere in memory, or to other objects of any process. The driver knows from the
+ * list of offsets where the objects lie.
+ *
+ * A parcel that is written refers to its buffers until it has been sent. One that was received
+ * refers to memory of the driver, which it gives back in the end. Reading past the end, or
+ * another kind of object than there is, is an error and changes nothing outside the parcel.
+ */
+class Parcel {
+  public:
+    /** Gives memory back to the driver. */
+    using ReleaseBuffer = void (*)(const uint8_t* data, void* owner);
+
+    Parcel() = default;
+    ~Parcel();
+    Parcel(const Parcel&) = delete;
+    Parcel& operator=(const Parcel&) = delete;
+
+    // Writing. Fails with NO_MEMORY if there is no memory left.
+
+    /** Begins a request: names the interface that declares the operation. */
+    status_t writeInterfaceToken(const char* interface);
+    status_t writeBool(bool value) { return writePadded(uint8_t{value}); }
+    status_t writeInt8(int8_t value) { return writePadded(value); }
+    status_t writeUint8(uint8_t value) { return writePadded(value); }
+    status_t writeInt32(int32_t value) { return writePadded(value); }
+    status_t writeUint32(uint32_t value) { return writePadded(value); }
+    status_t writeInt64(int64_t value) { return writePadded(value); }
+    status_t writeUint64(uint64_t value) { return writePadded(value); }
+    /** Writes text as UTF-16; only for ASCII. */
+    status_t writeString16(const char* text, size_t length);
+    /** Refers to a buffer. @param handle its number, for what is embedded in it; may be nullptr. */
+    status_t writeBuffer(const void* buffer, size_t length, size_t* handle);
+    /** Refers to a buffer whose address stands in another one, its parent. */
+    status_t writeEmbeddedBuffer(const void* buffer, size_t length, size_t* handle,
+                                 size_t parentHandle, size_t parentOffset);
+    /** @param binder nullptr for no object. */
+    status_t writeStrongBinder(const sp<IBinder>& binder);
+    /** @return INVALID_OPERATION for any handle but nullptr: no descriptors travel. */
+    status_t writeNativeHandleNoDup(const native_handle_t* handle);
+
+    // Reading. NOT_ENOUGH_DATA past the end; BAD_TYPE for something else than what was asked for.
+
+    /** @return whether the request names this interface. */
+    bool enforceInterface(const char* interface) const;
+    status_t readBool(bool* value) const;
+    status_t readInt8(int8_t* value) const { return readPadded(value); }
+    status_t readUint8(uint8_t* value) const { return readPadded(value); }
+    status_t readInt32(int32_t* value) const { return readPadded(value); }
+    status_t readUint32(uint32_t* value) const { return readPadded(value); }
+    status_t readInt64(int64_t* value) const { return readPadded(value); }
+    status_t readUint64(uint64_t* value) const { return readPadded(value); }
+    /** Reads text; what is not ASCII becomes "?". */
+    status_t readString16(std::string* text) const;
+    /** @param length what the buffer must measure. */
+    status_t readBuffer(size_t length, size_t* handle, const void** buffer) const;
+    status_t readEmbeddedBuffer(size_t length, size_t* handle, size_t parentHandle,
+                                size_t parentOffset, const void** buffer) const;
+    /** @param binder nullptr where no object was sent. */
+    status_t readNullableStrongBinder(sp<IBinder>* binder) const;
+    /** @return INVALID_OPERATION for any handle but none: no descriptors travel. */
+    status_t readNullableNativeHandleNoDup(const native_handle_t** handle) const;
+
+    // For the drivers.
+
+    const uint8_t* data() const { return mData; }
+    size_t dataSize() const { return mSize; }
+    const binder_size_t* offsets() const { return mOffsets; }
+    size_t offsetCount() const { return mOffsetCount; }
+    /** @return the room that its buffers need, each rounded up to 8, in bytes. */
+    size_t buffersSize() const;
+    void setDataPosition(size_t position) const { mPosition = position; }
+    /** Becomes what the driver has received. */
+    void ipcSetDataReference(const uint8_t* data, size_t size, const binder_size_t* offsets,
+                             size_t offsetCount, ReleaseBuffer release, void* owner);
+    /** Becomes empty. */
+    void clear();
+
+  private:
+    void releaseMemory();
+    template <typename T>
+    status_t writePadded(T value);
+    template <typename T>
+    status_t readPadded(T* value) const;
+    status_t write(const void* bytes, size_t size);
+    uint8_t* grow(size_t size);
+    status_t writeObject(const void* object, size_t size);
+    bool addOffset(size_t offset);
+    /** @return where the next value lies, and goes past it; nullptr past the end. */
+    const uint8_t* read(size_t size) const;
+    /** Reads an object of a kind that the driver has checked. @param index its number. */
+    status_t readObject(uint32_t type, void* object, size_t size, size_t* index) const;
+    status_t readPointer(size_t length, size_t* handle, binder_buffer_object* object) const;
+
+    // What most calls need lies in the parcel itself, so that they need no memory from the heap.
+    // Left uninitialised: it is written before it is read.
+    alignas(8) uint8_t mInlineData[256];
+    binder_size_t mInlineOffsets[8];
+
+    uint8_t* mData = mInlineData;
+    size_t mSize = 0;
+    size_t mCapacity = sizeof(mInlineData);
+    mutable size_t mPosition = 0;
+    binder_size_t* mOffsets = mInlineOffsets;
+    size_t mOffsetCount = 0;
+    size_t mOffsetCapacity = sizeof(mInlineOffsets) / sizeof(mInlineOffsets[0]);
+    /** Which of the offsets is the next to be read. */
+    mutable size_t mNextObject = 0;
+    ReleaseBuffer mRelease = nullptr;
+    void* mOwner = nullptr;
+    /** Keeps what was written alive until the driver has taken it over. */
+    std::vector<sp<IBinder>> mBinders;
+};
+
+}  // namespace android::hardware

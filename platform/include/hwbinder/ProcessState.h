@@ -1,0 +1,60 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <hwbinder/IBinder.h>
+
+#include <cstddef>
+#include <cstdint>
+#include <map>
+#include <memory>
+#include <mutex>
+#include <string>
+
+namespace android::hardware {
+
+class Driver;
+
+/** What this process has of the binder: its driver, its pool of threads and its proxies. */
+class ProcessState {
+  public:
+    /** @return the state of this process, made at the first call. */
+    static ProcessState* self();
+
+    /** @return the driver that calls of this process go over. */
+    Driver& driver() { return *mDriver; }
+    /** @return the driver and why it is this one, in words. */
+    const std::string& driverDescription() const { return mDescription; }
+
+    /**
+     * @param maxThreads threads that serve calls at the most; this platform always has one.
+     * @param callerJoins whether a thread of the caller's will be that one.
+     */
+    void setThreadPoolConfiguration(size_t maxThreads, bool callerJoins);
+    /** Starts the thread that serves calls, unless one of the caller's will do it. */
+    void startThreadPool();
+    /**
+     * Serves calls with the calling thread, until that becomes impossible. While another thread
+     * does so this one waits: objects never have two calls at once.
+     */
+    void joinThreadPool();
+
+    /** @return the one proxy of a handle. */
+    sp<IBinder> getStrongProxyForHandle(uint32_t handle);
+    /** Forgets a proxy that is going away. @return false when it has a successor already. */
+    bool expungeHandle(uint32_t handle, IBinder* proxy);
+    /** Tells the proxy of a handle, if it still lives, that the process behind it has ended. */
+    void sendObituary(uint32_t handle);
+
+  private:
+    ProcessState();
+
+    std::string mDescription;
+    std::unique_ptr<Driver> mDriver;
+    std::mutex mServing;
+    std::mutex mMutex;
+    bool mCallerJoins = false;
+    bool mPoolStarted = false;
+    std::map<uint32_t, wp<IBinder>> mProxies;
+};
+
+}  // namespace android::hardware

@@ -1,0 +1,103 @@
+// SPDX-License-Identifier: Apache-2.0
+#include <android/hidl/base/1.0/BnHwBase.h>
+#include <android/hidl/base/1.0/BpHwBase.h>
+#include <android/log.h>
+#include <hidl/HidlBinderSupport.h>
+
+#include <mutex>
+
+namespace android::hardware {
+
+using ::android::hidl::base::V1_0::BnHwBase;
+using ::android::hidl::base::V1_0::IBase;
+
+status_t writeEmbeddedToParcel(const hidl_string& text, Parcel* parcel, size_t parentHandle,
+                               size_t parentOffset) {
+    return parcel->writeEmbeddedBuffer(text.c_str(), text.size() + 1, nullptr, parentHandle,
+                                       parentOffset + hidl_string::kOffsetOfBuffer);
+}
+
+status_t readEmbeddedFromParcel(const hidl_string& text, const Parcel& parcel, size_t parentHandle,
+                                size_t parentOffset) {
+    const void* buffer = nullptr;
+    const status_t status =
+            parcel.readEmbeddedBuffer(text.size() + 1, nullptr, parentHandle,
+                                      parentOffset + hidl_string::kOffsetOfBuffer, &buffer);
+    if (status != OK) return status;
+    return static_cast<const char*>(buffer)[text.size()] == '\0' ? OK : BAD_VALUE;
+}
+
+status_t writeToParcel(const Status& status, Parcel* parcel) {
+    const status_t written = parcel->writeInt32(status.exceptionCode());
+    if (written != OK || status.isOk()) return written;
+    const std::string& message = status.exceptionMessage();
+    return parcel->writeString16(message.data(), message.size());
+}
+
+status_t readFromParcel(Status* status, const Parcel& parcel) {
+    // The stub of setHALInstrumentation sends a reply with nothing in it.
+    if (parcel.dataSize() == 0) return OK;
+    int32_t exception = Status::EX_NONE;
+    status_t read = parcel.readInt32(&exception);
+    if (read != OK || exception == Status::EX_NONE) return read;
+    std::string message;
+    read = parcel.readString16(&message);
+    if (read == OK) *status = Status::fromExceptionCode(exception, message);
+    return read;
+}
+
+namespace details {
+
+sp<IBase> localObject(const sp<IBinder>& binder) {
+    return static_cast<BnHwBase*>(binder->localBinder())->getImpl();
+}
+
+Return<bool> canCastInterface(IBase* object, const char* interface, bool emitError) {
+    bool canCast = false;
+    const Return<void> result = object->interfaceChain([&](const auto& chain) {
+        for (const hidl_string& each : chain)
+            canCast = canCast || each == interface;
+    });
+    if (result.isOk()) return canCast;
+    if (emitError) {
+        __android_log_print(ANDROID_LOG_ERROR, "hwbinder", "no cast to %s: %s", interface,
+                            result.description().c_str());
+    }
+    return Status::fromStatusT(DEAD_OBJECT);
+}
+
+}  // namespace details
+
+namespace {
+
+/** @return the remote object behind any proxy. */
+sp<IBinder> remoteOf(IBase* proxy) {
+    // An interface adds nothing but virtual functions to the one that it extends, so IInterface
+    // lies at the same place in every proxy.
+    return IInterface::asBinder(static_cast<BpInterface<IBase>*>(proxy));
+}
+
+}  // namespace
+
+sp<IBinder> getOrCreateCachedBinder(IBase* object) {
+    if (object->isRemote()) return remoteOf(object);
+    // Two threads must not make two stubs of one object.
+    static auto* const mutex = new std::mutex;
+    const std::lock_guard<std::mutex> lock(*mutex);
+    sp<IBinder> binder = details::gBnMap->get(object, nullptr).promote();
+    if (binder != nullptr) return binder;
+
+    std::string descriptor;
+    object->interfaceDescriptor([&](const hidl_string& each) { descriptor = each; });
+    const auto make = details::getBnConstructorMap().get(descriptor, nullptr);
+    if (make == nullptr) {
+        __android_log_print(ANDROID_LOG_ERROR, "hwbinder", "no stub is known for %s",
+                            descriptor.c_str());
+        return nullptr;
+    }
+    binder = make(object);
+    details::gBnMap->set(object, binder->localBinder());
+    return binder;
+}
+
+}  // namespace android::hardware

@@ -1,0 +1,184 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "LocalServiceManager.h"
+
+#include "libhwbinder/LocalDriver.h"
+#include "libhwbinder/SocketDirectory.h"
+
+#include <android/hidl/base/1.0/BpHwBase.h>
+#include <dirent.h>
+#include <hwbinder/ProcessState.h>
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <chrono>
+#include <set>
+#include <thread>
+#include <utility>
+
+namespace android::hardware {
+namespace {
+
+using ::android::hidl::base::V1_0::IBase;
+using ::android::hidl::manager::V1_0::IServiceNotification;
+
+/** An interface and an instance. */
+using Name = std::pair<std::string, std::string>;
+
+/** @return the names of the sockets, and links to them, that this process can see. */
+std::set<Name> listNames() {
+    std::set<Name> names;
+    for (const std::string& path : clientDirectories()) {
+        DIR* directory = opendir(path.c_str());
+        if (directory == nullptr) continue;
+        while (const dirent* entry = readdir(directory)) {
+            const std::string name = entry->d_name;
+            struct stat info;
+            // "a.b@1.0::IName.instance": a dot ends the interface behind its last colon.
+            const size_t colon = name.find("::");
+            const size_t dot = colon == std::string::npos ? colon : name.find('.', colon);
+            if (dot != std::string::npos && name.back() != '~' &&
+                stat((path + "/" + name).c_str(), &info) == 0 && S_ISSOCK(info.st_mode)) {
+                names.emplace(name.substr(0, dot), name.substr(dot + 1));
+            }
+        }
+        closedir(directory);
+    }
+    return names;
+}
+
+/** Which socket there is for a service; it changes with every registration. */
+std::pair<ino_t, time_t> socketOf(const Name& name) {
+    for (const std::string& directory : clientDirectories()) {
+        struct stat info;
+        const std::string path = directory + "/" + socketName(name.first, name.second);
+        if (stat(path.c_str(), &info) == 0 && S_ISSOCK(info.st_mode)) {
+            return {info.st_ino, info.st_ctime};
+        }
+    }
+    return {};
+}
+
+/** Who wants to hear of which service. */
+class Notifications {
+  public:
+    static Notifications& instance() {
+        static auto* const notifications = new Notifications;
+        return *notifications;
+    }
+
+    void add(const Name& name, const sp<IServiceNotification>& callback) {
+        const std::lock_guard<std::mutex> lock(mMutex);
+        if (!mIsWatching) std::thread([this] { watch(); }).detach();
+        mIsWatching = true;
+        mWatches.push_back({name, callback, {}, true});
+    }
+    bool remove(const Name& name, const sp<IServiceNotification>& callback) {
+        const std::lock_guard<std::mutex> lock(mMutex);
+        const auto first =
+                std::remove_if(mWatches.begin(), mWatches.end(), [&](const Watch& watch) {
+                    return watch.callback == callback && (name.first.empty() || watch.name == name);
+                });
+        const bool isFound = first != mWatches.end();
+        mWatches.erase(first, mWatches.end());
+        return isFound;
+    }
+
+  private:
+    struct Watch {
+        Name name;
+        sp<IServiceNotification> callback;
+        std::pair<ino_t, time_t> socket;
+        bool isNew;
+    };
+
+    /** Runs as long as there is anybody to notify. */
+    void watch() {
+        for (;;) {
+            std::vector<Watch> news;
+            {
+                const std::lock_guard<std::mutex> lock(mMutex);
+                mIsWatching = !mWatches.empty();
+                if (!mIsWatching) return;
+                for (Watch& watch : mWatches) {
+                    const auto socket = socketOf(watch.name);
+                    if (socket.first != 0 && socket != watch.socket) news.push_back(watch);
+                    watch.socket = socket;
+                    watch.isNew = false;
+                }
+            }
+            for (const Watch& watch : news)
+                watch.callback->onRegistration(watch.name.first, watch.name.second, watch.isNew);
+            std::this_thread::sleep_for(std::chrono::milliseconds(100));
+        }
+    }
+
+    std::mutex mMutex;
+    std::vector<Watch> mWatches;
+    bool mIsWatching = false;
+};
+
+}  // namespace
+
+Return<sp<IBase>> LocalServiceManager::get(const hidl_string& interface, const hidl_string& name) {
+    lookupError().clear();
+    const uint32_t handle = mDriver.connect(interface, name, &lookupError());
+    if (handle == 0) return sp<IBase>();
+    return sp<IBase>(new ::android::hidl::base::V1_0::BpHwBase(
+            ProcessState::self()->getStrongProxyForHandle(handle)));
+}
+
+Return<void> LocalServiceManager::list(list_cb callback) {
+    std::vector<hidl_string> names;
+    for (const auto& [interface, instance] : listNames())
+        names.emplace_back(interface + "/" + instance);
+    callback(names);
+    return Void();
+}
+
+Return<void> LocalServiceManager::listByInterface(const hidl_string& interface,
+                                                  listByInterface_cb callback) {
+    std::vector<hidl_string> instances;
+    for (const Name& name : listNames()) {
+        if (interface == name.first) instances.emplace_back(name.second);
+    }
+    callback(instances);
+    return Void();
+}
+
+Return<bool> LocalServiceManager::registerForNotifications(
+        const hidl_string& interface, const hidl_string& name,
+        const sp<IServiceNotification>& callback) {
+    if (callback == nullptr) return false;
+    Notifications::instance().add({interface, name}, callback);
+    return true;
+}
+
+Return<bool> LocalServiceManager::unregisterForNotifications(
+        const hidl_string& interface, const hidl_string& name,
+        const sp<IServiceNotification>& callback) {
+    return Notifications::instance().remove({interface, name}, callback);
+}
+
+Return<void> LocalServiceManager::debugDump(debugDump_cb callback) {
+    std::vector<InstanceDebugInfo> infos;
+    for (const auto& [interface, instance] : listNames()) {
+        InstanceDebugInfo info{};
+        info.interfaceName = interface;
+        info.instanceName = instance;
+        info.pid = static_cast<int32_t>(PidConstant::NO_PID);
+        infos.push_back(info);
+    }
+    callback(infos);
+    return Void();
+}
+
+Return<bool> LocalServiceManager::addWithChain(const hidl_string& name, const sp<IBase>& service,
+                                               const hidl_vec<hidl_string>& chain) {
+    if (service == nullptr || service->isRemote() || chain.size() == 0) return false;
+    const sp<IBinder> binder = getOrCreateCachedBinder(service.get());
+    if (binder == nullptr) return false;
+    const std::vector<std::string> names(chain.begin(), chain.end());
+    return mDriver.publish(binder->localBinder(), names, name);
+}
+
+}  // namespace android::hardware

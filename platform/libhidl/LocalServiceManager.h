@@ -1,0 +1,46 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "ServiceManagerBase.h"
+
+#include <string>
+
+namespace android::hardware {
+
+class LocalDriver;
+
+/**
+ * The service manager where calls go over sockets. It is no process of its own: each process looks
+ * into the directories of sockets itself.
+ */
+class LocalServiceManager : public ServiceManagerBase {
+  public:
+    explicit LocalServiceManager(LocalDriver& driver) : mDriver(driver) {}
+
+    Return<sp<::android::hidl::base::V1_0::IBase>> get(const hidl_string& interface,
+                                                       const hidl_string& name) override;
+    Return<void> list(list_cb callback) override;
+    Return<void> listByInterface(const hidl_string& interface,
+                                 listByInterface_cb callback) override;
+    /** Has a thread look for the service ten times a second. */
+    Return<bool> registerForNotifications(
+            const hidl_string& interface, const hidl_string& name,
+            const sp<::android::hidl::manager::V1_0::IServiceNotification>& callback) override;
+    Return<void> debugDump(debugDump_cb callback) override;
+    Return<bool> unregisterForNotifications(
+            const hidl_string& interface, const hidl_string& name,
+            const sp<::android::hidl::manager::V1_0::IServiceNotification>& callback) override;
+    Return<bool> addWithChain(const hidl_string& name,
+                              const sp<::android::hidl::base::V1_0::IBase>& service,
+                              const hidl_vec<hidl_string>& chain) override;
+    /** Objects stay known until their process ends. */
+    Return<bool> tryUnregister(const hidl_string&, const hidl_string&,
+                               const sp<::android::hidl::base::V1_0::IBase>&) override {
+        return false;
+    }
+
+  private:
+    LocalDriver& mDriver;
+};
+
+}  // namespace android::hardware

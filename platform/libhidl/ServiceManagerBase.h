@@ -1,0 +1,44 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <android/hidl/manager/1.2/IServiceManager.h>
+
+namespace android::hardware {
+
+/** What both service managers of this platform answer in the same way. */
+class ServiceManagerBase : public ::android::hidl::manager::V1_2::IServiceManager {
+  public:
+    /** Adds a service under the names of the interfaces that it says it has. */
+    Return<bool> add(const hidl_string& name,
+                     const sp<::android::hidl::base::V1_0::IBase>& service) override {
+        if (service == nullptr) return false;
+        bool success = false;
+        const Return<void> result = service->interfaceChain(
+                [&](const auto& chain) { success = addWithChain(name, service, chain); });
+        return result.isOk() && success;
+    }
+    /** There is no list of declared services: only a service that is there has a transport. */
+    Return<Transport> getTransport(const hidl_string& interface, const hidl_string& name) override {
+        const Return<sp<::android::hidl::base::V1_0::IBase>> service = get(interface, name);
+        return service.withDefault(nullptr) != nullptr ? Transport::HWBINDER : Transport::EMPTY;
+    }
+    Return<void> registerPassthroughClient(const hidl_string&, const hidl_string&) override {
+        return Void();
+    }
+    Return<bool> registerClientCallback(
+            const hidl_string&, const hidl_string&, const sp<::android::hidl::base::V1_0::IBase>&,
+            const sp<::android::hidl::manager::V1_2::IClientCallback>&) override {
+        return false;
+    }
+    Return<bool> unregisterClientCallback(
+            const sp<::android::hidl::base::V1_0::IBase>&,
+            const sp<::android::hidl::manager::V1_2::IClientCallback>&) override {
+        return false;
+    }
+    Return<void> listManifestByInterface(const hidl_string& interface,
+                                         listManifestByInterface_cb callback) override {
+        return listByInterface(interface, callback);
+    }
+};
+
+}  // namespace android::hardware

@@ -1,0 +1,63 @@
+// SPDX-License-Identifier: Apache-2.0
+#include <android/log.h>
+#include <hidl/Status.h>
+
+#include <cstdlib>
+#include <cstring>
+
+namespace android::hardware {
+
+Status Status::fromExceptionCode(int32_t code, std::string message) {
+    Status status;
+    status.mException = code;
+    status.mMessage = std::move(message);
+    return status;
+}
+
+Status Status::fromStatusT(status_t error) {
+    Status status;
+    status.setFromStatusT(error);
+    return status;
+}
+
+void Status::setFromStatusT(status_t error) {
+    mException = error == OK ? EX_NONE : EX_TRANSACTION_FAILED;
+    mError = error;
+    mMessage.clear();
+}
+
+std::string Status::description() const {
+    if (mException != EX_NONE && mException != EX_TRANSACTION_FAILED) {
+        return mMessage.empty() ? "exception " + std::to_string(mException) : mMessage;
+    }
+    switch (mError) {
+        case OK:
+            return "No error";
+        case DEAD_OBJECT:
+            return "the service has gone, or has closed the connection";
+        case TIMED_OUT:
+            return "the service did not answer in time";
+        case UNKNOWN_TRANSACTION:
+            return "the service does not know the operation";
+        case BAD_TYPE:
+        case NOT_ENOUGH_DATA:
+            return "the message does not hold what the operation takes";
+        case FAILED_TRANSACTION:
+            return "the message could not be delivered; it may be too large";
+        case UNKNOWN_ERROR:
+            return "unknown error";
+        default:
+            return strerror(-mError);
+    }
+}
+
+namespace details {
+
+void return_status::abortOnUse() const {
+    __android_log_print(ANDROID_LOG_FATAL, "hwbinder", "the value of a failed call was used: %s",
+                        description().c_str());
+    abort();
+}
+
+}  // namespace details
+}  // namespace android::hardware

@@ -1,0 +1,297 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "KernelThread.h"
+
+#include <android/log.h>
+#include <hwbinder/ProcessState.h>
+#include <sys/ioctl.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <csignal>
+#include <ctime>
+#include <functional>
+#include <utility>
+
+namespace android::hardware {
+namespace {
+
+constexpr char kTag[] = "hwbinder";
+
+/**
+ * BR_TRANSACTION_PENDING_FROZEN, which the headers lack before Linux 6.4: what stands in place of
+ * BR_TRANSACTION_COMPLETE when a oneway call is kept for a process that is frozen.
+ */
+constexpr uint32_t kTransactionPendingFrozen = _IO('r', 20);
+
+/** Gives a buffer of the mapping back to the kernel. */
+void release(const uint8_t* data, void* thread) {
+    // Any thread may give it back, not only the one that has received it.
+    (void)thread;
+    auto& driver = static_cast<KernelDriver&>(ProcessState::self()->driver());
+    KernelThread::self(driver).queue(BC_FREE_BUFFER, reinterpret_cast<binder_uintptr_t>(data));
+}
+
+}  // namespace
+
+/**
+ * Interrupts this thread's wait for the driver when a time is up, and then again every 10 ms, since
+ * the first signal may come before the wait begins. Polling the device with a timeout would do it,
+ * too, but then the kernel waits for tens of milliseconds when the thread ends.
+ */
+class KernelThread::Alarm {
+  public:
+    /** @param milliseconds 0 for no limit. */
+    explicit Alarm(int milliseconds) : mIsSet(milliseconds > 0) {
+        if (!mIsSet) return;
+        struct sigaction action {};
+        action.sa_handler = [](int) {};
+        sigaction(signalNumber(), &action, nullptr);
+        sigevent event{};
+        event.sigev_notify = SIGEV_THREAD_ID;
+        event.sigev_signo = signalNumber();
+        event._sigev_un._tid = gettid();
+        mIsSet = timer_create(CLOCK_MONOTONIC, &event, &mTimer) == 0;
+        const itimerspec times{{0, 10'000'000},
+                               {milliseconds / 1000, milliseconds % 1000 * 1'000'000L}};
+        if (mIsSet) timer_settime(mTimer, 0, &times, nullptr);
+        clock_gettime(CLOCK_MONOTONIC, &mEnd);
+        mEnd.tv_sec += times.it_value.tv_sec;
+        mEnd.tv_nsec += times.it_value.tv_nsec;
+    }
+    ~Alarm() {
+        if (mIsSet) timer_delete(mTimer);
+    }
+    Alarm(const Alarm&) = delete;
+    Alarm& operator=(const Alarm&) = delete;
+
+    bool isOver() const {
+        timespec now{};
+        clock_gettime(CLOCK_MONOTONIC, &now);
+        return mIsSet && (now.tv_sec - mEnd.tv_sec) * 1'000'000'000 + now.tv_nsec >= mEnd.tv_nsec;
+    }
+
+  private:
+    static int signalNumber() { return SIGRTMIN; }
+
+    bool mIsSet;
+    timer_t mTimer{};
+    timespec mEnd{};
+};
+
+KernelThread& KernelThread::self(KernelDriver& driver) {
+    static thread_local KernelThread thread(driver);
+    return thread;
+}
+
+KernelThread::~KernelThread() {
+    flush();
+    ioctl(mDriver.mDevice, BINDER_THREAD_EXIT, 0);
+}
+
+status_t KernelThread::exchange(bool receive) {
+    if (!mDriver.isOpen()) {
+        mOutSize = 0;
+        return NO_INIT;
+    }
+    binder_write_read exchange{};
+    exchange.write_buffer = reinterpret_cast<binder_uintptr_t>(mOut);
+    exchange.write_size = mOutSize;
+    if (receive) {
+        exchange.read_buffer = reinterpret_cast<binder_uintptr_t>(mIn);
+        exchange.read_size = sizeof(mIn);
+    }
+    while (ioctl(mDriver.mDevice, BINDER_WRITE_READ, &exchange) != 0) {
+        if (errno == EINTR && !(receive && mAlarm != nullptr && mAlarm->isOver())) continue;
+        const int error = errno;
+        mOutSize = 0;
+        if (error != EINTR) return -error;
+        // Makes the kernel forget this thread, and the call with it. With the next command it
+        // gets to know the thread anew.
+        ioctl(mDriver.mDevice, BINDER_THREAD_EXIT, 0);
+        return TIMED_OUT;
+    }
+    // Commands that the kernel has not taken are dropped: it did not understand one of them.
+    mOutSize = 0;
+    if (receive) {
+        mInSize = exchange.read_consumed;
+        mInPosition = 0;
+    }
+    return OK;
+}
+
+status_t KernelThread::flush() {
+    return mOutSize == 0 ? OK : exchange(false);
+}
+
+bool KernelThread::next(uint32_t* command) {
+    if (mInSize - mInPosition < sizeof(*command)) return false;
+    memcpy(command, mIn + mInPosition, sizeof(*command));
+    mInPosition += sizeof(*command);
+    return true;
+}
+
+template <typename T>
+T KernelThread::argument() {
+    T value;
+    memcpy(&value, mIn + mInPosition, sizeof(value));
+    mInPosition += sizeof(value);
+    return value;
+}
+
+void KernelThread::queueTransaction(uint32_t command, uint32_t handle, uint32_t code,
+                                    const Parcel& data, uint32_t flags, const status_t* status) {
+    binder_transaction_data_sg outgoing{};
+    binder_transaction_data& call = outgoing.transaction_data;
+    call.target.handle = handle;
+    call.code = code;
+    call.flags = flags;
+    if (status != nullptr) {
+        call.flags |= TF_STATUS_CODE;
+        call.data_size = sizeof(*status);
+        call.data.ptr.buffer = reinterpret_cast<binder_uintptr_t>(status);
+    } else {
+        call.data_size = data.dataSize();
+        call.data.ptr.buffer = reinterpret_cast<binder_uintptr_t>(data.data());
+        call.offsets_size = data.offsetCount() * sizeof(binder_size_t);
+        call.data.ptr.offsets = reinterpret_cast<binder_uintptr_t>(data.offsets());
+        outgoing.buffers_size = data.buffersSize();
+    }
+    queue(command, outgoing);
+}
+
+status_t KernelThread::transact(uint32_t handle, uint32_t code, const Parcel& data, Parcel* reply,
+                                uint32_t flags) {
+    // No TF_ACCEPT_FDS: a reply with descriptors is refused by the kernel.
+    queueTransaction(BC_TRANSACTION_SG, handle, code, data, flags, nullptr);
+    const bool oneway = (flags & IBinder::FLAG_ONEWAY) != 0;
+    const Alarm alarm(callTimeout());
+    const Alarm* const before = std::exchange(mAlarm, &alarm);
+    const status_t status = waitFor(oneway ? Until::kCompletion : Until::kReply, reply);
+    mAlarm = before;
+    return status;
+}
+
+status_t KernelThread::waitFor(Until until, Parcel* reply) {
+    for (;;) {
+        uint32_t command = 0;
+        while (!next(&command)) {
+            const status_t status = exchange(true);
+            if (status != OK) return status;
+        }
+        switch (command) {
+            case BR_TRANSACTION_COMPLETE:
+            case BR_ONEWAY_SPAM_SUSPECT:
+            case kTransactionPendingFrozen:
+                if (until == Until::kCompletion) return OK;
+                break;
+            case BR_DEAD_REPLY:
+                if (until != Until::kForEver) return DEAD_OBJECT;
+                break;
+            case BR_FAILED_REPLY:
+            case BR_FROZEN_REPLY:
+                if (until != Until::kForEver) return FAILED_TRANSACTION;
+                break;
+            case BR_REPLY:
+                return takeReply(argument<binder_transaction_data>(), reply);
+            default:
+                handle(command);
+        }
+    }
+}
+
+status_t KernelThread::takeReply(const binder_transaction_data& received, Parcel* reply) {
+    const auto* data = reinterpret_cast<const uint8_t*>(received.data.ptr.buffer);
+    if ((received.flags & TF_STATUS_CODE) != 0) {
+        status_t status = UNKNOWN_ERROR;
+        if (received.data_size >= sizeof(status)) memcpy(&status, data, sizeof(status));
+        giveBack(received);
+        return status;
+    }
+    Parcel unwanted;
+    (reply == nullptr ? &unwanted : reply)
+            ->ipcSetDataReference(data, received.data_size,
+                                  reinterpret_cast<const binder_size_t*>(received.data.ptr.offsets),
+                                  received.offsets_size / sizeof(binder_size_t), release, nullptr);
+    return OK;
+}
+
+void KernelThread::giveBack(const binder_transaction_data& received) {
+    queue(BC_FREE_BUFFER, received.data.ptr.buffer);
+}
+
+void KernelThread::handle(uint32_t command) {
+    switch (command) {
+        case BR_TRANSACTION:
+            serveCall(argument<binder_transaction_data>());
+            break;
+        case BR_INCREFS:
+        case BR_ACQUIRE: {
+            // Both keep the object alive, also while only the kernel refers to it.
+            const auto reference = argument<binder_ptr_cookie>();
+            reinterpret_cast<BHwBinder*>(reference.cookie)->incStrong(this);
+            queue(command == BR_INCREFS ? BC_INCREFS_DONE : BC_ACQUIRE_DONE, reference);
+            break;
+        }
+        case BR_RELEASE:
+        case BR_DECREFS:
+            reinterpret_cast<BHwBinder*>(argument<binder_ptr_cookie>().cookie)->decStrong(this);
+            break;
+        case BR_DEAD_BINDER: {
+            const auto handle = argument<binder_uintptr_t>();
+            ProcessState::self()->sendObituary(static_cast<uint32_t>(handle));
+            queue(BC_DEAD_BINDER_DONE, handle);
+            break;
+        }
+        case BR_CLEAR_DEATH_NOTIFICATION_DONE:
+            argument<binder_uintptr_t>();
+            break;
+        case BR_ERROR:
+            argument<int32_t>();
+            break;
+        default:
+            // BR_NOOP, BR_OK, BR_SPAWN_LOOPER, BR_FINISHED: nothing to do.
+            break;
+    }
+}
+
+void KernelThread::sendReply(const Parcel& data, const status_t* status) {
+    queueTransaction(BC_REPLY_SG, 0, 0, data, 0, status);
+    waitFor(Until::kCompletion, nullptr);
+}
+
+void KernelThread::serveCall(const binder_transaction_data& received) {
+    const auto* bytes = reinterpret_cast<const uint8_t*>(received.data.ptr.buffer);
+    Parcel data;
+    data.ipcSetDataReference(bytes, received.data_size,
+                             reinterpret_cast<const binder_size_t*>(received.data.ptr.offsets),
+                             received.offsets_size / sizeof(binder_size_t), release, nullptr);
+    const sp<BHwBinder> object =
+            received.target.ptr == 0 ? mDriver.mContextManager
+                                     : sp<BHwBinder>(reinterpret_cast<BHwBinder*>(received.cookie));
+    const CallerIdentity caller(received.sender_euid, received.sender_pid);
+    const bool oneway = (received.flags & TF_ONE_WAY) != 0;
+
+    Parcel reply;
+    bool replied = false;
+    const auto send = [&](Parcel& results) {
+        if (!oneway && !replied) sendReply(results, nullptr);
+        replied = true;
+    };
+    // By reference, which is copied without memory from the heap.
+    const status_t status = object->transact(received.code, data, &reply,
+                                             received.flags & TF_ONE_WAY, std::ref(send));
+    if (oneway || replied) return;
+    sendReply(reply, status == OK ? nullptr : &status);
+}
+
+void KernelThread::serve() {
+    flush();
+    const uint32_t enter = BC_ENTER_LOOPER;
+    memcpy(mOut + mOutSize, &enter, sizeof(enter));
+    mOutSize += sizeof(enter);
+    const status_t status = waitFor(Until::kForEver, nullptr);
+    __android_log_print(ANDROID_LOG_ERROR, kTag, "%s serves no more: %s", mDriver.name().c_str(),
+                        strerror(-status));
+}
+
+}  // namespace android::hardware

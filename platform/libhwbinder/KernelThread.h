@@ -1,0 +1,69 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "KernelDriver.h"
+
+#include <linux/android/binder.h>
+
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+
+namespace android::hardware {
+
+/** A thread's exchange with the kernel's driver: commands go there, returns come back. */
+class KernelThread {
+  public:
+    /** @return the state of the current thread. */
+    static KernelThread& self(KernelDriver& driver);
+
+    status_t transact(uint32_t handle, uint32_t code, const Parcel& data, Parcel* reply,
+                      uint32_t flags);
+    void serve();
+
+    /** Adds a command, which goes to the kernel with the next exchange. */
+    template <typename T>
+    void queue(uint32_t command, const T& argument) {
+        if (mOutSize + sizeof(command) + sizeof(argument) > sizeof(mOut)) flush();
+        memcpy(mOut + mOutSize, &command, sizeof(command));
+        memcpy(mOut + mOutSize + sizeof(command), &argument, sizeof(argument));
+        mOutSize += sizeof(command) + sizeof(argument);
+    }
+    /** Sends the commands now. */
+    status_t flush();
+
+  private:
+    explicit KernelThread(KernelDriver& driver) : mDriver(driver) {}
+    ~KernelThread();
+
+    class Alarm;
+
+    /** What waitFor is waiting for. */
+    enum class Until { kReply, kCompletion, kForEver };
+
+    /** Sends the commands. @return OK; TIMED_OUT when the alarm's time is up before. */
+    status_t exchange(bool receive);
+    status_t waitFor(Until until, Parcel* reply);
+    bool next(uint32_t* command);
+    template <typename T>
+    T argument();
+    void queueTransaction(uint32_t command, uint32_t handle, uint32_t code, const Parcel& data,
+                          uint32_t flags, const status_t* status);
+    status_t takeReply(const binder_transaction_data& received, Parcel* reply);
+    void handle(uint32_t command);
+    void serveCall(const binder_transaction_data& received);
+    void sendReply(const Parcel& data, const status_t* status);
+    void giveBack(const binder_transaction_data& received);
+
+    KernelDriver& mDriver;
+    /** Of the call that is being waited for; nullptr outside calls. */
+    const Alarm* mAlarm = nullptr;
+    // A command of the kernel's own never measures more than some 80 bytes.
+    alignas(8) uint8_t mOut[512];
+    size_t mOutSize = 0;
+    alignas(8) uint8_t mIn[512];
+    size_t mInSize = 0;
+    size_t mInPosition = 0;
+};
+
+}  // namespace android::hardware

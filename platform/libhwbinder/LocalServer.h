@@ -1,0 +1,119 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "Packet.h"
+
+#include <hwbinder/Binder.h>
+#include <sys/socket.h>
+
+#include <atomic>
+#include <cstddef>
+#include <cstdint>
+#include <list>
+#include <memory>
+#include <mutex>
+#include <string>
+#include <unordered_map>
+#include <vector>
+
+namespace android::hardware {
+
+/**
+ * Serves the clients of this process's objects with one thread, one call at a time.
+ *
+ * Everybody gets the same: in each round every uid that has calls waiting gets one of them served,
+ * the one that has waited longest, however many connections it has. Nobody is waited for: a client
+ * that does not take its replies loses its connection. When there are too many connections, one
+ * that is idle gives way; one that is busy does to a uid that has fewer.
+ */
+class LocalServer {
+  public:
+    LocalServer();
+    ~LocalServer();
+    LocalServer(const LocalServer&) = delete;
+    LocalServer& operator=(const LocalServer&) = delete;
+
+    /**
+     * Makes an object known under a name: at once, or when the process that has it has gone.
+     *
+     * @return whether the object has the name now.
+     */
+    bool publish(const sp<BHwBinder>& object, const std::vector<std::string>& chain,
+                 const std::string& instance);
+    /** Serves calls until that becomes impossible. */
+    void serve();
+
+    /** Sends the obituary of a handle when the other side of its connection closes. */
+    bool watch(uint32_t handle, int connection) const;
+    void unwatch(int connection) const;
+
+  private:
+    struct Share;
+
+    /** What the loop waits for: a listening socket, or a client's connection. */
+    struct Endpoint {
+        int socket;
+        sp<BHwBinder> object;
+        /** Whose connection it is; nullptr for a listening socket. */
+        Share* share;
+        /** The next of the same uid that has a call waiting. */
+        Endpoint* next;
+        bool isQueued;
+        uint64_t lastUsed;
+    };
+
+    /** What a uid has: connections, and those of them that have calls waiting, in their order. */
+    struct Share {
+        uid_t uid;
+        size_t connections = 0;
+        Endpoint* first = nullptr;
+        Endpoint* last = nullptr;
+    };
+
+    /** An object whose name another process has. */
+    struct Pending {
+        sp<BHwBinder> object;
+        std::vector<std::string> chain;
+        std::string instance;
+    };
+
+    bool listen(int socket, const sp<BHwBinder>& object);
+    int retryPending();
+    bool collect(int timeout);
+    void enqueue(Endpoint* client);
+    Endpoint* dequeue(Share* share);
+    void unqueue(Endpoint* client);
+    void serveOneOfEach();
+    bool serveCall(Endpoint* client);
+    bool receive(int socket, ucred* caller);
+    bool reply(int socket);
+
+    void acceptAll(Endpoint* listener);
+    bool makeRoom(const Endpoint* newcomer);
+    Endpoint* oldestClient(const Share* share, const Endpoint* newcomer, bool onlyIdle);
+    void refuseOne(int listener);
+    void drop(Endpoint* client);
+
+    const int mEpoll;
+    const int mWake;
+    int mSpare;
+    size_t mMost;
+    size_t mMostPerUid;
+    size_t mConnections = 0;
+    uint64_t mClock = 0;
+    int mRetryAfter = 1;
+    std::unordered_map<int, Endpoint> mClients;
+    std::unordered_map<uid_t, Share> mShares;
+    /** The uids that have calls waiting, each once. */
+    std::vector<Share*> mTurns;
+    std::vector<Share*> mRound;
+    /** Of what may be published while calls are served. */
+    std::mutex mMutex;
+    std::list<Endpoint> mListeners;
+    std::vector<Pending> mPending;
+    std::atomic<bool> mHasPending = false;
+    std::unique_ptr<Packet> mRequest;
+    std::unique_ptr<Packet> mReply;
+};
+
+}  // namespace android::hardware

@@ -1,0 +1,335 @@
+// SPDX-License-Identifier: Apache-2.0
+#include <hwbinder/Binder.h>
+#include <hwbinder/BpHwBinder.h>
+#include <hwbinder/Parcel.h>
+#include <hwbinder/ProcessState.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <cstring>
+#include <string>
+
+namespace android::hardware {
+namespace {
+
+/** Values begin at multiples of 4; objects, too. */
+constexpr size_t padded(size_t size) {
+    return (size + 3) & ~size_t{3};
+}
+
+/** Doubles an array that lies in the parcel, or on the heap. @return nullptr without memory. */
+template <typename T>
+T* moveToHeap(T* array, const T* inlined, size_t count, size_t capacity) {
+    if (array != inlined) return static_cast<T*>(realloc(array, capacity * sizeof(T)));
+    auto* moved = static_cast<T*>(malloc(capacity * sizeof(T)));
+    if (moved != nullptr) memcpy(moved, array, count * sizeof(T));
+    return moved;
+}
+
+}  // namespace
+
+Parcel::~Parcel() {
+    releaseMemory();
+}
+
+void Parcel::releaseMemory() {
+    if (mRelease != nullptr) {
+        mRelease(mData, mOwner);
+    } else {
+        if (mData != mInlineData) free(mData);
+        if (mOffsets != mInlineOffsets) free(mOffsets);
+    }
+}
+
+void Parcel::clear() {
+    releaseMemory();
+    mRelease = nullptr;
+    mData = mInlineData;
+    mSize = 0;
+    mCapacity = sizeof(mInlineData);
+    mOffsets = mInlineOffsets;
+    mOffsetCount = 0;
+    mOffsetCapacity = std::size(mInlineOffsets);
+    mPosition = 0;
+    mNextObject = 0;
+    mBinders.clear();
+}
+
+void Parcel::ipcSetDataReference(const uint8_t* data, size_t size, const binder_size_t* offsets,
+                                 size_t offsetCount, ReleaseBuffer release, void* owner) {
+    if (mRelease != nullptr || mSize > 0) clear();
+    // Never written to: a parcel that has an owner refuses it.
+    mData = const_cast<uint8_t*>(data);
+    mSize = size;
+    mCapacity = 0;
+    mOffsets = const_cast<binder_size_t*>(offsets);
+    mOffsetCount = offsetCount;
+    mOffsetCapacity = 0;
+    mRelease = release;
+    mOwner = owner;
+}
+
+uint8_t* Parcel::grow(size_t size) {
+    const size_t needed = mSize + padded(size);
+    if (mRelease != nullptr || needed < mSize) return nullptr;
+    if (needed > mCapacity) {
+        const size_t capacity = std::max(needed, 2 * mCapacity);
+        uint8_t* larger = moveToHeap(mData, mInlineData, mSize, capacity);
+        if (larger == nullptr) return nullptr;
+        mData = larger;
+        mCapacity = capacity;
+    }
+    uint8_t* place = mData + mSize;
+    mSize = needed;
+    // What fills the last 4 bytes up is zero.
+    if (size > 0) memset(mData + mSize - 4, 0, 4);
+    return place;
+}
+
+status_t Parcel::write(const void* bytes, size_t size) {
+    uint8_t* place = grow(size);
+    if (place == nullptr) return NO_MEMORY;
+    memcpy(place, bytes, size);
+    return OK;
+}
+
+template <typename T>
+status_t Parcel::writePadded(T value) {
+    return write(&value, sizeof(value));
+}
+
+template status_t Parcel::writePadded(int8_t value);
+template status_t Parcel::writePadded(uint8_t value);
+template status_t Parcel::writePadded(int32_t value);
+template status_t Parcel::writePadded(uint32_t value);
+template status_t Parcel::writePadded(int64_t value);
+template status_t Parcel::writePadded(uint64_t value);
+
+status_t Parcel::writeInterfaceToken(const char* interface) {
+    return write(interface, strlen(interface) + 1);
+}
+
+status_t Parcel::writeString16(const char* text, size_t length) {
+    const status_t status = writeInt32(static_cast<int32_t>(length));
+    if (status != OK) return status;
+    uint8_t* place = grow(2 * (length + 1));
+    if (place == nullptr) return NO_MEMORY;
+    for (size_t i = 0; i <= length; ++i) {
+        const char16_t character = i < length ? static_cast<unsigned char>(text[i]) : 0;
+        memcpy(place + 2 * i, &character, sizeof(character));
+    }
+    return OK;
+}
+
+bool Parcel::addOffset(size_t offset) {
+    if (mOffsetCount == mOffsetCapacity) {
+        const size_t capacity = 2 * mOffsetCapacity;
+        binder_size_t* larger = moveToHeap(mOffsets, mInlineOffsets, mOffsetCount, capacity);
+        if (larger == nullptr) return false;
+        mOffsets = larger;
+        mOffsetCapacity = capacity;
+    }
+    mOffsets[mOffsetCount++] = offset;
+    return true;
+}
+
+status_t Parcel::writeObject(const void* object, size_t size) {
+    const size_t offset = mSize;
+    const status_t status = write(object, size);
+    if (status != OK) return status;
+    return addOffset(offset) ? OK : NO_MEMORY;
+}
+
+status_t Parcel::writeBuffer(const void* buffer, size_t length, size_t* handle) {
+    binder_buffer_object object{};
+    object.hdr.type = BINDER_TYPE_PTR;
+    object.buffer = reinterpret_cast<binder_uintptr_t>(buffer);
+    object.length = length;
+    if (handle != nullptr) *handle = mOffsetCount;
+    return writeObject(&object, sizeof(object));
+}
+
+status_t Parcel::writeEmbeddedBuffer(const void* buffer, size_t length, size_t* handle,
+                                     size_t parentHandle, size_t parentOffset) {
+    binder_buffer_object object{};
+    object.hdr.type = BINDER_TYPE_PTR;
+    object.flags = BINDER_BUFFER_FLAG_HAS_PARENT;
+    object.buffer = reinterpret_cast<binder_uintptr_t>(buffer);
+    object.length = length;
+    object.parent = parentHandle;
+    object.parent_offset = parentOffset;
+    if (handle != nullptr) *handle = mOffsetCount;
+    return writeObject(&object, sizeof(object));
+}
+
+status_t Parcel::writeStrongBinder(const sp<IBinder>& binder) {
+    flat_binder_object object{};
+    object.hdr.type = BINDER_TYPE_BINDER;
+    // Not in the list of offsets: the driver would make an object of it.
+    if (binder == nullptr) return write(&object, sizeof(object));
+    if (BpHwBinder* remote = binder->remoteBinder()) {
+        object.hdr.type = BINDER_TYPE_HANDLE;
+        object.handle = remote->handle();
+    } else {
+        BHwBinder* local = binder->localBinder();
+        // No FLAT_BINDER_FLAG_ACCEPTS_FDS: no operation takes descriptors, and to close one that a
+        // hostile caller has chosen may take seconds.
+        object.flags = static_cast<uint32_t>(local->getMinSchedulingPriority()) &
+                       FLAT_BINDER_FLAG_PRIORITY_MASK;
+        object.binder = reinterpret_cast<binder_uintptr_t>(local->getWeakRefs());
+        object.cookie = reinterpret_cast<binder_uintptr_t>(local);
+    }
+    mBinders.push_back(binder);
+    return writeObject(&object, sizeof(object));
+}
+
+status_t Parcel::writeNativeHandleNoDup(const native_handle_t* handle) {
+    return handle == nullptr ? writeUint64(0) : INVALID_OPERATION;
+}
+
+const uint8_t* Parcel::read(size_t size) const {
+    if (mPosition > mSize || size > mSize - mPosition) return nullptr;
+    // The bytes of an object, which the driver has filled in, are never read as plain values.
+    if (mNextObject < mOffsetCount && mPosition + size > mOffsets[mNextObject]) return nullptr;
+    const uint8_t* place = mData + mPosition;
+    mPosition = std::min(mSize, mPosition + padded(size));
+    return place;
+}
+
+template <typename T>
+status_t Parcel::readPadded(T* value) const {
+    const uint8_t* place = read(sizeof(T));
+    if (place == nullptr) return NOT_ENOUGH_DATA;
+    memcpy(value, place, sizeof(T));
+    return OK;
+}
+
+template status_t Parcel::readPadded(int8_t* value) const;
+template status_t Parcel::readPadded(uint8_t* value) const;
+template status_t Parcel::readPadded(int32_t* value) const;
+template status_t Parcel::readPadded(uint32_t* value) const;
+template status_t Parcel::readPadded(int64_t* value) const;
+template status_t Parcel::readPadded(uint64_t* value) const;
+
+status_t Parcel::readBool(bool* value) const {
+    uint8_t byte = 0;
+    const status_t status = readPadded(&byte);
+    // Any byte but 0 and 1 would be undefined as a bool.
+    if (status == OK) *value = byte != 0;
+    return status;
+}
+
+bool Parcel::enforceInterface(const char* interface) const {
+    const size_t size = strlen(interface) + 1;
+    const uint8_t* place = read(size);
+    return place != nullptr && memcmp(place, interface, size) == 0;
+}
+
+status_t Parcel::readString16(std::string* text) const {
+    int32_t length = 0;
+    const status_t status = readInt32(&length);
+    if (status != OK) return status;
+    if (length < 0) return BAD_VALUE;
+    const auto count = static_cast<size_t>(length);
+    const uint8_t* place = read(2 * (count + 1));
+    if (place == nullptr) return NOT_ENOUGH_DATA;
+    text->clear();
+    for (size_t i = 0; i < count; ++i) {
+        char16_t character = 0;
+        memcpy(&character, place + 2 * i, sizeof(character));
+        *text += character < 0x80 ? static_cast<char>(character) : '?';
+    }
+    return OK;
+}
+
+status_t Parcel::readObject(uint32_t type, void* object, size_t size, size_t* index) const {
+    if (mPosition > mSize || size > mSize - mPosition) return NOT_ENOUGH_DATA;
+    if (mNextObject >= mOffsetCount || mOffsets[mNextObject] != mPosition) return BAD_TYPE;
+    binder_object_header header;
+    memcpy(&header, mData + mPosition, sizeof(header));
+    if (header.type != type) return BAD_TYPE;
+    memcpy(object, mData + mPosition, size);
+    mPosition += size;
+    *index = mNextObject++;
+    return OK;
+}
+
+status_t Parcel::readPointer(size_t length, size_t* handle, binder_buffer_object* object) const {
+    size_t index = 0;
+    const status_t status = readObject(BINDER_TYPE_PTR, object, sizeof(*object), &index);
+    if (status != OK) return status;
+    if (object->length != length) return BAD_VALUE;
+    if (handle != nullptr) *handle = index;
+    return OK;
+}
+
+status_t Parcel::readBuffer(size_t length, size_t* handle, const void** buffer) const {
+    binder_buffer_object object;
+    const status_t status = readPointer(length, handle, &object);
+    if (status != OK) return status;
+    if ((object.flags & BINDER_BUFFER_FLAG_HAS_PARENT) != 0) return BAD_VALUE;
+    *buffer = reinterpret_cast<const void*>(object.buffer);
+    return OK;
+}
+
+status_t Parcel::readEmbeddedBuffer(size_t length, size_t* handle, size_t parentHandle,
+                                    size_t parentOffset, const void** buffer) const {
+    binder_buffer_object object;
+    const status_t status = readPointer(length, handle, &object);
+    if (status != OK) return status;
+    if ((object.flags & BINDER_BUFFER_FLAG_HAS_PARENT) == 0 || object.parent != parentHandle ||
+        object.parent_offset != parentOffset || parentHandle >= mOffsetCount) {
+        return BAD_VALUE;
+    }
+    // Objects that overlap could have made the driver write over the address again.
+    binder_buffer_object parent;
+    memcpy(&parent, mData + mOffsets[parentHandle], sizeof(parent));
+    binder_uintptr_t address = 0;
+    memcpy(&address, reinterpret_cast<const uint8_t*>(parent.buffer) + parentOffset,
+           sizeof(address));
+    if (address != object.buffer) return BAD_VALUE;
+    *buffer = reinterpret_cast<const void*>(object.buffer);
+    return OK;
+}
+
+status_t Parcel::readNullableStrongBinder(sp<IBinder>* binder) const {
+    const bool isObject = mNextObject < mOffsetCount && mOffsets[mNextObject] == mPosition;
+    flat_binder_object object;
+    size_t index = 0;
+    if (!isObject) {
+        const uint8_t* place = read(sizeof(object));
+        if (place == nullptr) return NOT_ENOUGH_DATA;
+        memcpy(&object, place, sizeof(object));
+        *binder = nullptr;
+        return object.hdr.type == BINDER_TYPE_BINDER && object.binder == 0 ? OK : BAD_TYPE;
+    }
+    if (readObject(BINDER_TYPE_HANDLE, &object, sizeof(object), &index) == OK) {
+        *binder = ProcessState::self()->getStrongProxyForHandle(object.handle);
+        return OK;
+    }
+    const status_t status = readObject(BINDER_TYPE_BINDER, &object, sizeof(object), &index);
+    if (status == OK) *binder = reinterpret_cast<BHwBinder*>(object.cookie);
+    return status;
+}
+
+status_t Parcel::readNullableNativeHandleNoDup(const native_handle_t** handle) const {
+    uint64_t size = 0;
+    const status_t status = readUint64(&size);
+    if (status != OK) return status;
+    *handle = nullptr;
+    return size == 0 ? OK : INVALID_OPERATION;
+}
+
+size_t Parcel::buffersSize() const {
+    size_t total = 0;
+    for (size_t i = 0; i < mOffsetCount; ++i) {
+        binder_buffer_object object;
+        memcpy(&object.hdr, mData + mOffsets[i], sizeof(object.hdr));
+        if (object.hdr.type != BINDER_TYPE_PTR) continue;
+        memcpy(&object, mData + mOffsets[i], sizeof(object));
+        total += (object.length + 7) & ~size_t{7};
+    }
+    return total;
+}
+
+}  // namespace android::hardware

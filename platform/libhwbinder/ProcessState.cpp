@@ -1,0 +1,129 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Driver.h"
+#include "KernelDriver.h"
+#include "LocalDriver.h"
+
+#include <android/log.h>
+#include <hwbinder/BpHwBinder.h>
+#include <hwbinder/Host.h>
+#include <hwbinder/ProcessState.h>
+
+#include <atomic>
+#include <cstdlib>
+#include <thread>
+
+namespace android::hardware {
+namespace {
+
+constexpr char kDevice[] = "/dev/hwbinder";
+
+std::string environment(const char* name) {
+    const char* value = getenv(name);
+    return value == nullptr ? "" : value;
+}
+
+/** Chooses the driver. @param description takes which one it is, and why. */
+std::unique_ptr<Driver> chooseDriver(std::string* description) {
+    const std::string device = environment("HWBINDER_DEVICE");
+    if (!device.empty()) {
+        auto kernel = std::make_unique<KernelDriver>(device);
+        *description = (kernel->isOpen() ? device : kernel->error()) + ", as HWBINDER_DEVICE says";
+        return kernel;
+    }
+    auto local = std::make_unique<LocalDriver>();
+    if (!environment("HWBINDER_DIR").empty()) {
+        *description = local->name() + ", as HWBINDER_DIR says";
+        return local;
+    }
+    auto kernel = std::make_unique<KernelDriver>(kDevice);
+    if (kernel->isOpen()) {
+        *description = std::string(kDevice) + ", which is there";
+        return kernel;
+    }
+    *description = local->name() + ", because of " + kernel->error();
+    return local;
+}
+
+std::atomic<int>& timeout() {
+    static std::atomic<int> milliseconds = 0;
+    return milliseconds;
+}
+
+}  // namespace
+
+ProcessState::ProcessState() : mDriver(chooseDriver(&mDescription)) {}
+
+ProcessState* ProcessState::self() {
+    // Never destroyed: threads of the pool and objects with static lifetime use it to the end.
+    static auto* const state = new ProcessState;
+    return state;
+}
+
+void ProcessState::setThreadPoolConfiguration(size_t maxThreads, bool callerJoins) {
+    if (maxThreads != 1) {
+        __android_log_print(ANDROID_LOG_WARN, "hwbinder",
+                            "a pool of %zu threads was asked for; one thread serves all calls",
+                            maxThreads);
+    }
+    const std::lock_guard<std::mutex> lock(mMutex);
+    mCallerJoins = callerJoins;
+}
+
+void ProcessState::startThreadPool() {
+    const std::lock_guard<std::mutex> lock(mMutex);
+    if (mPoolStarted || mCallerJoins) return;
+    mPoolStarted = true;
+    std::thread([this] { joinThreadPool(); }).detach();
+}
+
+void ProcessState::joinThreadPool() {
+    const std::lock_guard<std::mutex> lock(mServing);
+    mDriver->serve();
+}
+
+sp<IBinder> ProcessState::getStrongProxyForHandle(uint32_t handle) {
+    const std::lock_guard<std::mutex> lock(mMutex);
+    wp<IBinder>& entry = mProxies[handle];
+    sp<IBinder> proxy = entry.promote();
+    if (proxy == nullptr) {
+        proxy = new BpHwBinder(handle);
+        entry = proxy;
+    }
+    return proxy;
+}
+
+bool ProcessState::expungeHandle(uint32_t handle, IBinder* proxy) {
+    const std::lock_guard<std::mutex> lock(mMutex);
+    const auto entry = mProxies.find(handle);
+    if (entry == mProxies.end() || entry->second.unsafe_get() != proxy) return false;
+    mProxies.erase(entry);
+    return true;
+}
+
+void ProcessState::sendObituary(uint32_t handle) {
+    sp<IBinder> proxy;
+    {
+        const std::lock_guard<std::mutex> lock(mMutex);
+        const auto entry = mProxies.find(handle);
+        if (entry != mProxies.end()) proxy = entry->second.promote();
+    }
+    if (proxy != nullptr) proxy->remoteBinder()->sendObituary();
+}
+
+int callTimeout() {
+    return timeout();
+}
+
+}  // namespace android::hardware
+
+namespace android::hardware::host {
+
+std::string transportDescription() {
+    return ProcessState::self()->driverDescription();
+}
+
+void setCallTimeout(std::chrono::milliseconds limit) {
+    timeout() = static_cast<int>(limit.count());
+}
+
+}  // namespace android::hardware::host

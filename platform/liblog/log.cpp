@@ -1,0 +1,145 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "LogFilter.h"
+
+#include <android/log.h>
+#include <fcntl.h>
+#include <poll.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <climits>
+#include <csignal>
+#include <cstdarg>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <ctime>
+#include <mutex>
+
+namespace android::log {
+namespace {
+
+/** Longest message; the rest of a longer one is cut off, as the system log does. */
+constexpr size_t kMaxMessage = 1024;
+constexpr size_t kMaxTag = 64;
+
+/**
+ * Keeps descriptor 2 occupied. Were it free, the next file opened would get it, and every log line
+ * would be written into that file.
+ */
+void occupyStandardError() {
+    if (fcntl(STDERR_FILENO, F_GETFD) != -1) return;
+    const int null = open("/dev/null", O_WRONLY);
+    if (null >= 0 && null != STDERR_FILENO) {
+        dup2(null, STDERR_FILENO);
+        close(null);
+    }
+}
+
+const LogFilter& filter() {
+    static const LogFilter instance = [] {
+        occupyStandardError();
+        const char* rules = getenv("ANDROID_LOG_TAGS");
+        LogFilter parsed(rules == nullptr ? "" : rules);
+        if (!parsed.firstBadRule().empty()) {
+            dprintf(STDERR_FILENO,
+                    "ANDROID_LOG_TAGS: \"%s\" is no rule of the form TAG[:VDIWEFS]\n",
+                    parsed.firstBadRule().c_str());
+        }
+        return parsed;
+    }();
+    return instance;
+}
+
+/** Copies text with its control characters escaped. @return the end of the copy. */
+char* escape(const char* text, char* out) {
+    constexpr char kHex[] = "0123456789abcdef";
+    for (; *text != '\0'; ++text) {
+        const auto byte = static_cast<unsigned char>(*text);
+        if (byte >= 0x20 && byte != 0x7f) {
+            *out++ = *text;
+        } else if (byte == '\n') {
+            *out++ = '\\';
+            *out++ = 'n';
+        } else {
+            *out++ = '\\';
+            *out++ = 'x';
+            *out++ = kHex[byte >> 4];
+            *out++ = kHex[byte & 15];
+        }
+    }
+    return out;
+}
+
+/**
+ * @return standard error or, where that is a terminal, the same terminal opened anew: a terminal
+ *     that is stopped makes a write wait although poll has promised room, and standard error cannot
+ *     be told not to wait without telling all who share it.
+ */
+int logDescriptor() {
+    struct stat info;
+    if (fstat(STDERR_FILENO, &info) != 0 || !S_ISCHR(info.st_mode)) return STDERR_FILENO;
+    static std::mutex mutex;
+    static int terminal = -1;
+    static dev_t device = 0;
+    const std::lock_guard<std::mutex> lock(mutex);
+    if (terminal < 0 || device != info.st_rdev) {
+        if (terminal >= 0) close(terminal);
+        terminal = open("/proc/self/fd/2", O_WRONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC);
+        device = info.st_rdev;
+    }
+    return terminal >= 0 ? terminal : STDERR_FILENO;
+}
+
+/** Writes without waiting for a slow reader, or being killed by SIGPIPE when it has gone. */
+int writeLine(const char* line, size_t length) {
+    const int descriptor = logDescriptor();
+    pollfd reader{descriptor, POLLOUT, 0};
+    if (poll(&reader, 1, 0) != 1 || reader.revents != POLLOUT) return -EAGAIN;
+
+    sigset_t pipeSignal;
+    sigset_t before;
+    sigemptyset(&pipeSignal);
+    sigaddset(&pipeSignal, SIGPIPE);
+    pthread_sigmask(SIG_BLOCK, &pipeSignal, &before);
+    const int result = write(descriptor, line, length) < 0 ? -errno : 1;
+    if (result == -EPIPE && sigismember(&before, SIGPIPE) == 0) {
+        const timespec now{0, 0};
+        sigtimedwait(&pipeSignal, nullptr, &now);
+    }
+    pthread_sigmask(SIG_SETMASK, &before, nullptr);
+    return result;
+}
+
+int printLine(int priority, const char* tag, const char* format, va_list arguments) {
+    char message[kMaxMessage];
+    // NOLINTNEXTLINE(clang-analyzer-valist.Uninitialized): the caller has started it
+    vsnprintf(message, sizeof(message), format, arguments);
+
+    constexpr char kLetters[] = "??VDIWEFS";
+    char line[kMaxTag + 32 + 4 * kMaxMessage];
+    const int prefix = snprintf(line, kMaxTag + 31, "%c/%-8.*s(%5d): ", kLetters[priority],
+                                static_cast<int>(kMaxTag), tag, getpid());
+    char* end = escape(message, line + prefix);
+    // A pipe takes so much in one piece, or nothing of it.
+    if (end - line >= PIPE_BUF) end = line + PIPE_BUF - 1;
+    *end++ = '\n';
+    return writeLine(line, static_cast<size_t>(end - line));
+}
+
+}  // namespace
+}  // namespace android::log
+
+int __android_log_print(int prio, const char* tag, const char* fmt, ...) {
+    if (prio < ANDROID_LOG_VERBOSE || prio > ANDROID_LOG_FATAL) prio = ANDROID_LOG_DEBUG;
+    if (!android::log::filter().shows(prio, tag)) return 0;
+
+    const int error = errno;
+    va_list arguments;
+    va_start(arguments, fmt);
+    const int result = android::log::printLine(prio, tag, fmt, arguments);
+    va_end(arguments);
+    errno = error;
+    return result;
+}
