@@ -1,7 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Driver.h"
 
-#include <sys/stat.h>
+#include "Faults.h"
+#include "Folder.h"
+
+#include <fcntl.h>
 
 #include <algorithm>
 #include <cerrno>
@@ -12,14 +15,10 @@
 #include <cstring>
 #include <ctime>
 #include <filesystem>
-#include <fstream>
-#include <sstream>
 #include <string_view>
 
 namespace simulator {
 namespace {
-
-namespace fs = std::filesystem;
 
 /** The most that sysfs takes in one write. */
 constexpr size_t kPageSize = 4096;
@@ -27,19 +26,24 @@ constexpr size_t kPageSize = 4096;
 constexpr std::string_view kTimedOutputDirectory = "/sys/class/timed_output/vibrator/";
 constexpr std::string_view kLedTriggerDirectory = "/sys/class/leds/vibrator/";
 
+/** Marks a folder as one that may be written to. */
+constexpr char kMarkFile[] = ".vibrator-sim";
+
 /** Holds, beside the nodes, when the motor stops: nanoseconds of the monotonic clock. */
 constexpr char kDeadlineFile[] = ".deadline";
 
-std::string readFile(const std::string& path) {
-    std::ostringstream text;
-    text << std::ifstream(path).rdbuf();
-    return text.str();
+std::string_view folderOf(Layout layout) {
+    return layout == Layout::kTimedOutput ? kTimedOutputDirectory : kLedTriggerDirectory;
 }
 
-bool writeFile(const std::string& path, std::string_view text) {
-    std::ofstream file(path, std::ios::trunc);
-    file << text;
-    return static_cast<bool>(file.flush());
+/** @return the folder of a sysfs directory, whose path begins and ends with a slash. */
+Folder openBelow(const std::string& directory, std::string_view path, bool create = false) {
+    return {Folder(directory), std::string(path.substr(1, path.size() - 2)), create};
+}
+
+/** @return the folder that a node's file lies in. */
+Folder folderOf(const Node& node) {
+    return openBelow(node.directory, node.path.substr(0, node.path.rfind('/') + 1));
 }
 
 int64_t now() {
@@ -51,25 +55,30 @@ int64_t now() {
 /** The motor's one-shot timer, beside the given node's file. */
 class Timer {
   public:
-    explicit Timer(const Node& node) : mFile(fs::path(node.file).replace_filename(kDeadlineFile)) {}
+    explicit Timer(const Node& node) : mFolder(folderOf(node)) {}
 
-    void start(uint64_t milliseconds) {
+    /** @return 0, or a negative errno. */
+    int start(uint64_t milliseconds) const {
         constexpr uint64_t kMost = 1'000'000'000'000;
         const auto time = static_cast<int64_t>(std::min(milliseconds, kMost));
-        writeFile(mFile, std::to_string(now() + time * 1'000'000));
+        return set(now() + time * 1'000'000);
     }
-    void stop() { writeFile(mFile, "0"); }
+    int stop() const { return set(0); }
 
     /** @return the time left in ms, rounded up; 0 when the motor does not run. */
     int64_t remaining() const {
         int64_t deadline = 0;
-        const std::string text = readFile(mFile);
+        const std::string text = mFolder.read(kDeadlineFile);
         std::from_chars(text.data(), text.data() + text.size(), deadline);
         return std::max<int64_t>(0, (deadline - now() + 999'999) / 1'000'000);
     }
 
   private:
-    std::string mFile;
+    int set(int64_t deadline) const {
+        return -mFolder.replace(kDeadlineFile, std::to_string(deadline), 0644);
+    }
+
+    Folder mFolder;
 };
 
 /**
@@ -90,9 +99,14 @@ int parseKernelNumber(std::string_view text, Number* number) {
     return error == std::errc() ? 0 : -ERANGE;
 }
 
+int storeText(const Node& node, std::string_view text) {
+    const Folder folder = folderOf(node);
+    return -folder.replace(node.leaf(), text, folder.mode(node.leaf()) & 07777);
+}
+
 template <typename Number>
 int hold(const Node& node, Number number) {
-    return writeFile(node.file, std::to_string(number) + "\n") ? 0 : -EIO;
+    return storeText(node, std::to_string(number) + "\n");
 }
 
 /** Holds a number from a range that the driver checks. */
@@ -108,12 +122,8 @@ int storeNumber(const Node& node, std::string_view text) {
 int storeEnable(const Node& node, std::string_view text) {
     int milliseconds = 0;
     if (sscanf(std::string(text).c_str(), "%d", &milliseconds) != 1) return -EINVAL;
-    if (milliseconds > 0) {
-        Timer(node).start(static_cast<uint64_t>(milliseconds));
-    } else {
-        Timer(node).stop();
-    }
-    return 0;
+    const Timer timer(node);
+    return milliseconds > 0 ? timer.start(static_cast<uint64_t>(milliseconds)) : timer.stop();
 }
 
 std::string showEnable(const Node& node) {
@@ -126,14 +136,10 @@ int storeActivate(const Node& node, std::string_view text) {
     const int error = parseKernelNumber(text, &state);
     if (error != 0) return error;
     if (state > 1) return -EINVAL;
-    Timer timer(node);
-    if (state == 0) {
-        timer.stop();
-    } else if (timer.remaining() == 0) {
-        const fs::path duration = fs::path(node.file).replace_filename("duration");
-        timer.start(strtoull(readFile(duration).c_str(), nullptr, 10));
-    }
-    return 0;
+    const Timer timer(node);
+    if (state == 0) return timer.stop();
+    if (timer.remaining() > 0) return 0;
+    return timer.start(strtoull(folderOf(node).read("duration").c_str(), nullptr, 10));
 }
 
 std::string showActivate(const Node& node) {
@@ -145,10 +151,6 @@ int storeDuration(const Node& node, std::string_view text) {
     unsigned long milliseconds = 0;
     const int error = parseKernelNumber(text, &milliseconds);
     return error != 0 ? error : hold(node, milliseconds);
-}
-
-int storeText(const Node& node, std::string_view text) {
-    return writeFile(node.file, text) ? 0 : -EIO;
 }
 
 /** "COUNT v v v v ...\n": COUNT values follow, four a packet. */
@@ -244,8 +246,7 @@ const Attribute* findAttribute(const Node& node) {
 }  // namespace
 
 std::string sysfsDirectory(Layout layout) {
-    return std::string(layout == Layout::kTimedOutput ? kTimedOutputDirectory
-                                                      : kLedTriggerDirectory);
+    return std::string(folderOf(layout));
 }
 
 std::vector<std::string> featureNames() {
@@ -258,30 +259,36 @@ std::vector<std::string> featureNames() {
     return names;
 }
 
-int createDriver(const std::string& directory, Layout layout, const Features& features) {
-    const std::string nodes = directory + sysfsDirectory(layout);
-    std::error_code error;
-    fs::create_directories(nodes, error);
-    // The driver that was there before may be running its motor, and have faults.
-    if (!error) fs::remove(nodes + kDeadlineFile, error);
-    if (!error) fs::remove_all(directory + "/faults", error);
-    if (!error) fs::create_directories(directory + "/faults", error);
-    if (error) return error.value();
+bool isMarked(const Folder& directory) {
+    return S_ISREG(directory.mode(kMarkFile));
+}
 
-    const auto create = [&](const Attribute& attribute) {
-        const std::string file = nodes + attribute.leaf;
-        fs::remove(file, error);
-        if (attribute.feature != nullptr && features.names.count(attribute.feature) == 0) return 0;
-        std::string initial = attribute.initial;
-        if (file == nodes + "motor_type") initial = features.motor + "\n";
-        if (file == nodes + "num_waves") initial = std::to_string(features.waves) + "\n";
-        if (!writeFile(file, initial) || chmod(file.c_str(), attribute.mode) != 0) return EIO;
-        return 0;
-    };
-    int result = 0;
+int claimDirectory(const std::string& directory) {
+    std::error_code error;
+    std::filesystem::create_directories(directory, error);
+    if (error) return error.value();
+    const Folder folder(directory);
+    if (isMarked(folder)) return 0;
+    if (!folder.isEmpty()) return folder.error() != 0 ? folder.error() : ENOTEMPTY;
+    return folder.replace(kMarkFile, "", 0644);
+}
+
+int createNodes(const std::string& directory, Layout layout, const Features& features) {
+    const Folder nodes = openBelow(directory, folderOf(layout), true);
+    // The driver that was there before may be running its motor.
+    nodes.remove(kDeadlineFile);
+    int error = nodes.error();
     const auto createAll = [&](const auto& attributes) {
         for (const Attribute& attribute : attributes) {
-            if (result == 0) result = create(attribute);
+            const std::string leaf = attribute.leaf;
+            if (attribute.feature != nullptr && features.names.count(attribute.feature) == 0) {
+                nodes.remove(leaf);
+                continue;
+            }
+            std::string initial = attribute.initial;
+            if (leaf == "motor_type") initial = features.motor + "\n";
+            if (leaf == "num_waves") initial = std::to_string(features.waves) + "\n";
+            if (error == 0) error = nodes.replace(leaf, initial, attribute.mode);
         }
     };
     createAll(kCommonAttributes);
@@ -290,7 +297,13 @@ int createDriver(const std::string& directory, Layout layout, const Features& fe
     } else {
         createAll(kLedTriggerAttributes);
     }
-    return result;
+    return error;
+}
+
+int createDriver(const std::string& directory, Layout layout, const Features& features) {
+    int error = claimDirectory(directory);
+    if (error == 0) error = clearFaults(directory);
+    return error != 0 ? error : createNodes(directory, layout, features);
 }
 
 std::string Node::name() const {
@@ -307,28 +320,37 @@ bool findNode(const std::string& directory, const char* path, Node* node) {
         return strncmp(path, place.data(), place.size()) == 0;
     };
     if (!liesIn(kTimedOutputDirectory) && !liesIn(kLedTriggerDirectory)) return false;
-    *node = {path, directory + path};
+    *node = {path, directory, directory + path};
     return true;
 }
 
 std::vector<Node> listNodes(const std::string& directory) {
     std::vector<Node> nodes;
-    for (const std::string_view place : {kTimedOutputDirectory, kLedTriggerDirectory}) {
-        std::error_code error;
-        for (const auto& entry : fs::directory_iterator(directory + std::string(place), error)) {
-            const std::string leaf = entry.path().filename();
-            if (leaf != kDeadlineFile) nodes.push_back({std::string(place) + leaf, entry.path()});
+    for (const std::string_view place : {kLedTriggerDirectory, kTimedOutputDirectory}) {
+        for (const std::string& leaf : openBelow(directory, place).names()) {
+            const std::string path = std::string(place) + leaf;
+            nodes.push_back({path, directory, directory + path});
         }
     }
-    std::sort(nodes.begin(), nodes.end(),
-              [](const Node& a, const Node& b) { return a.path < b.path; });
     return nodes;
+}
+
+int openNode(const Node& node, int flags) {
+    const std::string leaf = node.leaf();
+    const Folder folder = folderOf(node);
+    // The driver's own mode binds root too, who is let into any plain file.
+    const mode_t mode = folder.mode(leaf);
+    const bool reads = (flags & O_ACCMODE) != O_WRONLY;
+    const bool writes = (flags & O_ACCMODE) != O_RDONLY;
+    if (mode == 0 || leaf[0] == '.') return -ENOENT;
+    if ((reads && (mode & 0444) == 0) || (writes && (mode & 0222) == 0)) return -EACCES;
+    return folder.open(leaf, flags & O_ACCMODE);
 }
 
 std::string show(const Node& node) {
     const Attribute* attribute = findAttribute(node);
     if (attribute != nullptr && attribute->show != nullptr) return attribute->show(node);
-    return readFile(node.file);
+    return folderOf(node).read(node.leaf());
 }
 
 ssize_t store(const Node& node, const std::string& bytes) {

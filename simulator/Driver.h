@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "Folder.h"
+
 #include <sys/types.h>
 
 #include <cstddef>
@@ -32,13 +34,28 @@ struct Features {
 /** @return all features that a driver can have. */
 std::vector<std::string> featureNames();
 
-/** Makes the nodes of a driver below a directory. @return an errno, 0 for success. */
+/**
+ * Takes a directory for a simulated driver: makes it, or marks it when it is empty.
+ *
+ * @return an errno, 0 for success; ENOTEMPTY for one with something in it and without the mark.
+ */
+int claimDirectory(const std::string& directory);
+/** @return whether a directory has been claimed. */
+bool isMarked(const Folder& directory);
+/**
+ * Makes a driver in a directory that can be claimed, in place of one of the same layout. Follows
+ * no links inside. @return an errno, 0 for success.
+ */
 int createDriver(const std::string& directory, Layout layout, const Features& features);
+/** Makes just the nodes, in any directory, "" being the root. @return an errno, 0 for success. */
+int createNodes(const std::string& directory, Layout layout, const Features& features);
 
 /** A node of the simulated driver. */
 struct Node {
     /** Its path on a device. */
     std::string path;
+    /** The directory of the driver. */
+    std::string directory;
     /** The file that holds its state. */
     std::string file;
 
@@ -51,8 +68,11 @@ struct Node {
 /** @return whether a path lies where the driver's nodes are; then *node is that node. */
 bool findNode(const std::string& directory, const char* path, Node* node);
 
-/** @return the names, like "leds/intensity", of the nodes that exist below a directory. */
+/** @return the nodes that exist below a directory. */
 std::vector<Node> listNodes(const std::string& directory);
+
+/** Opens a node's file as the kernel would the node. @return a descriptor, or a negative errno. */
+int openNode(const Node& node, int flags);
 
 /** @return what reading the node yields now. */
 std::string show(const Node& node);

@@ -1,16 +1,60 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Faults.h"
 
+#include "Folder.h"
+#include "Trace.h"
+
+#include <fcntl.h>
+#include <sys/file.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdio>
 #include <cstring>
-#include <filesystem>
-#include <fstream>
 
 namespace simulator {
 namespace {
 
-std::string faultFile(const std::string& directory, const std::string& leaf,
-                      const std::string& operation) {
-    return directory + "/faults/" + leaf + "." + operation;
+constexpr char kPrefix[] = "fault.";
+
+std::string fileName(const std::string& leaf, const std::string& operation) {
+    return kPrefix + leaf + "." + operation;
+}
+
+std::vector<std::string> faultFiles(const Folder& folder) {
+    std::vector<std::string> names = folder.names();
+    names.erase(std::remove_if(names.begin(), names.end(),
+                               [](const auto& name) { return name.find(kPrefix) != 0; }),
+                names.end());
+    return names;
+}
+
+std::string inWords(const Fault& fault) {
+    return std::to_string(fault.error) + ' ' + std::to_string(fault.bytes) + ' ' +
+           std::to_string(fault.times) + ' ' + std::to_string(fault.after) + '\n';
+}
+
+std::optional<Fault> fromWords(const std::string& text) {
+    Fault fault;
+    const int fields = sscanf(text.c_str(), "%d %zu %u %u", &fault.error, &fault.bytes,
+                              &fault.times, &fault.after);
+    return fields == 4 ? std::optional(fault) : std::nullopt;
+}
+
+/** Reads a fault from its file, and leaves there what it is after this time. */
+std::optional<Fault> countDown(int file) {
+    char text[64] = {};
+    if (pread(file, text, sizeof(text) - 1, 0) < 0) return std::nullopt;
+    const std::optional<Fault> fault = fromWords(text);
+    if (!fault || (fault->times == 0 && fault->after == 0)) return fault;
+
+    Fault left = *fault;
+    const bool happens = fault->after == 0;
+    --(happens ? left.times : left.after);
+    // The file of a fault that is used up is empty.
+    const std::string words = happens && left.times == 0 ? "" : inWords(left);
+    if (ftruncate(file, 0) != 0 || pwrite(file, words.data(), words.size(), 0) < 0) return fault;
+    return happens ? fault : std::nullopt;
 }
 
 }  // namespace
@@ -37,34 +81,44 @@ std::optional<Fault> parseFault(const std::string& text) {
 
 bool setFault(const std::string& directory, const std::string& leaf, const std::string& operation,
               const std::optional<Fault>& fault) {
-    const std::string path = faultFile(directory, leaf, operation);
-    if (!fault) {
-        std::error_code error;
-        std::filesystem::remove(path, error);
-        return !error;
-    }
-    std::ofstream file(path, std::ios::trunc);
-    file << fault->error << ' ' << fault->bytes << ' ' << fault->times << ' ' << fault->after
-         << '\n';
-    return static_cast<bool>(file.flush());
+    const Folder folder(directory);
+    if (fault) return folder.replace(fileName(leaf, operation), inWords(*fault), 0644) == 0;
+    folder.remove(fileName(leaf, operation));
+    return folder.error() == 0;
 }
 
-std::optional<Fault> takeFault(const std::string& directory, const std::string& leaf,
+std::optional<Fault> takeFault(const Folder& directory, const std::string& leaf,
                                const std::string& operation) {
-    Fault fault;
-    std::ifstream file(faultFile(directory, leaf, operation));
-    if (!(file >> fault.error >> fault.bytes >> fault.times >> fault.after)) return std::nullopt;
-    if (fault.after > 0) {
-        --fault.after;
-        setFault(directory, leaf, operation, fault);
-        return std::nullopt;
-    }
-    if (fault.times > 0) {
-        Fault left = fault;
-        --left.times;
-        setFault(directory, leaf, operation, left.times > 0 ? std::optional(left) : std::nullopt);
-    }
+    const int file = onlyLooks() ? -1 : directory.open(fileName(leaf, operation), O_RDWR);
+    if (file < 0) return std::nullopt;
+    std::optional<Fault> fault;
+    if (flock(file, LOCK_EX) == 0) fault = countDown(file);
+    close(file);
     return fault;
+}
+
+std::vector<std::string> listFaults(const std::string& directory) {
+    std::vector<std::string> lines;
+    const Folder folder(directory);
+    for (const std::string& name : faultFiles(folder)) {
+        const auto fault = fromWords(folder.read(name));
+        if (!fault) continue;
+        std::string line = name.substr(strlen(kPrefix));
+        line.replace(line.rfind('.'), 1, " ");
+        line += fault->error != 0 ? std::string(" ") + strerrorname_np(fault->error)
+                                  : " short=" + std::to_string(fault->bytes);
+        if (fault->times > 0) line += ", " + std::to_string(fault->times) + " times";
+        if (fault->after > 0) line += ", after " + std::to_string(fault->after);
+        lines.push_back(line);
+    }
+    return lines;
+}
+
+int clearFaults(const std::string& directory) {
+    const Folder folder(directory);
+    for (const std::string& name : faultFiles(folder))
+        folder.remove(name);
+    return folder.error();
 }
 
 }  // namespace simulator

@@ -1,9 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "Folder.h"
+
 #include <cstddef>
 #include <optional>
 #include <string>
+#include <vector>
 
 namespace simulator {
 
@@ -15,7 +18,7 @@ struct Fault {
     size_t bytes = 0;
     /** How often it still happens; 0 for ever. */
     unsigned times = 0;
-    /** How often the operation still goes well before. */
+    /** How often the operation still succeeds before. */
     unsigned after = 0;
 };
 
@@ -32,8 +35,17 @@ std::optional<Fault> parseFault(const std::string& text);
 bool setFault(const std::string& directory, const std::string& leaf, const std::string& operation,
               const std::optional<Fault>& fault);
 
-/** @return what goes wrong this time; counts it. */
-std::optional<Fault> takeFault(const std::string& directory, const std::string& leaf,
+/**
+ * @return what goes wrong this time. Counts it: of several processes that ask at once, only as many
+ *         get the fault as it has times left.
+ */
+std::optional<Fault> takeFault(const Folder& directory, const std::string& leaf,
                                const std::string& operation);
+
+/** @return a line for each fault that is set, like "intensity write EIO, 2 times". */
+std::vector<std::string> listFaults(const std::string& directory);
+
+/** Takes back all that was set. @return an errno, 0 for success. */
+int clearFaults(const std::string& directory);
 
 }  // namespace simulator

@@ -1,4 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "Driver.h"
+#include "Trace.h"
+
 #include <unistd.h>
 
 #include <cstdio>
@@ -9,12 +12,14 @@ namespace {
 /** Says at the start what would otherwise look like a kernel without a driver. */
 __attribute__((constructor)) void checkDirectory() {
     const char* directory = getenv("VIBRATOR_SIM_DIR");
-    if (directory == nullptr) {
+    if (directory == nullptr || *directory == '\0') {
         dprintf(STDERR_FILENO,
                 "libvibrator_sim: VIBRATOR_SIM_DIR is not set, nothing is simulated\n");
-    } else if (access(directory, X_OK) != 0) {
-        dprintf(STDERR_FILENO, "libvibrator_sim: VIBRATOR_SIM_DIR: %s: ", directory);
-        perror(nullptr);
+    } else if (!simulator::isMarked(simulator::Folder(directory))) {
+        dprintf(STDERR_FILENO,
+                "libvibrator_sim: VIBRATOR_SIM_DIR: %s has no simulated driver, nothing is traced; "
+                "\"vibrator-sim create\" makes one\n",
+                simulator::quote(directory).c_str());
     }
 }
 

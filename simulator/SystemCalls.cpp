@@ -11,7 +11,6 @@
 #include "Trace.h"
 
 #include <fcntl.h>
-#include <sys/stat.h>
 #include <sys/syscall.h>
 #include <unistd.h>
 
@@ -22,10 +21,12 @@
 #include <cstdlib>
 #include <cstring>
 #include <map>
+#include <memory>
 #include <mutex>
 
 namespace {
 
+using simulator::Folder;
 using simulator::Node;
 
 int kernelOpen(const char* path, int flags, mode_t mode) {
@@ -43,8 +44,10 @@ int kernelClose(int file) {
 
 /** A node that is open; its descriptor is one of the file that holds its state. */
 struct OpenNode {
-    std::string directory;
     Node node;
+    std::shared_ptr<const Folder> directory;
+    /** What it has shown at its first read: the next ones go on in that. */
+    std::string shown;
     size_t offset = 0;
 };
 
@@ -60,13 +63,16 @@ class OpenNodes {
     /** @return whether any node is open; does without a lock in the common case that none is. */
     static bool any() { return sCount.load(std::memory_order_acquire) > 0; }
 
+    // What goes is destroyed without the lock: it closes a folder, and close takes the lock.
     void add(int file, OpenNode node) {
         const std::lock_guard<std::mutex> lock(mMutex);
-        mNodes[file] = std::move(node);
+        std::swap(mNodes[file], node);
         sCount = static_cast<int>(mNodes.size());
     }
     void remove(int file) {
+        OpenNode gone;
         const std::lock_guard<std::mutex> lock(mMutex);
+        std::swap(mNodes[file], gone);
         mNodes.erase(file);
         sCount = static_cast<int>(mNodes.size());
     }
@@ -104,36 +110,24 @@ const char* accessName(int flags) {
     return kNames[flags & O_ACCMODE];
 }
 
-/** Opens a node as the kernel would. @return a descriptor, or a negative errno. */
-int openNode(const Node& node, int flags) {
-    struct stat info;
-    if (stat(node.file.c_str(), &info) != 0) return -errno;
-    // Root is let into any plain file, but the driver's own mode binds root too.
-    const bool reads = (flags & O_ACCMODE) != O_WRONLY;
-    const bool writes = (flags & O_ACCMODE) != O_RDONLY;
-    if ((reads && (info.st_mode & 0444) == 0) || (writes && (info.st_mode & 0222) == 0)) {
-        return -EACCES;
-    }
-    const int file = kernelOpen(node.file.c_str(), flags & (O_ACCMODE | O_CLOEXEC | O_NONBLOCK), 0);
-    return file < 0 ? -errno : file;
-}
-
-int simulateOpen(const std::string& directory, const Node& node, int flags) {
+int simulateOpen(const Node& node, int flags) {
+    const auto directory = std::make_shared<const Folder>(node.directory);
     const std::string access = node.name() + " open " + accessName(flags);
-    const auto fault = simulator::takeFault(directory, node.leaf(), "open");
-    const int file = fault ? -fault->error : openNode(node, flags);
-    simulator::trace(directory, access, std::min(file, 0));
-    if (file >= 0) OpenNodes::instance().add(file, {directory, node});
+    const auto fault = simulator::takeFault(*directory, node.leaf(), "open");
+    const int file = fault ? -fault->error : simulator::openNode(node, flags);
+    simulator::trace(*directory, access, std::min(file, 0));
+    if (file >= 0) OpenNodes::instance().add(file, {node, directory, {}});
     return file;
 }
 
 ssize_t simulateRead(OpenNode& open, void* buffer, size_t size) {
-    const auto fault = simulator::takeFault(open.directory, open.node.leaf(), "read");
+    const auto fault = simulator::takeFault(*open.directory, open.node.leaf(), "read");
     ssize_t result = 0;
     if (fault && fault->error != 0) {
         result = -fault->error;
     } else {
-        const std::string text = simulator::show(open.node);
+        if (open.offset == 0) open.shown = simulator::show(open.node);
+        const std::string& text = open.shown;
         const size_t start = std::min(open.offset, text.size());
         size_t length = std::min(size, text.size() - start);
         if (fault) length = std::min(length, fault->bytes);
@@ -142,14 +136,14 @@ ssize_t simulateRead(OpenNode& open, void* buffer, size_t size) {
         result = static_cast<ssize_t>(length);
     }
     const auto shown = static_cast<size_t>(std::max<ssize_t>(result, 0));
-    simulator::trace(open.directory, open.node.name() + " read " + std::to_string(size), result,
+    simulator::trace(*open.directory, open.node.name() + " read " + std::to_string(size), result,
                      result < 0 ? "" : simulator::quote({static_cast<char*>(buffer), shown}));
     return result;
 }
 
 ssize_t simulateWrite(const OpenNode& open, const void* buffer, size_t size) {
     const std::string bytes(static_cast<const char*>(buffer), size);
-    const auto fault = simulator::takeFault(open.directory, open.node.leaf(), "write");
+    const auto fault = simulator::takeFault(*open.directory, open.node.leaf(), "write");
     ssize_t result = 0;
     if (!fault) {
         result = simulator::store(open.node, bytes);
@@ -158,15 +152,15 @@ ssize_t simulateWrite(const OpenNode& open, const void* buffer, size_t size) {
         result = fault->error != 0 ? -fault->error
                                    : static_cast<ssize_t>(std::min(size, fault->bytes));
     }
-    simulator::trace(open.directory, open.node.name() + " write " + simulator::quote(bytes),
+    simulator::trace(*open.directory, open.node.name() + " write " + simulator::quote(bytes),
                      result);
     return result;
 }
 
 int simulateClose(int file, const OpenNode& open) {
-    const auto fault = simulator::takeFault(open.directory, open.node.leaf(), "close");
+    const auto fault = simulator::takeFault(*open.directory, open.node.leaf(), "close");
     const int result = fault ? -fault->error : 0;
-    simulator::trace(open.directory, open.node.name() + " close", result);
+    simulator::trace(*open.directory, open.node.name() + " close", result);
     OpenNodes::instance().remove(file);
     kernelClose(file);
     return result;
@@ -179,8 +173,9 @@ bool takesMode(int flags) {
 int openAnything(const char* path, int flags, mode_t mode) {
     const char* directory = getenv("VIBRATOR_SIM_DIR");
     Node node;
-    if (directory != nullptr && path != nullptr && simulator::findNode(directory, path, &node)) {
-        return answer([&] { return simulateOpen(directory, node, flags); });
+    if (directory != nullptr && *directory != '\0' && path != nullptr &&
+        simulator::findNode(directory, path, &node)) {
+        return answer([&] { return simulateOpen(node, flags); });
     }
     return kernelOpen(path, flags, mode);
 }

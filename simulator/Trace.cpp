@@ -1,7 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Trace.h"
 
+#include "Driver.h"
+#include "Folder.h"
+
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cstdio>
@@ -10,13 +14,22 @@
 
 namespace simulator {
 
+namespace {
+
+constexpr char kTraceName[] = "trace";
+
+bool sOnlyLooks = false;
+
+}  // namespace
+
 std::string traceFile(const std::string& directory) {
-    return directory + "/trace";
+    return directory + "/" + kTraceName;
 }
 
 std::string quote(std::string_view bytes) {
     std::string quoted = "\"";
     for (const char c : bytes) {
+        const auto byte = static_cast<unsigned char>(c);
         if (c == '\n') {
             quoted += "\\n";
         } else if (c == '\0') {
@@ -24,9 +37,9 @@ std::string quote(std::string_view bytes) {
         } else if (c == '"' || c == '\\') {
             quoted += '\\';
             quoted += c;
-        } else if (c < 0x20 || c == 0x7f) {
+        } else if (byte < 0x20 || byte >= 0x7f) {
             char hex[8];
-            snprintf(hex, sizeof(hex), "\\x%02x", static_cast<unsigned char>(c));
+            snprintf(hex, sizeof(hex), "\\x%02x", byte);
             quoted += hex;
         } else {
             quoted += c;
@@ -35,8 +48,9 @@ std::string quote(std::string_view bytes) {
     return quoted + '"';
 }
 
-void trace(const std::string& directory, const std::string& access, long result,
+void trace(const Folder& directory, const std::string& access, long result,
            const std::string& shown) {
+    if (sOnlyLooks || !isMarked(directory)) return;
     timespec time{};
     clock_gettime(CLOCK_MONOTONIC, &time);
     char clock[32];
@@ -48,13 +62,23 @@ void trace(const std::string& directory, const std::string& access, long result,
     if (!shown.empty()) line += " " + shown;
     line += '\n';
 
-    const int file =
-            open(traceFile(directory).c_str(), O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC, 0666);
-    if (file < 0) return;
+    const int file = directory.open(kTraceName, O_WRONLY | O_APPEND | O_CREAT, 0644);
+    struct stat info;
+    if (file < 0 || fstat(file, &info) != 0) return;
     // One write a line, so that the lines of several processes do not mix. There is nobody to
     // complain to when it fails.
-    [[maybe_unused]] const ssize_t written = write(file, line.data(), line.size());
+    if (info.st_size < kTraceLimit) {
+        [[maybe_unused]] const ssize_t written = write(file, line.data(), line.size());
+    }
     close(file);
+}
+
+void onlyLook() {
+    sOnlyLooks = true;
+}
+
+bool onlyLooks() {
+    return sOnlyLooks;
 }
 
 }  // namespace simulator

@@ -1,0 +1,144 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Folder.h"
+
+#include <dirent.h>
+#include <fcntl.h>
+#include <linux/openat2.h>
+#include <sys/syscall.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+
+namespace simulator {
+namespace {
+
+constexpr int kOpenFolder = O_PATH | O_DIRECTORY | O_CLOEXEC;
+
+/** @return a name that stays in its folder; of what would not, "", which no call takes. */
+const char* inside(const std::string& name) {
+    const bool leaves = name.find('/') != std::string::npos || name == "." || name == "..";
+    return leaves ? "" : name.c_str();
+}
+
+/** Opens the folder at a relative path, one after the other of those on the way. */
+int walk(int above, std::string_view path, bool create) {
+    int file = fcntl(above, F_DUPFD_CLOEXEC, 0);
+    while (file >= 0 && !path.empty()) {
+        const std::string name(path.substr(0, path.find('/')));
+        path.remove_prefix(std::min(name.size() + 1, path.size()));
+        if (create) mkdirat(file, inside(name), 0755);
+        const int next = openat(file, inside(name), kOpenFolder | O_NOFOLLOW);
+        const int error = errno;
+        close(file);
+        errno = error;
+        file = next;
+    }
+    return file;
+}
+
+}  // namespace
+
+// openat throughout: in a program with the stand-ins, open is one of them.
+Folder::Folder(const std::string& path)
+    : mFile(openat(AT_FDCWD, path.empty() ? "/" : path.c_str(), kOpenFolder)) {
+    if (mFile < 0) mError = errno;
+}
+
+Folder::Folder(const Folder& above, const std::string& path, bool create)
+    : mFile(-1), mError(above.mError) {
+    if (mError != 0) return;
+    open_how how{};
+    how.flags = kOpenFolder;
+    how.resolve = RESOLVE_BENEATH | RESOLVE_NO_SYMLINKS;
+    if (!create) {
+        mFile = static_cast<int>(
+                syscall(SYS_openat2, above.mFile, path.c_str(), &how, sizeof(how)));
+    }
+    // Neither old kernels nor emulators know that call.
+    if (create || (mFile < 0 && errno == ENOSYS)) mFile = walk(above.mFile, path, create);
+    if (mFile < 0) mError = errno;
+}
+
+Folder::~Folder() {
+    if (mFile >= 0) close(mFile);
+}
+
+mode_t Folder::mode(const std::string& name) const {
+    struct stat info;
+    return fstatat(mFile, inside(name), &info, AT_SYMLINK_NOFOLLOW) == 0 ? info.st_mode : 0;
+}
+
+int Folder::open(const std::string& name, int flags, mode_t mode) const {
+    if (mError != 0) return -mError;
+    // O_NONBLOCK: a pipe in a file's place must not hold anybody up.
+    constexpr int kSafely = O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC;
+    const int file = openat(mFile, inside(name), flags | kSafely, mode);
+    if (file < 0) return -errno;
+    struct stat info;
+    if (fstat(file, &info) == 0 && S_ISREG(info.st_mode)) return file;
+    close(file);
+    return -EINVAL;
+}
+
+std::string Folder::read(const std::string& name) const {
+    std::string text;
+    const int file = open(name, O_RDONLY);
+    if (file < 0) return text;
+    char piece[4096];
+    for (ssize_t count; (count = ::read(file, piece, sizeof(piece))) > 0;)
+        text.append(piece, static_cast<size_t>(count));
+    close(file);
+    return text;
+}
+
+int Folder::replace(const std::string& name, std::string_view text, mode_t mode) const {
+    if (mError != 0) return mError;
+    // One for each thread; what a killed one has left is taken away.
+    const std::string fresh = ".new." + std::to_string(gettid());
+    constexpr int kNew = O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC;
+    int file = openat(mFile, fresh.c_str(), kNew, 0600);
+    if (file < 0 && errno == EEXIST) {
+        remove(fresh);
+        file = openat(mFile, fresh.c_str(), kNew, 0600);
+    }
+    if (file < 0) return errno;
+    errno = ENOSPC;
+    const bool isDone =
+            write(file, text.data(), text.size()) == static_cast<ssize_t>(text.size()) &&
+            fchmod(file, mode) == 0 && renameat(mFile, fresh.c_str(), mFile, inside(name)) == 0;
+    const int error = isDone ? 0 : errno;
+    close(file);
+    if (!isDone) remove(fresh);
+    return error;
+}
+
+void Folder::remove(const std::string& name) const {
+    unlinkat(mFile, inside(name), 0);
+}
+
+std::vector<std::string> Folder::names() const {
+    std::vector<std::string> names = allNames();
+    names.erase(std::remove_if(names.begin(), names.end(),
+                               [](const std::string& name) { return name[0] == '.'; }),
+                names.end());
+    std::sort(names.begin(), names.end());
+    return names;
+}
+
+bool Folder::isEmpty() const {
+    return allNames().size() == 2;  // . and ..
+}
+
+std::vector<std::string> Folder::allNames() const {
+    std::vector<std::string> names;
+    const int file = openat(mFile, ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    DIR* folder = file < 0 ? nullptr : fdopendir(file);
+    if (folder == nullptr) return names;
+    while (const dirent* entry = readdir(folder))
+        names.emplace_back(entry->d_name);
+    closedir(folder);
+    return names;
+}
+
+}  // namespace simulator

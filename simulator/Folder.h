@@ -1,0 +1,50 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <sys/stat.h>
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace simulator {
+
+/**
+ * A folder that is open. Whatever is done with it stays inside: names have no slashes, and a
+ * symbolic link in a name's place is never followed.
+ */
+class Folder {
+  public:
+    /** Opens a folder by its path, in which links are followed: the user has named it. */
+    explicit Folder(const std::string& path);
+    /** Opens the folder at a relative path below another; makes it where asked to. */
+    Folder(const Folder& above, const std::string& path, bool create = false);
+    Folder(const Folder&) = delete;
+    Folder& operator=(const Folder&) = delete;
+    ~Folder();
+
+    /** @return the errno that kept it from being opened; 0 when it is open. */
+    int error() const { return mError; }
+    /** @return a file's type and mode; 0 when there is no such file. */
+    mode_t mode(const std::string& name) const;
+    /** Opens a plain file. @return its descriptor, or a negative errno. */
+    int open(const std::string& name, int flags, mode_t mode = 0) const;
+    /** @return what a plain file holds; "" when there is none. */
+    std::string read(const std::string& name) const;
+    /** Gives a file new content at once, whatever it was. @return an errno, 0 for success. */
+    int replace(const std::string& name, std::string_view text, mode_t mode) const;
+    /** Removes a file, or a link itself. */
+    void remove(const std::string& name) const;
+    /** @return the sorted names of all in it, without those that begin with a dot. */
+    std::vector<std::string> names() const;
+    /** @return whether nothing at all is in it. */
+    bool isEmpty() const;
+
+  private:
+    std::vector<std::string> allNames() const;
+
+    int mFile;
+    int mError = 0;
+};
+
+}  // namespace simulator

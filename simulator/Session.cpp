@@ -1,0 +1,278 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Session.h"
+
+#include "Trace.h"
+#include "cli/Text.h"
+
+#include <fcntl.h>
+#include <sys/prctl.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <csignal>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <functional>
+#include <iostream>
+
+namespace simulator {
+namespace {
+
+namespace fs = std::filesystem;
+
+constexpr char kDaemon[] = "vendor.velmora.hardware.vibrator@2.1-service";
+constexpr char kPreload[] = "libvibrator_sim.so";
+
+std::string failure(const std::string& what) {
+    return what + ": " + strerror(errno);
+}
+
+/** @return a file that belongs to this program, beside it or where it is built or installed. */
+fs::path findProgram(const std::string& name, const std::vector<const char*>& places) {
+    const fs::path own = fs::read_symlink("/proc/self/exe").parent_path();
+    for (const char* place : places) {
+        fs::path path = (own / place / name).lexically_normal();
+        if (access(path.c_str(), R_OK) == 0) return path;
+    }
+    throw SessionError(name + " is neither beside vibrator-sim nor where it is built or installed");
+}
+
+/** A program that this one starts; it is killed in the destructor at the latest. */
+class Child {
+  public:
+    /** @param prepare what the child does before it becomes the program. */
+    Child(const std::vector<std::string>& command, const std::function<void()>& prepare) {
+        std::vector<char*> arguments;
+        arguments.reserve(command.size() + 1);
+        for (const std::string& word : command)
+            arguments.push_back(const_cast<char*>(word.c_str()));
+        arguments.push_back(nullptr);
+        mPid = fork();
+        if (mPid < 0) throw SessionError(failure("fork"));
+        if (mPid != 0) return;
+        prepare();
+        sigset_t none;
+        sigemptyset(&none);
+        sigprocmask(SIG_SETMASK, &none, nullptr);
+        execvp(arguments[0], arguments.data());
+        const int error = errno;
+        std::cerr << "vibrator-sim: run: " << cli::inQuotes(command[0]) << ": " << strerror(error)
+                  << std::endl;
+        _exit(error == ENOENT ? 127 : 126);
+    }
+    Child(const Child&) = delete;
+    Child& operator=(const Child&) = delete;
+    ~Child() {
+        signal(SIGKILL);
+        wait();
+    }
+
+    void signal(int number) const {
+        if (mPid > 0) kill(mPid, number);
+    }
+    /** @return whether the program has ended, now or before. */
+    bool hasEnded(int options = WNOHANG) {
+        if (mPid > 0 && waitpid(mPid, &mStatus, options) == mPid) mPid = -1;
+        return mPid < 0;
+    }
+    /** Waits for the program's end. @return its exit code, as a shell gives it. */
+    int wait() {
+        while (!hasEnded(0) && errno == EINTR) {
+        }
+        return WIFSIGNALED(mStatus) ? 128 + WTERMSIG(mStatus) : WEXITSTATUS(mStatus);
+    }
+
+  private:
+    pid_t mPid;
+    int mStatus = 0;
+};
+
+/** A directory in /tmp, which a process of its own removes when this one ends, however it does. */
+class PrivateDirectory {
+  public:
+    // Not in $TMPDIR: the path of a socket must be short, and one to preload without blanks.
+    PrivateDirectory() {
+        if (mkdtemp(mPath.data()) == nullptr) throw SessionError(failure(mPath));
+        std::array<int, 2> channel{};
+        if (pipe2(channel.data(), O_CLOEXEC) != 0) throw SessionError(failure("pipe"));
+        mLifeline = channel[1];
+        mRemover = fork();
+        if (mRemover != 0) {
+            close(channel[0]);
+            return;
+        }
+        setsid();
+        close(mLifeline);
+        const int nothing = open("/dev/null", O_RDWR);
+        for (const int file : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO})
+            dup2(nothing, file);
+        char none = 0;
+        // Ends when the last process that has the other end does.
+        while (read(channel[0], &none, 1) < 0 && errno == EINTR) {
+        }
+        // A dying daemon may still put something there.
+        std::error_code error;
+        for (int attempt = 0; attempt < 50 && fs::exists(mPath); ++attempt) {
+            fs::remove_all(mPath, error);
+            if (error) usleep(20'000);
+        }
+        _exit(0);
+    }
+    PrivateDirectory(const PrivateDirectory&) = delete;
+    PrivateDirectory& operator=(const PrivateDirectory&) = delete;
+    ~PrivateDirectory() {
+        close(mLifeline);
+        waitpid(mRemover, nullptr, 0);
+    }
+
+    std::string operator/(const std::string& name) const { return mPath + "/" + name; }
+    /** Makes a link in it, whose path has neither blanks nor colons. */
+    void link(const std::string& name, const fs::path& target) const {
+        if (symlink(target.c_str(), (*this / name).c_str()) != 0) {
+            throw SessionError(failure(*this / name));
+        }
+    }
+
+  private:
+    std::string mPath = "/tmp/vibrator-sim.XXXXXX";
+    int mLifeline = -1;
+    pid_t mRemover = -1;
+};
+
+/** The signals that end this program or tell of a child's end. They wait until they are taken. */
+class Signals {
+  public:
+    Signals() {
+        sigemptyset(&mSet);
+        for (const int number : {SIGINT, SIGQUIT, SIGTERM, SIGHUP, SIGCHLD})
+            sigaddset(&mSet, number);
+        sigprocmask(SIG_BLOCK, &mSet, nullptr);
+    }
+    /** @return the next signal; 0 when none has come for some time. */
+    int take(siginfo_t* info) const {
+        const timespec time{0, 20'000'000};
+        const int number = sigtimedwait(&mSet, info, &time);
+        return std::max(number, 0);
+    }
+
+  private:
+    sigset_t mSet;
+};
+
+/** Puts the daemon where the terminal's signals do not reach it, and the simulator into it. */
+void becomeDaemon(const std::string& directory, const std::string& preload, pid_t parent) {
+    setpgid(0, 0);
+    prctl(PR_SET_PDEATHSIG, SIGKILL);
+    if (getppid() != parent) _exit(1);
+    const int log = Folder(directory).open("log", O_WRONLY | O_APPEND);
+    dup2(open("/dev/null", O_RDONLY | O_CLOEXEC), STDIN_FILENO);
+    dup2(log, STDOUT_FILENO);
+    dup2(log, STDERR_FILENO);
+    const char* others = getenv("LD_PRELOAD");
+    setenv("LD_PRELOAD", (preload + (others == nullptr ? "" : std::string(":") + others)).c_str(),
+           1);
+}
+
+std::string lastLine(std::string text) {
+    text.erase(text.find_last_not_of('\n') + 1);
+    return text.substr(text.rfind('\n') + 1);
+}
+
+/** Waits until the daemon answers, and sees that it is the simulated driver that it has probed. */
+void awaitDaemon(Child& daemon, const std::string& client, const std::string& directory,
+                 const Signals& signals) {
+    constexpr int kAttempts = 500;
+    const auto silence = [] {
+        dup2(open("/dev/null", O_WRONLY | O_CLOEXEC), STDOUT_FILENO);
+        dup2(STDOUT_FILENO, STDERR_FILENO);
+    };
+    for (int attempt = 0; Child({client, "status"}, silence).wait() != 0; ++attempt) {
+        siginfo_t info{};
+        const int number = signals.take(&info);
+        if (number != 0 && number != SIGCHLD) {
+            throw SessionError(std::string("ended by ") + strsignal(number));
+        }
+        const bool hasEnded = daemon.hasEnded();
+        if (hasEnded || attempt == kAttempts) {
+            throw SessionError(std::string("the daemon ") +
+                               (hasEnded ? "has ended" : "does not answer") +
+                               "; the end of its log: " + lastLine(Folder(directory).read("log")));
+        }
+    }
+    struct stat trace;
+    if (stat(traceFile(directory).c_str(), &trace) != 0 || trace.st_size == 0) {
+        throw SessionError("the daemon does not use the simulated driver");
+    }
+}
+
+/** Passes signals on to a command until it ends. @return its exit code. */
+int awaitCommand(Child& command, const Signals& signals) {
+    // How often nothing may happen before a command that was told to end is killed: two seconds.
+    int patience = 100;
+    bool isEnding = false;
+    while (!command.hasEnded()) {
+        siginfo_t info{};
+        const int number = signals.take(&info);
+        if (number == 0 && isEnding && --patience == 0) command.signal(SIGKILL);
+        // What a terminal sends, the command has had itself.
+        if (number == 0 || number == SIGCHLD || info.si_code == SI_KERNEL) continue;
+        command.signal(number);
+        isEnding = isEnding || number == SIGTERM || number == SIGHUP;
+    }
+    return command.wait();
+}
+
+}  // namespace
+
+void makeDriver(const std::string& directory, Layout layout, const Features& features) {
+    const int error = createDriver(directory, layout, features);
+    if (error == ENOTEMPTY) {
+        throw SessionError("\"" + directory +
+                           "\" is neither empty nor a driver's; name a new directory");
+    }
+    if (error != 0) throw SessionError("\"" + directory + "\": " + strerror(error));
+}
+
+int runSession(const SessionOptions& options) {
+    const fs::path daemonFile = findProgram(kDaemon, {"../service", "../sbin"});
+    const fs::path preload = findProgram(kPreload, {".", "../" LIBRARY_DIRECTORY});
+    const fs::path client = findProgram("vibratorctl", {"../tools", "."});
+
+    const Signals signals;
+    const PrivateDirectory place;
+    const std::string directory =
+            options.directory.empty() ? place / "driver" : fs::absolute(options.directory).string();
+    makeDriver(directory, options.layout, options.features);
+    const Folder driver(directory);
+    driver.remove("trace");
+    if (driver.replace("log", "", 0644) != 0) throw SessionError(failure(directory + "/log"));
+    place.link(kPreload, preload);
+    fs::create_directory(place / "bin");
+    place.link("bin/vibratorctl", client);
+    place.link("bin/vibrator-sim", fs::read_symlink("/proc/self/exe"));
+    setenv("VIBRATOR_SIM_DIR", directory.c_str(), 1);
+    setenv("HWBINDER_DIR", (place / "sockets").c_str(), 1);
+
+    const pid_t self = getpid();
+    Child daemon({daemonFile}, [&] { becomeDaemon(directory, place / kPreload, self); });
+    awaitDaemon(daemon, client, directory, signals);
+
+    const char* path = getenv("PATH");
+    setenv("PATH", (place / "bin:" + (path == nullptr ? "/usr/bin:/bin" : path)).c_str(), 1);
+    std::vector<std::string> words = options.command;
+    if (words.empty()) {
+        const char* shell = getenv("SHELL");
+        words = {shell == nullptr || *shell == '\0' ? "/bin/sh" : shell};
+        std::cerr << "vibrator-sim: the driver is in " << cli::inQuotes(directory)
+                  << ", and so is the daemon's log; \"exit\" removes them\n";
+    }
+    Child command(words, [] { prctl(PR_SET_PDEATHSIG, SIGHUP); });
+    return awaitCommand(command, signals);
+}
+
+}  // namespace simulator
