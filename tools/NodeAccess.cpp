@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "NodeAccess.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cstdlib>
 #include <cstring>
+#include <ctime>
 
 namespace {
 
@@ -55,6 +57,33 @@ std::optional<std::string_view> after(std::string_view text, std::string_view ma
     return text;
 }
 
+/**
+ * Finds the time at the beginning of a log's line: a date and a time of day, or seconds.
+ *
+ * @param clock set to the time as it stands there; empty where there is none.
+ * @return it in s.
+ */
+double readClock(const std::string& line, std::string* clock) {
+    constexpr const char* kForms[] = {"%Y-%m-%d%n%H:%M:%S", "%Y-%m-%dT%H:%M:%S", "%m-%d%n%H:%M:%S",
+                                      "%b%n%d%n%H:%M:%S"};
+    const char* start = line.c_str() + std::min(line.find_first_not_of(" ["), line.size());
+    for (const char* form : kForms) {
+        // A leap year, for logs that do not say which.
+        tm date{};
+        date.tm_year = 100;
+        const char* rest = strptime(start, form, &date);
+        if (rest == nullptr) continue;
+        char* end = nullptr;
+        const double fraction = *rest == '.' ? strtod(rest, &end) : 0;
+        *clock = std::string(start, *rest == '.' ? end : rest);
+        return static_cast<double>(timegm(&date)) + fraction;
+    }
+    const std::string word(start, strspn(start, "0123456789."));
+    const bool isTime = word.find('.') < word.size() - 1 && word.find('.') > 0;
+    *clock = isTime ? word : "";
+    return isTime ? strtod(word.c_str(), nullptr) : 0;
+}
+
 /** @return a path as the trace names its node: "leds/state". */
 std::string nodeName(std::string_view path) {
     constexpr std::string_view kClass = "/sys/class/";
@@ -69,7 +98,8 @@ std::string nodeName(std::string_view path) {
 
 std::optional<NodeAccess> TraceReader::read(std::string_view line) {
     constexpr double kLatest = 1e12;
-    const double time = strtod(std::string(takeWord(&line)).c_str(), nullptr);
+    const std::string clock(takeWord(&line));
+    const double time = strtod(clock.c_str(), nullptr);
     const std::string node(takeWord(&line));
     const std::string_view call = takeWord(&line);
     if (!(time >= 0 && time < kLatest)) return std::nullopt;
@@ -105,6 +135,7 @@ std::optional<NodeAccess> TraceReader::read(std::string_view line) {
     }
     if (call == "open" && access.error.empty()) return std::nullopt;
     access.time = time;
+    access.clock = clock;
     access.node = node;
     NodeAccess done = std::move(access);
     mOpen.erase(node);
@@ -112,13 +143,55 @@ std::optional<NodeAccess> TraceReader::read(std::string_view line) {
 }
 
 void LogReader::begin(NodeAccess::Kind kind, std::string_view path, const std::string& bytes) {
-    mCurrent = NodeAccess{0, nodeName(path), kind, bytes, ""};
+    mCurrent = NodeAccess{0, nodeName(path), kind, bytes, "", ""};
     mDirectory = mCurrent->node.substr(0, mCurrent->node.find('/'));
 }
 
 std::optional<NodeAccess> LogReader::read(std::string_view line) {
+    auto done = readMessage(line);
+    if (done) {
+        const size_t tag = line.find("QorVibrator");
+        if (tag != std::string_view::npos)
+            done->time = readClock(std::string(line.substr(0, tag)), &done->clock);
+    }
+    return done;
+}
+
+std::optional<NodeAccess> LogReader::readMessage(std::string_view line) {
+    if (auto refusal = readRefusal(line)) return refusal;
     if (auto done = readText(line)) return done;
     return readNumber(line);
+}
+
+std::optional<NodeAccess> LogReader::readRefusal(std::string_view line) {
+    constexpr struct {
+        const char* mark;
+        const char* reason;
+    } kRefusals[] = {
+            {"Pemission denied (", "not permitted to this uid"},
+            {" is abnormal ", "out of range"},
+            {" BAD_VALUE", "out of range"},
+            {" packet size is exceed", "too many packets"},
+            {" while vibrating. Not supported", "the motor counts as running"},
+            {" is impossible because of intensity", "no control of the strength"},
+            {" unsupports", "the driver has none"},
+            {"perform_1_", "no such effect"},
+    };
+    const auto effect = after(line, "perform start effect : ");
+    for (const auto& [mark, reason] : kRefusals) {
+        const bool isUnknownEffect = effect && effect->substr(0, 2) != "0,";
+        if (!after(line, mark) && !isUnknownEffect) continue;
+        const size_t tag = std::min(line.find("QorVibrator"), line.size());
+        const std::string message(after(line.substr(tag), ": ").value_or(line));
+        const std::string word = message.substr(0, message.find(' '));
+        return NodeAccess{0,
+                          word == "Pemission" ? "" : word,
+                          NodeAccess::kRefusal,
+                          message,
+                          isUnknownEffect ? "no such effect" : reason,
+                          ""};
+    }
+    return std::nullopt;
 }
 
 std::optional<NodeAccess> LogReader::readText(std::string_view line) {
@@ -129,7 +202,7 @@ std::optional<NodeAccess> LogReader::readText(std::string_view line) {
             {"getMotorIndex string : ", "/motor_type"}};
     for (const auto& [mark, leaf] : reads) {
         if (const auto text = after(line, mark)) {
-            return NodeAccess{0, mDirectory + leaf, NodeAccess::kRead, std::string(*text), ""};
+            return NodeAccess{0, mDirectory + leaf, NodeAccess::kRead, std::string(*text), "", ""};
         }
     }
     const std::pair<const char*, const char*> writes[] = {
@@ -143,7 +216,7 @@ std::optional<NodeAccess> LogReader::readText(std::string_view line) {
             if (const size_t newline = bytes.find("\\n"); newline != std::string::npos)
                 bytes.replace(newline, 2, "\n");
             if (*leaf == '/' && leaf[1] == 'e') bytes.insert(0, "FOLDER_");
-            mText = NodeAccess{0, mDirectory + leaf, NodeAccess::kWrite, bytes, ""};
+            mText = NodeAccess{0, mDirectory + leaf, NodeAccess::kWrite, bytes, "", ""};
             return std::nullopt;
         }
     }

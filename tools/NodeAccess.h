@@ -6,20 +6,22 @@
 #include <string>
 #include <string_view>
 
-/** One access of a node, from its open to its close. */
+/** One access of a node, from its open to its close; or a call that the service refused. */
 struct NodeAccess {
-    enum Kind { kProbe, kRead, kWrite };
+    enum Kind { kProbe, kRead, kWrite, kRefusal };
 
-    /** When it ended, in s of a clock that never goes back; 0 where the source does not say. */
+    /** When it ended, in s; 0 where the source does not say. */
     double time = 0;
-    /** The node's path, from "/sys/class/" on: "leds/vibrator/state"; without "vibrator/" inside.
-     */
+    /** The node's path below "/sys/class/", without "vibrator/": "leds/state". Of a refusal the
+     * operation, as far as it is known. */
     std::string node;
     Kind kind = kProbe;
-    /** The bytes that were read or written. */
+    /** The bytes that were read or written; of a refusal what the service logged. */
     std::string bytes;
     /** Why it failed, like "ENOENT"; empty where it went well. */
     std::string error;
+    /** The time as the source writes it, like "11-24 22:18:03.123"; empty where it does not. */
+    std::string clock;
 
     /** @return the last part of the node's name, like "state". */
     std::string leaf() const { return node.substr(node.rfind('/') + 1); }
@@ -36,7 +38,10 @@ class TraceReader {
     std::map<std::string, NodeAccess> mOpen;
 };
 
-/** Puts accesses together from the lines of the daemon's log, in whatever form the log is shown. */
+/**
+ * Puts accesses together from the lines of the daemon's log: as the daemon writes it, as journalctl
+ * and as logcat show it. The times of logcat's forms brief, tag and raw are missing.
+ */
 class LogReader {
   public:
     /** @return the access that ends with the line; none where it goes on, or the line is another.
@@ -44,8 +49,10 @@ class LogReader {
     std::optional<NodeAccess> read(std::string_view line);
 
   private:
+    std::optional<NodeAccess> readMessage(std::string_view line);
     std::optional<NodeAccess> readNumber(std::string_view line);
     std::optional<NodeAccess> readText(std::string_view line);
+    std::optional<NodeAccess> readRefusal(std::string_view line);
     void begin(NodeAccess::Kind kind, std::string_view path, const std::string& bytes);
 
     /** Directory of the nodes, as far as it has been seen: "leds". */

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Packets.h"
 
+#include "cli/Text.h"
+
 #include <algorithm>
 #include <charconv>
 #include <cstdint>
@@ -24,7 +26,7 @@ bool parseNumber(std::string_view word, int32_t* number, std::string* error) {
     word = trimmed(word);
     const auto [end, status] = std::from_chars(word.data(), word.data() + word.size(), *number);
     if (status == std::errc() && end == word.data() + word.size()) return true;
-    *error = "\"" + std::string(word) + "\" is no whole number of 32 bits";
+    *error = cli::inQuotes(word) + " is no whole number of 32 bits";
     return false;
 }
 
@@ -92,7 +94,7 @@ bool parsePacket(const std::string& text, HapticEnginePackets* packets, std::str
     for (size_t i = 0; i < 4; ++i) {
         const size_t comma = rest.find(',');
         if ((comma == std::string_view::npos) != (i == 3)) {
-            *error = "\"" + text + "\" is not PARAM0,INTENSITY,PARAM2,PARAM3";
+            *error = cli::inQuotes(text) + " is not PARAM0,INTENSITY,PARAM2,PARAM3";
             return false;
         }
         if (!parseNumber(rest.substr(0, comma), &values[i], error)) return false;

@@ -5,11 +5,24 @@
 
 #include <string>
 
-/** @return the timeline as a drawing, 1200 pixels wide. */
-std::string plotSvg(const Timeline& timeline);
+enum class PictureFormat { kSvg, kPng };
+
+/** @return a script by which gnuplot writes a timeline as a picture to standard output. */
+std::string plotScript(const Timeline& timeline, PictureFormat format);
+
+/**
+ * Lets gnuplot draw a timeline.
+ *
+ * @param picture set to the bytes of the picture.
+ * @return what is wrong, and what to do; empty where nothing is.
+ */
+std::string drawPicture(const Timeline& timeline, PictureFormat format, std::string* picture);
 
 /** @return the timeline for a terminal of some columns. */
 std::string plotText(const Timeline& timeline, size_t columns);
 
-/** Writes a drawing as pixels. @return what is wrong; empty where nothing is. */
-std::string writePng(const std::string& svg, const std::string& file);
+/** @return what a timeline is about, in a few words. */
+std::string plotTitle(const Timeline& timeline);
+
+/** @return what cannot be seen from a plot by itself, like that times are missing; or nothing. */
+std::string plotNote(const Timeline& timeline);

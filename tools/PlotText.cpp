@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "Duration.h"
 #include "Plot.h"
 
 #include <algorithm>
 #include <cmath>
 #include <cstdio>
+#include <cstring>
 
 namespace {
 
@@ -11,16 +13,21 @@ constexpr long kRows = 5;
 constexpr long kEighths = 8;
 /** Width of what stands left of the strip. */
 constexpr size_t kMargin = 6;
+/** Calls that are listed. */
+constexpr size_t kMostCalls = 40;
+/** What times may be off, as a part of a column. */
+constexpr double kInexact = 1e-6;
 
-/** @return the strongest that the motor was in a span. */
-double strengthIn(const Timeline& timeline, double start, double end) {
-    double strongest = 0;
+/** @return how strong the motor was told to be at most, in each column. */
+std::vector<double> strengths(const Timeline& timeline, size_t width, double perColumn) {
+    std::vector<double> columns(width);
     for (const Timeline::Segment& segment : timeline.segments) {
-        if (segment.start < end && segment.end > start) {
-            strongest = std::max(strongest, segment.strength);
-        }
+        const double first = (segment.start - timeline.start) / perColumn + kInexact;
+        const double last = std::ceil((segment.end - timeline.start) / perColumn - kInexact);
+        for (auto i = static_cast<size_t>(first); i < width && static_cast<double>(i) < last; ++i)
+            columns[i] = std::max(columns[i], segment.strength);
     }
-    return strongest;
+    return columns;
 }
 
 }  // namespace
@@ -28,31 +35,50 @@ double strengthIn(const Timeline& timeline, double start, double end) {
 std::string plotText(const Timeline& timeline, size_t columns) {
     constexpr const char* kBlocks[] = {" ", "▁", "▂", "▃", "▄", "▅", "▆", "▇", "█"};
     const size_t width = std::max<size_t>(columns, kMargin + 20) - kMargin;
-    const double length = std::max(timeline.length, 0.001);
+    const double length = std::max(timeline.end - timeline.start, 0.001);
     const double perColumn = length / static_cast<double>(width);
+    const std::vector<double> strong = strengths(timeline, width, perColumn);
+    const auto& segments = timeline.segments;
+    const bool isOpen = std::any_of(segments.begin(), segments.end(),
+                                    [](const auto& each) { return each.isOpen; });
+    const bool isBeyond = std::any_of(segments.begin(), segments.end(),
+                                      [](const auto& each) { return each.strength > 1; });
 
-    std::string text;
-    char line[160];
+    std::string text = plotTitle(timeline) + '\n';
+    char line[64];
     for (long row = kRows - 1; row >= 0; --row) {
         snprintf(line, sizeof(line), "%3ld %% ", (row + 1) * 100 / kRows);
         text += line;
-        for (size_t column = 0; column < width; ++column) {
-            const double start = static_cast<double>(column) * perColumn;
-            const double strength = strengthIn(timeline, start, start + perColumn);
-            const long eighths = std::lround(strength * double{kRows * kEighths}) - row * kEighths;
-            text += kBlocks[std::clamp<long>(eighths, 0, kEighths)];
+        for (size_t i = 0; i < width; ++i) {
+            const long eighths = std::lround(strong[i] * double{kRows * kEighths}) - row * kEighths;
+            const bool isTop = row == kRows - 1 && strong[i] > 1;
+            text += isTop ? "!" : kBlocks[std::clamp<long>(eighths, 0, kEighths)];
         }
         text += '\n';
     }
     std::string axis(width, '-');
     for (const Timeline::Mark& mark : timeline.marks) {
-        axis[std::min(width - 1, static_cast<size_t>(mark.time / perColumn))] = '|';
+        const auto column =
+                static_cast<size_t>((mark.time - timeline.start) / perColumn + kInexact);
+        axis[std::min(width - 1, column)] = '|';
     }
-    snprintf(line, sizeof(line), "      0%*.3f s\n", static_cast<int>(width - 3), length);
-    text += std::string(kMargin, ' ') + axis + '\n' + line + '\n';
-    for (const Timeline::Mark& mark : timeline.marks) {
-        snprintf(line, sizeof(line), "%10.3f s  %s\n", mark.time, mark.label.c_str());
-        text += line;
+    if (isOpen) axis.back() = '>';
+    const std::string from = durationInWords(timeline.start);
+    const std::string to = durationInWords(timeline.end);
+    const size_t between = width - std::min(width, from.size() + to.size());
+    const std::string indent(kMargin, ' ');
+    text += indent + axis + '\n' + indent + from + std::string(between, ' ') + to + '\n';
+    if (isOpen) text += indent + "> goes on\n";
+    if (isBeyond) text += indent + "! beyond full strength\n";
+    if (!plotNote(timeline).empty()) text += indent + plotNote(timeline) + '\n';
+    text += '\n';
+    for (size_t i = 0; i < timeline.marks.size() && i < kMostCalls; ++i) {
+        snprintf(line, sizeof(line), "%12s  ", durationInWords(timeline.marks[i].time).c_str());
+        text += line + timeline.marks[i].label + '\n';
+    }
+    if (timeline.marks.size() > kMostCalls) {
+        text += "  and " + std::to_string(timeline.marks.size() - kMostCalls) +
+                " more calls; --from, --to and --last show a part\n";
     }
     return text;
 }

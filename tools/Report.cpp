@@ -1,46 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Report.h"
 
+#include "cli/Text.h"
+
 #include <unistd.h>
 
 #include <iostream>
 
-namespace {
-
 using nlohmann::ordered_json;
-
-/** uids that may call the restricted operations: root and Android's system user. */
-bool mayCallRestricted(uid_t uid) {
-    return uid == 0 || uid == 1000;
-}
-
-std::string explain(const Call& call, VibratorStatus status) {
-    if (call.restricted && !mayCallRestricted(getuid())) {
-        return "the caller is not permitted: uid " + std::to_string(getuid()) +
-               " is neither 0 (root) nor 1000 (system)";
-    }
-    switch (status) {
-        case VibratorStatus::BAD_VALUE:
-            return std::string("out of range") +
-                   (call.range != nullptr ? std::string(": ") + call.range : "");
-        case VibratorStatus::UNSUPPORTED_OPERATION:
-            return "not supported here and now";
-        default:
-            return "the driver has not taken it; the service's log says why";
-    }
-}
-
-std::string inWords(const ordered_json& value) {
-    if (value.is_boolean()) return value.get<bool>() ? "yes" : "no";
-    if (value.is_string()) return value.get<std::string>();
-    if (!value.is_array()) return value.dump();
-    std::string words;
-    for (const auto& element : value)
-        words += (words.empty() ? "" : " ") + inWords(element);
-    return words.empty() ? "none" : words;
-}
-
-}  // namespace
 
 std::string statusName(VibratorStatus status) {
     constexpr const char* kNames[] = {"OK", "UNKNOWN_ERROR", "BAD_VALUE", "UNSUPPORTED_OPERATION"};
@@ -48,46 +15,66 @@ std::string statusName(VibratorStatus status) {
     return number < std::size(kNames) ? kNames[number] : std::to_string(number);
 }
 
-int Report::answer(const Call& call, VibratorStatus status, const ordered_json& more) {
-    ordered_json values = {{"operation", call.operation}, {"status", statusName(status)}};
-    if (status == VibratorStatus::OK && !more.is_null()) values.update(more);
-    const std::string reason = status == VibratorStatus::OK ? "" : explain(call, status);
-    if (mJson) {
-        if (!reason.empty()) values["reason"] = reason;
-        print(values);
-    } else if (reason.empty()) {
-        std::cout << call.operation << ": " << statusName(status) << '\n';
-        if (!more.is_null()) print(more);
+bool mayCallRestricted() {
+    return getuid() == 0 || getuid() == 1000;
+}
+
+std::string notPermitted() {
+    return "not permitted: only root and uid 1000 (system) may do this, not uid " +
+           std::to_string(getuid());
+}
+
+int Report::answer(const Call& call, VibratorStatus status, const Details& details,
+                   const std::string& reason) const {
+    const bool ok = status == VibratorStatus::OK;
+    if (isJson) {
+        ordered_json object = {{"command", call.command}};
+        if (!call.argument.empty()) object["argument"] = call.argument;
+        object.update({{"operation", call.operation}, {"ok", ok}, {"status", statusName(status)}});
+        if (!ok) object["reason"] = reason;
+        object.update(details.members);
+        print(object);
+        return ok ? kSuccess : kRefused;
+    }
+    std::string line = call.command + (call.argument.empty() ? "" : " ") + call.argument + ": ";
+    if (ok) {
+        line += "OK" + (details.words.empty() ? "" : ", " + details.words);
     } else {
-        std::cerr << call.operation << ": " << statusName(status) << ": " << reason << '\n';
+        line += reason;
     }
-    return status == VibratorStatus::OK ? kSuccess : kRefused;
+    if (isVerbose) line += std::string(" [") + call.operation + ": " + statusName(status) + "]";
+    (ok ? std::cout : std::cerr) << cli::printable(line) << '\n';
+    return ok ? kSuccess : kRefused;
 }
 
-int Report::unreachable(const std::string& operation, const std::string& why) {
-    if (mJson) {
-        print({{"operation", operation}, {"error", why}});
+int Report::found(const std::string& command, const std::string& words, const ordered_json& members,
+                  bool ok) const {
+    if (isJson) {
+        ordered_json object = {{"command", command}, {"ok", ok}};
+        object.update(members);
+        print(object);
     } else {
-        std::cerr << "vibratorctl: the service cannot be reached: " << why << '\n';
+        std::cout << cli::printableLines(words);
     }
-    return kUnreachable;
+    return ok ? kSuccess : kRefused;
 }
 
-int Report::values(const ordered_json& values) {
-    print(values);
-    return kSuccess;
+void Report::failure(const std::string& command, const std::string& status,
+                     const std::string& reason) const {
+    if (isJson) {
+        ordered_json object = {{"command", nullptr}};
+        if (!command.empty()) object["command"] = command;
+        object.update({{"ok", false}, {"status", status}, {"reason", reason}});
+        print(object);
+    } else {
+        warn((command.empty() ? "" : command + ": ") + reason);
+    }
 }
 
-void Report::note(const std::string& text) const {
-    if (!mJson) std::cerr << text << '\n';
+void Report::warn(const std::string& text) const {
+    if (!isJson) std::cerr << "vibratorctl: " << cli::printable(text) << '\n';
 }
 
-void Report::print(const ordered_json& values) const {
-    if (mJson) {
-        std::cout << values.dump(2) << '\n';
-        return;
-    }
-    for (const auto& [name, value] : values.items()) {
-        std::cout << name << ": " << inWords(value) << '\n';
-    }
+void Report::print(const ordered_json& object) {
+    std::cout << object.dump(-1, ' ', true, ordered_json::error_handler_t::replace) << '\n';
 }

@@ -2,7 +2,6 @@
 #pragma once
 
 #include <android/hardware/vibrator/1.0/types.h>
-#include <hidl/Status.h>
 
 #include <nlohmann/json.hpp>
 #include <string>
@@ -12,43 +11,66 @@ using VibratorStatus = ::android::hardware::vibrator::V1_0::Status;
 /** Exit codes of vibratorctl. */
 enum ExitCode {
     kSuccess = 0,
-    /** The service answered that it did not do it. */
+    /** The service refused, doctor found something, or the output could not be written. */
     kRefused = 1,
-    /** The command line, or a file it names, makes no sense. */
+    /** The command line, or a file that it names, has a mistake. */
     kUsage = 2,
-    /** The service could not be reached. */
+    /** The service cannot be reached. */
     kUnreachable = 3,
 };
 
 /** @return the name of a status, like "BAD_VALUE". */
 std::string statusName(VibratorStatus status);
 
+/** @return whether this process's user may make the calls that not everybody may. */
+bool mayCallRestricted();
+
+/** @return why a call was refused to this process's user. */
+std::string notPermitted();
+
 /** What is known of a call before it is made, to explain its answer. */
 struct Call {
+    /** The command: "intensity". */
+    std::string command;
     /** The operation as the interface names it. */
     const char* operation;
-    /** The range of its argument in words; nullptr where it has none. */
-    const char* range = nullptr;
     /** Whether only the system user and root may call it. */
     bool restricted = false;
+    /** What the command was given: "5"; for the answer. */
+    std::string argument = {};
 };
 
-/** Tells the user what came of a call, in words or as JSON. */
-class Report {
-  public:
-    explicit Report(bool json) : mJson(json) {}
+/** The answer to a call beside its status. */
+struct Details {
+    /** For a person: "20 ms". */
+    std::string words;
+    /** The same, as members of the JSON. */
+    nlohmann::ordered_json members = nlohmann::ordered_json::object();
+};
 
-    /** Reports the answer to a call, with further results. @return the exit code. */
-    int answer(const Call& call, VibratorStatus status, const nlohmann::ordered_json& more = {});
-    /** Reports a call that did not reach the service. @return the exit code. */
-    int unreachable(const std::string& operation, const std::string& why);
-    /** Reports results that have no status, in words as "name: value" lines. */
-    int values(const nlohmann::ordered_json& values);
-    /** Says something that is no result, unless the output is for a script. */
-    void note(const std::string& text) const;
+/** Tells the user what came of a command, in words or as JSON: one line, one object, a call. */
+struct Report {
+    bool isJson = false;
+    bool isVerbose = false;
 
-  private:
-    void print(const nlohmann::ordered_json& values) const;
+    /** Reports the answer to a call. @param reason why it was refused. @return the exit code. */
+    int answer(const Call& call, VibratorStatus status, const Details& details,
+               const std::string& reason) const;
+    /**
+     * Reports what a command that is no single call found.
+     *
+     * @param words lines for a person.
+     * @param ok whether all is as it should be.
+     * @return the exit code.
+     */
+    int found(const std::string& command, const std::string& words,
+              const nlohmann::ordered_json& members, bool ok = true) const;
+    /** Reports that a command was not done. @param status like "USAGE". */
+    void failure(const std::string& command, const std::string& status,
+                 const std::string& reason) const;
+    /** Warns on standard error, in words only. */
+    void warn(const std::string& text) const;
 
-    bool mJson;
+    /** Prints an object in one line, of ASCII only: safe for terminals, whatever is in it. */
+    static void print(const nlohmann::ordered_json& object);
 };

@@ -1,8 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Score.h"
 
+#include "cli/Text.h"
+
 #include <algorithm>
-#include <charconv>
 #include <cstring>
 #include <optional>
 #include <sstream>
@@ -10,12 +11,14 @@
 
 namespace {
 
-using ::android::hardware::vibrator::V1_0::EffectStrength;
-
 constexpr uint32_t kLongestMs = INT32_MAX;
 constexpr uint32_t kLongestWaitMs = 3'600'000;
 constexpr uint32_t kFullAmplitude = 10000;
 constexpr size_t kMostPackets = 339;
+/** Steps that a score plays, those of its blocks counted each time. */
+constexpr size_t kMostSteps = 1'000'000;
+constexpr size_t kLongestText = 60;
+constexpr char kTooMany[] = "more than 1000000 steps to play";
 
 struct Word {
     std::string text;
@@ -35,67 +38,130 @@ std::vector<Word> wordsOf(std::string_view line) {
     return words;
 }
 
-/** Reads the words of one line. */
-class LineParser {
+/** Reads a score line by line. */
+class ScoreParser {
   public:
-    LineParser(std::string_view line, size_t number, std::vector<ScoreError>* errors)
-        : mWords(wordsOf(line)), mNumber(number), mEnd(line.size() + 1), mErrors(*errors) {}
+    ScoreParser(Score* score, std::vector<ScoreError>* errors) : mScore(*score), mErrors(*errors) {}
 
-    bool isEmpty() const { return mWords.empty(); }
+    void parseLine(std::string_view line) {
+        ++mLine;
+        mWords = wordsOf(line);
+        mNext = 0;
+        mEnd = line.size() + 1;
+        if (!mWords.empty()) parseWords();
+    }
 
-    ScoreStep parse() {
-        using Parse = void (LineParser::*)(ScoreStep*);
-        struct Command {
-            const char* name;
-            ScoreStep::Kind kind;
-            Parse parse;
-        };
-        constexpr Command kCommands[] = {
-                {"click", ScoreStep::kClick, &LineParser::click},
-                {"on", ScoreStep::kOn, &LineParser::on},
-                {"off", ScoreStep::kOff, nullptr},
-                {"wait", ScoreStep::kWait, &LineParser::wait},
-                {"amplitude", ScoreStep::kAmplitude, &LineParser::amplitude},
-                {"intensity", ScoreStep::kIntensity, &LineParser::intensity},
-                {"pattern", ScoreStep::kPattern, &LineParser::pattern},
-                {"engine", ScoreStep::kEngine, &LineParser::engine},
-        };
-        ScoreStep step;
-        const Word name = *take();
-        const auto* command =
-                std::find_if(std::begin(kCommands), std::end(kCommands),
-                             [&](const Command& each) { return name.text == each.name; });
-        if (command == std::end(kCommands)) {
-            complain(name, "\"" + name.text +
-                                   "\" is none of click, on, off, wait, amplitude, intensity, "
-                                   "pattern, engine");
-            return step;
-        }
-        step.kind = command->kind;
-        const size_t before = mErrors.size();
-        if (command->parse != nullptr) (this->*command->parse)(&step);
-        if (mErrors.size() == before && mNext < mWords.size()) {
-            complain(mWords[mNext], "\"" + mWords[mNext].text + "\" is one word too many");
-        }
-        return step;
+    void finish() {
+        if (!mErrors.empty()) return;
+        for (const Block& block : mBlocks)
+            mErrors.push_back({block.line, block.column, R"("repeat" without an "end")"});
+        if (mErrors.empty() && mScore.order.empty()) mErrors.push_back({1, 1, "no step"});
     }
 
   private:
-    void click(ScoreStep* step) {
-        const std::optional<Word> word = take();
-        if (!word) return;
-        const char* const names[] = {"light", "medium", "strong"};
-        const auto* name = std::find(std::begin(names), std::end(names), word->text);
-        if (name == std::end(names)) {
-            complain(*word, "\"" + word->text + "\" is none of light, medium, strong");
+    struct Block {
+        /** Where it begins in the order of the steps. */
+        size_t start;
+        uint32_t times;
+        size_t line;
+        size_t column;
+    };
+    struct Command {
+        const char* name;
+        ScoreStep::Kind kind;
+        void (ScoreParser::*parse)(ScoreStep*);
+    };
+    static const std::vector<Command>& commands() {
+        static const std::vector<Command> all = {
+                {"click", ScoreStep::kClick, &ScoreParser::click},
+                {"on", ScoreStep::kOn, &ScoreParser::on},
+                {"off", ScoreStep::kOff, &ScoreParser::off},
+                {"wait", ScoreStep::kWait, &ScoreParser::wait},
+                {"amplitude", ScoreStep::kAmplitude, &ScoreParser::amplitude},
+                {"intensity", ScoreStep::kIntensity, &ScoreParser::intensity},
+                {"pattern", ScoreStep::kPattern, &ScoreParser::pattern},
+                {"engine", ScoreStep::kEngine, &ScoreParser::engine},
+                {"external", ScoreStep::kExternal, &ScoreParser::external},
+                {"frequency", ScoreStep::kFrequency, &ScoreParser::frequency},
+                {"force-touch", ScoreStep::kForceTouch, &ScoreParser::intensity},
+                {"fold", ScoreStep::kFold, &ScoreParser::fold},
+        };
+        return all;
+    }
+
+    void parseWords() {
+        const Word name = *take();
+        const size_t before = mErrors.size();
+        if (name.text == "repeat") {
+            uint32_t times = 1;
+            number("a number of times", 1, kMostSteps, &times);
+            mBlocks.push_back({mScore.order.size(), times, mLine, name.column});
+        } else if (name.text == "end") {
+            endBlock(name);
+        } else {
+            const auto command =
+                    std::find_if(commands().begin(), commands().end(),
+                                 [&](const Command& each) { return name.text == each.name; });
+            if (command == commands().end()) return complainOfName(name);
+            ScoreStep step;
+            step.kind = command->kind;
+            step.line = mLine;
+            step.column = name.column;
+            step.name = name.text;
+            for (const Word& word : mWords) {
+                if (word.column != name.column) step.argument += " " + word.text;
+            }
+            step.argument.erase(0, 1);
+            if (step.argument.size() > kLongestText) {
+                step.argument.replace(kLongestText - 3, step.argument.size(), "...");
+            }
+            (this->*command->parse)(&step);
+            mScore.order.push_back(static_cast<uint32_t>(mScore.lines.size()));
+            mScore.lines.push_back(std::move(step));
+            if (mScore.order.size() > kMostSteps) complain(name, kTooMany);
+        }
+        if (mErrors.size() == before && mNext < mWords.size()) {
+            complain(mWords[mNext], cli::inQuotes(mWords[mNext].text) + " is one word too many");
+        }
+    }
+
+    void complainOfName(const Word& name) {
+        std::vector<std::string> names;
+        for (const Command& command : commands())
+            names.emplace_back(command.name);
+        names.insert(names.end(), {"repeat", "end"});
+        const std::string nearest = cli::suggestion(name.text, names);
+        complain(name, "no step " + cli::inQuotes(name.text) +
+                               (nearest.empty() ? "; there are " + cli::join(names, ", ", " and ")
+                                                : nearest));
+    }
+
+    void endBlock(const Word& word) {
+        if (mBlocks.empty()) return complain(word, R"("end" without a "repeat")");
+        const Block block = mBlocks.back();
+        mBlocks.pop_back();
+        auto& order = mScore.order;
+        const size_t size = order.size() - block.start;
+        if (block.start + size * block.times > kMostSteps) {
+            mErrors.push_back({block.line, block.column, kTooMany});
             return;
         }
-        step->strength = static_cast<EffectStrength>(name - names);
+        for (size_t i = size; i < size * block.times; ++i)
+            order.push_back(order[order.size() - size]);
+    }
+
+    void click(ScoreStep* step) {
+        step->number = 1;
+        if (mNext < mWords.size()) choose({"light", "medium", "strong"}, step);
     }
     void on(ScoreStep* step) { number("a time in ms", 1, kLongestMs, &step->number); }
+    void off(ScoreStep* /* step */) {}
     void wait(ScoreStep* step) { number("a time in ms", 0, kLongestWaitMs, &step->number); }
     void amplitude(ScoreStep* step) { number("an amplitude", 1, 255, &step->number); }
     void intensity(ScoreStep* step) { number("an intensity", 1, kFullAmplitude, &step->number); }
+    void external(ScoreStep* step) { choose({"off", "on"}, step); }
+    void frequency(ScoreStep* step) { number("a frequency type", 0, 4, &step->number); }
+    void fold(ScoreStep* step) { choose({"open", "close"}, step); }
 
     void pattern(ScoreStep* step) {
         number("a pattern's number", 0, kLongestMs, &step->number);
@@ -116,10 +182,10 @@ class LineParser {
             if (!parsePacket(word->text, &step->packets, &error)) {
                 complain(*word, error);
             } else if (step->packets.size() > kMostPackets) {
-                complain(*word, "more than 339 packets");
-                return;
+                return complain(*word, "more than 339 packets");
             } else if (!isShort(step->packets.back())) {
-                complain(*word, "\"" + word->text + "\" has a value of more than 8 characters");
+                complain(*word,
+                         cli::inQuotes(word->text) + " has a value of more than 8 characters");
             }
         }
     }
@@ -131,19 +197,25 @@ class LineParser {
         });
     }
 
-    void number(const char* what, uint32_t least, uint32_t most, uint32_t* value) {
+    void number(const std::string& what, uint32_t least, uint32_t most, uint32_t* value) {
+        const std::string range =
+                " (" + std::to_string(least) + " to " + std::to_string(most) + ")";
         const std::optional<Word> word = take();
-        const std::string range = std::string(what) + " from " + std::to_string(least) + " to " +
-                                  std::to_string(most);
-        if (!word) {
-            complain({"", mEnd}, range + " is missing");
-            return;
-        }
-        const char* end = word->text.data() + word->text.size();
-        const auto [stop, status] = std::from_chars(word->text.data(), end, *value);
-        if (status != std::errc() || stop != end || *value < least || *value > most) {
-            complain(*word, "\"" + word->text + "\" is not " + range);
-        }
+        if (!word) return complain({"", mEnd}, what + range + " is missing");
+        const auto parsed = cli::parseNumber(word->text, least, most);
+        if (!parsed) return complain(*word, cli::inQuotes(word->text) + " is not " + what + range);
+        *value = *parsed;
+    }
+
+    /** Reads one of some words into the step's number. */
+    void choose(const std::vector<std::string>& words, ScoreStep* step) {
+        const std::string list = cli::join(words, ", ", " or ");
+        const std::optional<Word> word = take();
+        if (!word) return complain({"", mEnd}, list + " is missing");
+        const auto found = std::find(words.begin(), words.end(), word->text);
+        if (found == words.end())
+            return complain(*word, cli::inQuotes(word->text) + " is not " + list);
+        step->number = static_cast<uint32_t>(found - words.begin());
     }
 
     std::optional<Word> take() {
@@ -151,25 +223,47 @@ class LineParser {
         return mWords[mNext++];
     }
     void complain(const Word& word, const std::string& what) {
-        mErrors.push_back({mNumber, word.column, what});
+        mErrors.push_back({mLine, word.column, what});
     }
 
+    Score& mScore;
+    std::vector<ScoreError>& mErrors;
+    std::vector<Block> mBlocks;
     std::vector<Word> mWords;
     size_t mNext = 0;
-    size_t mNumber;
-    size_t mEnd;
-    std::vector<ScoreError>& mErrors;
+    size_t mLine = 0;
+    size_t mEnd = 0;
 };
 
 }  // namespace
 
-std::vector<ScoreError> parseScore(const std::string& text, std::vector<ScoreStep>* steps) {
-    std::vector<ScoreError> errors;
-    std::istringstream lines(text);
-    size_t number = 0;
-    for (std::string line; std::getline(lines, line);) {
-        LineParser parser(line, ++number, &errors);
-        if (!parser.isEmpty()) steps->push_back(parser.parse());
+double Score::seconds() const {
+    constexpr double kPatternMs = 1000;
+    constexpr double kClickMs = 20;
+    double now = 0;
+    double stop = 0;
+    for (const uint32_t index : order) {
+        const ScoreStep& step = lines[index];
+        if (step.kind == ScoreStep::kWait) now += step.number;
+        if (step.kind == ScoreStep::kOn) stop = now + step.number;
+        if (step.kind == ScoreStep::kOff) stop = now;
+        if (step.kind == ScoreStep::kClick) stop = now + kClickMs;
+        if (step.kind == ScoreStep::kPattern && step.number != 0) stop = now + kPatternMs;
+        if (step.kind != ScoreStep::kEngine) continue;
+        stop = now;
+        for (const auto& packet : step.packets)
+            stop += std::max(0, packet.param0);
     }
+    return std::max(now, stop) / 1000;
+}
+
+std::vector<ScoreError> parseScore(const std::string& text, Score* score) {
+    std::vector<ScoreError> errors;
+    ScoreParser parser(score, &errors);
+    std::istringstream lines(text);
+    for (std::string line; errors.size() < kMostScoreErrors && std::getline(lines, line);)
+        parser.parseLine(line);
+    parser.finish();
+    errors.resize(std::min(errors.size(), kMostScoreErrors));
     return errors;
 }

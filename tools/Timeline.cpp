@@ -2,9 +2,9 @@
 #include "Timeline.h"
 
 #include <algorithm>
+#include <cmath>
 #include <cstdint>
 #include <cstdlib>
-#include <limits>
 #include <sstream>
 
 namespace {
@@ -13,179 +13,242 @@ namespace {
 constexpr double kFull = 10000;
 /** The index that makes the driver play its queue. */
 constexpr long long kQueueIndex = 0xFFFE;
-/** A run that nothing ends is shown for so long after the last call, in s. */
-constexpr double kOpenEnd = 1;
+/** Accesses of one call lie no further apart, in s. */
+constexpr double kSameCall = 0.05;
+/** How long the service plays a click, a stored pattern, and the start of packets, in ms. */
+constexpr long long kClickMs = 20;
+constexpr long long kPatternMs = 1000;
+constexpr long long kEngineMs = 1;
 
-/** Follows the driver from write to write. */
-class Motor {
-  public:
-    explicit Motor(Timeline* timeline) : mTimeline(*timeline) {}
+/** @return the amplitude from 1 to 255 that the service turns into an intensity; 0 for none. */
+int amplitudeOf(long long intensity) {
+    if (intensity < 1 || intensity > 10000) return 0;
+    const double exact = static_cast<double>(intensity - 1) * 254 / 9999 + 1;
+    const long amplitude = std::lround(exact);
+    const bool isOne =
+            std::lround(static_cast<double>(amplitude - 1) / 254 * 9999 + 1) == intensity;
+    return isOne ? static_cast<int>(amplitude) : 0;
+}
 
-    void write(const NodeAccess& access, double time) {
-        struct Node {
-            const char* leaf;
-            void (Motor::*write)(double time, long long value, const std::string& bytes);
-        };
-        constexpr Node kNodes[] = {
-                {"enable", &Motor::writeEnable},
-                {"duration", &Motor::writeDuration},
-                {"activate", &Motor::writeActivate},
-                {"intensity", &Motor::writeIntensity},
-                {"haptic_engine", &Motor::writeHapticEngine},
-                {"cp_trigger_index", &Motor::writeIndex},
-                {"cp_trigger_queue", &Motor::writeQueue},
-                {"event_cmd", &Motor::writeEvent},
-                {"ext_control", &Motor::writeExternalControl},
-                {"multi_freq", &Motor::writeFrequency},
-                {"force_touch_intensity", &Motor::writeForceTouch},
-        };
-        const std::string leaf = access.leaf();
-        for (const Node& node : kNodes) {
-            if (leaf != node.leaf) continue;
-            const long long value = strtoll(access.bytes.c_str(), nullptr, 10);
-            (this->*node.write)(time, value, access.bytes);
-        }
-    }
-
-    void finish() {
-        double last = mTimeline.marks.empty() ? 0 : mTimeline.marks.back().time;
-        for (const Timeline::Segment& segment : mTimeline.segments)
-            last = std::max(last, segment.start);
-        for (Timeline::Segment& segment : mTimeline.segments) {
-            if (segment.end > last + kOpenEnd && segment.end - segment.start > 60 * kOpenEnd) {
-                segment.end = last + kOpenEnd;
-            }
-            mTimeline.length = std::max(mTimeline.length, segment.end);
-        }
-        mTimeline.length = std::max(mTimeline.length, last);
-    }
-
-  private:
-    using Bytes = const std::string&;
-
-    void writeEnable(double time, long long value, Bytes /* bytes */) { switchMotor(time, value); }
-    void writeDuration(double /* time */, long long value, Bytes /* bytes */) { mDuration = value; }
-    void writeActivate(double time, long long value, Bytes /* bytes */) {
-        // While it runs, the trigger goes on as it is; what has been selected is set off.
-        if (value != 0 && time < mEnd && mPattern.empty() && mPackets.empty()) {
-            mark(time, "on " + std::to_string(mDuration) + ", runs already");
-        } else {
-            switchMotor(time, value == 0 ? 0 : mDuration);
-        }
-    }
-    void writeIntensity(double time, long long value, Bytes /* bytes */) {
-        mark(time, "intensity " + std::to_string(value));
-        setStrength(time, static_cast<double>(value) / kFull);
-    }
-    void writeHapticEngine(double time, long long /* value */, Bytes bytes) {
-        readPackets(bytes);
-        mark(time, "engine, " + std::to_string(mPackets.size()) + " packets");
-    }
-    void writeIndex(double time, long long value, Bytes /* bytes */) {
-        if (value == kQueueIndex) return;
-        const std::string label = "pattern " + std::to_string(value);
-        mPattern = value == 0 ? "" : label;
-        mark(time, label);
-    }
-    void writeQueue(double time, long long /* value */, Bytes bytes) {
-        const std::string play = bytes.substr(0, bytes.find(','));
-        const size_t point = play.find('.');
-        const std::string number = play.substr(0, point);
-        const std::string percent = point == std::string::npos ? "0" : play.substr(point + 1);
-        mPattern = "pattern " + number;
-        mQueueStrength = std::clamp(strtod(percent.c_str(), nullptr) / 100, 0.0, 1.0);
-        mark(time, "queue " + number + " at " + percent + " %");
-    }
-    void writeEvent(double time, long long /* value */, Bytes bytes) {
-        mark(time, bytes == "FOLDER_OPEN\n" ? "fold open" : "fold close");
-    }
-    void writeExternalControl(double time, long long value, Bytes /* bytes */) {
-        mark(time, value == 0 ? "external off" : "external on");
-    }
-    void writeFrequency(double time, long long value, Bytes /* bytes */) {
-        mark(time, "frequency " + std::to_string(value));
-    }
-    void writeForceTouch(double time, long long value, Bytes /* bytes */) {
-        mark(time, "force touch " + std::to_string(value));
-    }
-
-    void mark(double time, const std::string& label) { mTimeline.marks.push_back({time, label}); }
-
-    void stop(double time) {
-        for (Timeline::Segment& segment : mTimeline.segments)
-            segment.end = std::min(segment.end, std::max(segment.start, time));
-        mEnd = time;
-    }
-
-    void switchMotor(double time, long long ms) {
-        if (!mPackets.empty() && ms > 0) {
-            // The packets have their own times; this only sets them off.
-            stop(time);
-            for (const auto& [length, strength] : mPackets) {
-                add({time, time + length, strength, Timeline::Segment::kPacket, ""});
-                time += length;
-            }
-            mPackets.clear();
-            return;
-        }
-        mark(time, ms > 0 ? "on " + std::to_string(ms) : "off");
-        stop(time);
-        if (ms <= 0) return;
-        mEnd = time + static_cast<double>(ms) / 1000;
-        const bool queued = mQueueStrength >= 0;
-        add({time, mEnd, queued ? mQueueStrength : mStrength,
-             mPattern.empty() ? Timeline::Segment::kRun : Timeline::Segment::kPattern, mPattern});
-        mPattern.clear();
-        mQueueStrength = -1;
-    }
-
-    void setStrength(double time, double strength) {
-        mStrength = strength;
-        if (mTimeline.segments.empty()) return;
-        Timeline::Segment& running = mTimeline.segments.back();
-        if (running.kind != Timeline::Segment::kRun || running.end <= time) return;
-        const double end = running.end;
-        running.end = time;
-        add({time, end, strength, Timeline::Segment::kRun, ""});
-    }
-
-    void add(const Timeline::Segment& segment) { mTimeline.segments.push_back(segment); }
-
-    void readPackets(const std::string& text) {
-        std::istringstream numbers(text);
-        int64_t count = 0;
-        int64_t values[4];
-        numbers >> count;
-        mPackets.clear();
-        while (numbers >> values[0] >> values[1] >> values[2] >> values[3]) {
-            mPackets.emplace_back(std::max(0.0, static_cast<double>(values[0]) / 1000),
-                                  std::clamp(static_cast<double>(values[1]) / kFull, 0.0, 1.0));
-        }
-    }
-
-    Timeline& mTimeline;
-    double mStrength = 1;
-    double mEnd = -std::numeric_limits<double>::infinity();
-    long long mDuration = 0;
-    std::string mPattern;
-    double mQueueStrength = -1;
-    std::vector<std::pair<double, double>> mPackets;
-};
+/** @return the strength of the click with an amplitude; nullptr for that of none. */
+const char* clickOf(int amplitude) {
+    return amplitude == 36    ? "light"
+           : amplitude == 128 ? "medium"
+           : amplitude == 255 ? "strong"
+                              : nullptr;
+}
 
 }  // namespace
 
-Timeline makeTimeline(const std::vector<NodeAccess>& accesses) {
-    Timeline timeline;
-    Motor motor(&timeline);
-    double begin = -1;
-    double now = 0;
-    for (const NodeAccess& access : accesses) {
-        if (access.kind != NodeAccess::kWrite || !access.error.empty()) continue;
-        if (begin < 0) begin = access.time;
-        // In a trace that was put together the clock may seem to go back.
-        now = std::max(now, access.time - begin);
-        motor.write(access, now);
+void TimelineMaker::add(const NodeAccess& access) {
+    const bool isStrength = access.leaf() == "intensity";
+    const bool isUsed = access.kind == NodeAccess::kWrite && access.error.empty();
+    if (isUsed) {
+        if (mTimeline.marks.empty()) {
+            mFirst = access.time;
+            mTimeline.isTimed = !access.clock.empty();
+        }
+        if (!access.clock.empty()) {
+            // After a clock that was set back, the time goes on from there.
+            mFirst = std::min(mFirst, access.time - mNow);
+            mNow = access.time - mFirst;
+        }
+        write(access.leaf(), access.bytes);
     }
-    motor.finish();
-    return timeline;
+    mProbed = access.kind == NodeAccess::kProbe && isStrength && access.error.empty();
+}
+
+void TimelineMaker::write(const std::string& leaf, const std::string& bytes) {
+    const long long value = strtoll(bytes.c_str(), nullptr, 10);
+    const std::string number = std::to_string(value);
+    if (leaf == "enable") {
+        start(value);
+    } else if (leaf == "duration") {
+        mDuration = value;
+    } else if (leaf == "activate" && value == 0) {
+        start(0);
+    } else if (leaf == "activate" && mTimeline.isTimed && mBegun < kPattern && mNow < mStop) {
+        // While it runs, the trigger goes on as it is.
+        mark("on " + std::to_string(mDuration) + " (running)");
+    } else if (leaf == "activate" && mDuration == 0) {
+        mark("on 0");
+    } else if (leaf == "activate") {
+        start(mDuration);
+    } else if (leaf == "intensity") {
+        writeIntensity(value);
+    } else if (leaf == "haptic_engine") {
+        writeHapticEngine(bytes);
+    } else if (leaf == "cp_trigger_index") {
+        writeIndex(value);
+    } else if (leaf == "cp_trigger_queue") {
+        writeQueue(bytes);
+    } else if (leaf == "event_cmd") {
+        mark(bytes == "FOLDER_OPEN\n" ? "fold open" : "fold close", true);
+    } else if (leaf == "ext_control") {
+        mark(value == 0 ? "external off" : "external on", true);
+    } else if (leaf == "multi_freq") {
+        mark("frequency " + number, true);
+    } else if (leaf == "force_touch_intensity") {
+        mark("force-touch " + number, true);
+    }
+}
+
+bool TimelineMaker::isSoon() const {
+    return !mTimeline.isTimed || mNow - mTimeline.marks.back().time < kSameCall;
+}
+
+void TimelineMaker::mark(const std::string& label, bool isSetting) {
+    constexpr double kGap = 0.02;
+    constexpr double kLongest = 1;
+    if (!mTimeline.isTimed && !mTimeline.marks.empty()) {
+        mNow = isSetting ? mNow + kGap : std::clamp(mStop + kGap, mNow + kGap, mNow + kLongest);
+    }
+    mTimeline.marks.push_back({mNow, label});
+    mBegun = kNothing;
+}
+
+void TimelineMaker::writeIntensity(long long value) {
+    const double strength = std::max(0.0, static_cast<double>(value) / kFull);
+    // The service looks for the node before it sets an amplitude, and not before an intensity.
+    const int amplitude = mProbed ? amplitudeOf(value) : 0;
+    if (mBegun == kOn && isSoon() && clickOf(amplitude) != nullptr) {
+        // It starts the motor before it sets the strength; to the eye that is one.
+        mTimeline.marks.back().label = std::string("click ") + clickOf(amplitude);
+        mTimeline.segments.back().strength = mStrength = strength;
+        mBegun = kNothing;
+        return;
+    }
+    mark(amplitude > 0 ? "amplitude " + std::to_string(amplitude)
+                       : "intensity " + std::to_string(value),
+         true);
+    mBegun = kIntensity;
+    setStrength(strength);
+}
+
+void TimelineMaker::setStrength(double strength) {
+    mStrength = strength;
+    if (mTimeline.segments.empty()) return;
+    Timeline::Segment& running = mTimeline.segments.back();
+    if (running.kind != Timeline::Segment::kRun || running.end <= mNow) return;
+    if (running.start >= mNow) {
+        running.strength = strength;
+        return;
+    }
+    const double end = running.end;
+    running.end = mNow;
+    mTimeline.segments.push_back({mNow, end, strength, Timeline::Segment::kRun, false});
+}
+
+void TimelineMaker::writeHapticEngine(const std::string& text) {
+    std::istringstream numbers(text);
+    int64_t count = 0;
+    int64_t values[4];
+    numbers >> count;
+    mPackets.clear();
+    while (numbers >> values[0] >> values[1] >> values[2] >> values[3]) {
+        mPackets.emplace_back(std::max(0.0, static_cast<double>(values[0]) / 1000),
+                              std::max(0.0, static_cast<double>(values[1]) / kFull));
+    }
+    const std::string plural = mPackets.size() == 1 ? "" : "s";
+    mark("engine, " + std::to_string(mPackets.size()) + " packet" + plural);
+    mBegun = kEngine;
+}
+
+void TimelineMaker::writeIndex(long long value) {
+    mQueueStrength = -1;
+    // The text in the queue tells which pattern.
+    if (value == kQueueIndex) return;
+    const std::string label = "pattern " + std::to_string(value);
+    if (mBegun == kIntensity && isSoon()) {
+        mTimeline.marks.back().label = label;
+    } else {
+        mark(label);
+    }
+    mBegun = value == 0 ? kNothing : kPattern;
+}
+
+void TimelineMaker::writeQueue(const std::string& text) {
+    // "PATTERN.PERCENT, REPEATS, DELAY~"
+    char* rest = nullptr;
+    const long long pattern = strtoll(text.c_str(), &rest, 10);
+    const long long percent = *rest == '.' ? strtoll(rest + 1, nullptr, 10) : 0;
+    mQueueStrength = static_cast<double>(std::max(0LL, percent)) / 100;
+    mark("pattern " + std::to_string(pattern) + " repeat");
+    mBegun = kPattern;
+}
+
+void TimelineMaker::start(long long ms) {
+    const Begun begun = mBegun;
+    if (begun == kEngine && ms > 0) {
+        // The packets have their own times; this only sets them off.
+        if (ms != kEngineMs) mark("on " + std::to_string(ms));
+        stop();
+        double time = mNow;
+        for (const auto& [length, strength] : mPackets) {
+            mTimeline.segments.push_back(
+                    {time, time + length, strength, Timeline::Segment::kPacket, false});
+            time += length;
+        }
+        mStop = time;
+        mBegun = kNothing;
+        return;
+    }
+    if (begun != kPattern || ms != kPatternMs) mark(ms > 0 ? "on " + std::to_string(ms) : "off");
+    stop();
+    mStop = mNow;
+    mBegun = kNothing;
+    if (ms <= 0) return;
+    mStop = mNow + static_cast<double>(ms) / 1000;
+    const bool isQueued = begun == kPattern && mQueueStrength >= 0;
+    mTimeline.segments.push_back(
+            {mNow, mStop, isQueued ? mQueueStrength : mStrength,
+             begun == kPattern ? Timeline::Segment::kPattern : Timeline::Segment::kRun, false});
+    if (ms == kClickMs && begun != kPattern) mBegun = kOn;
+}
+
+void TimelineMaker::stop() {
+    auto& segments = mTimeline.segments;
+    while (!segments.empty() && segments.back().start >= mNow)
+        segments.pop_back();
+    if (!segments.empty()) segments.back().end = std::min(segments.back().end, mNow);
+}
+
+Timeline TimelineMaker::finish() {
+    // A run that nothing ends is drawn for a short while, or as long as all before it.
+    constexpr double kTail = 60;
+    auto& segments = mTimeline.segments;
+    double last = mNow;
+    for (const Timeline::Segment& segment : segments)
+        last = std::max(last, segment.start);
+    for (Timeline::Segment& segment : segments) {
+        if (segment.end - last > std::max(kTail, last)) {
+            segment.end = last + std::max(1.0, last / 20);
+            segment.isOpen = true;
+        }
+        mTimeline.end = std::max(mTimeline.end, segment.end);
+    }
+    mTimeline.end = std::max(mTimeline.end, last);
+    return std::move(mTimeline);
+}
+
+void cut(Timeline* timeline, double from, double to) {
+    timeline->start = std::max(timeline->start, from);
+    timeline->end = std::min(timeline->end, to);
+    auto& segments = timeline->segments;
+    auto& marks = timeline->marks;
+    const auto isOutside = [&](const auto& start, const auto& end) {
+        return start > timeline->end || end < timeline->start;
+    };
+    segments.erase(
+            std::remove_if(segments.begin(), segments.end(),
+                           [&](const auto& each) { return isOutside(each.start, each.end); }),
+            segments.end());
+    marks.erase(std::remove_if(marks.begin(), marks.end(),
+                               [&](const auto& each) { return isOutside(each.time, each.time); }),
+                marks.end());
+    for (Timeline::Segment& segment : segments) {
+        segment.start = std::max(segment.start, timeline->start);
+        segment.isOpen = segment.isOpen || segment.end > timeline->end;
+        segment.end = std::min(segment.end, timeline->end);
+    }
 }

@@ -15,5 +15,10 @@ struct WatchSource {
     bool once = false;
 };
 
-/** Prints the accesses of the driver's nodes as they come, a line each. @return the exit code. */
-int watch(const WatchSource& source);
+/**
+ * Prints the accesses of the driver's nodes as they come, a line each, and the calls that the
+ * service refused, as far as the source tells of them.
+ *
+ * @throw cli::UsageError when the file cannot be read.
+ */
+void watch(const WatchSource& source);

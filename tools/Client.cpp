@@ -1,0 +1,106 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Client.h"
+
+#include "Driver.h"
+#include "Reasons.h"
+
+#include <cerrno>
+#include <cstdlib>
+#include <cstring>
+#include <fstream>
+#include <iostream>
+#include <sstream>
+
+Client::Client()
+    : mProgram("vibratorctl", VERSION,
+               "Calls the vibrator service, and shows what it makes of its calls.") {
+    constexpr cli::Numbers kTimeouts = {"a time in s", 0, 3600};
+    cli::Command& shared = mProgram.shared();
+    mInstance = shared.text("--instance NAME", "name of the service's instance", "default");
+    mTimeout = shared.number("--timeout SECONDS", kTimeouts,
+                             "the longest that a call may take; 0: no limit", 10);
+    mJson = shared.flag("--json", "answer with a JSON object a line");
+    mVerbose = shared.flag("-v,--verbose", "name the interface's operation and its status, too");
+    shared.note("Exit code: 0 done; 1 refused, by the service or by what the output is written "
+                "to, or doctor has found something; 2 a mistake in the command line or in a file; "
+                "3 the service cannot be reached.")
+            .note("Only root and uid 1000 (system) may make the calls under \"For root and "
+                  "system\".")
+            .note("\"vibratorctl help COMMAND\" shows a command's options and an example.");
+}
+
+int Client::run(int argc, char** argv) {
+    int code = runCommand(argc, argv);
+    errno = 0;
+    if (!std::cout.flush()) {
+        std::cerr << "vibratorctl: standard output cannot be written: "
+                  << strerror(errno != 0 ? errno : EIO) << '\n';
+        code = kRefused;
+    }
+    return code;
+}
+
+int Client::runCommand(int argc, char** argv) {
+    // A command line with a mistake in it is still to be answered in JSON.
+    for (int i = 1; i < argc && strcmp(argv[i], "--") != 0; ++i)
+        mReport.isJson = mReport.isJson || strcmp(argv[i], "--json") == 0;
+    const auto fail = [this](const char* status, const std::string& reason, int code) {
+        const cli::Command* command = mProgram.current();
+        mReport.failure(command == nullptr ? "" : command->name(), status, reason);
+        return code;
+    };
+    try {
+        return mProgram.run(argc, argv, [this] {
+            service::setCallTimeout(*mTimeout);
+            mReport = {*mJson, *mVerbose};
+            return *mJson;
+        });
+    } catch (const cli::UsageError& error) {
+        return fail("USAGE", error.what(), kUsage);
+    } catch (const Unreachable& error) {
+        return fail("UNREACHABLE",
+                    std::string("the service cannot be reached: ") + error.what() +
+                            "; \"vibratorctl doctor\" says what to do",
+                    kUnreachable);
+    } catch (const std::exception& error) {
+        return fail("FAILED", error.what(), kRefused);
+    }
+}
+
+::android::sp<service::IDaxVibrator> Client::service() const {
+    std::string whyNot;
+    auto vibrator = service::connect(*mInstance, &whyNot);
+    if (vibrator == nullptr) throw Unreachable(whyNot);
+    return vibrator;
+}
+
+int Client::answer(const Call& call, const ::android::hardware::Return<VibratorStatus>& status,
+                   const Details& details) const {
+    return answer(call, reached(status), details);
+}
+
+int Client::answer(const Call& call, VibratorStatus status, const Details& details) const {
+    const std::string reason = status == VibratorStatus::OK ? "" : reasonOf(call, status);
+    return mReport.answer(call, status, details, reason);
+}
+
+std::string simulationDirectory() {
+    const char* directory = getenv("VIBRATOR_SIM_DIR");
+    return directory == nullptr ? "" : directory;
+}
+
+std::string readInput(const std::string& name) {
+    constexpr size_t kMost = 64 << 20;
+    errno = 0;
+    std::ifstream file(name);
+    std::istream& input = name == "-" ? std::cin : file;
+    std::string text;
+    char block[65536];
+    while (text.size() <= kMost && (input.read(block, sizeof(block)) || input.gcount() > 0))
+        text.append(block, static_cast<size_t>(input.gcount()));
+    if (text.size() > kMost) throw cli::UsageError(name + ": more than 64 MiB");
+    if (input.bad() || (name != "-" && !file.is_open())) {
+        throw cli::UsageError(name + ": cannot be read: " + strerror(errno != 0 ? errno : EIO));
+    }
+    return text;
+}

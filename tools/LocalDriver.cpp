@@ -1,0 +1,86 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "LocalDriver.h"
+
+#include "Client.h"
+#include "Driver.h"
+#include "Log.h"
+#include "MotorType.h"
+#include "NodePathTable.h"
+#include "Trace.h"
+
+#include <fcntl.h>
+#include <pwd.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
+
+using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
+
+LocalDriver::LocalDriver() : mSimulation(simulationDirectory()) {
+    simulator::onlyLook();
+    // Its log is the daemon's business.
+    setenv("ANDROID_LOG_TAGS", (std::string(kLogTag) + ":S").c_str(), 1);
+    mVibrator = new Vibrator();
+    mIsUsable = !THE_DEVICE_INTENSITY.empty();
+    mIsThere = mIsUsable || look(THE_DEVICE_ENABLE).exists || look(THE_DEVICE_ACTIVATE).exists;
+    // The service's code does not look at nodes that this user cannot open; people want to.
+    if (!mIsUsable)
+        setDriverMode(look(THE_DEVICE_ENABLE).exists ? kTimedOutputMode : kLedTriggerMode);
+}
+
+LocalDriver::Node LocalDriver::look(const std::string& path) const {
+    simulator::Node simulated;
+    const bool isSimulated =
+            !mSimulation.empty() && simulator::findNode(mSimulation, path.c_str(), &simulated);
+    struct stat info {};
+    Node node;
+    if (stat(isSimulated ? simulated.file.c_str() : path.c_str(), &info) != 0) return node;
+    node.exists = true;
+    const auto tryToOpen = [&](int mode, mode_t bits) {
+        // Root is let into any file, but not past the mode of a driver's attribute.
+        return (info.st_mode & bits) == 0 ? -1 : open(path.c_str(), mode | O_CLOEXEC | O_NONBLOCK);
+    };
+    const int writable = tryToOpen(O_WRONLY, 0222);
+    node.writes = writable >= 0;
+    if (node.writes) close(writable);
+    const int readable = tryToOpen(O_RDONLY, 0444);
+    node.reads = readable >= 0;
+    if (node.reads) {
+        char text[512];
+        const ssize_t size = read(readable, text, sizeof(text));
+        node.value.assign(text, static_cast<size_t>(std::max<ssize_t>(size, 0)));
+        close(readable);
+    }
+    char mode[8];
+    snprintf(mode, sizeof(mode), "%04o", info.st_mode & 07777);
+    node.mode = mode;
+    const passwd* user = getpwuid(info.st_uid);
+    node.owner = user != nullptr ? user->pw_name : std::to_string(info.st_uid);
+    return node;
+}
+
+std::string LocalDriver::layout() const {
+    if (!mIsThere) return "none";
+    return DriverMode == kTimedOutputMode ? "timed output" : "LED trigger";
+}
+
+std::string LocalDriver::directory() const {
+    return THE_DEVICE_INTENSITY.substr(0, THE_DEVICE_INTENSITY.rfind('/') + 1);
+}
+
+bool LocalDriver::isVibrating() const {
+    return mVibrator->isVibrating();
+}
+
+LocalDriver::Motor LocalDriver::motor() const {
+    int32_t number = mVibrator->getMotorIndex();
+    const char* found = "by the driver's name for it";
+    if (number == kMotorNone) {
+        number = mVibrator->getMotorIndexbyMethod();
+        found = "by the features of the driver";
+    }
+    return {number, MotorTypeNames[number], found};
+}

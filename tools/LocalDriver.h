@@ -1,0 +1,56 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "Vibrator.h"
+
+#include <string>
+
+/**
+ * The driver that this process sees, the kernel's or the simulated one, as the service's own code
+ * judges it. Looks only: nothing is written, a simulated driver's trace does not show it, and its
+ * faults are left for others.
+ */
+class LocalDriver {
+  public:
+    using Vibrator = ::vendor::velmora::hardware::vibrator::V2_1::implementation::Vibrator;
+
+    LocalDriver();
+
+    /** A node as it is now. */
+    struct Node {
+        bool exists = false;
+        bool reads = false;
+        bool writes = false;
+        std::string mode;
+        std::string owner;
+        std::string value;
+    };
+    Node look(const std::string& path) const;
+
+    /** @return whether the service's code, run as this user, finds a driver. */
+    bool isUsable() const { return mIsUsable; }
+    /** @return whether a driver is there, for another user at least. */
+    bool isThere() const { return mIsThere; }
+    /** @return "LED trigger", "timed output" or "none". */
+    std::string layout() const;
+    /** @return where the nodes are; ends in a slash. */
+    std::string directory() const;
+    bool isVibrating() const;
+
+    struct Motor {
+        int32_t number = 0;
+        std::string name;
+        /** How the service's code has found it out. */
+        std::string found;
+    };
+    /** @return the motor of a usable driver, for a user who may make the restricted calls. */
+    Motor motor() const;
+    /** The service's code itself, to be asked as its clients ask it. */
+    const ::android::sp<Vibrator>& vibrator() const { return mVibrator; }
+
+  private:
+    std::string mSimulation;
+    ::android::sp<Vibrator> mVibrator;
+    bool mIsUsable = false;
+    bool mIsThere = false;
+};

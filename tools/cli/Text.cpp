@@ -1,0 +1,118 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Text.h"
+
+#include <algorithm>
+#include <charconv>
+#include <clocale>
+#include <cstdio>
+#include <cwchar>
+#include <cwctype>
+#include <numeric>
+#include <sstream>
+
+namespace cli {
+namespace {
+
+/** @return how many letters must be changed, added or left out. */
+size_t distance(std::string_view a, std::string_view b) {
+    std::vector<size_t> steps(b.size() + 1);
+    std::iota(steps.begin(), steps.end(), 0);
+    for (const char letter : a) {
+        size_t diagonal = steps[0]++;
+        for (size_t i = 0; i < b.size(); ++i) {
+            const size_t changed = diagonal + (letter == b[i] ? 0 : 1);
+            diagonal = steps[i + 1];
+            steps[i + 1] = std::min({changed, steps[i] + 1, diagonal + 1});
+        }
+    }
+    return steps.back();
+}
+
+}  // namespace
+
+std::string printable(std::string_view text) {
+    // Which characters are controls is known of any language; without the locale, of ASCII.
+    static const char* const locale = setlocale(LC_CTYPE, "C.UTF-8");
+    static_cast<void>(locale);
+    std::string safe;
+    while (!text.empty()) {
+        mbstate_t state{};
+        wchar_t character = 0;
+        const size_t size = mbrtowc(&character, text.data(), text.size(), &state);
+        const bool isCharacter = size >= 1 && size <= text.size();
+        const std::string_view bytes = text.substr(0, isCharacter ? size : 1);
+        for (const char byte : bytes) {
+            char hex[8];
+            snprintf(hex, sizeof(hex), "\\x%02x", static_cast<unsigned char>(byte));
+            safe += isCharacter && iswprint(static_cast<wint_t>(character)) != 0
+                            ? std::string(1, byte)
+                            : hex;
+        }
+        text.remove_prefix(bytes.size());
+    }
+    return safe;
+}
+
+std::string printableLines(std::string_view text) {
+    std::string safe;
+    for (size_t end = 0; (end = text.find('\n')) != std::string_view::npos;) {
+        safe += printable(text.substr(0, end)) + '\n';
+        text.remove_prefix(end + 1);
+    }
+    return safe + printable(text);
+}
+
+std::string inQuotes(std::string_view text) {
+    return '"' + printable(text) + '"';
+}
+
+std::optional<uint32_t> parseNumber(std::string_view text, uint32_t least, uint32_t most) {
+    uint32_t number = 0;
+    const char* end = text.data() + text.size();
+    const auto [stop, error] = std::from_chars(text.data(), end, number);
+    if (error != std::errc() || stop != end || number < least || number > most) return {};
+    return number;
+}
+
+std::string suggestion(std::string_view typed, const std::vector<std::string>& known) {
+    constexpr size_t kLongest = 64;
+    const std::string* nearest = nullptr;
+    // A word of which more than a third is wrong is another word.
+    size_t best = std::min<size_t>(2, (typed.size() + 1) / 3) + 1;
+    for (const std::string& word : known) {
+        const size_t steps = typed.size() > kLongest ? best : distance(typed, word);
+        if (steps >= best) continue;
+        best = steps;
+        nearest = &word;
+    }
+    return nearest == nullptr ? "" : "; did you mean " + inQuotes(*nearest) + "?";
+}
+
+std::string join(const std::vector<std::string>& words, const std::string& separator,
+                 const std::string& last) {
+    std::string joined;
+    for (size_t i = 0; i < words.size(); ++i) {
+        joined += (i == 0 ? "" : i + 1 == words.size() ? last : separator) + words[i];
+    }
+    return joined;
+}
+
+std::string wrap(const std::string& text, size_t indent) {
+    std::istringstream words(text);
+    std::string lines;
+    size_t column = indent;
+    for (std::string word; words >> word;) {
+        if (column > indent && column + 1 + word.size() > kColumns) {
+            lines += '\n' + std::string(indent, ' ');
+            column = indent;
+        } else if (column > indent) {
+            lines += ' ';
+            ++column;
+        }
+        lines += word;
+        column += word.size();
+    }
+    return lines + '\n';
+}
+
+}  // namespace cli

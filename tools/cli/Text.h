@@ -1,0 +1,41 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+/** Texts that people type and read. */
+namespace cli {
+
+/**
+ * @return the text without anything that a terminal would obey: control characters, C1 ones too,
+ *     and bytes that are no UTF-8 stand as \xNN.
+ */
+std::string printable(std::string_view text);
+
+/** @return the same for a text of several lines, of which the ends stay. */
+std::string printableLines(std::string_view text);
+
+/** @return the text between quotation marks, printable. */
+std::string inQuotes(std::string_view text);
+
+/** @return the number, if the text is a whole decimal one from least to most. */
+std::optional<uint32_t> parseNumber(std::string_view text, uint32_t least, uint32_t most);
+
+/** @return `; did you mean "WORD"?` for the known word nearest to a mistyped one, or nothing. */
+std::string suggestion(std::string_view typed, const std::vector<std::string>& known);
+
+/** @return words with a separator between them, and another one before the last. */
+std::string join(const std::vector<std::string>& words, const std::string& separator,
+                 const std::string& last);
+
+/** Columns that helps and tables keep to. */
+constexpr size_t kColumns = 80;
+
+/** @return the text in lines of at most kColumns, all but the first of them indented. */
+std::string wrap(const std::string& text, size_t indent);
+
+}  // namespace cli
