@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Vibrator.h"
-#include "support/VibratorPeer.h"
 
 #include <benchmark/benchmark.h>
 #include <fcntl.h>
@@ -13,7 +12,6 @@ namespace {
 
 using ::vendor::velmora::hardware::vibrator::V2_1::implementation::Status;
 using ::vendor::velmora::hardware::vibrator::V2_1::implementation::Vibrator;
-using ::vendor::velmora::hardware::vibrator::V2_1::implementation::VibratorPeer;
 
 /** A file that is held in memory, as a node of sysfs is, and has a path about as long. */
 class MemoryNode {
@@ -37,7 +35,7 @@ void writeNode(benchmark::State& state) {
     const MemoryNode node;
     const android::sp<Vibrator> vibrator = new Vibrator;
     for (auto _ : state) {
-        if (VibratorPeer::writeNode(*vibrator, node.path(), 500) != Status::OK) abort();
+        if (vibrator->writeNode(node.path(), 500) != Status::OK) abort();
     }
 }
 BENCHMARK(writeNode);
@@ -56,7 +54,7 @@ void readNode(benchmark::State& state) {
     const MemoryNode node;
     const android::sp<Vibrator> vibrator = new Vibrator;
     for (auto _ : state) {
-        if (VibratorPeer::readNode(*vibrator, node.path()) != 500) abort();
+        if (vibrator->readNode(node.path()) != 500) abort();
     }
 }
 BENCHMARK(readNode);

@@ -10,8 +10,8 @@
 #include <fcntl.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdlib>
-#include <fstream>
 #include <memory>
 
 namespace {
@@ -21,13 +21,17 @@ using simulator::Layout;
 
 const std::string kDirectory = simulator::sysfsDirectory(Layout::kLedTrigger);
 
-/** Makes the nodes anew, as the operation expects them. */
-void prepare(const Operation& operation) {
+/** Makes the nodes anew, as the operation expects them. @return its accesses of nodes. */
+std::vector<Step> prepare(const Operation& operation) {
     simulator::Features features;
     for (const std::string& name : simulator::featureNames())
         features.names.insert(name);
-    if (simulator::createDriver("", Layout::kLedTrigger, features) != 0) abort();
-    std::ofstream(kDirectory + "motor_type") << operation.motor;
+    if (simulator::createNodes("", Layout::kLedTrigger, features) != 0) abort();
+    std::vector<Step> steps = parseSteps(Layout::kLedTrigger, operation.steps);
+    prepareNodes("", Layout::kLedTrigger, steps);
+    const auto isNone = [](const Step& step) { return !step.isAccess() || step.isAfterFailure; };
+    steps.erase(std::remove_if(steps.begin(), steps.end(), isNone), steps.end());
+    return steps;
 }
 
 void runOperation(benchmark::State& state, const Operation& operation) {
@@ -44,18 +48,25 @@ void runOperation(benchmark::State& state, const Operation& operation) {
 }
 
 void runFloor(benchmark::State& state, const Operation& operation) {
-    prepare(operation);
-    std::vector<std::string> paths;
-    for (const Access& access : operation.accesses)
-        paths.push_back(kDirectory + access.leaf);
+    struct Access {
+        Step::Kind kind;
+        std::string path;
+        int mode;
+        std::string bytes;
+        size_t size;
+    };
+    std::vector<Access> accesses;
+    for (const Step& step : prepare(operation)) {
+        accesses.push_back({step.kind, kDirectory + step.leaf, step.readsOnly ? O_RDONLY : O_RDWR,
+                            step.bytes(), step.size});
+    }
     for (auto _ : state) {
-        for (size_t i = 0; i < paths.size(); ++i) {
-            const Access& access = operation.accesses[i];
-            const int file = open(paths[i].c_str(), access.mode);
+        for (const Access& access : accesses) {
+            const int file = open(access.path.c_str(), access.mode);
             char text[512];
-            if (access.kind == Access::kRead && read(file, text, access.size) < 0) abort();
-            if (access.kind == Access::kWrite &&
-                write(file, access.text.data(), access.text.size()) < 0) {
+            if (access.kind == Step::kRead && read(file, text, access.size) < 0) abort();
+            if (access.kind == Step::kWrite &&
+                write(file, access.bytes.data(), access.bytes.size()) < 0) {
                 abort();
             }
             close(file);
@@ -66,7 +77,7 @@ void runFloor(benchmark::State& state, const Operation& operation) {
 }  // namespace
 
 void registerOperations() {
-    for (const Operation& operation : allOperations(Layout::kLedTrigger)) {
+    for (const Operation& operation : allOperations()) {
         const std::string name = "operation/" + operation.name;
         benchmark::RegisterBenchmark(name.c_str(), runOperation, operation);
         benchmark::RegisterBenchmark((name + "/floor").c_str(), runFloor, operation);

@@ -1,13 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "MotorType.h"
-#include "NodePaths.h"
-#include "support/VibratorPeer.h"
+#include "NodePathTable.h"
+#include "Vibrator.h"
 
 #include <sys/mman.h>
 #include <unistd.h>
 
 #include <cstdio>
 #include <cstdlib>
+#include <optional>
 #include <string>
 
 using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
@@ -21,9 +22,10 @@ std::string textOf(const std::string& content, size_t most) {
     return text.substr(0, text.find('\0'));
 }
 
-int32_t numberOf(const std::string& content) {
-    int32_t number = -1;
-    return sscanf(content.substr(0, 7).c_str(), "%d", &number) == 1 ? number : -1;
+std::optional<int32_t> numberOf(const std::string& content) {
+    int32_t number = 0;
+    if (sscanf(content.substr(0, 7).c_str(), "%d", &number) == 1) return number;
+    return std::nullopt;
 }
 
 int32_t motorOf(const std::string& content) {
@@ -47,18 +49,17 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     if (ftruncate(file, 0) != 0 || pwrite(file, data, size, 0) != static_cast<ssize_t>(size))
         abort();
 
-    const int32_t number = numberOf(content);
-    if (VibratorPeer::readNode(*vibrator, node) != number) abort();
+    const std::optional<int32_t> number = numberOf(content);
+    if (vibrator->readNode(node) != number.value_or(-1)) abort();
     int answers = 0;
     vibrator->daxGetNumberOfPrebakedHapticPattern([&](Status status, uint32_t count) {
-        const bool isCount = number != -1;
-        if ((status == Status::OK) != isCount) abort();
-        if (count != (isCount ? static_cast<uint32_t>(number) : 0)) abort();
+        if ((status == Status::OK) != number.has_value()) abort();
+        if (count != static_cast<uint32_t>(number.value_or(0))) abort();
         ++answers;
     });
     if (answers != 1) abort();
 
-    if (VibratorPeer::getMotorIndex(*vibrator) != motorOf(content)) abort();
+    if (vibrator->getMotorIndex() != motorOf(content)) abort();
     const bool enhanced = vibrator->daxSupportsEnhancedVelmoraHapticPattern();
     if (enhanced != (textOf(content, 31) == "LINEAR_1040")) abort();
     const bool folds = vibrator->daxSupportsFolderStatusSetting();

@@ -7,13 +7,15 @@
  */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     const std::string text(reinterpret_cast<const char*>(data), size);
-    std::vector<ScoreStep> steps;
-    const std::vector<ScoreError> errors = parseScore(text, &steps);
+    Score score;
+    const std::vector<ScoreError> errors = parseScore(text, &score);
     for (const ScoreError& error : errors) {
         if (error.line == 0 || error.column == 0 || error.column > size + 1) abort();
     }
     if (!errors.empty()) return 0;
-    for (const ScoreStep& step : steps) {
+    if (score.order.empty() || !(score.seconds() >= 0)) abort();
+    for (const uint32_t index : score.order) {
+        const ScoreStep& step = score.lines.at(index);
         if (step.amplitude < 1 || step.amplitude > 10000 || step.packets.size() > 339) abort();
     }
     return 0;

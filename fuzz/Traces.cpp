@@ -4,17 +4,22 @@
 #include <cstdlib>
 #include <sstream>
 
-/** Any bytes as a trace and as a log, drawn both ways. */
+/** Any bytes as a trace and as a log, drawn all ways, whole and in part. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-    std::istringstream lines(std::string(reinterpret_cast<const char*>(data), size));
     TraceReader trace;
     LogReader log;
-    std::vector<NodeAccess> accesses;
+    TimelineMaker maker;
+    std::istringstream lines(std::string(reinterpret_cast<const char*>(data), size));
     for (std::string line; std::getline(lines, line);) {
-        if (auto access = trace.read(line)) accesses.push_back(std::move(*access));
-        if (auto access = log.read(line)) accesses.push_back(std::move(*access));
+        if (const auto access = trace.read(line)) maker.add(*access);
+        if (const auto access = log.read(line)) maker.add(*access);
     }
-    const Timeline timeline = makeTimeline(accesses);
-    if (plotSvg(timeline).empty() || plotText(timeline, 80).empty()) abort();
+    Timeline timeline = maker.finish();
+    for (const Timeline::Segment& segment : timeline.segments) {
+        if (!(segment.start <= segment.end && segment.end <= timeline.end)) abort();
+    }
+    if (plotText(timeline, 80).empty()) abort();
+    cut(&timeline, timeline.end / 4, timeline.end / 2);
+    if (plotScript(timeline, PictureFormat::kSvg).empty()) abort();
     return 0;
 }

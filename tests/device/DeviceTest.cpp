@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "NodePaths.h"
+#include "NodePathTable.h"
 #include "support/Process.h"
 
 #include <gtest/gtest.h>
@@ -136,25 +136,36 @@ TEST(DeviceTest, InitStartsTheServiceAndGivesItTheNodes) {
     EXPECT_EQ(given, nodePaths());
 }
 
-TEST(DeviceTest, ManifestDeclaresWhatIsRegistered) {
+/** What a manifest or matrix in device/ says of each interface: package, version and name. */
+std::vector<std::vector<std::string>> interfacesIn(const std::string& file, const char* type) {
     pugi::xml_document document;
-    const std::string path = kSource + "/device/" + kBinary + ".xml";
-    const pugi::xml_parse_result result = document.load_file(path.c_str());
-    ASSERT_TRUE(result) << result.description();
-    const pugi::xml_node manifest = document.child("manifest");
-    EXPECT_STREQ(manifest.attribute("type").value(), "device");
+    const pugi::xml_parse_result result = document.load_file((kSource + "/device/" + file).c_str());
+    EXPECT_TRUE(result) << file << ": " << result.description();
+    const pugi::xml_node root = document.document_element();
+    EXPECT_STREQ(root.attribute("type").value(), type);
 
-    std::vector<std::vector<std::string>> declared;
-    for (const pugi::xml_node& hal : manifest.children("hal")) {
+    std::vector<std::vector<std::string>> interfaces;
+    for (const pugi::xml_node& hal : root.children("hal")) {
         EXPECT_STREQ(hal.attribute("format").value(), "hidl");
-        EXPECT_STREQ(hal.child_value("transport"), "hwbinder");
         EXPECT_STREQ(hal.child("interface").child_value("instance"), "default");
-        declared.push_back({hal.child_value("name"), hal.child_value("version"),
-                            hal.child("interface").child_value("name")});
+        // A manifest says how the interface is reached; a matrix, whether it must be there.
+        const std::string manner = hal.child_value("transport");
+        EXPECT_EQ(manner + hal.attribute("optional").value(),
+                  type == std::string("device") ? "hwbinder" : "true");
+        interfaces.push_back({hal.child_value("name"), hal.child_value("version"),
+                              hal.child("interface").child_value("name")});
     }
+    return interfaces;
+}
+
+TEST(DeviceTest, ManifestDeclaresWhatIsRegisteredAndMatrixAllowsIt) {
     using ::android::hardware::vibrator::V1_3::IVibrator;
-    EXPECT_EQ(declared, (std::vector<std::vector<std::string>>{partsOf(IDaxVibrator::descriptor),
-                                                               partsOf(IVibrator::descriptor)}));
+    using Interfaces = std::vector<std::vector<std::string>>;
+    const std::vector<std::string> ours = partsOf(IDaxVibrator::descriptor);
+    EXPECT_EQ(interfacesIn(kBinary + ".xml", "device"),
+              (Interfaces{ours, partsOf(IVibrator::descriptor)}));
+    // The platform's own matrix has the platform's interface.
+    EXPECT_EQ(interfacesIn("framework_compatibility_matrix.xml", "framework"), Interfaces{ours});
 }
 
 TEST(DeviceTest, PolicyNamesTheBinaryTheInterfaceAndTheDirectories) {

@@ -10,7 +10,6 @@
 #include <chrono>
 #include <cstdlib>
 #include <iostream>
-#include <regex>
 #include <thread>
 
 /**
@@ -72,14 +71,14 @@ class KernelTest : public ::testing::Test {
     KernelTest() { run({"off"}); }
 
     static Outcome run(std::vector<std::string> words, uid_t uid = kSystem) {
-        words.insert(words.begin(), "/bin/vibratorctl");
+        words.insert(words.begin(), {"/bin/vibratorctl", "-v"});
         return runProgram(words, uid);
     }
     static void expectRefusal(const std::vector<std::string>& words, const std::string& status,
                               uid_t uid = kSystem) {
         const Outcome outcome = run(words, uid);
         EXPECT_EQ(outcome.exitCode, 1) << words[0];
-        EXPECT_NE(outcome.errors.find(": " + status + ": "), std::string::npos) << outcome.errors;
+        EXPECT_NE(outcome.errors.find(": " + status + "]"), std::string::npos) << outcome.errors;
     }
     static void wait(int milliseconds) {
         std::this_thread::sleep_for(std::chrono::milliseconds(milliseconds));
@@ -141,7 +140,7 @@ TEST_F(KernelTest, OffEndsItEarly) {
 TEST_F(KernelTest, ClickLightsTheLine) {
     Watcher watcher;
     // Without an intensity node its strength is not set, and it is played all the same.
-    EXPECT_EQ(run({"click"}).output, "perform: OK\nlengthMs: 20\n");
+    EXPECT_EQ(run({"click"}).output, "click: OK, 20 ms [perform: OK]\n");
     wait(200);
     show("click lit the line for", watcher.stop(), "ms");
     EXPECT_EQ(getNode(kLed + "duration"), "20\n");
@@ -153,15 +152,6 @@ TEST_F(KernelTest, ValuesAtTheEdgesAreTheKernelsToJudge) {
     EXPECT_EQ(run({"on", "2147483647"}).exitCode, 0);
     EXPECT_EQ(getNode(kLed + "activate"), "1\n");
     EXPECT_EQ(run({"off"}).exitCode, 0);
-    // Written as negative numbers, which the kernel refuses; what was written before stays.
-    for (const char* value : {"4294967295", "2147483648"}) {
-        const size_t before = readFile(kLog).size();
-        expectRefusal({"on", value}, "UNKNOWN_ERROR");
-        const std::string log = readFile(kLog).substr(before);
-        EXPECT_NE(log.find("THE_DEVICE_DURATION is impossible"), std::string::npos) << log;
-        EXPECT_EQ(log.find("/activate"), std::string::npos) << log;
-        EXPECT_EQ(getNode(kLed + "duration"), "2147483647\n");
-    }
 }
 
 TEST_F(KernelTest, CallerIsJudgedByItsUid) {
@@ -177,7 +167,9 @@ TEST_F(KernelTest, CallerIsJudgedByItsUid) {
 TEST_F(KernelTest, MissingNodesAnswerFalseAndFail) {
     const std::string supports = run({"supports"}).output;
     EXPECT_EQ(supports.find("yes"), std::string::npos) << supports;
-    EXPECT_NE(supports.find("daxSupportsHapticEngine: no"), std::string::npos) << supports;
+    EXPECT_NE(supports.find("haptic engine packets: no [daxSupportsHapticEngine]"),
+              std::string::npos)
+            << supports;
     expectRefusal({"amplitude", "5"}, "UNSUPPORTED_OPERATION");
     expectRefusal({"intensity", "5"}, "UNKNOWN_ERROR");
     expectRefusal({"frequency", "1"}, "UNKNOWN_ERROR");
@@ -187,24 +179,6 @@ TEST_F(KernelTest, MissingNodesAnswerFalseAndFail) {
     expectRefusal({"fold", "open"}, "UNKNOWN_ERROR");
     expectRefusal({"external", "on"}, "UNSUPPORTED_OPERATION");
     expectRefusal({"ladder"}, "UNSUPPORTED_OPERATION");
-}
-
-TEST_F(KernelTest, DaemonIsSmall) {
-    std::smatch figure;
-    // Exact, which the figures in "status" are not: those lag behind on every processor.
-    const std::string memory =
-            readFile("/proc/" + std::to_string(sDaemon->pid()) + "/smaps_rollup");
-    for (const char* kind : {"Rss", "Private_Dirty"}) {
-        ASSERT_TRUE(
-                std::regex_search(memory, figure, std::regex(std::string(kind) + ":\\s+(\\d+)")));
-        show(std::string("the daemon's ") + kind, std::stoi(figure[1]), "KiB");
-        EXPECT_GT(std::stoi(figure[1]), 0);
-        EXPECT_LE(std::stoi(figure[1]), 3 * 1024);
-    }
-    struct stat binary {};
-    ASSERT_EQ(stat(kDaemon, &binary), 0);
-    show("the daemon's stripped binary", static_cast<double>(binary.st_size) / 1024, "KiB");
-    EXPECT_LT(binary.st_size, 1536 * 1024);
 }
 
 }  // namespace

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "log/LogFilter.h"
+#include "liblog/LogFilter.h"
 #include "support/LogCapture.h"
 
 #include <android/log.h>
@@ -40,6 +40,26 @@ TEST(LogFilterTest, RulesDecideByTagAndPriority) {
     for (const char* bad : {"A:", "A:X", "A:DD", ":D", "A:3"}) {
         EXPECT_EQ(LogFilter(std::string("B:E ") + bad + " C:!").firstBadRule(), bad);
         EXPECT_FALSE(LogFilter(std::string("B:E ") + bad).shows(ANDROID_LOG_WARN, "B"));
+    }
+}
+
+TEST(LogTest, PriorityIsALetter) {
+    LogCapture log;
+    const std::pair<int, char> cases[] = {{ANDROID_LOG_VERBOSE, 'V'},
+                                          {ANDROID_LOG_DEBUG, 'D'},
+                                          {ANDROID_LOG_INFO, 'I'},
+                                          {ANDROID_LOG_WARN, 'W'},
+                                          {ANDROID_LOG_ERROR, 'E'},
+                                          {ANDROID_LOG_FATAL, 'F'},
+                                          // What is no priority of a line counts as debug.
+                                          {ANDROID_LOG_UNKNOWN, 'D'},
+                                          {ANDROID_LOG_DEFAULT, 'D'},
+                                          {ANDROID_LOG_SILENT, 'D'},
+                                          {-1, 'D'},
+                                          {99, 'D'}};
+    for (const auto& [priority, letter] : cases) {
+        EXPECT_EQ(__android_log_print(priority, "T", "text"), 1);
+        EXPECT_EQ(log.takeText()[0], letter) << priority;
     }
 }
 

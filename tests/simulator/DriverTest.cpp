@@ -1,8 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "Faults.h"
+#include "Folder.h"
+#include "Trace.h"
 #include "support/TransientTrigger.h"
 #include "support/VibratorTest.h"
 
 #include <fcntl.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -99,6 +104,87 @@ TEST_F(SimulatedDriverTest, OtherFilesAreNotTouched) {
     EXPECT_EQ(::write(file, "abc", 3), 3);
     EXPECT_EQ(::close(file), 0);
     EXPECT_EQ(trace(), Lines());
+}
+
+TEST_F(SimulatedDriverTest, TwoProcessesShareTheTimesOfAFault) {
+    start(Layout::kLedTrigger);
+    constexpr int kTimes = 100;
+    ASSERT_TRUE(simulator::setFault(mDirectory.path(), "intensity", "read",
+                                    simulator::Fault{EIO, 0, kTimes, 50}));
+    const simulator::Folder directory(mDirectory.path());
+    const auto countFaults = [&] {
+        int count = 0;
+        for (int i = 0; i < 2 * kTimes; ++i)
+            count += simulator::takeFault(directory, "intensity", "read") ? 1 : 0;
+        return count;
+    };
+    const pid_t other = fork();
+    if (other == 0) _exit(countFaults());
+    const int own = countFaults();
+    int status = 0;
+    waitpid(other, &status, 0);
+    EXPECT_EQ(own + WEXITSTATUS(status), kTimes);
+}
+
+TEST_F(SimulatedDriverTest, ReadersNeverSeeHalfAValue) {
+    start(Layout::kLedTrigger);
+    const pid_t writer = fork();
+    if (writer == 0) {
+        alarm(20);
+        for (;;) {
+            put("intensity", "1\n");
+            put("intensity", "10000\n");
+        }
+    }
+    std::set<std::string> seen;
+    for (int i = 0; i < 3000; ++i)
+        seen.insert(get("intensity"));
+    kill(writer, SIGKILL);
+    waitpid(writer, nullptr, 0);
+    EXPECT_EQ(seen, (std::set<std::string>{"1\n", "10000\n"}));
+}
+
+TEST_F(SimulatedDriverTest, TraceIsLimitedAndStaysInsideMarkedFolders) {
+    start(Layout::kLedTrigger);
+    const std::string file = simulator::traceFile(mDirectory.path());
+    const auto size = [&] {
+        struct stat info {};
+        return stat(file.c_str(), &info) == 0 ? info.st_size : -1;
+    };
+    ASSERT_EQ(truncate(file.c_str(), simulator::kTraceLimit - 1), 0);
+    get("intensity");
+    const off_t full = size();
+    EXPECT_GT(full, simulator::kTraceLimit);
+    get("intensity");
+    EXPECT_EQ(size(), full);
+
+    // A link is not followed; without the mark, nothing is written.
+    const std::string victim = mDirectory.path() + "/victim";
+    for (const bool isMarked : {true, false}) {
+        remove(file.c_str());
+        if (isMarked) {
+            ASSERT_EQ(symlink(victim.c_str(), file.c_str()), 0);
+        } else {
+            ASSERT_EQ(remove((mDirectory.path() + "/.vibrator-sim").c_str()), 0);
+        }
+        get("intensity");
+        EXPECT_EQ(access((isMarked ? victim : file).c_str(), F_OK), -1) << isMarked;
+    }
+}
+
+TEST_F(SimulatedDriverTest, NamesStayInTheirFolder) {
+    const simulator::Folder folder(mDirectory.path());
+    for (const char* name : {"a/b", ".", "..", "../x", ""}) {
+        EXPECT_NE(folder.replace(name, "x", 0600), 0) << name;
+        EXPECT_LT(folder.open(name, O_RDONLY), 0) << name;
+    }
+    for (const char* path : {"..", "sys/../../x"})
+        EXPECT_NE(simulator::Folder(folder, path, true).error(), 0) << path;
+    start(Layout::kLedTrigger);
+    for (const char* leaf : {"../../../../../victim", ".deadline", ""})
+        EXPECT_NE(put(leaf, "1"), 0) << leaf;
+    ASSERT_EQ(mkfifo((mDirectory.path() + path("pipe")).c_str(), 0600), 0);
+    EXPECT_EQ(put("pipe", "1"), EINVAL) << "must not wait for a reader";
 }
 
 }  // namespace

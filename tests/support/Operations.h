@@ -1,80 +1,61 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Driver.h"
 #include "support/Answer.h"
-#include "support/LogCapture.h"
+#include "support/Steps.h"
 
 #include <functional>
 #include <string>
+#include <tuple>
+#include <type_traits>
+#include <utility>
 #include <vector>
 
-/**
- * What every operation of the interface does, step by step: one table, for the tests of the object,
- * of the daemon, of every fault, and for the benchmarks. Lines of the log are cut down to priority
- * and message, like "E Pemission denied (2000)".
- */
-
-/** One access of a node: open, at most one transfer, close. */
-struct Access {
-    enum Kind { kProbe, kRead, kWrite };
-    Kind kind;
-    std::string leaf;
-    /** O_RDONLY or O_RDWR. */
-    int mode;
-    /** What is written, or what the node holds. */
-    std::string text;
-    /** How many bytes a read asks for. */
-    size_t size;
-    /** Of a text: what the log lines of the access begin with. A number's are the primitives'. */
-    std::string textOf;
-
-    /** What the operation logs before the access. */
-    Lines before;
-    /** The operation's answer, and what it logs at the end, when the open or the transfer fails. */
-    std::string answerFailed;
-    Lines logFailed;
-    /** The answer when the transfer fails, where that is another. */
-    std::string answerTransferFailed;
-    /** The answer when a read yields a single byte; a write of a single one has failed. */
-    std::string answerOneByte;
-    /** Whether the operation goes on after a failure, with these nodes written all the same. */
-    bool goesOn = false;
-    Lines writtenAfter;
-};
-
-/** An operation with certain arguments. */
+/** A call of an operation with certain arguments, and what it does. */
 struct Operation {
     std::string name;
     std::function<Answer(IDaxVibrator&)> call;
     std::string answer;
-    std::string answerWithoutDriver;
-    /** The answer to a caller who is not permitted; empty where everybody is. */
-    std::string answerRefused;
-    std::vector<Access> accesses;
-    /** What it logs after the last access. */
-    Lines end;
-    /** How many of the lines before the first access come before the caller is judged. */
-    size_t linesBeforeGate = 0;
-    /** What motor_type holds. */
-    std::string motor = "LINEAR_1040\n";
+    /** In the notation of Steps.h. */
+    std::string steps;
+    /** The answer when a step fails that does not tell another one. */
+    std::string answerFailed;
 };
 
 /** @return each operation of the interface, on a driver that has every feature and is at rest. */
-std::vector<Operation> allOperations(simulator::Layout layout);
+std::vector<Operation> allOperations();
 
-/** @return what the trace shows of an operation that nothing disturbs. */
-Lines undisturbedTrace(simulator::Layout layout, const Operation& operation);
+/** An argument of whatever type it takes. */
+template <typename Given>
+struct Argument {
+    Given given;
+    template <typename Taken>
+    operator Taken() const {
+        return static_cast<Taken>(given);
+    }
+};
 
-/** @return what an operation that nothing disturbs logs. */
-Lines undisturbedLog(simulator::Layout layout, const Operation& operation);
+/** What a callback is given, as one. */
+template <typename Callback>
+struct GivenTo;
+template <typename... Given>
+struct GivenTo<std::function<void(Given...)>> {
+    using Type = std::pair<std::decay_t<Given>...>;
+};
 
-/**
- * @param index the access that fails; nothing after it happens.
- * @param opens whether it is the transfer that fails, rather than the open.
- * @param error the errno; 0 where the transfer is cut short.
- * @param result what the transfer yields.
- * @return what the operation logs.
- */
-Lines failedLog(simulator::Layout layout, const Operation& operation, size_t index, bool opens,
-                int error, int result);
+/** @return a call of an operation; its enums and structures are taken as plain numbers, too. */
+template <typename Result, typename Interface, typename... Taken, typename... Given>
+std::function<Answer(IDaxVibrator&)> call(
+        ::android::hardware::Return<Result> (Interface::*operation)(Taken...), Given... given) {
+    return [=](IDaxVibrator& vibrator) {
+        if constexpr (std::is_void_v<Result>) {
+            using Callback = std::tuple_element_t<sizeof...(Given), std::tuple<Taken...>>;
+            using Both = typename GivenTo<std::decay_t<Callback>>::Type;
+            return answerTo<Both>([&](const auto& callback) {
+                return (vibrator.*operation)(Argument<Given>{given}..., callback);
+            });
+        } else {
+            return answerOf((vibrator.*operation)(Argument<Given>{given}...));
+        }
+    };
+}

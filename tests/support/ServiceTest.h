@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "Driver.h"
 #include "support/Answer.h"
 #include "support/Process.h"
 #include "support/TemporaryDirectory.h"
@@ -17,6 +18,7 @@ class ServiceTest : public ::testing::Test {
     ServiceTest() {
         setenv("HWBINDER_DIR", socketDirectory().c_str(), 1);
         setenv("VIBRATOR_SIM_DIR", mDirectory.path().c_str(), 1);
+        simulator::claimDirectory(mDirectory.path());
     }
     ~ServiceTest() override {
         unsetenv("HWBINDER_DIR");
@@ -40,7 +42,7 @@ class ServiceTest : public ::testing::Test {
     /** Starts the daemon, and waits until it answers. */
     void start(const std::vector<std::string>& environment = {}) {
         startDaemon(mService, "", environment);
-        ASSERT_TRUE(eventually([] { return IDaxVibrator::getService()->ping().isOk(); })) << log();
+        ASSERT_TRUE(eventually(isThere)) << log();
     }
 
     /** Starts a daemon, with its standard error redirected as a shell does. */
@@ -53,6 +55,10 @@ class ServiceTest : public ::testing::Test {
                 logFile(), environment);
     }
 
+    static bool isThere() {
+        const auto vibrator = IDaxVibrator::tryGetService();
+        return vibrator != nullptr && vibrator->ping().isOk();
+    }
     std::string socketDirectory() const { return mDirectory.path() + "/sockets"; }
     std::string logFile() const { return mDirectory.path() + "/log"; }
     std::string log() const { return readFile(logFile()); }

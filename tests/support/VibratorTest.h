@@ -2,32 +2,16 @@
 #pragma once
 
 #include "Driver.h"
-#include "NodePaths.h"
+#include "NodePathTable.h"
 #include "Vibrator.h"
 #include "support/LogCapture.h"
+#include "support/Operations.h"
 #include "support/TemporaryDirectory.h"
-#include "support/VibratorPeer.h"
 
 #include <gtest/gtest.h>
 
-#include <optional>
-#include <ostream>
-#include <set>
+#include <functional>
 #include <string>
-#include <vector>
-
-namespace android::hardware::vibrator::V1_0 {
-inline void PrintTo(Status status, std::ostream* out) {
-    const char* const names[] = {"OK", "UNKNOWN_ERROR", "BAD_VALUE", "UNSUPPORTED_OPERATION"};
-    *out << names[static_cast<size_t>(status)];
-}
-}  // namespace android::hardware::vibrator::V1_0
-
-namespace simulator {
-inline void PrintTo(Layout layout, std::ostream* out) {
-    *out << (layout == Layout::kTimedOutput ? "TimedOutput" : "LedTrigger");
-}
-}  // namespace simulator
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 
@@ -51,18 +35,16 @@ class VibratorTest : public ::testing::Test {
     VibratorTest();
     ~VibratorTest() override;
 
-    /** Makes a driver with all features but the given ones, and the service object on it. */
-    void start(Layout layout, const std::set<std::string>& without = {});
+    /** Makes a driver with all features, at rest, and the service object on it. */
+    void start(Layout layout);
+    /** Makes the driver anew. */
+    void createDriver();
     /** Makes the service object on what there is. */
-    void construct();
+    void construct() { mVibrator = new Vibrator(); }
 
-    /** Puts text into a node, or takes the node away. */
+    /** Puts text into a node, or changes the mode of its file. */
     void setNode(const std::string& leaf, const std::string& text) const;
-    void removeNode(const std::string& leaf) const;
     void setMode(const std::string& leaf, unsigned mode) const;
-    /** Makes accesses of a node fail, some time after now; times 0 is for ever. */
-    void fail(const std::string& leaf, const std::string& operation, const std::string& fault,
-              unsigned times = 0, unsigned after = 0) const;
 
     /** @return where the node is on a device. */
     std::string path(const std::string& leaf) const { return sysfsDirectory(mLayout) + leaf; }
@@ -70,19 +52,15 @@ class VibratorTest : public ::testing::Test {
     Lines trace();
     Lines log() { return mLog.takeLines(); }
 
-    // What the trace shows of an undisturbed access.
-    Lines written(const std::string& leaf, const std::string& text) const;
-    Lines read(const std::string& leaf, const std::string& text, size_t size,
-               const std::string& mode = "O_RDONLY") const;
-    Lines probed(const std::string& leaf, const std::string& mode = "O_RDWR") const;
-    Lines missing(const std::string& leaf, const std::string& mode = "O_RDWR") const;
-    /** What on(ms) does in the layout at hand. */
-    Lines switchedOn(const std::string& ms) const;
-
-    // What the log shows of the node primitives.
-    Lines writeLog(const std::string& leaf, int value, bool succeeds = true) const;
-    Lines probeLog(const std::string& leaf, bool exists) const;
-    Lines readLog(const std::string& leaf) const;
+    /** Makes a call on what there is, and compares all that it shows with its steps. */
+    void expectBehaviour(const Operation& operation, const std::vector<Step>& steps,
+                         const Circumstances& circumstances = {});
+    /** The same on a driver made anew. */
+    void expect(const Operation& operation, const std::vector<Step>& steps,
+                const Circumstances& circumstances = {});
+    void expect(const Operation& operation, const Circumstances& circumstances = {}) {
+        expect(operation, parseSteps(mLayout, operation.steps), circumstances);
+    }
 
     /** The system user calls, whoever runs the tests. */
     CallerIdentity mCaller{1000};
@@ -92,23 +70,26 @@ class VibratorTest : public ::testing::Test {
     android::sp<Vibrator> mVibrator;
 
   private:
-    std::string nodeName(const std::string& leaf) const;
     size_t mTraceRead = 0;
 };
 
 /** The same in both layouts. */
-class BothLayoutsTest : public VibratorTest, public ::testing::WithParamInterface<Layout> {};
+class BothLayoutsTest : public VibratorTest, public ::testing::WithParamInterface<Layout> {
+  protected:
+    BothLayoutsTest() { start(GetParam()); }
 
-inline std::string layoutName(const ::testing::TestParamInfo<Layout>& info) {
-    return ::testing::PrintToString(info.param);
-}
+    /** Expects of a call an answer and steps, which also tell what goes wrong. */
+    void row(const std::function<Answer(IDaxVibrator&)>& call, const std::string& answer,
+             const std::string& steps) {
+        expect({"", call, answer, steps, ""});
+    }
+};
 
-#define INSTANTIATE_FOR_BOTH_LAYOUTS(Suite)                                                \
-    INSTANTIATE_TEST_SUITE_P(Layouts, Suite,                                               \
-                             ::testing::Values(Layout::kTimedOutput, Layout::kLedTrigger), \
-                             layoutName)
-
-/** @return several lists of lines as one. */
-Lines join(const std::vector<Lines>& parts);
+#define INSTANTIATE_FOR_BOTH_LAYOUTS(Suite)                                                 \
+    INSTANTIATE_TEST_SUITE_P(                                                               \
+            Layouts, Suite, ::testing::Values(Layout::kTimedOutput, Layout::kLedTrigger),   \
+            [](const auto& layout) {                                                        \
+                return layout.param == Layout::kTimedOutput ? "TimedOutput" : "LedTrigger"; \
+            })
 
 }  // namespace vendor::velmora::hardware::vibrator::V2_1::implementation

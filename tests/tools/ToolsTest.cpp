@@ -4,8 +4,12 @@
 
 #include <sys/stat.h>
 
+#include <algorithm>
+#include <cmath>
+#include <csignal>
 #include <filesystem>
 #include <fstream>
+#include <map>
 #include <nlohmann/json.hpp>
 #include <pugixml.hpp>
 #include <sstream>
@@ -13,6 +17,13 @@
 namespace {
 
 using Words = std::vector<std::string>;
+
+std::string repeated(const std::string& text, int times) {
+    std::string all;
+    for (int i = 0; i < times; ++i)
+        all += text;
+    return all;
+}
 
 class ToolsTest : public ServiceTest {
   protected:
@@ -27,43 +38,134 @@ class ToolsTest : public ServiceTest {
         return mDirectory.path() + "/sys/class/leds/vibrator/" + leaf;
     }
     std::string traceFile() const { return mDirectory.path() + "/trace"; }
+    /** @return whether the last that the trigger was told is a number. */
+    bool wasTold(const std::string& number) const {
+        const std::string trace = readFile(traceFile());
+        const std::string write = "leds/activate write \"";
+        const size_t last = trace.rfind(write);
+        return last != std::string::npos &&
+               trace.compare(last + write.size(), number.size(), number) == 0;
+    }
 };
 
 TEST_F(ToolsTest, MistakesInAScoreAreNamedBeforeTheFirstCall) {
-    const std::pair<std::string, std::string> cases[] = {
-            {"clik",
-             "-:1:1: \"clik\" is none of click, on, off, wait, amplitude, intensity, "
-             "pattern, engine\n"},
-            {"off\n\n  on", "-:3:5: a time in ms from 1 to 2147483647 is missing\n"},
-            {"on 0", "-:1:4: \"0\" is not a time in ms from 1 to 2147483647\n"},
-            {"wait -1", "-:1:6: \"-1\" is not a time in ms from 0 to 3600000\n"},
-            {"amplitude 256 # too much", "-:1:11: \"256\" is not an amplitude from 1 to 255\n"},
-            {"click\tloud", "-:1:7: \"loud\" is none of light, medium, strong\n"},
-            {"off now", "-:1:5: \"now\" is one word too many\n"},
-            {"pattern 1 repeat 5", "-:1:18: \"5\" is one word too many\n"},
-            {"engine 5", "-:1:9: packets are missing\n"},
-            {"engine 5 1,2,3", "-:1:10: \"1,2,3\" is not PARAM0,INTENSITY,PARAM2,PARAM3\n"},
+    const std::string all =
+            "; there are click, on, off, wait, amplitude, intensity, pattern, engine, external, "
+            "frequency, force-touch, fold, repeat and end";
+    const std::pair<std::string, Words> cases[] = {
+            {"clik", {"1:1: no step \"clik\"; did you mean \"click\"?"}},
+            {"\x1b\xc2\x9b\xff", {"1:1: no step \"\\x1b\\xc2\\x9b\\xff\"" + all}},
+            {"off\n\n  on", {"3:5: a time in ms (1 to 2147483647) is missing"}},
+            {"on 0", {"1:4: \"0\" is not a time in ms (1 to 2147483647)"}},
+            {"wait -1", {"1:6: \"-1\" is not a time in ms (0 to 3600000)"}},
+            {"wait 3600001", {"1:6: \"3600001\" is not a time in ms (0 to 3600000)"}},
+            {"amplitude 256 # too much", {"1:11: \"256\" is not an amplitude (1 to 255)"}},
+            {"force-touch 10001", {"1:13: \"10001\" is not an intensity (1 to 10000)"}},
+            {"frequency 5", {"1:11: \"5\" is not a frequency type (0 to 4)"}},
+            {"click\tloud", {"1:7: \"loud\" is not light, medium or strong"}},
+            {"fold", {"1:5: open or close is missing"}},
+            {"external 1", {"1:10: \"1\" is not off or on"}},
+            {"off now", {"1:5: \"now\" is one word too many"}},
+            {"pattern 1 repeat 5", {"1:18: \"5\" is one word too many"}},
+            {"engine 5", {"1:9: packets are missing"}},
+            {"engine 5 1,2,3", {"1:10: \"1,2,3\" is not PARAM0,INTENSITY,PARAM2,PARAM3"}},
+            {"engine 5 1,2,x,4", {"1:10: \"x\" is no whole number of 32 bits"}},
             {"engine 5 1,2,3,100000000",
-             "-:1:10: \"1,2,3,100000000\" has a value of more than 8 characters\n"},
+             {"1:10: \"1,2,3,100000000\" has a value of more than 8 characters"}},
+            {"engine 5" + repeated(" 1,2,3,4", 340), {"1:2722: more than 339 packets"}},
             {"on x\noff\nintensity 10001",
-             "-:1:4: \"x\" is not a time in ms from 1 to 2147483647\n"
-             "-:3:11: \"10001\" is not an intensity from 1 to 10000\n"},
-            {"# nothing\r\n\r\nclick strong\r\npattern 0 1 repeat\nwait 0\nengine 1 1,2,3,4 "
-             "-1,0,0,0",
-             ""}};
-    for (const auto& [score, errors] : cases) {
+             {"1:4: \"x\" is not a time in ms (1 to 2147483647)",
+              "3:11: \"10001\" is not an intensity (1 to 10000)"}},
+            {"# nothing", {"1:1: no step"}},
+            {"off\nrepeat 2\noff", {"2:1: \"repeat\" without an \"end\""}},
+            {"end", {"1:1: \"end\" without a \"repeat\""}},
+            {"repeat 1000\nrepeat 1001\noff\nend\nend", {"1:1: more than 1000000 steps to play"}},
+            {"repeat 0\noff\nend", {"1:8: \"0\" is not a number of times (1 to 1000000)"}},
+            {repeated("on\n", 21), Words(20, "a time in ms")}};
+    for (const auto& [score, mistakes] : cases) {
         const Outcome outcome = run({"play", "--check", "-"}, score);
-        EXPECT_EQ(outcome.errors, errors);
-        EXPECT_EQ(outcome.exitCode, errors.empty() ? 0 : 2) << score;
+        EXPECT_EQ(outcome.exitCode, 2) << score;
+        std::istringstream lines(outcome.errors);
+        for (const std::string& mistake : mistakes) {
+            std::string line;
+            std::getline(lines, line);
+            const std::string start = "vibratorctl: play: -:";
+            EXPECT_EQ(line.find(start), 0U) << line;
+            EXPECT_NE((line + "$").find(mistakes.size() < 20 ? mistake + "$" : mistake),
+                      std::string::npos)
+                    << line << " instead of " << mistake;
+        }
+        const std::string rest(std::istreambuf_iterator<char>(lines), {});
+        EXPECT_EQ(rest, mistakes.size() < 20
+                                ? ""
+                                : "vibratorctl: play: -: only the first 20 mistakes are shown\n");
     }
+    const std::pair<std::string, std::string> good[] = {
+            {"# nothing\r\n\r\nclick strong\r\npattern 0 1 repeat\nwait 0\nengine 1 1,2,3,4 "
+             "-9,0,0,0",
+             "4 steps, 1 ms"},
+            {"repeat 2\n repeat 3\n wait 500\n end\n click\nend", "8 steps, 3.02 s"},
+            {"on 90000\nwait 100\noff", "3 steps, 100 ms"},
+            {"pattern 4 9 repeat", "1 step, 1 s"},
+            {"engine 10000 30,1,0,0 40,1,0,0\nexternal off\nfold close\nfrequency 0\nforce-touch 1",
+             "5 steps, 70 ms"}};
+    for (const auto& [score, answer] : good)
+        EXPECT_EQ(run({"play", "--check", "-"}, score).output, "OK, " + answer + "\n") << score;
+}
+
+TEST_F(ToolsTest, ScoresPlayAndStopTheMotorWhenTheyCannot) {
     createDriver();
     start();
     EXPECT_EQ(run({"play", "-"}, "on 5\non x").exitCode, 2);
     EXPECT_EQ(node("duration"), "0\n");
-    // A refused call ends the play.
+    const Outcome whole = run({"play", "-"},
+                              "external on\nexternal off\nfrequency 3\nforce-touch 7\nfold close\n"
+                              "repeat 2\nclick light\nend\nengine 10000" +
+                                      repeated(" 1,2,3,4", 9));
+    EXPECT_EQ(whole.errors, "");
+    EXPECT_NE(whole.output.find("fold close: OK\nclick light: OK\nclick light: OK\nengine 10000 "
+                                "1,2,3,4 1,2,3,4 1,2,3,4 1,2,3,4 1,2,3,4 1,2,3,4 1,2...: OK\n"),
+              std::string::npos)
+            << whole.output;
+    EXPECT_EQ(node("multi_freq") + node("force_touch_intensity") + node("event_cmd"),
+              "3\n7\nFOLDER_CLOSE\n");
+
     runProgram({VIBRATOR_SIM, "fault", "intensity", "write", "EIO"});
-    EXPECT_EQ(run({"play", "-"}, "on 5\nintensity 7\non 9").exitCode, 1);
-    EXPECT_EQ(node("duration"), "5\n");
+    const Outcome failed = run({"--json", "play", "-"}, "wait 1\non 60000\n  intensity 7\non 9");
+    EXPECT_EQ(failed.exitCode, 1);
+    std::istringstream lines(failed.output);
+    Words shown;
+    for (std::string line; std::getline(lines, line);) {
+        const auto step = nlohmann::json::parse(line);
+        shown.push_back(step["command"].get<std::string>() + " " + step.value("argument", "") +
+                        (step["ok"] ? " ok " : " not ok ") +
+                        step.value("reason", "at " + step.value("line", nlohmann::json()).dump()));
+    }
+    ASSERT_EQ(shown.size(), 4U) << failed.output;
+    EXPECT_EQ(shown[0] + ", " + shown[1], "wait 1 ok at 1, on 60000 ok at 2");
+    EXPECT_EQ(shown[2].find("intensity 7 not ok "), 0U);
+    EXPECT_EQ(shown[3], "play  not ok -:3:3: the step failed; the motor is stopped");
+    EXPECT_TRUE(wasTold("0"));
+
+    std::ofstream(mDirectory.path() + "/long") << "on 60000\nwait 60000";
+    for (const int signal : {SIGINT, SIGTERM}) {
+        const std::string errors = mDirectory.path() + "/errors" + std::to_string(signal);
+        // A shell starts what runs in its background with some of these ignored.
+        ::signal(signal, SIG_DFL);
+        ChildProcess player;
+        player.startProgram({"/bin/bash", "-c", "exec \"$0\" play \"$1\" >/dev/null", VIBRATORCTL,
+                             mDirectory.path() + "/long"},
+                            errors, {});
+        ASSERT_TRUE(eventually([&] { return wasTold("1"); }));
+        ::kill(player.pid(), signal);
+        ASSERT_TRUE(eventually([&] { return !player.isAlive(); }));
+        // In the first or the second line.
+        const std::string said = readFile(errors);
+        const std::string file = mDirectory.path() + "/long";
+        EXPECT_EQ(said.find("vibratorctl: play: interrupted at " + file + ":"), 0U) << said;
+        EXPECT_NE(said.find(":1; the motor is stopped\n"), std::string::npos) << said;
+        EXPECT_TRUE(wasTold("0"));
+    }
 }
 
 TEST_F(ToolsTest, ExamplesCanBePlayed) {
@@ -77,71 +179,6 @@ TEST_F(ToolsTest, ExamplesCanBePlayed) {
         ++played;
     }
     EXPECT_GE(played, 3U);
-}
-
-TEST_F(ToolsTest, DoctorFindsWhatIsWrong) {
-    const struct {
-        Words features;
-        std::string harm;
-        std::string layout;
-        std::string problem;
-    } cases[] = {
-            {{}, "true", "LED trigger", ""},
-            {{}, "rm activate", "none", "offers no vibrator driver"},
-            {{}, "rm activate; touch trigger", "none", "has no transient trigger"},
-            {{}, "chmod 0444 state", "none", "state cannot be opened for reading and writing"},
-            {{}, "chmod 0444 intensity", "LED trigger", "cannot write it"},
-            {{}, "echo FOO > motor_type", "LED trigger", "\"FOO\", is of no use"},
-            {{}, "echo 1 > ext_control", "LED trigger", "external control is on"},
-            {{}, "echo 500 > duration", "LED trigger", "external control is refused"},
-            {{"--layout", "timed"}, "true", "timed output", "has both layouts"},
-    };
-    start();
-    for (const auto& [features, harm, layout, problem] : cases) {
-        SCOPED_TRACE(harm);
-        std::filesystem::remove_all(mDirectory.path() + "/sys");
-        createDriver();
-        if (!features.empty()) createDriver(features);
-        ASSERT_EQ(runShell("cd " + nodeFile("") + " && " + harm).exitCode, 0);
-        const Outcome outcome = run({"doctor"});
-        EXPECT_EQ(outcome.exitCode, problem.empty() ? 0 : 1) << outcome.output;
-        EXPECT_EQ(outcome.output.find("layout:   " + layout + "\n"), 0U) << outcome.output;
-        EXPECT_NE(outcome.output.find(problem.empty() ? "nothing is wrong" : problem),
-                  std::string::npos)
-                << outcome.output;
-    }
-}
-
-TEST_F(ToolsTest, DoctorAgreesWithTheService) {
-    const Words motors = {"LINEAR_1040", "COINDC_PMIC", "LINEAR_1030", "COINDC", "unknown"};
-    const Words features = {"intensity,motor-name",
-                            "haptic-engine,motor-name",
-                            "prebaked",
-                            "prebaked,haptic-engine",
-                            "haptic-engine",
-                            "intensity",
-                            "none"};
-    for (const std::string& motor : motors) {
-        for (const std::string& some : features) {
-            SCOPED_TRACE(motor + " " + some);
-            createDriver({"--motor", motor, "--features", some});
-            start();
-            const auto found = nlohmann::json::parse(run({"doctor", "--json"}).output);
-            EXPECT_EQ(found["service"], "answers");
-            const auto known = nlohmann::json::parse(run({"motor", "--json"}).output);
-            EXPECT_EQ(found["ladders"]["0"], known["ladder0"]);
-            EXPECT_EQ(found["ladders"]["1"], known["ladder1"]);
-            EXPECT_NE(log().find("daxGetAmplitudeList type: 0 : " +
-                                 found["motor"]["number"].dump() + "\n"),
-                      std::string::npos);
-            std::filesystem::remove(logFile());
-            mService.kill();
-        }
-    }
-    createDriver();
-    const auto alone = nlohmann::json::parse(run({"doctor", "--json"}).output);
-    EXPECT_EQ(alone["motor"]["number"], 7);
-    EXPECT_EQ(alone["findings"].size(), 1U) << "only that there is no service";
 }
 
 TEST_F(ToolsTest, WatchShowsTheSameByTraceAndByLog) {
@@ -158,12 +195,12 @@ TEST_F(ToolsTest, WatchShowsTheSameByTraceAndByLog) {
     const std::string byTrace = runShell("\"$0\" watch --all --once" + same).output;
     const std::string byLog =
             runShell("\"$0\" watch --log --all --once " + logFile() + same).output;
-    EXPECT_EQ(byTrace.find("leds/state                      write  \"1\"  ok\n"), 0U) << byTrace;
-    EXPECT_NE(byTrace.find("leds/cp_trigger_queue           write  \"3.100, 10, 0~\"  ok\n"),
+    EXPECT_EQ(byTrace.find("leds/state                      write    \"1\"  ok\n"), 0U) << byTrace;
+    EXPECT_NE(byTrace.find("leds/cp_trigger_queue           write    \"3.100, 10, 0~\"  ok\n"),
               std::string::npos)
             << byTrace;
     // A text's write shows in the log only when the next begins.
-    EXPECT_NE(byLog.find("leds/multi_freq                 write  \"1\"  failed\n"),
+    EXPECT_NE(byLog.find("leds/multi_freq                 write    \"1\"  failed\n"),
               std::string::npos)
             << byLog;
     EXPECT_EQ(byLog.substr(0, byLog.find("leds/multi_freq")), byTrace) << byLog;
@@ -179,126 +216,544 @@ TEST_F(ToolsTest, WatchShowsTheSameByTraceAndByLog) {
     EXPECT_EQ(run({"watch", "--all", "--once"}).output.find('\033'), std::string::npos);
 }
 
-/** @return the segments of a timeline, in ms and %, like "0-20 100 run". */
+TEST_F(ToolsTest, WatchFollowsAFileThatGrowsAndBeginsAnew) {
+    const auto access = [](const std::string& time) {
+        return time + " leds/state open O_RDWR = -1 ENOENT\n";
+    };
+    std::ofstream(traceFile()) << access("1.5") << "2.5 leds/state op";
+    const std::string shown = mDirectory.path() + "/shown";
+    ChildProcess watcher;
+    watcher.startProgram({"/bin/bash", "-c", "exec \"$0\" watch --all >\"$1\"", VIBRATORCTL, shown},
+                         mDirectory.path() + "/errors", {});
+    const auto shows = [&](const std::string& text) {
+        return eventually([&] { return readFile(shown).find(text) != std::string::npos; });
+    };
+    const std::string line = "  leds/state                      probe    ENOENT\n";
+    EXPECT_TRUE(shows("         1.5" + line)) << readFile(shown);
+    std::ofstream(traceFile(), std::ios::app) << "en O_RDWR = -1 ENOENT\n";
+    EXPECT_TRUE(shows("         2.5" + line)) << readFile(shown);
+    std::ofstream(traceFile()) << access("0.5");
+    EXPECT_TRUE(shows("         0.5" + line)) << readFile(shown);
+    std::ofstream(traceFile() + "2") << access("7.5") << access("8.5") << access("9.5");
+    std::filesystem::rename(traceFile() + "2", traceFile());
+    EXPECT_TRUE(shows("         9.5" + line)) << readFile(shown);
+    EXPECT_EQ(readFile(mDirectory.path() + "/errors"),
+              "Waiting for accesses in " + traceFile() + "; Ctrl-C ends it.\n");
+
+    const std::string strange = "1.5 le\x1b\xc2\x9b\xff open O_RDWR = -1 E\x07";
+    EXPECT_EQ(run({"watch", "--once", "-"}, strange).output,
+              "         1.5  le\\x1b\\xc2\\x9b\\xff              probe    E\\x07\n");
+    const std::pair<Words, std::string> wrong[] = {
+            {{"watch", "--once", "-"},
+             "vibratorctl: watch: -: no trace of the driver; for a log give --log, too\n"},
+            {{"watch", "--once", "--log", "-"}, "vibratorctl: watch: -: no log of the daemon\n"}};
+    for (const auto& [words, complaint] : wrong)
+        EXPECT_EQ(run(words, repeated("some text\n", 150)).errors, complaint);
+}
+
+TEST(LogReaderTest, TellsTimesAndRefusals) {
+    const std::string write = "QorVibrator-HAL2.1(  539): << writeNode node OK";
+    const struct {
+        std::string start;
+        std::string clock;
+        double seconds;
+    } forms[] = {
+            {"D/", "", 0},
+            {"11-24 22:18:03.250 D/", "11-24 22:18:03.250", 80283.25},
+            {"2026-11-24 22:18:03.250   539   541 D ", "2026-11-24 22:18:03.250", 80283.25},
+            {"2026-11-24T22:18:03+0000 host vibrator[539]: D/", "2026-11-24T22:18:03", 80283},
+            {"Nov 24 22:18:03 host vibrator[539]: D/", "Nov 24 22:18:03", 80283},
+            {"[   77.500000] host vibrator[539]: D/", "77.500000", 77.5},
+            {"1732486683.125   539   541 D ", "1732486683.125", 1732486683.125 - 20051 * 86400.0}};
+    for (const auto& [start, clock, seconds] : forms) {
+        LogReader reader;
+        reader.read(start +
+                    "QorVibrator-HAL2.1(  539): >> writeNode node:/sys/class/leds/vibrator/state "
+                    "val:1");
+        const auto access = reader.read(start + write);
+        ASSERT_TRUE(access) << start;
+        EXPECT_EQ(access->clock, clock);
+        EXPECT_DOUBLE_EQ(std::fmod(access->time, 86400), std::fmod(seconds, 86400)) << start;
+    }
+    const std::pair<std::string, std::string> refusals[] = {
+            {"Pemission denied (2000)", ": not permitted to this uid"},
+            {"daxGetAmplitudeList is abnormal 2", "daxGetAmplitudeList: out of range"},
+            {"daxSetFolderStatus BAD_VALUE", "daxSetFolderStatus: out of range"},
+            {"daxPerformHapticEngine packet size is exceed",
+             "daxPerformHapticEngine: too many packets"},
+            {"setExternalControl external control while vibrating. Not supported",
+             "setExternalControl: the motor counts as running"},
+            {"setAmplitude is impossible because of intensity",
+             "setAmplitude: no control of the strength"},
+            {"daxGetNumberOfPrebakedHapticPattern unsupports",
+             "daxGetNumberOfPrebakedHapticPattern: the driver has none"},
+            {"perform start effect : 12, strength : 1", "perform: no such effect"},
+            {"perform_1_2 start effect : 0, strength : 1", "perform_1_2: no such effect"},
+            {"perform start effect : 0, strength : 1", ""},
+            {"daxSetFolderStatus starts", ""}};
+    for (const auto& [message, refusal] : refusals) {
+        for (const std::string start :
+             {"E QorVibrator-HAL2.1: ", "E/QorVibrator-HAL2.1(  539): "}) {
+            const auto access = LogReader().read(start + message);
+            ASSERT_EQ(access.has_value(), !refusal.empty()) << message;
+            if (!access) continue;
+            EXPECT_EQ(access->kind, NodeAccess::kRefusal);
+            EXPECT_EQ(access->node + ": " + access->error, refusal);
+            EXPECT_EQ(access->bytes, message);
+        }
+    }
+}
+
+/**
+ * @return a timeline of writes, like "activate 1" at 250 ms, and probes, "?intensity"; without a
+ *     time for those at less than 0.
+ */
+Timeline timelineOf(const std::vector<std::pair<double, std::string>>& accesses) {
+    TimelineMaker maker;
+    for (const auto& [ms, text] : accesses) {
+        const size_t blank = std::min(text.find(' '), text.size());
+        const bool isProbe = text[0] == '?';
+        NodeAccess access;
+        access.time = 100 + ms / 1000;
+        access.clock = ms < 0 ? "" : "time";
+        access.node = "leds/" + text.substr(isProbe ? 1 : 0, blank);
+        access.kind = isProbe ? NodeAccess::kProbe : NodeAccess::kWrite;
+        if (!isProbe) access.bytes = text.substr(std::min(blank + 1, text.size())) + "\n";
+        maker.add(access);
+        // What the driver has not taken counts for nothing.
+        access.kind = NodeAccess::kWrite;
+        access.bytes = "700\n";
+        access.error = "EINVAL";
+        if (!isProbe) maker.add(access);
+    }
+    return maker.finish();
+}
+
+/** @return a timeline's calls, and its segments in ms and %, like "on 20 at 0" and "0-20 100 run".
+ */
 Words inWords(const Timeline& timeline) {
     Words words;
+    for (const Timeline::Mark& mark : timeline.marks) {
+        std::ostringstream text;
+        text << mark.label << " at " << std::round(mark.time * 1000);
+        words.push_back(text.str());
+    }
     for (const Timeline::Segment& segment : timeline.segments) {
         std::ostringstream text;
-        const char* const kinds[] = {"run", "packet", "pattern"};
-        text << segment.start * 1000 << '-' << segment.end * 1000 << ' ' << segment.strength * 100
-             << ' ' << kinds[segment.kind] << segment.label;
+        const char* const kinds[] = {" run", " packet", " pattern"};
+        text << std::round(segment.start * 1000) << '-' << std::round(segment.end * 1000) << ' '
+             << segment.strength * 100 << kinds[segment.kind] << (segment.isOpen ? " open" : "");
         words.push_back(text.str());
     }
     return words;
 }
 
-TEST(TimelineTest, ShowsWhatTheDriverDoes) {
-    using Writes = std::vector<std::pair<double, std::string>>;
-    const struct {
-        Writes writes;
-        Words segments;
-    } cases[] = {
-            {{{1, "enable 500"}}, {"0-500 100 run"}},
-            {{{1, "enable 500"}, {1.25, "enable 500"}, {1.5, "enable 0"}},
-             {"0-250 100 run", "250-500 100 run"}},
-            {{{0, "duration 500"}, {0, "activate 1"}, {0.25, "duration 900"}, {0.25, "activate 1"}},
-             {"0-500 100 run"}},
-            {{{0, "intensity 5000"}, {0, "enable 500"}, {0.25, "intensity 2500"}},
-             {"0-250 50 run", "250-500 25 run"}},
-            {{{0, "haptic_engine 8 125 5000 0 0 250 10000 0 0"}, {0, "enable 1"}},
-             {"0-125 50 packet", "125-375 100 packet"}},
-            {{{0, "intensity 5000"}, {0, "cp_trigger_index 7"}, {0, "enable 1000"}},
-             {"0-1000 50 patternpattern 7"}},
-            {{{0, "cp_trigger_index 65534"},
-              {0, "cp_trigger_queue 3.25, 10, 0~"},
-              {0, "enable 1000"},
-              {0.5, "enable 0"}},
-             {"0-500 25 patternpattern 3"}},
-            {{{0, "enable 2000000000"}}, {"0-1000 100 run"}},
+TEST(TimelineTest, ShowsWhatTheDriverWasTold) {
+    using Accesses = std::vector<std::pair<double, std::string>>;
+    const std::pair<Accesses, Words> cases[] = {
+            {{{1000, "enable 500"}}, {"on 500 at 0", "0-500 100 run"}},
+            {{{1000, "enable 500"}, {1250, "enable 500"}, {1500, "enable 0"}},
+             {"on 500 at 0", "on 500 at 250", "off at 500", "0-250 100 run", "250-500 100 run"}},
+            {{{0, "duration 500"},
+              {0, "activate 1"},
+              {250, "duration 900"},
+              {250, "activate 1"},
+              {600, "activate 0"},
+              {700, "duration 0"},
+              {700, "activate 1"}},
+             {"on 500 at 0", "on 900 (running) at 250", "off at 600", "on 0 at 700",
+              "0-500 100 run"}},
+            // A clock that is set back.
+            {{{500, "enable 100"}, {900, "enable 100"}, {0, "multi_freq 1"}, {50, "multi_freq 2"}},
+             {"on 100 at 0", "on 100 at 400", "frequency 1 at 400", "frequency 2 at 450",
+              "0-100 100 run", "400-500 100 run"}},
+            {{{0, "enable 20"}, {1, "?intensity"}, {2, "intensity 1379"}},
+             {"click light at 0", "0-20 13.79 run"}},
+            {{{0, "enable 20"}, {1, "?intensity"}, {2, "intensity 5001"}, {2, "intensity 10000"}},
+             {"click medium at 0", "intensity 10000 at 2", "0-2 50.01 run", "2-20 100 run"}},
+            // Not a click: without the probe, another strength, another time, too late.
+            {{{0, "enable 20"},
+              {2, "intensity 10000"},
+              {100, "enable 20"},
+              {101, "?intensity"},
+              {102, "intensity 5040"},
+              {200, "enable 30"},
+              {201, "?intensity"},
+              {202, "intensity 10000"},
+              {300, "enable 20"},
+              {351, "?intensity"},
+              {351, "intensity 1"}},
+             {"on 20 at 0", "intensity 10000 at 2", "on 20 at 100", "amplitude 129 at 102",
+              "on 30 at 200", "amplitude 255 at 202", "on 20 at 300", "amplitude 1 at 351",
+              "0-2 100 run", "2-20 100 run", "100-102 100 run", "102-120 50.4 run",
+              "200-202 50.4 run", "202-230 100 run", "300-320 100 run"}},
+            {{{0, "intensity 5000"},
+              {0, "enable 500"},
+              {250, "?intensity"},
+              {250, "intensity 2500"}},
+             {"intensity 5000 at 0", "on 500 at 0", "intensity 2500 at 250", "0-250 50 run",
+              "250-500 25 run"}},
+            {{{0, "haptic_engine 8 125 5000 0 0 250 20000 0 0"},
+              {9, "enable 1"},
+              {100, "enable 0"}},
+             {"engine, 2 packets at 0", "off at 100", "9-100 50 packet"}},
+            {{{0, "haptic_engine 4 -1 -5 0 0"}, {0, "enable 7"}},
+             {"engine, 1 packet at 0", "on 7 at 0", "0-0 0 packet"}},
+            {{{0, "duration 900"},
+              {0, "activate 1"},
+              {9, "haptic_engine 4 30 20000 0 0"},
+              {9, "duration 1"},
+              {9, "activate 1"}},
+             {"on 900 at 0", "engine, 1 packet at 9", "0-9 100 run", "9-39 200 packet"}},
+            {{{0, "intensity 5000"}, {1, "cp_trigger_index 7"}, {2, "enable 1000"}},
+             {"pattern 7 at 0", "2-1002 50 pattern"}},
+            {{{0, "cp_trigger_index 7"},
+              {2, "enable 900"},
+              {2000, "cp_trigger_index 0"},
+              {2000, "enable 1000"}},
+             {"pattern 7 at 0", "on 900 at 2", "pattern 0 at 2000", "on 1000 at 2000",
+              "2-902 100 pattern", "2000-3000 100 run"}},
+            {{{0, "intensity 5000"},
+              {60, "cp_trigger_index 65534"},
+              {60, "cp_trigger_queue 3.25, 10, 0~"},
+              {61, "enable 1000"},
+              {500, "enable 0"},
+              {500, "enable 20"}},
+             {"intensity 5000 at 0", "pattern 3 repeat at 60", "off at 500", "on 20 at 500",
+              "61-500 25 pattern", "500-520 50 run"}},
+            {{{0, "cp_trigger_queue 3.25, 10, 0~"}, {0, "cp_trigger_index 7"}, {0, "enable 1000"}},
+             {"pattern 3 repeat at 0", "pattern 7 at 0", "0-1000 100 pattern"}},
+            {{{0, "ext_control 1"},
+              {0, "ext_control 0"},
+              {0, "force_touch_intensity 9"},
+              {0, "event_cmd FOLDER_OPEN"},
+              {0, "event_cmd FOLDER_CLOSE"}},
+             {"external on at 0", "external off at 0", "force-touch 9 at 0", "fold open at 0",
+              "fold close at 0"}},
+            {{{0, "enable 61100"}}, {"on 61100 at 0", "0-1000 100 run open"}},
+            {{{0, "enable 59000"}}, {"on 59000 at 0", "0-59000 100 run"}},
+            {{{0, "enable 9"}, {100000, "enable 99000"}, {100000, "intensity 1"}},
+             {"on 9 at 0", "on 99000 at 100000", "intensity 1 at 100000", "0-9 100 run",
+              "100000-199000 0.01 run"}},
+            // Without times, each call follows the one before.
+            {{{-1, "enable 20"},
+              {-1, "?intensity"},
+              {-1, "intensity 1379"},
+              {-1, "enable 500"},
+              {-1, "intensity 5000"},
+              {-1, "enable 5000"},
+              {-1, "enable 0"}},
+             {"click light at 0", "on 500 at 40", "intensity 5000 at 60", "on 5000 at 560",
+              "off at 1560", "0-20 13.79 run", "40-60 13.79 run", "60-540 50 run",
+              "560-1560 50 run"}},
     };
-    for (const auto& [writes, segments] : cases) {
-        std::vector<NodeAccess> accesses;
-        for (const auto& [time, write] : writes) {
-            const size_t blank = write.find(' ');
-            accesses.push_back({time, "leds/" + write.substr(0, blank), NodeAccess::kWrite,
-                                write.substr(blank + 1) + "\n", ""});
-        }
-        // What the driver has not taken counts for nothing.
-        accesses.push_back({2, "leds/enable", NodeAccess::kWrite, "700\n", "EINVAL"});
-        EXPECT_EQ(inWords(makeTimeline(accesses)), segments) << writes[0].second;
-    }
+    for (const auto& [accesses, words] : cases)
+        EXPECT_EQ(inWords(timelineOf(accesses)), words) << accesses[0].second;
+
+    Timeline part = timelineOf({{0, "enable 100"}, {200, "enable 100"}, {400, "enable 100"}});
+    cut(&part, 0.25, 0.45);
+    EXPECT_EQ(inWords(part), (Words{"on 100 at 400", "250-300 100 run", "400-450 100 run open"}));
+    EXPECT_DOUBLE_EQ(part.start + part.end, 0.7);
 }
 
-TEST_F(ToolsTest, LabelsOfAPlotDoNotOverlap) {
+/** @return the lines of a plot's script that hold a text, of which a final $ is their end. */
+Words scriptLines(const Timeline& timeline, const std::string& text) {
+    Words found;
+    std::istringstream lines(plotScript(timeline, PictureFormat::kSvg));
+    for (std::string line; std::getline(lines, line);) {
+        if ((line + '$').find(text) != std::string::npos) found.push_back(line);
+    }
+    return found;
+}
+
+TEST(PlotTest, ScriptPutsEverythingInItsPlace) {
+    const Timeline timeline = timelineOf({{-1, "enable 100"},
+                                          {-1, "haptic_engine 8 3 20000 0 0 100 5000 0 0"},
+                                          {-1, "enable 1"},
+                                          {-1, "cp_trigger_index 4"},
+                                          {-1, "enable 300"},
+                                          {-1, "enable 20"},
+                                          {-1, "intensity 20000"},
+                                          {-1, "enable 90000"}});
+    EXPECT_EQ(plotScript(timeline, PictureFormat::kSvg),
+              R"(set terminal svg size 1000,537.1 font 'sans-serif,14' background '#ffffff'
+set termoption noenhanced
+set border 3 lc rgb '#444444'
+set tics nomirror out
+set lmargin at screen 0.084
+set rmargin at screen 0.88
+set bmargin at screen 0.197356172
+set tmargin at screen 0.606963322
+set label 'What the driver was told: 7 calls in 1.623 s' at screen 0.016, screen 0.959039285 font ',16'
+set xrange [0:1639.23]
+set xtics 200
+set xlabel 'time in ms' offset 0,0.4
+set yrange [0:100]
+set ytics 25
+set grid ytics lc rgb '#dddddd' lt 1
+set ylabel 'strength in %' offset 1,0
+set key at screen 0.88, screen 0.0446844163 right center horizontal Left reverse samplen 1.5
+set label 'The log has no times: each call is drawn after the one before.' at screen 0.016, screen 0.0446844163 font ',12'
+set label 'on 100' at 0, graph 1.02 rotate by 45 tc rgb '#222222'
+set label 'engine, 2 packets' at 120, graph 1.02 rotate by 45 tc rgb '#222222'
+set label 'pattern 4, on 300' at 243, graph 1.02 rotate by 45 tc rgb '#222222'
+set label 'on 20, intensity 20000 +1' at 583, graph 1.02 rotate by 45 tc rgb '#222222'
+set arrow from 1623,50 rto 49.4240201,0 filled lw 2 lc rgb '#444444'
+set label 'goes on' at 1684.78003,50
+$on << END
+0 98.9703329 100
+583 601.970333 100
+623 1621.97033 100
+END
+$packets << END
+120 123 100
+123 221.970333 50
+END
+$patterns << END
+263 561.970333 100
+END
+$beyond << END
+120 123 100
+623 1621.97033 100
+END
+$calls << END
+0
+120
+243
+263
+583
+603
+623
+END
+plot $calls using 1:(100) with impulses lc rgb '#999999' dt 3 notitle, $on using 1:3:1:2:(0):3 with boxxyerror fs solid noborder lc rgb '#0072b2' title 'motor on', $packets using 1:3:1:2:(0):3 with boxxyerror fs solid noborder lc rgb '#e69f00' title 'haptic engine packets', $patterns using 1:3:1:2:(0):3 with boxxyerror fs solid noborder lc rgb '#009e73' title 'stored pattern', $beyond using 1:3:1:2:(96):3 with boxxyerror fs solid noborder lc rgb '#d55e00' title 'beyond full strength'
+)");
+    EXPECT_EQ(plotScript(timeline, PictureFormat::kPng)
+                      .find("set terminal pngcairo fontscale 0.75 size 1000,"),
+              0U);
+}
+
+TEST(PlotTest, AxesSuitTheLength) {
+    const struct {
+        double length;
+        std::string tics;
+        std::string title;
+    } cases[] = {{0.019, "2", "ms"},
+                 {1.9, "200", "ms"},
+                 {1.99, "0.5", "s"},
+                 {49, "5", "s"},
+                 {118, "20", "s"},
+                 {119, "15 time format '%tM:%tS'", "min:s"},
+                 {7000, "900 time format '%tM:%tS'", "min:s"},
+                 {7200, "900 time format '%tH:%tM'", "h:min"},
+                 {100 * 86400, "950400 time format '%tH:%tM'", "h:min"}};
+    for (const auto& [length, tics, title] : cases) {
+        Timeline timeline;
+        timeline.marks.push_back({0, "off"});
+        timeline.end = length;
+        EXPECT_EQ(scriptLines(timeline, "set xtics "), Words{"set xtics " + tics}) << length;
+        EXPECT_EQ(scriptLines(timeline, "set xlabel 'time in " + title + "'").size(), 1U) << length;
+    }
+    // Its end is not on the frame.
+    EXPECT_EQ(scriptLines(timelineOf({{0, "enable 20"}}), "set xrange"),
+              Words{"set xrange [0:20.2]"});
+}
+
+TEST(PlotTest, CrowdsAreThinnedAndNothingLeavesItsQuotes) {
+    using Segment = Timeline::Segment;
     Timeline timeline;
-    for (int i = 0; i < 60; ++i) {
-        timeline.marks.push_back({i * i * 0.001, "intensity " + std::to_string(i * i)});
-        timeline.length = timeline.marks.back().time;
+    timeline.end = 100;
+    for (int i = 0; i < 10000; ++i) {
+        timeline.marks.push_back({i * 0.01, "off"});
+        timeline.segments.push_back(
+                {i * 0.01, i * 0.01 + 0.001, i % 7 == 0 ? 0.5 : 0.25, Segment::kRun, false});
     }
+    const Words labels = scriptLines(timeline, "rotate by 45");
+    ASSERT_GT(labels.size(), 30U);
+    EXPECT_LT(labels.size(), 50U);
+    EXPECT_EQ(labels[0].find("set label 'off, off, off, off +"), 0U) << labels[0];
+    EXPECT_EQ(labels[0].find(" +"), labels[0].rfind(" +"));
+    // A bar holds what is in its pixel.
+    EXPECT_LE(scriptLines(timeline, " 25$").size(), 2U) << "the tics, and the last bar";
+    EXPECT_GT(scriptLines(timeline, " 50$").size(), 700U);
+    EXPECT_LT(scriptLines(timeline, " 50$").size(), 800U);
+
+    timeline = {};
+    timeline.end = 1;
+    timeline.marks.push_back({0, "it's `d`\n\"\\ <&> @x \xff"});
+    EXPECT_EQ(scriptLines(timeline, "graph 1.02"), Words{"set label 'it?s ?d???? ??"
+                                                         "? ?x ?' at 0, graph 1.02 rotate by 45 tc "
+                                                         "rgb '#222222'"});
+}
+
+TEST(PlotTest, TextFitsTheColumns) {
+    const Timeline timeline = timelineOf({{0, "enable 100"},
+                                          {200, "haptic_engine 4 100 20000 0 0"},
+                                          {200, "enable 1"},
+                                          {300, "intensity 1250"},
+                                          {300, "enable 100000"}});
+    const std::string wanted =
+            "What the driver was told: 4 calls in 1.3 s\n"
+            "100 % ██  !!                    \n"
+            " 80 % ██  ██                    \n"
+            " 60 % ██  ██                    \n"
+            " 40 % ██  ██                    \n"
+            " 20 % ██  ██▅▅▅▅▅▅▅▅▅▅▅▅▅▅▅▅▅▅▅▅\n"
+            "      |---|-|------------------>\n"
+            "      0 ms                 1.3 s\n"
+            "      > goes on\n"
+            "      ! beyond full strength\n"
+            "\n"
+            "        0 ms  on 100\n"
+            "      200 ms  engine, 1 packet\n"
+            "      300 ms  intensity 1250\n"
+            "      300 ms  on 100000\n";
+    EXPECT_EQ(plotText(timeline, 32), wanted);
+    Timeline part = timelineOf({{0, "enable 100"}, {200, "enable 100"}});
+    cut(&part, 0.15, 0.25);
+    EXPECT_NE(plotText(part, 26).find("\n 20 %           ██████████\n      ----------|-------->\n"),
+              std::string::npos)
+            << plotText(part, 26);
+    std::vector<std::pair<double, std::string>> many;
+    for (int i = 0; i < 42; ++i)
+        many.emplace_back(i * 60000.0, "enable 0");
+    const std::string text = plotText(timelineOf(many), 0);
+    EXPECT_NE(text.find("\n   38:00 min  off\n   39:00 min  off\n  and 2 more calls;"),
+              std::string::npos)
+            << text;
+    EXPECT_NE(text.find("|\n      0 ms       41:00 min\n\n"), std::string::npos) << text;
+    EXPECT_NE(plotText(timelineOf({{-1, "enable 5"}}), 80).find("The log has no times"),
+              std::string::npos);
+}
+
+TEST_F(ToolsTest, PicturesShowTheCallsInTheirPlaces) {
+    createDriver();
+    start();
+    run({"play", "-"},
+        "on 200\nwait 300\nclick light\nengine 10000 100,20000,0,0\nwait 200\npattern 3");
     pugi::xml_document svg;
-    ASSERT_TRUE(svg.load_string(plotSvg(timeline).c_str()));
-    EXPECT_STREQ(svg.child("svg").attribute("width").value(), "1200");
-    std::map<std::string, double> laneEnds;
-    size_t labels = 0;
-    for (const pugi::xml_node& text : svg.child("svg").children("text")) {
-        if (std::string(text.attribute("class").value()) != "call") continue;
-        const double start = text.attribute("x").as_double();
-        double& end = laneEnds[text.attribute("y").value()];
-        EXPECT_GE(start, end) << text.child_value();
-        end = start + 7.8 * static_cast<double>(strlen(text.child_value()));
-        EXPECT_LE(end, 1200) << text.child_value();
-        ++labels;
+    ASSERT_TRUE(svg.load_string(run({"plot", "-o", "-"}).output.c_str()));
+    const pugi::xml_node root = svg.child("svg");
+    EXPECT_EQ(
+            std::string(root.child_value("title")).find("What the driver was told: 4 calls in 1."),
+            0U);
+    EXPECT_EQ(std::string(root.child_value("desc"))
+                      .find("Strength over time: on 200 at 0 ms; click light at 3"),
+              0U)
+            << root.child_value("desc");
+    EXPECT_NE(std::string(root.child_value("style")).find("dark"), std::string::npos);
+    Words texts;
+    std::map<std::string, std::pair<double, double>> bars;
+    const auto visit = [&](const auto& self, const pugi::xml_node& parent) -> void {
+        for (const pugi::xml_node& each : parent.children()) {
+            const std::string name = each.name();
+            if (name == "text")
+                texts.push_back(each.first_child().value() +
+                                std::string(each.child_value("tspan")));
+            if (name == "polygon") {
+                double left = 0;
+                double bottom = 0;
+                double right = 0;
+                std::istringstream points(each.attribute("points").value());
+                char comma = 0;
+                points >> left >> comma >> bottom >> right;
+                // The legend's is at the bottom, and comes first.
+                bars[each.attribute("fill").value()] = {left, right};
+            }
+            self(self, each);
+        }
+    };
+    visit(visit, root);
+    for (const std::string text :
+         {"on 200", "click light +1", "pattern 3", "motor on", "haptic engine packets",
+          "stored pattern", "beyond full strength", "strength in %", "time in ms"}) {
+        EXPECT_EQ(std::count(texts.begin(), texts.end(), text), 1) << text;
     }
-    EXPECT_GT(labels, 20U);
+    ASSERT_EQ(bars.size(), 4U);
+    const auto [packetLeft, packetRight] = bars["rgb(230, 159,   0)"];
+    const auto [patternLeft, patternRight] = bars["rgb(  0, 158, 115)"];
+    // The pattern lasts a second, the packet a tenth, and the whole ends with the pattern.
+    EXPECT_NEAR((patternRight - patternLeft) / (packetRight - packetLeft), 10, 0.3);
+    EXPECT_NEAR(patternRight, 84 + (1000 - 84 - 120) / 1.01, 2);
+    EXPECT_GT(packetLeft, 84 + 796 * 0.1);
+    EXPECT_GT(patternLeft, packetRight + 796 * 0.05);
 }
 
 TEST_F(ToolsTest, PlotsGoToFilesAndToTheTerminal) {
     createDriver();
     start();
-    run({"play", "-"}, "on 100\nwait 50\nengine 10000 10,5000,0,0\npattern 3");
-    for (const std::string ending : {"svg", "png"}) {
-        const std::string file = mDirectory.path() + "/plot." + ending;
-        const Outcome outcome = run({"plot", traceFile(), "-o", file});
-        const std::string drawing = readFile(file);
-        if (ending == "png" && outcome.errors.find("built without") != std::string::npos) continue;
+    run({"play", "-"}, "on 100\nwait 50\noff");
+    const std::string plot = mDirectory.path() + "/plot";
+    std::filesystem::create_symlink(plot + ".svg", plot + "2.svg");
+    std::ofstream(plot + ".svg") << "older and other";
+    chmod((plot + ".svg").c_str(), 0600);
+    const struct {
+        Words options;
+        std::string file;
+        std::string start;
+    } good[] = {{{"-o", plot + "2.svg"}, plot + ".svg", "<?xml"},
+                {{"-o", plot + ".png"}, plot + ".png", "\x89PNG"},
+                {{"-o", plot, "--format", "png"}, plot, "\x89PNG"}};
+    for (const auto& [options, file, beginning] : good) {
+        Words words = {"plot"};
+        words.insert(words.end(), options.begin(), options.end());
+        const Outcome outcome = run(words);
         EXPECT_EQ(outcome.exitCode, 0) << outcome.errors;
-        EXPECT_NE(drawing.find(ending == "svg" ? "strength in %" : "PNG"), std::string::npos);
+        EXPECT_EQ(readFile(file).find(beginning), 0U) << file;
     }
+    struct stat info = {};
+    EXPECT_EQ(stat((plot + ".svg").c_str(), &info), 0);
+    EXPECT_EQ(info.st_mode & 0777U, 0600U);
+
     const std::string text = run({"plot", traceFile()}).output;
-    EXPECT_NE(text.find(" s  on 100\n"), std::string::npos) << text;
-    EXPECT_NE(text.find(" s  pattern 3\n"), std::string::npos) << text;
+    EXPECT_NE(text.find("  off\n"), std::string::npos) << text;
     EXPECT_EQ(run({"plot", "-"}, readFile(traceFile())).output, text);
+    EXPECT_NE(run({"plot", "--log", logFile()}).output.find("The log has no times"),
+              std::string::npos);
+    EXPECT_EQ(run({"plot", "--from", "1ms"}).output.find("What the driver was told: 1 call in "),
+              0U);
+    EXPECT_EQ(
+            run({"plot", "--to", "0.001s"}).output.find("What the driver was told: 1 call in 1 ms"),
+            0U);
+    EXPECT_EQ(
+            run({"plot", "--last", "1ms"}).output.find("What the driver was told: 1 call in 1 ms"),
+            0U);
+
+    mkfifo((plot + ".fifo.svg").c_str(), 0600);
+    std::filesystem::create_symlink(traceFile(), plot + "3.svg");
+    const std::string noTime = " is not a time like 10s, 500ms, 2m or 1h";
     const std::pair<Words, std::string> bad[] = {
-            {{"plot", traceFile(), "-o", "/tmp/x.gif"}, "neither .svg nor .png"},
-            {{"plot", traceFile(), "-o", "/no/such/x.svg"}, "cannot be written"},
+            {{"plot", "-o", "/tmp/x.gif"}, "plot: /tmp/x.gif: neither .svg nor .png"},
+            {{"plot", "-o", "/no/such/x.svg"},
+             "plot: /no/such/x.svg: cannot be written: No such file"},
+            {{"plot", "-o", plot + ".fifo.svg"},
+             "is no regular file; -o - writes to standard output"},
+            {{"plot", "-o", "/dev/full", "--format", "svg"}, "is no regular file"},
+            {{"plot", "-o", plot + "3.svg"}, "3.svg: is the input, too"},
+            {{"plot", "--from", "10"}, "--from: \"10\"" + noTime},
+            {{"plot", "--to", "1.5.5s"}, "--to: \"1.5.5s\"" + noTime},
+            {{"plot", "--to", "ms"}, "--to: \"ms\"" + noTime},
+            {{"plot", "--last", "1s", "--to", "1s"}, "--last goes with neither --from nor --to"},
+            {{"plot", "--from", "1h"}, "nothing in that time"},
+            {{"plot", "--log"}, "no FILE"},
             {{"plot", "/no/such"}, "cannot be read"},
-            {{"plot", "/proc/version"}, "no write that a driver has taken"},
+            {{"plot", "/proc/version"}, "/proc/version: no write to the driver in it"},
             {{"watch", "/no/such"}, "cannot be read"},
+            {{"watch", "/tmp"}, "cannot be read"},
+            {{"watch", "--all", "/dev/zero"}, "a line of more than 1 MiB"},
             {{"watch", "--log"}, "no FILE"},
-            {{"play", "/no/such"}, "cannot be read"},
-            {{"completion", "fish"}, "fish not in"}};
+            {{"play", "/no/such"}, "cannot be read"}};
     for (const auto& [words, complaint] : bad) {
         const Outcome outcome = run(words);
-        EXPECT_EQ(outcome.exitCode, 2) << complaint;
+        EXPECT_EQ(outcome.exitCode, words.size() > 2 && words[2] == "/no/such/x.svg" ? 1 : 2)
+                << complaint;
         EXPECT_NE(outcome.errors.find(complaint), std::string::npos) << outcome.errors;
     }
-}
-
-TEST_F(ToolsTest, ShellsCompleteCommandsAndOptions) {
-    const std::pair<std::string, std::string> cases[] = {
-            {"pl", "plot play"},
-            {"prebaked ", "count play --help --instance --json"},
-            {"prebaked play --r", "--repeat"},
-            {"--json fold --h", "--help"},
-            {"on 500 --j", "--json"}};
-    for (const auto& [typed, completed] : cases) {
-        const Outcome outcome = runShell(
-                "source <(\"$0\" completion bash); read -ra words <<<'vibratorctl " + typed +
-                "|'; COMP_WORDS=(\"${words[@]/|/}\"); COMP_CWORD=$((${#words[@]} - 1)); "
-                "_vibratorctl; echo ${COMPREPLY[@]}");
-        EXPECT_EQ(outcome.output, completed + "\n") << outcome.errors;
-    }
-    EXPECT_EQ(runShell("\"$0\" completion zsh | { ! command -v zsh || zsh -n; }").exitCode, 0);
+    const Outcome full = runShell("\"$0\" plot -o - >/dev/full");
+    EXPECT_EQ(full.exitCode, 1);
+    EXPECT_NE(full.errors.find("standard output cannot be written"), std::string::npos);
+    const Outcome missing = runShell("PATH= \"$0\" plot -o /tmp/x.svg");
+    EXPECT_EQ(missing.exitCode, 1);
+    EXPECT_NE(missing.errors.find("install the package gnuplot-nox"), std::string::npos);
 }
 
 }  // namespace

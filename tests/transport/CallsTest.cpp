@@ -1,84 +1,104 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "transport/TransportTest.h"
 
-#include <cstdint>
-#include <cstring>
+#include <android/hidl/manager/1.2/IServiceManager.h>
+#include <hidl/ServiceManagement.h>
+#include <hwbinder/Host.h>
+#include <utils/Errors.h>
+
+#include <atomic>
+#include <chrono>
+#include <csignal>
+#include <ctime>
 #include <thread>
+
+// Runs on sockets everywhere, and on the kernel's binder in a virtual machine.
 
 namespace {
 
 using ::android::sp;
+using ::android::wp;
+using ::android::hardware::hidl_death_recipient;
+using ::android::hardware::hidl_string;
+using ::android::hardware::Return;
 using ::android::hidl::base::V1_0::IBase;
 namespace vibrator = ::android::hardware::vibrator;
+namespace host = ::android::hardware::host;
 using V20 = ::vendor::velmora::hardware::vibrator::V2_0::IDaxVibrator;
+using std::chrono::milliseconds;
+using ::vendor::velmora::hardware::vibrator::V2_0::DaxHapticEnginePacket;
+
+const std::vector<std::string> kChain = {"vendor.velmora.hardware.vibrator@2.1::IDaxVibrator",
+                                         "vendor.velmora.hardware.vibrator@2.0::IDaxVibrator",
+                                         "android.hardware.vibrator@1.3::IVibrator",
+                                         "android.hardware.vibrator@1.2::IVibrator",
+                                         "android.hardware.vibrator@1.1::IVibrator",
+                                         "android.hardware.vibrator@1.0::IVibrator",
+                                         "android.hidl.base@1.0::IBase"};
 
 class CallsTest : public TransportTest {
   protected:
-    CallsTest() {
+    void SetUp() override {
         serve();
         mClient = IDaxVibrator::getService();
+        ASSERT_NE(mClient, nullptr);
     }
 
     sp<IDaxVibrator> mClient;
 };
 
 TEST_F(CallsTest, MessageThatIsTooLargeCostsOnlyItself) {
-    const std::vector<::vendor::velmora::hardware::vibrator::V2_0::DaxHapticEnginePacket> packets(
-            4096);
-    const auto request = mClient->daxPerformHapticEngine(packets, 1);
-    EXPECT_FALSE(request.isOk());
-    EXPECT_FALSE(request.isDeadObject());
-    EXPECT_EQ(request.description(), "the arguments are too large");
+    const std::vector<DaxHapticEnginePacket> packets(100'000);
+    for (int i = 0; i < 3; ++i) {
+        const Return<VibratorStatus> result = mClient->daxPerformHapticEngine(packets, 1);
+        EXPECT_FALSE(result.isOk());
+        EXPECT_FALSE(result.isDeadObject());
+        EXPECT_EQ(result.description(), "the message could not be delivered; it may be too large");
+    }
     EXPECT_TRUE(mClient->ping().isOk());
 }
 
-TEST_F(CallsTest, BaseOperationsHaveThePlatformsDefaults) {
-    const std::vector<std::string> expected = {"vendor.velmora.hardware.vibrator@2.1::IDaxVibrator",
-                                               "vendor.velmora.hardware.vibrator@2.0::IDaxVibrator",
-                                               "android.hardware.vibrator@1.3::IVibrator",
-                                               "android.hardware.vibrator@1.2::IVibrator",
-                                               "android.hardware.vibrator@1.1::IVibrator",
-                                               "android.hardware.vibrator@1.0::IVibrator",
-                                               "android.hidl.base@1.0::IBase"};
-    const sp<IDaxVibrator> local = new Vibrator;
-    EXPECT_FALSE(local->isRemote());
+TEST_F(CallsTest, ListsGetThereWhole) {
+    std::vector<DaxHapticEnginePacket> packets(40);
+    for (int i = 0; i < 40; ++i)
+        packets[static_cast<size_t>(i)] = {i, 10000, 2 * i, -i};
+    mClient->daxPerformHapticEngine(packets, 10000);
+    EXPECT_NE(log().find(" 38 10000 76 -38 39 10000 78 -39\\n"), std::string::npos) << log();
+}
+
+TEST_F(CallsTest, BaseOperationsAnswerForTheObject) {
     EXPECT_TRUE(mClient->isRemote());
-    for (const sp<IDaxVibrator>& object : {local, mClient}) {
-        std::vector<std::string> chain;
-        EXPECT_TRUE(object->interfaceChain([&](const auto& descriptors) {
-                              for (const auto& each : descriptors)
-                                  chain.emplace_back(each);
-                          }).isOk());
-        EXPECT_EQ(chain, expected);
-        EXPECT_TRUE(object->interfaceDescriptor([&](const auto& descriptor) {
-                              EXPECT_EQ(std::string(descriptor), expected[0]);
-                          }).isOk());
-        EXPECT_TRUE(object->getHashChain([&](const auto& hashes) {
-                              ASSERT_EQ(hashes.size(), expected.size());
-                              for (const auto& hash : hashes)
-                                  EXPECT_EQ(hash.elements[31], 0);
-                          }).isOk());
-        EXPECT_TRUE(object->getDebugInfo([](const auto& info) {
-                              EXPECT_EQ(info.pid, -1);
-                              EXPECT_EQ(info.ptr, 0U);
-                          }).isOk());
-        EXPECT_TRUE(object->ping().isOk());
-        EXPECT_TRUE(object->setHALInstrumentation().isOk());
-        EXPECT_TRUE(object->notifySyspropsChanged().isOk());
-        EXPECT_TRUE(object->debug({}, {"one", ""}).isOk());
-    }
-    const sp<android::hardware::hidl_death_recipient> recipient =
-            new android::hardware::hidl_death_recipient;
-    EXPECT_TRUE(local->linkToDeath(recipient, 0));
-    EXPECT_TRUE(local->unlinkToDeath(recipient));
-    EXPECT_FALSE(local->linkToDeath(nullptr, 0));
-    // No news of a death will come from another process.
-    EXPECT_FALSE(mClient->linkToDeath(recipient, 0));
+    std::vector<std::string> chain;
+    EXPECT_TRUE(mClient->interfaceChain([&](const auto& descriptors) {
+                           for (const auto& each : descriptors)
+                               chain.emplace_back(each);
+                       })
+                        .isOk());
+    EXPECT_EQ(chain, kChain);
+    std::string descriptor;
+    EXPECT_TRUE(mClient->interfaceDescriptor([&](const auto& each) { descriptor = each; }).isOk());
+    EXPECT_EQ(descriptor, kChain[0]);
+    size_t hashes = 0;
+    EXPECT_TRUE(mClient->getHashChain([&](const auto& list) { hashes = list.size(); }).isOk());
+    EXPECT_EQ(hashes, kChain.size());
+    int32_t pid = 0;
+    EXPECT_TRUE(mClient->getDebugInfo([&](const auto& info) {
+                           pid = info.pid;
+                           EXPECT_EQ(info.ptr, 0U) << "no address leaves the process";
+                       })
+                        .isOk());
+    EXPECT_EQ(pid, mServer.pid());
+    EXPECT_TRUE(mClient->ping().isOk());
+    EXPECT_TRUE(mClient->setHALInstrumentation().isOk());
+    EXPECT_TRUE(mClient->notifySyspropsChanged().isOk());
+    EXPECT_TRUE(mClient->debug(nullptr, {"one", "", "three"}).isOk());
+    EXPECT_EQ(mClient->perform_1_1({}, {}, nullptr).description(),
+              "Null synchronous callback passed.");
 }
 
 TEST_F(CallsTest, ObjectIsFoundUnderEveryInterfaceOfItsChain) {
     const sp<vibrator::V1_0::IVibrator> oldest = vibrator::V1_0::IVibrator::getService();
-    EXPECT_TRUE(oldest->ping().isOk());
+    ASSERT_NE(oldest, nullptr);
     for (const Answer& answer :
          {call(*vibrator::V1_1::IVibrator::getService()),
           call(*vibrator::V1_2::IVibrator::getService()),
@@ -86,28 +106,32 @@ TEST_F(CallsTest, ObjectIsFoundUnderEveryInterfaceOfItsChain) {
         EXPECT_EQ(answer.inWords(), "(UNSUPPORTED_OPERATION, 0)");
     }
     const sp<IDaxVibrator> cast = IDaxVibrator::castFrom(oldest);
-    ASSERT_NE(cast.get(), nullptr);
-    EXPECT_TRUE(cast->isRemote());
+    ASSERT_NE(cast, nullptr);
     EXPECT_TRUE(call(*cast).isOk);
-}
+    const sp<android::hidl::manager::V1_0::IServiceManager> manager =
+            android::hardware::defaultServiceManager();
+    ASSERT_NE(manager, nullptr);
+    EXPECT_EQ(sp<IDaxVibrator>(IDaxVibrator::castFrom(sp<IBase>(manager))), nullptr);
 
-TEST_F(CallsTest, CastsTellWhatAnObjectIs) {
-    const sp<IDaxVibrator> local = new Vibrator;
-    const sp<IBase> base = local;
-    EXPECT_EQ(sp<IDaxVibrator>(IDaxVibrator::castFrom(base)), local);
-    EXPECT_EQ(sp<vibrator::V1_0::IVibrator>(vibrator::V1_0::IVibrator::castFrom(base)).get(),
-              local.get());
-    EXPECT_EQ(sp<IDaxVibrator>(IDaxVibrator::castFrom(new IBase)).get(), nullptr);
-    EXPECT_EQ(sp<IDaxVibrator>(IDaxVibrator::castFrom(nullptr)).get(), nullptr);
-    mServer.kill();
-    EXPECT_FALSE(IDaxVibrator::castFrom(mClient).isOk());
+    std::vector<std::string> instances;
+    manager->listByInterface(kChain[5], [&](const auto& list) {
+        for (const auto& each : list)
+            instances.emplace_back(each);
+    });
+    EXPECT_EQ(instances, std::vector<std::string>{"default"});
+    bool isListed = false;
+    manager->list([&](const auto& list) {
+        for (const auto& each : list)
+            isListed = isListed || each == hidl_string(kChain[0] + "/default");
+    });
+    EXPECT_TRUE(isListed);
 }
 
 TEST_F(CallsTest, ThreadsMayShareAnObject) {
     std::vector<std::thread> threads;
     for (uint32_t id = 0; id < 4; ++id) {
         threads.emplace_back([&, id] {
-            for (int i = 0; i < 500; ++i) {
+            for (int i = 0; i < 300; ++i) {
                 // A reply that went astray would show: they differ in kind.
                 if (id % 2 == 0) {
                     ASSERT_EQ(call(*mClient).inWords(), "(UNSUPPORTED_OPERATION, 0)");
@@ -123,67 +147,101 @@ TEST_F(CallsTest, ThreadsMayShareAnObject) {
         thread.join();
 }
 
-/** The place of an operation in the virtual table, as the ABI encodes it in a member pointer. */
-template <typename Method>
-size_t slotOf(Method method) {
-    static_assert(sizeof(method) == 2 * sizeof(uintptr_t));
-    uintptr_t words[2];
-    memcpy(words, &method, sizeof(words));
-#ifdef __aarch64__
-    return words[0] / sizeof(void*);
-#else
-    return (words[0] - 1) / sizeof(void*);
-#endif
+/** Remembers the news of a death. */
+struct Recipient : hidl_death_recipient {
+    void serviceDied(uint64_t cookie, const wp<IBase>& who) override {
+        wasAlive = who.promote() != nullptr;
+        lastCookie = cookie;
+    }
+    std::atomic<uint64_t> lastCookie = 0;
+    std::atomic<bool> wasAlive = false;
+};
+
+TEST_F(CallsTest, DeathIsToldToThoseWhoAskedAndTheSuccessorIsFound) {
+    const sp<Recipient> told = new Recipient;
+    const sp<Recipient> untold = new Recipient;
+    EXPECT_TRUE(mClient->linkToDeath(untold, 7));
+    EXPECT_TRUE(mClient->linkToDeath(told, 42));
+    EXPECT_TRUE(mClient->unlinkToDeath(untold));
+    EXPECT_FALSE(mClient->unlinkToDeath(untold));
+    mServer.kill();
+    EXPECT_TRUE(eventually([&] { return told->lastCookie == 42; }));
+    EXPECT_TRUE(told->wasAlive);
+    EXPECT_EQ(untold->lastCookie, 0U);
+    EXPECT_TRUE(mClient->ping().isDeadObject());
+    EXPECT_FALSE(mClient->unlinkToDeath(told)) << "it has been told";
+    EXPECT_FALSE(mClient->linkToDeath(told, 1)) << "it is too late";
+    const clock_t before = clock();
+    std::this_thread::sleep_for(milliseconds(100));
+    EXPECT_LT(clock() - before, CLOCKS_PER_SEC / 50) << "the death is news only once";
+    EXPECT_EQ(mClient->off().withDefault(VibratorStatus::BAD_VALUE), VibratorStatus::BAD_VALUE);
+    serve();
+    EXPECT_TRUE(mClient->ping().isDeadObject()) << "a dead object stays dead";
 }
 
-TEST(InterfaceTest, OperationsKeepTheirSlots) {
-    using I = ::vendor::velmora::hardware::vibrator::V2_1::IDaxVibrator;
-    const size_t base[] = {
-            slotOf(&I::isRemote),
-            slotOf(static_cast<android::hardware::Return<void> (I::*)(I::interfaceChain_cb)>(
-                    &I::interfaceChain)),
-            slotOf(&I::debug),
-            slotOf(&I::interfaceDescriptor),
-            slotOf(&I::getHashChain),
-            slotOf(&I::setHALInstrumentation),
-            slotOf(&I::linkToDeath),
-            slotOf(&I::ping),
-            slotOf(&I::getDebugInfo),
-            slotOf(&I::notifySyspropsChanged),
-            slotOf(&I::unlinkToDeath),
-    };
-    for (size_t i = 0; i < std::size(base); ++i)
-        EXPECT_EQ(base[i], i);
-    // Two slots of the destructor lie between.
-    const size_t operations[] = {
-            slotOf(&I::on),
-            slotOf(&I::off),
-            slotOf(&I::supportsAmplitudeControl),
-            slotOf(&I::setAmplitude),
-            slotOf(&I::perform),
-            slotOf(&I::perform_1_1),
-            slotOf(&I::perform_1_2),
-            slotOf(&I::supportsExternalControl),
-            slotOf(&I::setExternalControl),
-            slotOf(&I::perform_1_3),
-            slotOf(&I::daxSupportsAmplitudeControl),
-            slotOf(&I::daxSupportsForceTouchAmplitudeControl),
-            slotOf(&I::daxSupportsFrequencyControl),
-            slotOf(&I::daxSupportsHapticEngine),
-            slotOf(&I::daxSupportsPrebakedHapticPattern),
-            slotOf(&I::daxSupportsFolderStatusSetting),
-            slotOf(&I::daxSupportsEnhancedVelmoraHapticPattern),
-            slotOf(&I::daxSetAmplitude),
-            slotOf(&I::daxSetForceTouchAmplitude),
-            slotOf(&I::daxSetFrequencyType),
-            slotOf(&I::daxSetFolderStatus),
-            slotOf(&I::daxGetNumberOfPrebakedHapticPattern),
-            slotOf(&I::daxPerformHapticEngine),
-            slotOf(&I::daxPerformPrebakedHapticPattern),
-            slotOf(&I::daxGetAmplitudeList),
-    };
-    for (size_t i = 0; i < std::size(operations); ++i)
-        EXPECT_EQ(operations[i], 13 + i) << i;
+/** Remembers the news of a registration. */
+struct Notification : android::hidl::manager::V1_0::IServiceNotification {
+    Return<void> onRegistration(const hidl_string& interface, const hidl_string& name,
+                                bool preexisting) override {
+        if (interface == IDaxVibrator::descriptor && name == "default") {
+            ++(preexisting ? before : after);
+        }
+        return android::hardware::Void();
+    }
+    std::atomic<int> before = 0;
+    std::atomic<int> after = 0;
+};
+
+TEST_F(CallsTest, RegistrationIsToldToThoseWhoAsked) {
+    const sp<Notification> notification = new Notification;
+    ASSERT_TRUE(IDaxVibrator::registerForNotifications("default", notification));
+    EXPECT_TRUE(eventually([&] { return notification->before == 1; }));
+    mServer.kill();
+    serve();
+    EXPECT_TRUE(eventually([&] { return notification->after == 1; }));
+    const auto manager = android::hardware::defaultServiceManager1_2();
+    EXPECT_TRUE(manager->unregisterForNotifications(kChain[0], "default", notification));
+    EXPECT_FALSE(manager->unregisterForNotifications(kChain[0], "default", notification));
+}
+
+TEST_F(CallsTest, SearchWaitsForAServiceThatIsToCome) {
+    mServer.kill();
+    ASSERT_TRUE(eventually([] { return IDaxVibrator::tryGetService() == nullptr; }));
+    EXPECT_NE(host::lookupError().find(kChain[0] + "/default is not there: "), std::string::npos)
+            << host::lookupError();
+    std::thread later([&] {
+        std::this_thread::sleep_for(milliseconds(100));
+        startDaemon(mServer);
+    });
+    const sp<IDaxVibrator> found = IDaxVibrator::getService();
+    later.join();
+    ASSERT_NE(found, nullptr) << host::lookupError();
+    EXPECT_TRUE(found->ping().isOk());
+}
+
+TEST_F(CallsTest, CallsCanHaveATimeLimit) {
+    host::setCallTimeout(milliseconds(200));
+    const sp<IDaxVibrator> impatient = IDaxVibrator::getService();
+    EXPECT_TRUE(impatient->ping().isOk());
+    ::kill(mServer.pid(), SIGSTOP);
+    const auto start = std::chrono::steady_clock::now();
+    const Return<void> result = impatient->ping();
+    host::setCallTimeout(milliseconds(0));
+    EXPECT_GE(std::chrono::steady_clock::now() - start, milliseconds(200));
+    EXPECT_EQ(result.description(), "the service did not answer in time");
+    ::kill(mServer.pid(), SIGCONT);
+    EXPECT_TRUE(answers());
+    // Else the late reply would be taken for that of the next call.
+    if (!isKernel()) {
+        EXPECT_TRUE(impatient->ping().isDeadObject());
+    }
+}
+
+TEST_F(CallsTest, ValueOfAFailedCallEndsTheProcess) {
+    mServer.kill();
+    const Return<VibratorStatus> failed = mClient->off();
+    EXPECT_DEATH(static_cast<void>(static_cast<VibratorStatus>(failed)),
+                 "the value of a failed call was used: the service has gone");
 }
 
 }  // namespace

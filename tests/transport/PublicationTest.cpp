@@ -1,145 +1,173 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "support/LogCapture.h"
 #include "transport/TransportTest.h"
 
+#include <hwbinder/Host.h>
+#include <sys/socket.h>
 #include <sys/stat.h>
-#include <utils/Errors.h>
+#include <sys/un.h>
 
 #include <csignal>
+#include <cstring>
 #include <filesystem>
 #include <fstream>
 
 namespace {
 
 namespace fs = std::filesystem;
+namespace host = ::android::hardware::host;
+
+constexpr char kName[] = "vendor.velmora.hardware.vibrator@2.1::IDaxVibrator.default";
 
 class PublicationTest : public TransportTest {
   protected:
-    /** @return what registering in this process gives. */
-    android::status_t tryToRegister(const std::string& instance = "default") {
-        const android::sp<IDaxVibrator> vibrator = new Vibrator;
-        // In a child: what is registered stays so for the life of the process.
-        const int code = runAs(geteuid(), [&] {
-            const android::status_t status = vibrator->registerAsService(instance);
-            return status == android::OK ? 0 : -status;
-        });
-        return -code;
+    void SetUp() override {
+        if (isKernel()) GTEST_SKIP() << "there are no sockets";
+    }
+    /** @return why a client finds no service. */
+    static std::string whyNot() {
+        return IDaxVibrator::tryGetService() == nullptr ? host::lookupError() : "found";
+    }
+    /** @return the log of a daemon that is started as somebody, once it has a text in it. */
+    std::string logWith(const std::string& text, uid_t uid = geteuid()) {
+        ChildProcess daemon;
+        daemon.startProgram({SERVICE}, logFile(), {}, uid);
+        eventually([&] { return log().find(text) != std::string::npos; });
+        return log();
     }
 };
 
-TEST_F(PublicationTest, MissingServiceIsADeadObject) {
-    const LogCapture log;
-    const auto vibrator = IDaxVibrator::getService();
-    ASSERT_NE(vibrator.get(), nullptr);
-    for (int i = 0; i < 2; ++i) {
-        const auto result = vibrator->on(1);
-        EXPECT_FALSE(result.isOk());
-        EXPECT_TRUE(result.isDeadObject());
-        EXPECT_EQ(result.description(),
-                  mDirectory.path() +
-                          "/vendor.velmora.hardware.vibrator@2.1::IDaxVibrator.default"
-                          ": No such file or directory");
+TEST_F(PublicationTest, SearchSaysEveryPlaceThatItHasLookedAt) {
+    EXPECT_EQ(whyNot(),
+              "vendor.velmora.hardware.vibrator@2.1::IDaxVibrator/default is not there: " +
+                      mDirectory.path() + "/" + kName + ": No such file or directory");
+    if (geteuid() != 0) return;
+    unsetenv("HWBINDER_DIR");
+    setenv("XDG_RUNTIME_DIR", (mDirectory.path() + "/own").c_str(), 1);
+    ASSERT_EQ(chmod(mDirectory.path().c_str(), 0755), 0);
+    // Its own place first, then root's.
+    const int code = runAs(2000, [&] {
+        const std::string why = whyNot();
+        const size_t own = why.find(mDirectory.path() + "/own/hwbinder");
+        return own != std::string::npos && why.find("; /run/hwbinder", own) != std::string::npos
+                       ? 0
+                       : 1;
+    });
+    EXPECT_EQ(code, 0);
+    unsetenv("XDG_RUNTIME_DIR");
+}
+
+TEST_F(PublicationTest, NameGoesToTheNextWhenItsHolderHasGone) {
+    serve();
+    ChildProcess second;
+    second.startProgram({SERVICE}, mDirectory.path() + "/second", {});
+    const auto secondsLog = [&] { return readFile(mDirectory.path() + "/second"); };
+    EXPECT_TRUE(eventually([&] {
+        return secondsLog().find("is not registered yet: another process has the name") !=
+               std::string::npos;
+    }));
+    EXPECT_TRUE(answers());
+    EXPECT_EQ(secondsLog().find("is registered now"), std::string::npos);
+    mServer.kill();
+    EXPECT_TRUE(eventually(answers));
+    EXPECT_NE(secondsLog().find("is registered now"), std::string::npos);
+}
+
+TEST_F(PublicationTest, OfManyStartsOneHasTheName) {
+    constexpr int kMany = 20;
+    std::vector<ChildProcess> daemons(kMany);
+    for (int i = 0; i < kMany; ++i) {
+        daemons[static_cast<size_t>(i)].startProgram(
+                {SERVICE}, mDirectory.path() + "/" + std::to_string(i), {});
     }
-    EXPECT_EQ(vibrator->off().withDefault(Status::BAD_VALUE), Status::BAD_VALUE);
-}
-
-TEST_F(PublicationTest, DeadServiceIsInNobodysWay) {
-    serve();
-    const auto vibrator = IDaxVibrator::getService();
-    EXPECT_TRUE(call(*vibrator).isOk);
-    mServer.kill();
-    EXPECT_TRUE(vibrator->ping().isDeadObject());
-    EXPECT_EQ(IDaxVibrator::getService()->ping().description().find(mDirectory.path()), 0U);
-    serve();
+    EXPECT_TRUE(eventually(answers));
+    EXPECT_TRUE(eventually([&] {
+        int waiting = 0;
+        for (int i = 0; i < kMany; ++i) {
+            const std::string text = readFile(mDirectory.path() + "/" + std::to_string(i));
+            waiting += text.find("is not registered yet") != std::string::npos ? 1 : 0;
+        }
+        return waiting == kMany - 1;
+    }));
     EXPECT_TRUE(answers());
-    EXPECT_FALSE(vibrator->ping().isOk());
-}
-
-TEST_F(PublicationTest, LivingServiceIsNotReplaced) {
-    serve();
-    const LogCapture log;
-    EXPECT_EQ(tryToRegister(), android::ALREADY_EXISTS);
-    EXPECT_TRUE(answers());
-    EXPECT_EQ(tryToRegister("second"), android::OK);
-    mServer.kill();
-    EXPECT_EQ(tryToRegister(), android::OK);
 }
 
 TEST_F(PublicationTest, EverybodyMayConnectWhateverTheUmask) {
     if (geteuid() != 0) GTEST_SKIP() << "only root can become somebody else";
-    const mode_t before = umask(0077);
+    ASSERT_EQ(chmod(mDirectory.path().c_str(), 0755), 0);
     setenv("HWBINDER_DIR", (mDirectory.path() + "/new").c_str(), 1);
-    serve();
-    umask(before);
+    serve("umask 0077");
     EXPECT_EQ(runAs(2000, [] { return answers() ? 0 : 1; }), 0);
 }
 
-TEST_F(PublicationTest, UnusableSurroundingsAreAClearError) {
+TEST_F(PublicationTest, SurroundingsThatCannotBeTrustedAreRefusedByBothSides) {
+    const std::string base = mDirectory.path();
+    fs::create_directory(base + "/open");
+    ASSERT_EQ(chmod((base + "/open").c_str(), 0775), 0);
+    fs::create_directory(base + "/anybodys");
+    ASSERT_EQ(chmod((base + "/anybodys").c_str(), 01777), 0);
+    fs::create_directory(base + "/good");
+    fs::create_symlink("good", base + "/link");
+    if (geteuid() == 0) {
+        ASSERT_EQ(lchown((base + "/link").c_str(), 2000, 2000), 0);
+    }
     const struct {
         std::string directory;
-        std::string instance;
         std::string complaint;
     } cases[] = {
-            {mDirectory.path() + "/a/b", "default", "No such file or directory"},
-            {"/proc/version", "default", "no directory"},
-            {"/proc/self", "default", "/proc/self"},
-            {mDirectory.path(), "a/b", "is no name for a socket"},
-            {mDirectory.path() + "/" + std::string(120, 'x'), "default",
-             "characters of a socket address"},
+            {base + "/a/b", base + "/a/b: No such file or directory"},
+            {"/proc/version", "/proc/version: is not a directory"},
+            {base + "/open", "others than its owner may write to it"},
+            {base + "/anybodys", "others than its owner may write to it"},
+            {base + "/" + std::string(120, 'x'), "characters of a socket's address"},
+            {base + "/link", geteuid() == 0 ? "is a link of uid 2000" : ""},
     };
-    for (const auto& [directory, instance, complaint] : cases) {
+    for (const auto& [directory, complaint] : cases) {
+        if (complaint.empty()) continue;
         SCOPED_TRACE(directory);
         setenv("HWBINDER_DIR", directory.c_str(), 1);
-        LogCapture log;
-        EXPECT_NE(tryToRegister(instance), android::OK);
-        const std::string text = log.takeText();
+        const std::string text = logWith(complaint);
         EXPECT_NE(text.find("E/hwbinder"), std::string::npos) << text;
         EXPECT_NE(text.find(complaint), std::string::npos) << text;
-        // The client is told as well.
-        EXPECT_TRUE(IDaxVibrator::getService(instance)->off().isDeadObject());
+        EXPECT_NE(whyNot().find(complaint), std::string::npos) << whyNot();
     }
 }
 
 TEST_F(PublicationTest, DirectoryOfAnotherUserIsNotUsed) {
     if (geteuid() != 0) GTEST_SKIP() << "only root can give a directory away";
     ASSERT_EQ(chown(mDirectory.path().c_str(), 2000, 2000), 0);
-    LogCapture log;
-    EXPECT_EQ(tryToRegister(), android::PERMISSION_DENIED);
-    EXPECT_NE(log.takeText().find("belongs to uid 2000"), std::string::npos);
+    EXPECT_NE(logWith("belongs to").find("belongs to uid 2000"), std::string::npos);
+    ASSERT_EQ(chown(mDirectory.path().c_str(), 0, 0), 0);
+    ASSERT_EQ(chmod(mDirectory.path().c_str(), 0755), 0);
+    std::ofstream(logFile()) << std::flush;
+    EXPECT_NE(logWith("Permission denied", 2000).find("Permission denied"), std::string::npos);
 }
 
-TEST_F(PublicationTest, DirectoryThatCannotBeWrittenIsAClearError) {
+TEST_F(PublicationTest, ServerOfAStrangerIsNotCalled) {
     if (geteuid() != 0) GTEST_SKIP() << "only root can become somebody else";
-    LogCapture log;
-    EXPECT_EQ(runAs(2000, [&] { return tryToRegister() == -EACCES ? 0 : 1; }), 0);
-    EXPECT_NE(log.takeText().find("Permission denied"), std::string::npos);
+    // Somebody has got a socket into a directory that is not his.
+    const int listener = socket(AF_UNIX, SOCK_SEQPACKET | SOCK_CLOEXEC, 0);
+    sockaddr_un address{};
+    address.sun_family = AF_UNIX;
+    const std::string path = mDirectory.path() + "/" + kName;
+    memcpy(address.sun_path, path.c_str(), path.size());
+    ASSERT_EQ(bind(listener, reinterpret_cast<sockaddr*>(&address), sizeof(address)), 0);
+    ASSERT_EQ(seteuid(2000), 0);
+    ASSERT_EQ(listen(listener, 1), 0);
+    ASSERT_EQ(seteuid(0), 0);
+    EXPECT_NE(whyNot().find(": served by uid 2000, to whom the directory does not belong"),
+              std::string::npos)
+            << whyNot();
+    close(listener);
 }
 
-TEST_F(PublicationTest, UserWithoutADirectoryIsToldSo) {
-    if (geteuid() != 0) GTEST_SKIP() << "only root can become somebody else";
-    unsetenv("HWBINDER_DIR");
-    const LogCapture log;
-    EXPECT_EQ(runAs(2000,
-                    [] {
-                        unsetenv("XDG_RUNTIME_DIR");
-                        const auto result = IDaxVibrator::getService()->off();
-                        return result.description() ==
-                                               "neither HWBINDER_DIR nor XDG_RUNTIME_DIR is set"
-                                       ? 0
-                                       : 1;
-                    }),
-              0);
-    const std::string runtime = mDirectory.path();
-    ASSERT_EQ(chown(runtime.c_str(), 2000, 2000), 0);
-    EXPECT_EQ(runAs(2000,
-                    [&] {
-                        setenv("XDG_RUNTIME_DIR", runtime.c_str(), 1);
-                        const android::sp<IDaxVibrator> vibrator = new Vibrator;
-                        return vibrator->registerAsService() == android::OK ? 0 : 1;
-                    }),
-              0);
-    EXPECT_TRUE(fs::is_socket(
-            runtime + "/hwbinder/vendor.velmora.hardware.vibrator@2.1::IDaxVibrator.default"));
+TEST_F(PublicationTest, LogSaysWhatTheCallsGoOver) {
+    EXPECT_NE(logWith("calls go over")
+                      .find("calls go over sockets in " + mDirectory.path() +
+                            ", as HWBINDER_DIR says"),
+              std::string::npos);
+    setenv("HWBINDER_DEVICE", "/dev/null", 1);
+    EXPECT_NE(logWith("not registered").find("/dev/null: not a binder device"), std::string::npos);
+    unsetenv("HWBINDER_DEVICE");
 }
 
 }  // namespace

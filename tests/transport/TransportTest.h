@@ -1,50 +1,37 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Vibrator.h"
 #include "support/Answer.h"
 #include "support/Process.h"
 #include "support/TemporaryDirectory.h"
 
 #include <gtest/gtest.h>
-#include <hidl/HidlTransportSupport.h>
-#include <sys/resource.h>
 
 #include <cstdlib>
 #include <string>
+#include <vector>
 
 /**
- * A directory for sockets, and a process that serves an object in it. The operation that is called
- * is one that answers without a look at the driver.
+ * The daemon, without a look at what its driver is, and a way to it: a directory of sockets, or the
+ * kernel's binder where HWBINDER_DEVICE names it.
  */
 class TransportTest : public ::testing::Test {
   protected:
-    using Status = VibratorStatus;
-    using Vibrator = ::vendor::velmora::hardware::vibrator::V2_1::implementation::Vibrator;
-
     TransportTest() {
-        setenv("HWBINDER_DIR", mDirectory.path().c_str(), 1);
-        // What the object does is not looked at here.
-        setenv("ANDROID_LOG_TAGS", "QorVibrator-HAL2.1:S", 1);
+        if (!isKernel()) setenv("HWBINDER_DIR", mDirectory.path().c_str(), 1);
     }
-    ~TransportTest() override {
-        unsetenv("HWBINDER_DIR");
-        unsetenv("ANDROID_LOG_TAGS");
-    }
+    ~TransportTest() override { unsetenv("HWBINDER_DIR"); }
 
-    /** @param descriptors the limit that the process has; 0 leaves it as it is. */
-    void serve(const std::string& instance = "default", rlim_t descriptors = 0) {
-        mServer.start([&](const auto& ready) {
-            if (descriptors != 0) {
-                const rlimit limit{descriptors, descriptors};
-                setrlimit(RLIMIT_NOFILE, &limit);
-            }
-            const android::sp<IDaxVibrator> vibrator = new Vibrator;
-            android::hardware::configureRpcThreadpool(1, true);
-            if (vibrator->registerAsService(instance) != android::OK) _exit(1);
-            ready();
-            android::hardware::joinRpcThreadpool();
-        });
+    static bool isKernel() { return getenv("HWBINDER_DEVICE") != nullptr; }
+
+    /** Starts a daemon. @param limits shell commands that come first. */
+    void startDaemon(ChildProcess& daemon, const std::string& limits = "true") const {
+        daemon.startProgram({"/bin/sh", "-c", limits + "; exec \"$0\"", SERVICE}, logFile(), {});
+    }
+    /** Starts the daemon, and waits until it answers. */
+    void serve(const std::string& limits = "true") {
+        startDaemon(mServer, limits);
+        ASSERT_TRUE(eventually(answers)) << log();
     }
 
     /** @return what an effect of 1.1, which is never played, is answered with. */
@@ -57,9 +44,13 @@ class TransportTest : public ::testing::Test {
         });
     }
     /** @return whether a new client gets a right answer. */
-    static bool answers(const std::string& instance = "default") {
-        return call(*IDaxVibrator::getService(instance)).inWords() == "(UNSUPPORTED_OPERATION, 0)";
+    static bool answers() {
+        const auto vibrator = IDaxVibrator::tryGetService();
+        return vibrator != nullptr && call(*vibrator).inWords() == "(UNSUPPORTED_OPERATION, 0)";
     }
+
+    std::string logFile() const { return mDirectory.path() + "/log"; }
+    std::string log() const { return readFile(logFile()); }
 
     TemporaryDirectory mDirectory;
     ChildProcess mServer;

@@ -1,0 +1,149 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "libhwbinder/KernelDriver.h"
+#include "transport/TransportTest.h"
+
+#include <android/hidl/manager/1.0/IServiceNotification.h>
+#include <android/hidl/manager/1.2/IServiceManager.h>
+#include <hidl/HidlTransportSupport.h>
+#include <hidl/ServiceManagement.h>
+#include <hwbinder/BpHwBinder.h>
+#include <hwbinder/ProcessState.h>
+
+#include <algorithm>
+#include <atomic>
+#include <chrono>
+#include <filesystem>
+#include <thread>
+#include <vector>
+
+// What a program has of the runtime in its own process: its threads, and what it publishes.
+
+namespace {
+
+using ::android::sp;
+using ::android::wp;
+using ::android::hardware::BpHwBinder;
+using ::android::hardware::hidl_string;
+using ::android::hardware::IBinder;
+using ::android::hardware::ProcessState;
+using ::android::hardware::Return;
+using ::android::hidl::manager::V1_0::IServiceNotification;
+using std::chrono::milliseconds;
+
+/** Notes how many of its calls there are at once. */
+struct Slow : IServiceNotification {
+    Return<void> onRegistration(const hidl_string&, const hidl_string&, bool) override {
+        most = std::max<int>(most, ++now);
+        std::this_thread::sleep_for(milliseconds(20));
+        --now;
+        ++calls;
+        return ::android::hardware::Void();
+    }
+    std::atomic<int> now = 0;
+    std::atomic<int> most = 0;
+    std::atomic<int> calls = 0;
+};
+
+class RuntimeTest : public TransportTest {};
+
+size_t threadCount() {
+    const std::filesystem::directory_iterator tasks("/proc/self/task");
+    return static_cast<size_t>(std::distance(begin(tasks), end(tasks)));
+}
+
+TEST_F(RuntimeTest, DeviceThatCannotBeOpenedServesNothingHoweverOften) {
+    android::hardware::KernelDriver driver("/dev/null");
+    EXPECT_EQ(driver.error(), "/dev/null: not a binder device");
+    EXPECT_EQ(driver.becomeContextManager(nullptr), android::NO_INIT);
+    std::thread([&] {
+        for (int i = 0; i < 300; ++i)
+            driver.serve();
+    }).join();
+}
+
+struct Untold : IBinder::DeathRecipient {
+    void binderDied(const wp<IBinder>&) override {}
+};
+
+TEST_F(RuntimeTest, DeathNoticeThatCannotBeHadIsRefusedEveryTime) {
+    const sp<BpHwBinder> unknown = new BpHwBinder(4'000'000'000);
+    const sp<Untold> recipient = new Untold;
+    EXPECT_EQ(unknown->linkToDeath(recipient), android::DEAD_OBJECT);
+    EXPECT_EQ(unknown->linkToDeath(recipient), android::DEAD_OBJECT);
+    EXPECT_EQ(unknown->unlinkToDeath(recipient), android::NAME_NOT_FOUND);
+}
+
+TEST_F(RuntimeTest, OneThreadServesHoweverManyJoin) {
+    const sp<Slow> slow = new Slow;
+    ASSERT_EQ(slow->registerAsService("slow"), android::OK);
+    ProcessState::self()->startThreadPool();
+    for (int i = 0; i < 2; ++i)
+        std::thread(android::hardware::joinRpcThreadpool).detach();
+    for (int i = 0; i < 6; ++i) {
+        const auto client = IServiceNotification::tryGetService("slow");
+        ASSERT_NE(client, nullptr);
+        EXPECT_TRUE(client->onRegistration("", "", false).isOk());
+    }
+    EXPECT_TRUE(eventually([&] { return slow->calls == 6; }));
+    EXPECT_EQ(slow->most, 1);
+}
+
+TEST_F(RuntimeTest, NameThatIsTakenIsWaitedForByAServerThatIsIdle) {
+    ChildProcess first;
+    first.start([](const auto& ready) {
+        const sp<Slow> holder = new Slow;
+        if (holder->registerAsService("taken") == android::OK) ready();
+        android::hardware::joinRpcThreadpool();
+    });
+    ProcessState::self()->startThreadPool();
+    // Now it waits, with nothing to do.
+    std::this_thread::sleep_for(milliseconds(50));
+    const sp<Slow> second = new Slow;
+    EXPECT_NE(second->registerAsService("taken"), android::OK);
+    first.kill();
+    EXPECT_TRUE(eventually([&] {
+        const auto client = IServiceNotification::tryGetService("taken");
+        return client != nullptr && client->ping().isOk();
+    }));
+}
+
+TEST_F(RuntimeTest, NamesOfFilesBesideTheSocketsAreRefused) {
+    for (const char* name : {"x~", "x.lock", "a/b"}) {
+        EXPECT_NE((new Slow)->registerAsService(name), android::OK) << name;
+        EXPECT_EQ(IServiceNotification::tryGetService(name), nullptr);
+    }
+}
+
+TEST_F(RuntimeTest, WatchForServicesTakesOneThread) {
+    const size_t before = threadCount();
+    const auto manager = android::hardware::defaultServiceManager1_2();
+    const sp<Slow> callback = new Slow;
+    for (int i = 0; i < 20; ++i) {
+        EXPECT_TRUE(manager->registerForNotifications("a@1.0::IA", "x", callback));
+        EXPECT_TRUE(manager->unregisterForNotifications("a@1.0::IA", "x", callback));
+    }
+    EXPECT_LE(threadCount(), before + 1);
+}
+
+/** Makes a call when its thread ends. */
+struct Last {
+    sp<IDaxVibrator> vibrator;
+    bool* isOk;
+
+    ~Last() { *isOk = vibrator->ping().isOk(); }
+};
+
+TEST_F(RuntimeTest, CallsCanBeMadeWhileAThreadEnds) {
+    serve();
+    bool isOk = false;
+    std::thread([&] {
+        // Made before the runtime makes anything for this thread, so it ends after that.
+        static thread_local Last last{nullptr, nullptr};
+        last.isOk = &isOk;
+        last.vibrator = IDaxVibrator::tryGetService();
+        EXPECT_TRUE(last.vibrator->ping().isOk());
+    }).join();
+    EXPECT_TRUE(isOk);
+}
+
+}  // namespace

@@ -1,0 +1,160 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "hwservicemanager/ServiceManager.h"
+
+#include <gtest/gtest.h>
+#include <hwbinder/IPCThreadState.h>
+
+#include <string>
+#include <vector>
+
+namespace {
+
+using ::android::sp;
+using ::android::hardware::hidl_string;
+using ::android::hardware::IPCThreadState;
+using ::android::hardware::Return;
+using Notification = ::android::hidl::manager::V1_0::IServiceNotification;
+
+/** Makes the calls of a scope those of somebody else. */
+class Caller {
+  public:
+    Caller(uid_t uid, pid_t pid) : mBefore(IPCThreadState::self()->clearCallingIdentity()) {
+        IPCThreadState::self()->restoreCallingIdentity(IPCThreadState::identityToken(uid, pid));
+    }
+    ~Caller() { IPCThreadState::self()->restoreCallingIdentity(mBefore); }
+    Caller(const Caller&) = delete;
+    Caller& operator=(const Caller&) = delete;
+
+  private:
+    const int64_t mBefore;
+};
+
+/** An object to register, and to be told of others. */
+struct Object : Notification {
+    Return<void> onRegistration(const hidl_string& interface, const hidl_string& name,
+                                bool preexisting) override {
+        news.push_back(std::string(interface) + "/" + std::string(name) +
+                       (preexisting ? " before" : ""));
+        return ::android::hardware::Void();
+    }
+    std::vector<std::string> news;
+};
+
+constexpr char kInterface[] = "android.hidl.manager@1.0::IServiceNotification";
+constexpr uid_t kNobody = 54321;
+
+class ServiceManagerTest : public ::testing::Test {
+  protected:
+    std::vector<std::string> names() {
+        std::vector<std::string> result;
+        mManager->list([&](const auto& list) { result.assign(list.begin(), list.end()); });
+        return result;
+    }
+    bool knows(const char* name) {
+        return sp<ServiceManager::Interface>(mManager->get(kInterface, name)) != nullptr;
+    }
+
+    const sp<ServiceManager> mManager = new ServiceManager;
+    const sp<Object> mObject = new Object;
+};
+
+TEST_F(ServiceManagerTest, OnlySomeMayAdd) {
+    const struct {
+        uid_t uid;
+        bool isAllowed;
+    } cases[] = {{0, true}, {1000, true}, {getuid(), true}, {kNobody, false}};
+    for (const auto& [uid, isAllowed] : cases) {
+        const std::string name = "of" + std::to_string(uid);
+        const Caller caller(uid, 7);
+        EXPECT_EQ(mManager->add(name, mObject).withDefault(false), isAllowed) << uid;
+        EXPECT_EQ(mManager->addWithChain(name, mObject, {kInterface}).withDefault(false),
+                  isAllowed);
+        EXPECT_EQ(knows(name.c_str()), isAllowed);
+    }
+    EXPECT_FALSE(mManager->add("", mObject).withDefault(true));
+    EXPECT_FALSE(mManager->add("none", nullptr).withDefault(true));
+    EXPECT_FALSE(mManager->addWithChain("none", nullptr, {kInterface}).withDefault(true));
+    EXPECT_FALSE(mManager->addWithChain("none", mObject, {}).withDefault(true));
+}
+
+TEST_F(ServiceManagerTest, LastOneAddedHasTheNamesAndOnlyItsProcessTakesThemAway) {
+    const sp<Object> second = new Object;
+    const Caller caller(0, 7);
+    EXPECT_TRUE(mManager->addWithChain("default", mObject, {kInterface, "a@1.0::IA"}));
+    EXPECT_TRUE(mManager->addWithChain("default", second,
+                                       {kInterface, ServiceManager::Interface::descriptor}));
+    EXPECT_EQ(names(), (std::vector<std::string>{"a@1.0::IA/default",
+                                                 std::string(kInterface) + "/default"}));
+    EXPECT_EQ(sp<ServiceManager::Interface>(mManager->get(kInterface, "default")), second);
+    EXPECT_EQ(sp<ServiceManager::Interface>(mManager->get("a@1.0::IA", "default")), mObject);
+    EXPECT_FALSE(mManager->tryUnregister(kInterface, "default", mObject)) << "it has lost the name";
+    EXPECT_FALSE(mManager->tryUnregister(kInterface, "default", nullptr));
+    EXPECT_FALSE(mManager->tryUnregister(kInterface, "other", second));
+    {
+        const Caller another(0, 8);
+        EXPECT_FALSE(mManager->tryUnregister(kInterface, "default", second));
+    }
+    EXPECT_TRUE(mManager->tryUnregister("a@1.0::IA", "default", mObject));
+    EXPECT_TRUE(knows("default"));
+    EXPECT_TRUE(mManager->tryUnregister(kInterface, "default", second));
+    EXPECT_TRUE(names().empty());
+}
+
+TEST_F(ServiceManagerTest, ListenersHearOfWhatTheyAskedFor) {
+    const sp<Object> all = new Object;
+    const sp<Object> one = new Object;
+    const Caller caller(0, 7);
+    EXPECT_TRUE(mManager->add("first", mObject));
+    EXPECT_TRUE(mManager->registerForNotifications(kInterface, "", all));
+    EXPECT_TRUE(mManager->registerForNotifications(kInterface, "second", one));
+    EXPECT_TRUE(mManager->registerForNotifications("a@1.0::IA", "", one));
+    EXPECT_TRUE(mManager->add("second", mObject));
+    EXPECT_FALSE(mManager->unregisterForNotifications(kInterface, "second", all));
+    EXPECT_FALSE(mManager->unregisterForNotifications(kInterface, "second", nullptr));
+    EXPECT_TRUE(mManager->unregisterForNotifications(kInterface, "second", one));
+    EXPECT_TRUE(mManager->add("second", mObject));
+    EXPECT_TRUE(mManager->unregisterForNotifications("", "", all));
+    EXPECT_TRUE(mManager->add("second", mObject));
+    const std::string name = kInterface;
+    EXPECT_EQ(all->news, (std::vector<std::string>{name + "/first before", name + "/second",
+                                                   name + "/second"}));
+    EXPECT_EQ(one->news, std::vector<std::string>{name + "/second"});
+}
+
+TEST_F(ServiceManagerTest, OneUserCannotMakeItGrow) {
+    const Caller caller(kNobody, 7);
+    EXPECT_FALSE(mManager->registerForNotifications("", "", mObject));
+    EXPECT_FALSE(mManager->registerForNotifications("a", "", nullptr));
+    const std::string tooLong(1025, 'x');
+    EXPECT_FALSE(mManager->registerForNotifications(tooLong, "", mObject));
+    EXPECT_FALSE(mManager->registerForNotifications("a", tooLong, mObject));
+    EXPECT_TRUE(mManager->registerForNotifications(tooLong.substr(1), "", mObject));
+    for (int i = 1; i < 64; ++i)
+        EXPECT_TRUE(mManager->registerForNotifications("a", "", mObject)) << i;
+    EXPECT_FALSE(mManager->registerForNotifications("a", "", mObject));
+    const Caller another(kNobody + 1, 8);
+    EXPECT_TRUE(mManager->registerForNotifications("a", "", mObject));
+}
+
+TEST_F(ServiceManagerTest, ListsSayWhatIsThere) {
+    const Caller caller(0, 7);
+    EXPECT_TRUE(mManager->add("x", mObject));
+    EXPECT_TRUE(mManager->add("y", mObject));
+    std::vector<std::string> instances;
+    mManager->listByInterface(
+            kInterface, [&](const auto& list) { instances.assign(list.begin(), list.end()); });
+    EXPECT_EQ(instances, (std::vector<std::string>{"x", "y"}));
+    mManager->debugDump([&](const auto& infos) {
+        ASSERT_EQ(infos.size(), 2U);
+        EXPECT_EQ(std::string(infos[1].interfaceName), kInterface);
+        EXPECT_EQ(std::string(infos[1].instanceName), "y");
+        EXPECT_EQ(infos[1].pid, 7);
+    });
+    using Transport = ServiceManager::Transport;
+    EXPECT_EQ(mManager->getTransport(kInterface, "x").withDefault(Transport::EMPTY),
+              Transport::HWBINDER);
+    EXPECT_EQ(mManager->getTransport(kInterface, "z").withDefault(Transport::HWBINDER),
+              Transport::EMPTY);
+}
+
+}  // namespace
