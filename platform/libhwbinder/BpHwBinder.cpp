@@ -10,20 +10,18 @@
 namespace android::hardware {
 
 BpHwBinder::BpHwBinder(uint32_t handle)
-    : mHandle(handle), mLink(ProcessState::self()->driver().acquire(handle)) {}
+    : mDriver(ProcessState::self()->driver()), mHandle(handle), mLink(mDriver.acquire(handle)) {}
 
 BpHwBinder::~BpHwBinder() {
-    Driver& driver = ProcessState::self()->driver();
     const bool isLast = ProcessState::self()->expungeHandle(mHandle, this);
     // If the handle has another proxy by now, that one takes the notice over.
-    if (isLast && !mRecipients.empty()) driver.clearDeathNotice(mHandle);
-    driver.release(mHandle);
+    if (isLast && !mRecipients.empty()) mDriver.clearDeathNotice(mHandle);
+    mDriver.release(mHandle);
 }
 
 status_t BpHwBinder::transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags,
                               TransactCallback /* callback */) {
-    const status_t status =
-            ProcessState::self()->driver().transact(mHandle, mLink, code, data, reply, flags);
+    const status_t status = mDriver.transact(mHandle, mLink, code, data, reply, flags);
     if (status == DEAD_OBJECT) {
         const std::lock_guard<std::mutex> lock(mMutex);
         mAlive = false;
@@ -35,7 +33,7 @@ status_t BpHwBinder::linkToDeath(const sp<DeathRecipient>& recipient) {
     const std::lock_guard<std::mutex> lock(mMutex);
     if (!mAlive) return DEAD_OBJECT;
     if (mRecipients.empty()) {
-        const status_t status = ProcessState::self()->driver().requestDeathNotice(mHandle);
+        const status_t status = mDriver.requestDeathNotice(mHandle);
         if (status != OK) return status;
     }
     mRecipients.push_back(recipient);
@@ -47,7 +45,7 @@ status_t BpHwBinder::unlinkToDeath(const sp<DeathRecipient>& recipient) {
     const auto found = std::find(mRecipients.begin(), mRecipients.end(), recipient);
     if (found == mRecipients.end()) return NAME_NOT_FOUND;
     mRecipients.erase(found);
-    if (mRecipients.empty()) ProcessState::self()->driver().clearDeathNotice(mHandle);
+    if (mRecipients.empty()) mDriver.clearDeathNotice(mHandle);
     return OK;
 }
 

@@ -7,34 +7,58 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <memory>
-#include <new>
-#include <vector>
+#include <utility>
 
 namespace android::hardware {
 namespace {
 
-/** The packets that this thread has no use for now: most calls need no memory from the heap. */
-struct SparePackets {
-    ~SparePackets() { areGone = true; }
-
-    std::vector<std::unique_ptr<Packet>> packets;
-    /** What ends after this, at the end of a thread or of the process, may still make calls. */
-    static thread_local bool areGone;
+/** A packet, and the next of those that this thread has no use for now. */
+struct SparePacket : Packet {
+    SparePacket* next;
 };
-thread_local bool SparePackets::areGone = false;
-thread_local SparePackets spare;
 
-std::unique_ptr<Packet> takePacket() {
-    if (SparePackets::areGone || spare.packets.empty()) return std::unique_ptr<Packet>(new Packet);
-    std::unique_ptr<Packet> packet = std::move(spare.packets.back());
-    spare.packets.pop_back();
-    return packet;
+/** Most calls need no memory from the heap. */
+thread_local SparePacket* spare = nullptr;
+/** What ends after the spare ones, at the end of a thread or of the process, may still call. */
+thread_local bool areSparesGone = false;
+
+struct SparesEnd {
+    ~SparesEnd() {
+        areSparesGone = true;
+        while (spare != nullptr)
+            delete std::exchange(spare, spare->next);
+    }
+};
+
+SparePacket* newPacket() {
+    static thread_local const SparesEnd end;
+    return new SparePacket;
 }
 
-void giveBack(const uint8_t* /* bytes */, void* packet) {
-    std::unique_ptr<Packet> returned(static_cast<Packet*>(packet));
-    if (!SparePackets::areGone) spare.packets.push_back(std::move(returned));
+SparePacket* takePacket() {
+    return spare == nullptr ? newPacket() : std::exchange(spare, spare->next);
+}
+
+void giveBack(const uint8_t* /* bytes */, void* owner) {
+    auto* packet = static_cast<SparePacket*>(owner);
+    if (areSparesGone) {
+        delete packet;
+        return;
+    }
+    packet->next = spare;
+    spare = packet;
+}
+
+/** Makes a parcel of a reply. @return OK, or the status that the object has answered instead. */
+status_t take(SparePacket* packet, Parcel* reply) {
+    Packet::Header header;
+    status_t status = packet->unpack(&header, reply, giveBack, packet);
+    if (status == OK && (header.flags & TF_STATUS_CODE) != 0) {
+        const status_t read = reply->readInt32(&status);
+        reply->clear();
+        if (read != OK || status == OK) return FAILED_TRANSACTION;
+    }
+    return status;
 }
 
 template <typename Call>
@@ -53,25 +77,17 @@ LocalConnection::~LocalConnection() {
 
 status_t LocalConnection::transact(uint32_t code, const Parcel& data, Parcel* reply,
                                    uint32_t flags) {
-    std::unique_ptr<Packet> packet = takePacket();
+    SparePacket* packet = takePacket();
     const bool oneway = (flags & IBinder::FLAG_ONEWAY) != 0;
     status_t status = packet->pack(code, flags, data);
-    if (status == OK) status = exchange(packet.get(), oneway);
+    if (status == OK) status = exchange(packet, oneway);
     if (status != OK || oneway) {
-        giveBack(nullptr, packet.release());
+        giveBack(nullptr, packet);
         return status;
     }
+    if (reply != nullptr) return take(packet, reply);
     Parcel unwanted;
-    Parcel* received = reply == nullptr ? &unwanted : reply;
-    Packet::Header header;
-    Packet* const owner = packet.release();
-    status = owner->unpack(&header, received, giveBack, owner);
-    if (status == OK && (header.flags & TF_STATUS_CODE) != 0) {
-        const status_t read = received->readInt32(&status);
-        received->clear();
-        if (read != OK || status == OK) return FAILED_TRANSACTION;
-    }
-    return status;
+    return take(packet, &unwanted);
 }
 
 status_t LocalConnection::exchange(Packet* packet, bool oneway) {

@@ -117,7 +117,6 @@ bool LocalServer::listen(int socket, const sp<BHwBinder>& object) {
 }
 
 int LocalServer::retryPending() {
-    if (!mHasPending) return -1;
     const std::lock_guard<std::mutex> lock(mMutex);
     const auto isKnown = [&](const Pending& each) {
         std::string whyNot;
@@ -156,8 +155,8 @@ void LocalServer::serve() {
     mRequest = std::make_unique<Packet>();
     mReply = std::make_unique<Packet>();
     for (;;) {
-        const int timeout = retryPending();
-        if (!collect(mTurns.empty() ? timeout : 0)) return;
+        const int timeout = mHasPending ? retryPending() : -1;
+        if (!collect(mTurns.isEmpty() ? timeout : 0)) return;
         serveOneOfEach();
     }
 }
@@ -167,21 +166,24 @@ bool LocalServer::collect(int timeout) {
     const int count = epoll_wait(mEpoll, events, 1024, timeout);
     if (count < 0) return errno == EINTR;
     // Clients first: accepting may drop an idle client, and one with an event here is not idle.
+    int others = 0;
     for (int i = 0; i < count; ++i) {
-        const epoll_event& event = events[i];
-        auto* endpoint = static_cast<Endpoint*>(event.data.ptr);
-        if ((event.data.u64 & kWatched) == 0 && endpoint->share != nullptr) enqueue(endpoint);
-    }
-    for (int i = 0; i < count; ++i) {
-        const uint64_t word = events[i].data.u64;
         auto* endpoint = static_cast<Endpoint*>(events[i].data.ptr);
+        if ((events[i].data.u64 & kWatched) == 0 && endpoint->share != nullptr) {
+            enqueue(endpoint);
+        } else {
+            events[others++] = events[i];
+        }
+    }
+    for (int i = 0; i < others; ++i) {
+        const uint64_t word = events[i].data.u64;
         if (word == kWake) continue;
         if ((word & kWatched) != 0) {
             const auto handle = static_cast<uint32_t>(word);
             ProcessState::self()->driver().clearDeathNotice(handle);
             ProcessState::self()->sendObituary(handle);
-        } else if (endpoint->share == nullptr) {
-            acceptAll(endpoint);
+        } else {
+            acceptAll(static_cast<Endpoint*>(events[i].data.ptr));
         }
     }
     return true;
@@ -190,50 +192,30 @@ bool LocalServer::collect(int timeout) {
 void LocalServer::enqueue(Endpoint* client) {
     if (client->isQueued) return;
     client->isQueued = true;
-    client->next = nullptr;
     Share* share = client->share;
-    if (share->first == nullptr) {
-        share->first = client;
-        mTurns.push_back(share);
-    } else {
-        share->last->next = client;
-    }
-    share->last = client;
-}
-
-LocalServer::Endpoint* LocalServer::dequeue(Share* share) {
-    Endpoint* client = share->first;
-    share->first = client->next;
-    client->isQueued = false;
-    return client;
+    if (share->waiting.isEmpty()) mTurns.push(share);
+    share->waiting.push(client);
 }
 
 void LocalServer::unqueue(Endpoint* client) {
     if (!client->isQueued) return;
     client->isQueued = false;
     Share* share = client->share;
-    Endpoint* before = nullptr;
-    Endpoint** link = &share->first;
-    while (*link != client) {
-        before = *link;
-        link = &before->next;
-    }
-    *link = client->next;
-    if (share->last == client) share->last = before;
-    if (share->first == nullptr) {
-        mTurns.erase(std::find(mTurns.begin(), mTurns.end(), share));
-    }
+    share->waiting.remove(client);
+    if (share->waiting.isEmpty()) mTurns.remove(share);
 }
 
 void LocalServer::serveOneOfEach() {
-    mRound.swap(mTurns);
-    for (Share* share : mRound) {
-        Endpoint* client = dequeue(share);
-        if (share->first != nullptr) mTurns.push_back(share);
+    const Share* const lastOfRound = mTurns.last();
+    for (bool isLast = mTurns.isEmpty(); !isLast;) {
+        Share* share = mTurns.pop();
+        isLast = share == lastOfRound;
+        Endpoint* client = share->waiting.pop();
+        client->isQueued = false;
+        if (!share->waiting.isEmpty()) mTurns.push(share);
         // What else the client has sent is reported again, and waits behind its uid's other calls.
         if (!serveCall(client)) drop(client);
     }
-    mRound.clear();
 }
 
 bool LocalServer::receive(int socket, ucred* caller) {
@@ -263,14 +245,12 @@ bool LocalServer::serveCall(Endpoint* client) {
     ucred caller{};
     if (!receive(socket, &caller)) return false;
 
-    Parcel data;
     Packet::Header header;
-    status_t status = mRequest->unpack(&header, &data, keep, nullptr);
+    status_t status = mRequest->unpack(&header, &mArguments, keep, nullptr);
     // The header of a malformed packet cannot be trusted, nor its oneway flag: it gets an answer.
     const bool oneway = status == OK && (header.flags & TF_ONE_WAY) != 0;
     bool isAlive = true;
     bool replied = oneway;
-    Parcel results;
     const auto send = [&](Parcel& parcel) {
         if (replied) return;
         replied = true;
@@ -281,14 +261,16 @@ bool LocalServer::serveCall(Endpoint* client) {
     if (status == OK) {
         const CallerIdentity identity(caller.uid, caller.pid);
         // By reference, which is copied without memory from the heap.
-        status = client->object->transact(header.code, data, &results, header.flags & TF_ONE_WAY,
-                                          std::ref(send));
+        status = client->object->transact(header.code, mArguments, &mResults,
+                                          header.flags & TF_ONE_WAY, std::ref(send));
     }
-    if (!replied && status == OK) send(results);
+    if (!replied && status == OK) send(mResults);
     if (!replied) {
         mReply->packStatus(status);
         isAlive = reply(socket);
     }
+    mArguments.clear();
+    mResults.clear();
     return isAlive;
 }
 

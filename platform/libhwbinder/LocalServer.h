@@ -14,6 +14,7 @@
 #include <mutex>
 #include <string>
 #include <unordered_map>
+#include <utility>
 #include <vector>
 
 namespace android::hardware {
@@ -48,6 +49,35 @@ class LocalServer {
     void unwatch(int connection) const;
 
   private:
+    /** First in, first out, by the elements' own links; an element is in one queue at most. */
+    template <typename T>
+    class Queue {
+      public:
+        bool isEmpty() const { return mFirst == nullptr; }
+        const T* last() const { return mLast; }
+        void push(T* element) {
+            element->next = nullptr;
+            (isEmpty() ? mFirst : mLast->next) = element;
+            mLast = element;
+        }
+        T* pop() { return std::exchange(mFirst, mFirst->next); }
+        /** @param element one that is in the queue. */
+        void remove(const T* element) {
+            T* before = nullptr;
+            T** link = &mFirst;
+            while (*link != element) {
+                before = *link;
+                link = &before->next;
+            }
+            *link = element->next;
+            if (mLast == element) mLast = before;
+        }
+
+      private:
+        T* mFirst = nullptr;
+        T* mLast = nullptr;
+    };
+
     struct Share;
 
     /** What the loop waits for: a listening socket, or a client's connection. */
@@ -56,18 +86,18 @@ class LocalServer {
         sp<BHwBinder> object;
         /** Whose connection it is; nullptr for a listening socket. */
         Share* share;
-        /** The next of the same uid that has a call waiting. */
         Endpoint* next;
         bool isQueued;
         uint64_t lastUsed;
     };
 
-    /** What a uid has: connections, and those of them that have calls waiting, in their order. */
+    /** What a uid has. */
     struct Share {
         uid_t uid;
         size_t connections = 0;
-        Endpoint* first = nullptr;
-        Endpoint* last = nullptr;
+        /** Those of its connections that have calls waiting. */
+        Queue<Endpoint> waiting;
+        Share* next = nullptr;
     };
 
     /** An object whose name another process has. */
@@ -81,7 +111,6 @@ class LocalServer {
     int retryPending();
     bool collect(int timeout);
     void enqueue(Endpoint* client);
-    Endpoint* dequeue(Share* share);
     void unqueue(Endpoint* client);
     void serveOneOfEach();
     bool serveCall(Endpoint* client);
@@ -105,8 +134,7 @@ class LocalServer {
     std::unordered_map<int, Endpoint> mClients;
     std::unordered_map<uid_t, Share> mShares;
     /** The uids that have calls waiting, each once. */
-    std::vector<Share*> mTurns;
-    std::vector<Share*> mRound;
+    Queue<Share> mTurns;
     /** Of what may be published while calls are served. */
     std::mutex mMutex;
     std::list<Endpoint> mListeners;
@@ -114,6 +142,8 @@ class LocalServer {
     std::atomic<bool> mHasPending = false;
     std::unique_ptr<Packet> mRequest;
     std::unique_ptr<Packet> mReply;
+    Parcel mArguments;
+    Parcel mResults;
 };
 
 }  // namespace android::hardware

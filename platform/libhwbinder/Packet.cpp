@@ -47,19 +47,21 @@ bool Packet::clearAddress(size_t parentObject, const binder_buffer_object& objec
 }
 
 status_t Packet::pack(uint32_t code, uint32_t flags, const Parcel& parcel) {
-    size = 0;
-    if (parcel.dataSize() > kMaxSize || parcel.offsetCount() > kMaxSize / sizeof(binder_size_t)) {
-        return FAILED_TRANSACTION;
-    }
     const size_t offsetsSize = parcel.offsetCount() * sizeof(binder_size_t);
     const Header header{code, flags, static_cast<uint32_t>(parcel.dataSize()),
                         static_cast<uint32_t>(offsetsSize)};
-    if (!append(&header, sizeof(header)) || !append(parcel.data(), parcel.dataSize()) ||
-        !append(parcel.offsets(), offsetsSize)) {
+    memcpy(bytes, &header, sizeof(header));
+    size = sizeof(header);
+    if (!append(parcel.data(), parcel.dataSize())) return FAILED_TRANSACTION;
+    return offsetsSize == 0 ? OK : packObjects(parcel);
+}
+
+status_t Packet::packObjects(const Parcel& parcel) {
+    if (!append(parcel.offsets(), parcel.offsetCount() * sizeof(binder_size_t))) {
         return FAILED_TRANSACTION;
     }
     for (size_t i = 0; i < parcel.offsetCount(); ++i) {
-        uint8_t* place = bytes + sizeof(header) + parcel.offsets()[i];
+        uint8_t* place = bytes + sizeof(Header) + parcel.offsets()[i];
         binder_buffer_object object;
         memcpy(&object.hdr, place, sizeof(object.hdr));
         if (object.hdr.type != BINDER_TYPE_PTR) return FAILED_TRANSACTION;
@@ -88,37 +90,39 @@ void Packet::packStatus(status_t status) {
 
 status_t Packet::unpack(Header* header, Parcel* parcel, Parcel::ReleaseBuffer release,
                         void* owner) {
-    const status_t status = relocate(header);
+    status_t status = FAILED_TRANSACTION;
+    size_t offsetsAt = 0;
+    if (size >= sizeof(*header)) {
+        memcpy(header, bytes, sizeof(*header));
+        offsetsAt = sizeof(*header) + roundUp(header->dataSize);
+        const size_t buffersAt = offsetsAt + roundUp(header->offsetsSize);
+        if (header->dataSize % 4 == 0 && header->offsetsSize % sizeof(binder_size_t) == 0) {
+            const bool isAll = header->offsetsSize == 0 && buffersAt == size;
+            status = isAll ? OK : relocate(*header, buffersAt);
+        }
+    }
     if (status != OK) {
         release(bytes, owner);
         return status;
     }
-    const size_t offsetsAt = sizeof(*header) + roundUp(header->dataSize);
     parcel->ipcSetDataReference(bytes + sizeof(*header), header->dataSize,
                                 reinterpret_cast<const binder_size_t*>(bytes + offsetsAt),
                                 header->offsetsSize / sizeof(binder_size_t), release, owner);
     return OK;
 }
 
-status_t Packet::relocate(Header* header) {
-    if (size < sizeof(*header)) return FAILED_TRANSACTION;
-    memcpy(header, bytes, sizeof(*header));
-    const size_t offsetsAt = sizeof(*header) + roundUp(header->dataSize);
-    size_t buffersAt = offsetsAt + roundUp(header->offsetsSize);
-    if (header->dataSize % 4 != 0 || header->offsetsSize % sizeof(binder_size_t) != 0 ||
-        buffersAt > size) {
-        return FAILED_TRANSACTION;
-    }
-    uint8_t* data = bytes + sizeof(*header);
-    const auto* offsets = reinterpret_cast<const binder_size_t*>(bytes + offsetsAt);
-    const size_t count = header->offsetsSize / sizeof(binder_size_t);
+status_t Packet::relocate(const Header& header, size_t buffersAt) {
+    if (buffersAt > size) return FAILED_TRANSACTION;
+    uint8_t* data = bytes + sizeof(header);
+    const auto* offsets = reinterpret_cast<const binder_size_t*>(data + roundUp(header.dataSize));
+    const size_t count = header.offsetsSize / sizeof(binder_size_t);
     size_t least = 0;
     for (size_t i = 0; i < count; ++i) {
         const size_t offset = offsets[i];
         binder_buffer_object object;
         // Objects follow one another, and lie within the data at multiples of 4.
-        if (offset < least || offset % 4 != 0 || offset > header->dataSize ||
-            sizeof(object) > header->dataSize - offset) {
+        if (offset < least || offset % 4 != 0 || offset > header.dataSize ||
+            sizeof(object) > header.dataSize - offset) {
             return FAILED_TRANSACTION;
         }
         least = offset + sizeof(object);

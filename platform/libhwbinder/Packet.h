@@ -51,9 +51,11 @@ struct Packet {
 
   private:
     bool append(const void* source, size_t length);
+    status_t packObjects(const Parcel& parcel);
     /** Clears the place of an object's address in its parent's buffer. */
     bool clearAddress(size_t parentObject, const binder_buffer_object& object);
-    status_t relocate(Header* header);
+    /** Changes objects and addresses of a received packet to where the buffers lie here. */
+    status_t relocate(const Header& header, size_t buffersAt);
 };
 
 }  // namespace android::hardware

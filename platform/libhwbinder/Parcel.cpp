@@ -12,11 +12,6 @@
 namespace android::hardware {
 namespace {
 
-/** Values begin at multiples of 4; objects, too. */
-constexpr size_t padded(size_t size) {
-    return (size + 3) & ~size_t{3};
-}
-
 /** Doubles an array that lies in the parcel, or on the heap. @return nullptr without memory. */
 template <typename T>
 T* moveToHeap(T* array, const T* inlined, size_t count, size_t capacity) {
@@ -28,17 +23,9 @@ T* moveToHeap(T* array, const T* inlined, size_t count, size_t capacity) {
 
 }  // namespace
 
-Parcel::~Parcel() {
-    releaseMemory();
-}
-
-void Parcel::releaseMemory() {
-    if (mRelease != nullptr) {
-        mRelease(mData, mOwner);
-    } else {
-        if (mData != mInlineData) free(mData);
-        if (mOffsets != mInlineOffsets) free(mOffsets);
-    }
+void Parcel::freeMemory() {
+    if (mData != mInlineData) free(mData);
+    if (mOffsets != mInlineOffsets) free(mOffsets);
 }
 
 void Parcel::clear() {
@@ -55,55 +42,15 @@ void Parcel::clear() {
     mBinders.clear();
 }
 
-void Parcel::ipcSetDataReference(const uint8_t* data, size_t size, const binder_size_t* offsets,
-                                 size_t offsetCount, ReleaseBuffer release, void* owner) {
-    if (mRelease != nullptr || mSize > 0) clear();
-    // Never written to: a parcel that has an owner refuses it.
-    mData = const_cast<uint8_t*>(data);
-    mSize = size;
-    mCapacity = 0;
-    mOffsets = const_cast<binder_size_t*>(offsets);
-    mOffsetCount = offsetCount;
-    mOffsetCapacity = 0;
-    mRelease = release;
-    mOwner = owner;
+bool Parcel::reserve(size_t size) {
+    if (mRelease != nullptr || size < mSize) return false;
+    const size_t capacity = std::max(size, 2 * mCapacity);
+    uint8_t* larger = moveToHeap(mData, mInlineData, mSize, capacity);
+    if (larger == nullptr) return false;
+    mData = larger;
+    mCapacity = capacity;
+    return true;
 }
-
-uint8_t* Parcel::grow(size_t size) {
-    const size_t needed = mSize + padded(size);
-    if (mRelease != nullptr || needed < mSize) return nullptr;
-    if (needed > mCapacity) {
-        const size_t capacity = std::max(needed, 2 * mCapacity);
-        uint8_t* larger = moveToHeap(mData, mInlineData, mSize, capacity);
-        if (larger == nullptr) return nullptr;
-        mData = larger;
-        mCapacity = capacity;
-    }
-    uint8_t* place = mData + mSize;
-    mSize = needed;
-    // What fills the last 4 bytes up is zero.
-    if (size > 0) memset(mData + mSize - 4, 0, 4);
-    return place;
-}
-
-status_t Parcel::write(const void* bytes, size_t size) {
-    uint8_t* place = grow(size);
-    if (place == nullptr) return NO_MEMORY;
-    memcpy(place, bytes, size);
-    return OK;
-}
-
-template <typename T>
-status_t Parcel::writePadded(T value) {
-    return write(&value, sizeof(value));
-}
-
-template status_t Parcel::writePadded(int8_t value);
-template status_t Parcel::writePadded(uint8_t value);
-template status_t Parcel::writePadded(int32_t value);
-template status_t Parcel::writePadded(uint32_t value);
-template status_t Parcel::writePadded(int64_t value);
-template status_t Parcel::writePadded(uint64_t value);
 
 status_t Parcel::writeInterfaceToken(const char* interface) {
     return write(interface, strlen(interface) + 1);
@@ -186,30 +133,6 @@ status_t Parcel::writeStrongBinder(const sp<IBinder>& binder) {
 status_t Parcel::writeNativeHandleNoDup(const native_handle_t* handle) {
     return handle == nullptr ? writeUint64(0) : INVALID_OPERATION;
 }
-
-const uint8_t* Parcel::read(size_t size) const {
-    if (mPosition > mSize || size > mSize - mPosition) return nullptr;
-    // The bytes of an object, which the driver has filled in, are never read as plain values.
-    if (mNextObject < mOffsetCount && mPosition + size > mOffsets[mNextObject]) return nullptr;
-    const uint8_t* place = mData + mPosition;
-    mPosition = std::min(mSize, mPosition + padded(size));
-    return place;
-}
-
-template <typename T>
-status_t Parcel::readPadded(T* value) const {
-    const uint8_t* place = read(sizeof(T));
-    if (place == nullptr) return NOT_ENOUGH_DATA;
-    memcpy(value, place, sizeof(T));
-    return OK;
-}
-
-template status_t Parcel::readPadded(int8_t* value) const;
-template status_t Parcel::readPadded(uint8_t* value) const;
-template status_t Parcel::readPadded(int32_t* value) const;
-template status_t Parcel::readPadded(uint32_t* value) const;
-template status_t Parcel::readPadded(int64_t* value) const;
-template status_t Parcel::readPadded(uint64_t* value) const;
 
 status_t Parcel::readBool(bool* value) const {
     uint8_t byte = 0;

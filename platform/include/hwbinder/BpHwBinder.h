@@ -8,6 +8,8 @@
 
 namespace android::hardware {
 
+class Driver;
+
 /** An object of another process, which the driver knows by a handle. */
 class BpHwBinder : public IBinder {
   public:
@@ -26,6 +28,7 @@ class BpHwBinder : public IBinder {
     void sendObituary();
 
   private:
+    Driver& mDriver;
     const uint32_t mHandle;
     /** What the driver has with it. */
     void* const mLink;

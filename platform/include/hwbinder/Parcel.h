@@ -6,8 +6,10 @@
 #include <linux/android/binder.h>
 #include <utils/Errors.h>
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <string>
 #include <vector>
 
@@ -28,7 +30,7 @@ class Parcel {
     using ReleaseBuffer = void (*)(const uint8_t* data, void* owner);
 
     Parcel() = default;
-    ~Parcel();
+    ~Parcel() { releaseMemory(); }
     Parcel(const Parcel&) = delete;
     Parcel& operator=(const Parcel&) = delete;
 
@@ -88,22 +90,72 @@ class Parcel {
     void setDataPosition(size_t position) const { mPosition = position; }
     /** Becomes what the driver has received. */
     void ipcSetDataReference(const uint8_t* data, size_t size, const binder_size_t* offsets,
-                             size_t offsetCount, ReleaseBuffer release, void* owner);
+                             size_t offsetCount, ReleaseBuffer release, void* owner) {
+        if (mRelease != nullptr || mSize > 0) clear();
+        // Never written to: a parcel that has an owner refuses it.
+        mData = const_cast<uint8_t*>(data);
+        mSize = size;
+        mCapacity = 0;
+        mOffsets = const_cast<binder_size_t*>(offsets);
+        mOffsetCount = offsetCount;
+        mOffsetCapacity = 0;
+        mRelease = release;
+        mOwner = owner;
+    }
     /** Becomes empty. */
     void clear();
 
   private:
-    void releaseMemory();
+    /** Values begin at multiples of 4; objects, too. */
+    static constexpr size_t padded(size_t size) { return (size + 3) & ~size_t{3}; }
+
+    void releaseMemory() {
+        if (mRelease != nullptr) {
+            mRelease(mData, mOwner);
+        } else if (mData != mInlineData || mOffsets != mInlineOffsets) {
+            freeMemory();
+        }
+    }
+    void freeMemory();
     template <typename T>
-    status_t writePadded(T value);
+    status_t writePadded(T value) {
+        return write(&value, sizeof(value));
+    }
     template <typename T>
-    status_t readPadded(T* value) const;
-    status_t write(const void* bytes, size_t size);
-    uint8_t* grow(size_t size);
+    status_t readPadded(T* value) const {
+        const uint8_t* place = read(sizeof(*value));
+        if (place == nullptr) return NOT_ENOUGH_DATA;
+        memcpy(value, place, sizeof(*value));
+        return OK;
+    }
+    status_t write(const void* bytes, size_t size) {
+        uint8_t* place = grow(size);
+        if (place == nullptr) return NO_MEMORY;
+        memcpy(place, bytes, size);
+        return OK;
+    }
+    /** @return room for a value at the end; nullptr without memory, and in what was received. */
+    uint8_t* grow(size_t size) {
+        const size_t start = mSize;
+        const size_t needed = start + padded(size);
+        if ((needed > mCapacity || needed < start) && !reserve(needed)) return nullptr;
+        mSize = needed;
+        // What fills the last 4 bytes up is zero.
+        if (size > 0) memset(mData + needed - 4, 0, 4);
+        return mData + start;
+    }
+    bool reserve(size_t size);
     status_t writeObject(const void* object, size_t size);
     bool addOffset(size_t offset);
     /** @return where the next value lies, and goes past it; nullptr past the end. */
-    const uint8_t* read(size_t size) const;
+    const uint8_t* read(size_t size) const {
+        if (mPosition > mSize || size > mSize - mPosition) return nullptr;
+        // The bytes of an object, which the driver has filled in, are never read as plain values.
+        if (mNextObject < mOffsetCount && mPosition + size > mOffsets[mNextObject]) return nullptr;
+        const uint8_t* place = mData + mPosition;
+        mPosition = std::min(mSize, mPosition + padded(size));
+        return place;
+    }
     /** Reads an object of a kind that the driver has checked. @param index its number. */
     status_t readObject(uint32_t type, void* object, size_t size, size_t* index) const;
     status_t readPointer(size_t length, size_t* handle, binder_buffer_object* object) const;
