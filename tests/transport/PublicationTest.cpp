@@ -6,10 +6,13 @@
 #include <sys/stat.h>
 #include <sys/un.h>
 
-#include <csignal>
+#include <algorithm>
+#include <chrono>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <iostream>
+#include <thread>
 
 namespace {
 
@@ -130,6 +133,45 @@ TEST_F(PublicationTest, SurroundingsThatCannotBeTrustedAreRefusedByBothSides) {
         EXPECT_NE(text.find(complaint), std::string::npos) << text;
         EXPECT_NE(whyNot().find(complaint), std::string::npos) << whyNot();
     }
+}
+
+TEST_F(PublicationTest, FileSystemThatTakesNothingIsSaid) {
+    const std::string directory = mDirectory.path() + "/mounted";
+    fs::create_directory(directory);
+    const auto mounted = [&](const std::string& options, const std::string& program) {
+        return std::vector<std::string>{
+                "/usr/bin/unshare", "-m", "/bin/sh", "-c",
+                "mount -t tmpfs -o " + options + " none " + directory + " && exec " + program};
+    };
+    if (runProgram(mounted("ro", "true")).exitCode != 0) GTEST_SKIP() << "no mount is allowed";
+    setenv("HWBINDER_DIR", directory.c_str(), 1);
+    for (const auto& [options, complaint] : {std::pair("ro", "Read-only file system"),
+                                             std::pair("nr_inodes=1", "No space left on device")}) {
+        ChildProcess daemon;
+        daemon.startProgram(mounted(options, SERVICE), logFile(), {});
+        EXPECT_TRUE(eventually([&] { return log().find(complaint) != std::string::npos; }))
+                << log();
+    }
+}
+
+TEST_F(PublicationTest, RestartIsAnsweredSoon) {
+#ifdef SANITIZED
+    GTEST_SKIP() << "a sanitizer takes its time to start";
+#endif
+    std::vector<double> times;
+    for (int i = 0; i < 31; ++i) {
+        mServer.kill();
+        const auto start = std::chrono::steady_clock::now();
+        mServer.startProgram({SERVICE}, logFile(), {});
+        while (!answers())
+            std::this_thread::yield();
+        const std::chrono::duration<double, std::milli> time =
+                std::chrono::steady_clock::now() - start;
+        times.push_back(time.count());
+    }
+    std::sort(times.begin(), times.end());
+    std::cout << "answered after " << times[times.size() / 2] << " ms, the median\n";
+    EXPECT_LE(times[times.size() / 2], 5);
 }
 
 TEST_F(PublicationTest, DirectoryOfAnotherUserIsNotUsed) {
