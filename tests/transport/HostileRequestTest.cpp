@@ -126,8 +126,18 @@ const struct {
         // Addresses of the sender's choice, if anybody takes them for objects.
         {"objects not listed", [](auto& m) { m.offsets.clear(); }, kFailed, kBadType},
         {"elements not listed", [](auto& m) { m.offsets.resize(1); }, kFailed, kBadType},
-        {"handles", [](auto& m) { m.replace(0, BINDER_TYPE_HANDLE, flat_binder_object{}); },
+        {"object for a buffer",
+         [](auto& m) {
+             static const sp<Peer> peer = new Peer;
+             flat_binder_object object{};
+             object.binder = reinterpret_cast<binder_uintptr_t>(peer->getWeakRefs());
+             object.cookie =
+                     reinterpret_cast<binder_uintptr_t>(static_cast<BHwBinder*>(peer.get()));
+             m.replace(0, BINDER_TYPE_BINDER, object);
+         },
          kFailed, kBadType},
+        {"handle of nothing",
+         [](auto& m) { m.replace(0, BINDER_TYPE_HANDLE, flat_binder_object{}); }, kFailed, kFailed},
         {"descriptor", [](auto& m) { m.replace(1, BINDER_TYPE_FD, binder_fd_object{}); }, kFailed,
          kFailed},
         {"descriptors",
