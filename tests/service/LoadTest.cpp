@@ -135,31 +135,4 @@ TEST_F(LoadTest, ManyClientsGetTheirOwnAnswersInTheirOwnOrder) {
     expectAllCallsInTheTrace();
 }
 
-TEST_F(LoadTest, KilledDaemonIsNoticedAtOnceAndReplaced) {
-    createDriver();
-    start();
-    const auto vibrator = IDaxVibrator::getService();
-    EXPECT_EQ(Status(vibrator->on(5)), Status::OK);
-    // Interrupted for ever, the call is under way when the daemon dies.
-    runProgram({VIBRATOR_SIM, "fault", "state", "write", "EINTR"});
-    Clock::time_point killed;
-    std::thread killer([&] {
-        std::this_thread::sleep_for(std::chrono::milliseconds(200));
-        killed = Clock::now();
-        kill(mService.pid(), SIGKILL);
-    });
-    const auto result = vibrator->on(5);
-    const auto noticed = Clock::now();
-    killer.join();
-    EXPECT_TRUE(result.isDeadObject());
-    EXPECT_LT(noticed - killed, std::chrono::milliseconds(500));
-    EXPECT_TRUE(vibrator->off().isDeadObject());
-
-    mService.kill();
-    createDriver();
-    start();
-    EXPECT_TRUE(vibrator->off().isDeadObject()) << "a dead object stays dead";
-    EXPECT_EQ(Status(IDaxVibrator::getService()->on(5)), Status::OK);
-}
-
 }  // namespace

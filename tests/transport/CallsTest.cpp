@@ -179,7 +179,14 @@ TEST_F(CallsTest, DeathIsToldToThoseWhoAskedAndTheSuccessorIsFound) {
     EXPECT_TRUE(mClient->linkToDeath(told, 42));
     EXPECT_TRUE(mClient->unlinkToDeath(untold));
     EXPECT_FALSE(mClient->unlinkToDeath(untold));
-    mServer.kill();
+    // A call is under way when the daemon dies.
+    stopServer();
+    std::thread killer([&] {
+        std::this_thread::sleep_for(milliseconds(100));
+        mServer.kill();
+    });
+    EXPECT_TRUE(mClient->ping().isDeadObject());
+    killer.join();
     EXPECT_TRUE(eventually([&] { return told->lastCookie == 42; }));
     EXPECT_TRUE(told->wasAlive);
     EXPECT_EQ(untold->lastCookie, 0U);

@@ -118,6 +118,8 @@ const struct {
          kFailed},
         {"place that overflows", [](auto& m) { m.objects[1].parent_offset = UINT64_MAX - 7; },
          kFailed, kFailed},
+        // As objects that overlap could do it.
+        {"address written over", [](auto& m) { m.add("short", true); }, kBadValue, kFailed},
         {"odd offset", [](auto& m) { m.offsets[0] += 1; }, kFailed, kFailed},
         {"offset of no object", [](auto& m) { m.offsets[1] += 8; }, kFailed, kFailed},
         {"offsets in disorder", [](auto& m) { std::swap(m.offsets[0], m.offsets[1]); }, kFailed,
@@ -269,6 +271,17 @@ TEST_P(HostileRequestTest, DescriptorsDoNotStay) {
     EXPECT_LE(mServer.descriptors(), before + 1);
     debug.keep(0);
     EXPECT_EQ(call(debug, raw::kDebug), android::INVALID_OPERATION);
+}
+
+TEST_P(HostileRequestTest, BufferIsReadAsNothingElse) {
+    RawMessage debug = RawMessage::to(raw::kBase);
+    debug.add("a number");
+    EXPECT_EQ(call(debug, raw::kDebug), kNoData);
+    if (!isManager()) return;
+    RawMessage add = RawMessage::to(raw::kManager);
+    add.addString("name");
+    add.add("an object");
+    EXPECT_EQ(call(add, raw::kManagersAdd), kBadType);
 }
 
 constexpr char kPeer[] = "vendor.velmora.hardware.peer@1.0::IPeer";

@@ -29,6 +29,7 @@ constexpr uint32_t kOn = 1;
 constexpr uint32_t kDaxSetAmplitude = 18;
 constexpr uint32_t kDaxPerformHapticEngine = 23;
 constexpr uint32_t kManagersGet = 1;
+constexpr uint32_t kManagersAdd = 2;
 }  // namespace raw
 
 /** @return a structure's bytes. */
