@@ -98,7 +98,7 @@ TEST_F(HostileClientTest, ClientsThatVanishLeaveNothingBehind) {
         ASSERT_TRUE(client.send(request(kBase, kPing)));
         if (i % 2 == 0) client.receive();
     }
-    EXPECT_TRUE(eventually([&] { return mServer.descriptors() == before; }));
+    EXPECT_TRUE(eventually([&] { return mServer.descriptors() <= before; }));
     EXPECT_TRUE(answers());
 }
 
