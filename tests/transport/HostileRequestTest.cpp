@@ -121,6 +121,8 @@ const struct {
         // As objects that overlap could do it.
         {"address written over", [](auto& m) { m.add("short", true); }, kBadValue, kFailed},
         {"odd offset", [](auto& m) { m.offsets[0] += 1; }, kFailed, kFailed},
+        {"offset that overflows", [](auto& m) { m.offsets[0] = UINT64_MAX - 3 - m.head.size(); },
+         kFailed, kFailed},
         {"offset of no object", [](auto& m) { m.offsets[1] += 8; }, kFailed, kFailed},
         {"offsets in disorder", [](auto& m) { std::swap(m.offsets[0], m.offsets[1]); }, kFailed,
          kFailed},
