@@ -6,7 +6,6 @@
 #include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
 
 #include <filesystem>
-#include <nlohmann/json.hpp>
 #include <pugixml.hpp>
 #include <regex>
 #include <set>
@@ -15,187 +14,134 @@
 /** What a device's build, init and policy are told of the service is what the code says. */
 namespace {
 
+namespace fs = std::filesystem;
 using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
-using nlohmann::json;
+using ::android::hardware::vibrator::V1_3::IVibrator;
 using ::vendor::velmora::hardware::vibrator::V2_1::IDaxVibrator;
+using Texts = std::vector<std::string>;
 
 const std::string kSource = SOURCE_DIRECTORY;
-const std::string kBinary = std::filesystem::path(SERVICE).filename();
+const std::string kBinary = fs::path(SERVICE).filename();
 const std::string kInstalled = "/vendor/bin/hw/" + kBinary;
 
-/**
- * Reads a blueprint by turning it into JSON: names get quotation marks, a module's type becomes its
- * first member, and commas before a closing bracket go.
- */
-json parseBlueprint(const std::string& file) {
-    std::string text = std::regex_replace(readFile(kSource + "/" + file), std::regex("//.*"), "");
-    text = std::regex_replace(text, std::regex(R"((\w+)\s*:(?!:))"), "\"$1\":");
-    text = std::regex_replace(text, std::regex(R"((\w+)\s*\{)"), "{\"module\": \"$1\",");
-    text = std::regex_replace(text, std::regex(R"(,(\s*[\]}]))"), "$1");
-    text = std::regex_replace(text, std::regex(R"(\}(\s*\{))"), "},$1");
-    return json::parse("[" + text + "]");
+/** @return the lines of a file, without comments and blanks at their begin. */
+Texts linesOf(const std::string& file) {
+    std::istringstream text(readFile(kSource + "/" + file));
+    Texts lines;
+    for (std::string line; std::getline(text, line);) {
+        line.erase(0, line.find_first_not_of(' '));
+        if (!line.empty() && line[0] != '#') lines.push_back(line);
+    }
+    return lines;
 }
 
-/** @return the parts of an interface's name: package, version and name. */
-std::vector<std::string> partsOf(const std::string& descriptor) {
-    std::smatch parts;
-    EXPECT_TRUE(std::regex_match(descriptor, parts, std::regex(R"((.*)@(.*)::(.*))")));
-    return {parts[1], parts[2], parts[3]};
+TEST(DeviceTest, BlueprintNamesWhatThereIs) {
+    const std::string text = readFile(kSource + "/Android.bp");
+    for (const std::string& line :
+         {"name: \"" + kBinary + "\"", std::string("vendor: true"),
+          std::string("relative_install_path: \"hw\""), std::string("\"-Werror\""),
+          std::string("\"-fno-exceptions\""), std::string("\"-fno-rtti\"")}) {
+        EXPECT_NE(text.find(line + ","), std::string::npos) << line;
+    }
+    // The interfaces that it links, and the files that it is made of.
+    std::set<std::string> linked;
+    const std::regex quoted("\"([^\"]*)\"");
+    for (std::sregex_iterator i(text.begin(), text.end(), quoted), end; i != end; ++i) {
+        const std::string name = (*i)[1];
+        const fs::path path = kSource + "/" + name;
+        if (name.find('/') != std::string::npos) {
+            EXPECT_TRUE(path.filename() == "*.cpp" ? fs::is_directory(path.parent_path())
+                                                   : fs::is_regular_file(path))
+                    << name;
+        } else if (name.find('@') != std::string::npos && name != kBinary) {
+            linked.insert(name);
+        }
+    }
+    EXPECT_EQ(linked, (std::set<std::string>{
+                              "android.hardware.vibrator@1.0", "android.hardware.vibrator@1.1",
+                              "android.hardware.vibrator@1.2", "android.hardware.vibrator@1.3",
+                              "vendor.velmora.hardware.vibrator@2.0",
+                              "vendor.velmora.hardware.vibrator@2.1"}));
 }
 
-/** @return all node paths of both layouts, with their directories. */
-std::set<std::string> nodePaths() {
-    std::set<std::string> paths = {THE_DEVICE_ENABLE, THE_DEVICE_ACTIVATE, THE_DEVICE_DURATION,
-                                   THE_DEVICE_STATE};
+TEST(DeviceTest, InitStartsTheServiceAndGivesItTheNodes) {
+    std::multiset<std::string> given = {THE_DEVICE_ENABLE, THE_DEVICE_ACTIVATE, THE_DEVICE_DURATION,
+                                        THE_DEVICE_STATE};
     for (const uint8_t mode : {kTimedOutputMode, kLedTriggerMode}) {
         setDriverMode(mode);
-        paths.insert({THE_DEVICE_INTENSITY, THE_DEVICE_FORCE_TOUCH_INTENSITY, THE_DEVICE_MULTI_FREQ,
+        given.insert({THE_DEVICE_INTENSITY, THE_DEVICE_FORCE_TOUCH_INTENSITY, THE_DEVICE_MULTI_FREQ,
                       THE_DEVICE_HAPTIC_ENGINE, THE_DEVICE_HAPTIC_ENGINE_INDEX,
                       THE_DEVICE_HAPTIC_PLAYBACK_QUEUE, THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES,
                       THE_DEVICE_MOTOR_TYPE, THE_DEVICE_EVENT_CMD, THE_DEVICE_PATTERN_LENGTH,
                       THE_DEVICE_EXT_CONTROL});
     }
-    return paths;
+    const std::string chown = "chown system system ";
+    // Class hal is started on boot, after this; the trigger makes the nodes that are given away.
+    Texts expected = {"service vendor.vibrator-2-1 " + kInstalled,
+                      "class hal",
+                      "user system",
+                      "group system",
+                      "on early-boot",
+                      "write /sys/class/leds/vibrator/trigger transient"};
+    const auto count = static_cast<std::ptrdiff_t>(expected.size());
+    for (const std::string& node : given)
+        expected.push_back(chown + node);
+    Texts lines = linesOf("device/" + kBinary + ".rc");
+    ASSERT_EQ(lines.size(), expected.size());
+    std::sort(lines.begin() + count, lines.end());
+    EXPECT_EQ(lines, expected);
 }
 
-TEST(DeviceTest, BlueprintsBuildTheServiceAndItsInterfaces) {
-    const json modules = parseBlueprint("Android.bp");
-    ASSERT_EQ(modules.size(), 1U);
-    const json& binary = modules[0];
-    EXPECT_EQ(binary["module"], "cc_binary");
-    EXPECT_EQ(binary["name"], kBinary);
-    EXPECT_EQ(binary["vendor"], true);
-    EXPECT_EQ(binary["relative_install_path"], "hw");
-    for (const char* list : {"init_rc", "vintf_fragments"}) {
-        ASSERT_EQ(binary[list].size(), 1U);
-        EXPECT_TRUE(std::filesystem::exists(kSource + "/" + binary[list][0].get<std::string>()));
-    }
-    EXPECT_EQ(binary["cppflags"], (json{"-fno-exceptions", "-fno-rtti"}));
-    const json& flags = binary["cflags"];
-    EXPECT_NE(std::find(flags.begin(), flags.end(), "-Werror"), flags.end());
-    for (const json& pattern : binary["srcs"]) {
-        const std::filesystem::path sources = pattern.get<std::string>();
-        EXPECT_EQ(sources.filename(), "*.cpp");
-        EXPECT_TRUE(std::filesystem::is_directory(kSource / sources.parent_path()));
-    }
-
-    // The service links every interface of its chain, and each of the two of ours has its module.
-    std::set<std::string> needed;
-    for (const std::string version : {"2.0", "2.1"}) {
-        const json interface = parseBlueprint("interface/" + version + "/Android.bp").at(0);
-        EXPECT_EQ(interface["module"], "hidl_interface");
-        EXPECT_EQ(interface["name"], "vendor.velmora.hardware.vibrator@" + version);
-        needed.insert(interface["name"].get<std::string>());
-        for (const std::string each : interface["interfaces"]) {
-            if (each != "android.hidl.base@1.0") needed.insert(each);
-        }
-        EXPECT_EQ(interface["root"], parseBlueprint("interface/Android.bp").at(0)["name"]);
-        for (const std::string source : interface["srcs"]) {
-            const std::string path = kSource + "/interface/" + version + "/" + source;
-            EXPECT_TRUE(std::filesystem::exists(path)) << path;
-        }
-    }
-    std::set<std::string> linked;
-    for (const std::string library : binary["shared_libs"]) {
-        if (library.find('@') != std::string::npos) linked.insert(library);
-    }
-    EXPECT_EQ(linked, needed);
-}
-
-TEST(DeviceTest, InitStartsTheServiceAndGivesItTheNodes) {
-    std::istringstream file(readFile(kSource + "/device/" + kBinary + ".rc"));
-    const std::set<std::string> options = {"class hal", "user system", "group system"};
-    std::string section;
-    std::set<std::string> seenOptions;
-    std::set<std::string> given;
-    std::vector<std::string> order;
-    for (std::string line; std::getline(file, line);) {
-        if (line.empty() || line[0] == '#') continue;
-        if (line[0] != ' ') {
-            section = line;
-            order.push_back(line);
-            continue;
-        }
-        const std::string command = line.substr(4);
-        std::smatch words;
-        if (section.find("service ") == 0) {
-            EXPECT_EQ(options.count(command), 1U) << command;
-            seenOptions.insert(command);
-        } else if (std::regex_match(command, words, std::regex("chown system system (\\S+)"))) {
-            EXPECT_TRUE(given.insert(words[1]).second) << command << " is there twice";
-        } else {
-            // The trigger makes the nodes that are given away after it.
-            EXPECT_EQ(command, "write /sys/class/leds/vibrator/trigger transient");
-            EXPECT_TRUE(given.empty());
-        }
-    }
-    EXPECT_EQ(order, (std::vector<std::string>{"service vendor.vibrator-2-1 " + kInstalled,
-                                               // Class hal is started on boot, after this.
-                                               "on early-boot"}));
-    EXPECT_EQ(seenOptions, options);
-    EXPECT_EQ(given, nodePaths());
-}
-
-/** What a manifest or matrix in device/ says of each interface: package, version and name. */
-std::vector<std::vector<std::string>> interfacesIn(const std::string& file, const char* type) {
+/** @return the interfaces that a manifest or a matrix names, each in all that is said of it. */
+Texts interfacesIn(const std::string& file) {
     pugi::xml_document document;
-    const pugi::xml_parse_result result = document.load_file((kSource + "/device/" + file).c_str());
-    EXPECT_TRUE(result) << file << ": " << result.description();
+    EXPECT_TRUE(document.load_file((kSource + "/device/" + file).c_str())) << file;
     const pugi::xml_node root = document.document_element();
-    EXPECT_STREQ(root.attribute("type").value(), type);
-
-    std::vector<std::vector<std::string>> interfaces;
+    Texts interfaces = {root.attribute("type").value()};
     for (const pugi::xml_node& hal : root.children("hal")) {
-        EXPECT_STREQ(hal.attribute("format").value(), "hidl");
-        EXPECT_STREQ(hal.child("interface").child_value("instance"), "default");
-        // A manifest says how the interface is reached; a matrix, whether it must be there.
-        const std::string manner = hal.child_value("transport");
-        EXPECT_EQ(manner + hal.attribute("optional").value(),
-                  type == std::string("device") ? "hwbinder" : "true");
-        interfaces.push_back({hal.child_value("name"), hal.child_value("version"),
-                              hal.child("interface").child_value("name")});
+        const pugi::xml_node interface = hal.child("interface");
+        std::string words = std::string(hal.attribute("format").value()) + " " +
+                            hal.attribute("optional").value() + hal.child_value("transport") + " ";
+        words += std::string(hal.child_value("name")) + "@" + hal.child_value("version") +
+                 "::" + interface.child_value("name") + "/" + interface.child_value("instance");
+        interfaces.push_back(words);
     }
     return interfaces;
 }
 
 TEST(DeviceTest, ManifestDeclaresWhatIsRegisteredAndMatrixAllowsIt) {
-    using ::android::hardware::vibrator::V1_3::IVibrator;
-    using Interfaces = std::vector<std::vector<std::string>>;
-    const std::vector<std::string> ours = partsOf(IDaxVibrator::descriptor);
-    EXPECT_EQ(interfacesIn(kBinary + ".xml", "device"),
-              (Interfaces{ours, partsOf(IVibrator::descriptor)}));
+    const std::string ours = std::string(IDaxVibrator::descriptor) + "/default";
+    const std::string platforms = std::string(IVibrator::descriptor) + "/default";
+    EXPECT_EQ(interfacesIn(kBinary + ".xml"),
+              (Texts{"device", "hidl hwbinder " + ours, "hidl hwbinder " + platforms}));
     // The platform's own matrix has the platform's interface.
-    EXPECT_EQ(interfacesIn("framework_compatibility_matrix.xml", "framework"), Interfaces{ours});
+    EXPECT_EQ(interfacesIn("framework_compatibility_matrix.xml"),
+              (Texts{"framework", "hidl true " + ours}));
 }
 
-TEST(DeviceTest, PolicyNamesTheBinaryTheInterfaceAndTheDirectories) {
-    const std::string policy = kSource + "/device/sepolicy/";
-    const std::string types = readFile(policy + "hal_vibrator_velmora.te");
-    // Each context is a pattern and a label; the label's type is declared here or the platform's.
-    const auto label = [&](const std::string& file, const std::string& subject) {
-        std::istringstream lines(readFile(policy + file));
-        for (std::string line; std::getline(lines, line);) {
-            std::smatch parts;
-            if (std::regex_match(
-                        line, parts,
-                        std::regex(R"((?:genfscon sysfs )?(\S+)\s+u:object_r:(\w+):s0)")) &&
-                std::regex_match(subject, std::regex(parts[1].str() + "(/.*)?"))) {
-                return parts[2].str();
-            }
-        }
-        return std::string("none");
-    };
-    EXPECT_EQ(label("file_contexts", kInstalled), "hal_vibrator_velmora_exec");
+TEST(DeviceTest, PolicyLabelsTheBinaryTheInterfaceAndTheNodes) {
+    const std::string types = readFile(kSource + "/device/sepolicy/hal_vibrator_velmora.te");
     EXPECT_NE(types.find("type hal_vibrator_velmora_exec,"), std::string::npos);
-    const std::vector<std::string> interface = partsOf(IDaxVibrator::descriptor);
-    EXPECT_EQ(label("hwservice_contexts", interface[0] + "::" + interface[2]),
-              "hal_vibrator_hwservice");
-    EXPECT_EQ(label("genfs_contexts", "/devices/virtual/timed_output/vibrator/enable"),
-              "sysfs_vibrator");
-    EXPECT_EQ(label("genfs_contexts", "/devices/platform/leds/leds/vibrator/state"),
-              "sysfs_vibrator");
     EXPECT_NE(types.find("allow hal_vibrator_velmora sysfs_vibrator:file rw_file_perms;"),
               std::string::npos);
+    // Each context is a pattern and a label.
+    const std::tuple<const char*, std::string, const char*> labels[] = {
+            {"file_contexts", kInstalled, "hal_vibrator_velmora_exec"},
+            {"hwservice_contexts", "vendor.velmora.hardware.vibrator::IDaxVibrator",
+             "hal_vibrator_hwservice"},
+            {"genfs_contexts", "/devices/virtual/timed_output/vibrator/enable", "sysfs_vibrator"},
+            {"genfs_contexts", "/devices/platform/leds/leds/vibrator/state", "sysfs_vibrator"},
+    };
+    const std::regex context(R"((?:genfscon sysfs )?(\S+)\s+u:object_r:(\w+):s0)");
+    for (const auto& [file, subject, type] : labels) {
+        std::string found;
+        for (const std::string& line : linesOf(std::string("device/sepolicy/") + file)) {
+            std::smatch parts;
+            ASSERT_TRUE(std::regex_match(line, parts, context)) << line;
+            if (std::regex_match(subject, std::regex(parts[1].str() + "(/.*)?"))) found = parts[2];
+        }
+        EXPECT_EQ(found, type) << subject;
+    }
 }
 
 }  // namespace

@@ -1,56 +1,47 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Vibrator.h"
-#include "kernel/Services.h"
 #include "support/Operations.h"
+#include "transport/TransportTest.h"
 
-#include <gtest/gtest.h>
+#include <hwbinder/IPCThreadState.h>
 #include <sys/stat.h>
 
 /** Every operation over the kernel's binder, on the real LED trigger, by callers of all kinds. */
 namespace {
 
 using ::android::sp;
+using ::android::hardware::IPCThreadState;
 using ::vendor::velmora::hardware::vibrator::V2_1::implementation::Vibrator;
 
-constexpr const char* kNodes[] = {"/sys/class/leds/vibrator/activate",
-                                  "/sys/class/leds/vibrator/duration",
-                                  "/sys/class/leds/vibrator/state"};
+const std::string kLed = "/sys/class/leds/vibrator/";
 
 /** @return an operation's answer, and what the nodes that it may write hold afterwards. */
 std::string outcome(const Operation& operation, IDaxVibrator& vibrator) {
     const std::string answer = operation.call(vibrator).inWords();
-    return answer + " " + readFile("/sys/class/leds/vibrator/duration") +
-           readFile("/sys/class/leds/vibrator/state");
+    return answer + " " + readFile(kLed + "duration") + readFile(kLed + "state");
 }
+
+class OperationsTest : public TransportTest {};
 
 /** Compares what the daemon does with what its object does in the caller's own process. */
-int compareAll() {
-    const sp<IDaxVibrator> remote = IDaxVibrator::getService();
-    if (remote == nullptr || !remote->ping().isOk()) return 1;
-    const sp<IDaxVibrator> local = new Vibrator;
-    for (const Operation& operation : allOperations()) {
-        const std::string expected = outcome(operation, *local);
-        EXPECT_EQ(outcome(operation, *remote), expected)
-                << operation.name << " called by uid " << getuid();
-    }
-    return ::testing::Test::HasFailure() ? 1 : 0;
-}
-
-TEST(OperationsTest, AnswersAreThoseOfTheObjectForEveryCaller) {
-    Services services;
-    ASSERT_TRUE(services.startManager());
-    services.startDaemon();
+TEST_F(OperationsTest, AnswersAreThoseOfTheObjectForEveryCaller) {
+    serve();
     setenv("ANDROID_LOG_TAGS", "*:S", 1);
+    const sp<IDaxVibrator> remote = IDaxVibrator::getService();
+    const sp<IDaxVibrator> local = new Vibrator;
     // The object in the caller's own process has the caller's rights alone.
-    for (const char* node : kNodes)
-        ASSERT_EQ(chmod(node, 0666), 0) << node;
+    for (const char* node : {"activate", "duration", "state"})
+        ASSERT_EQ(chmod((kLed + node).c_str(), 0666), 0) << node;
     for (const uid_t uid : {0U, 1000U, 2000U, 10123U}) {
-        EXPECT_EQ(runAs(uid, compareAll), 0) << readFile(Services::kDaemonLog);
+        IPCThreadState::self()->restoreCallingIdentity(IPCThreadState::identityToken(uid, 1));
+        ASSERT_EQ(seteuid(uid), 0);
+        for (const Operation& operation : allOperations()) {
+            const std::string expected = outcome(operation, *local);
+            EXPECT_EQ(outcome(operation, *remote), expected) << operation.name << " by " << uid;
+        }
+        ASSERT_EQ(seteuid(0), 0);
     }
-    for (const char* node : kNodes)
-        EXPECT_EQ(chmod(node, 0644), 0) << node;
-    unsetenv("ANDROID_LOG_TAGS");
-    EXPECT_NE(readFile(Services::kDaemonLog).find("Pemission denied (10123)"), std::string::npos);
+    EXPECT_NE(log().find("Pemission denied (10123)"), std::string::npos) << log();
 }
 
 }  // namespace

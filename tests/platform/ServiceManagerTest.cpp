@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "hwservicemanager/ServiceManager.h"
+#include "libhwbinder/Driver.h"
 
 #include <gtest/gtest.h>
-#include <hwbinder/IPCThreadState.h>
 
 #include <string>
 #include <vector>
@@ -10,24 +10,10 @@
 namespace {
 
 using ::android::sp;
+using Caller = ::android::hardware::CallerIdentity;
 using ::android::hardware::hidl_string;
-using ::android::hardware::IPCThreadState;
 using ::android::hardware::Return;
 using Notification = ::android::hidl::manager::V1_0::IServiceNotification;
-
-/** Makes the calls of a scope those of somebody else. */
-class Caller {
-  public:
-    Caller(uid_t uid, pid_t pid) : mBefore(IPCThreadState::self()->clearCallingIdentity()) {
-        IPCThreadState::self()->restoreCallingIdentity(IPCThreadState::identityToken(uid, pid));
-    }
-    ~Caller() { IPCThreadState::self()->restoreCallingIdentity(mBefore); }
-    Caller(const Caller&) = delete;
-    Caller& operator=(const Caller&) = delete;
-
-  private:
-    const int64_t mBefore;
-};
 
 /** An object to register, and to be told of others. */
 struct Object : Notification {

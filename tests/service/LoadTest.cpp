@@ -23,7 +23,7 @@ using Clock = std::chrono::steady_clock;
 constexpr uint32_t kClients = 64;
 constexpr uint32_t kKilled = kClients / 3;
 constexpr uint32_t kSurvivors = kClients - kKilled;
-constexpr uint32_t kCallsEach = 100'000 / kSurvivors / 3 * 3;
+constexpr uint32_t kCallsEach = 100'000 / kSurvivors / 2 * 2;
 
 /** A number that no other call has, and that grows from call to call of a client. */
 uint32_t markOf(uint32_t client, uint32_t call) {
@@ -32,16 +32,8 @@ uint32_t markOf(uint32_t client, uint32_t call) {
 
 /** Makes the client's next call. @return whether the answer was the right one. */
 bool makeCall(IDaxVibrator& vibrator, bool permitted, uint32_t client, uint32_t call) {
-    if (call % 3 == 0)
+    if (call % 2 == 0)
         return vibrator.on(markOf(client, call)).withDefault(Status::BAD_VALUE) == Status::OK;
-    if (call % 3 == 1) {
-        const uint32_t amplitude = call % 20'001;
-        const bool isValid = amplitude >= 1 && amplitude <= 10'000;
-        const Status answer = vibrator.daxSetAmplitude(amplitude).withDefault(Status::OK);
-        return answer == (!permitted ? Status::UNKNOWN_ERROR
-                          : isValid  ? Status::OK
-                                     : Status::BAD_VALUE);
-    }
     bool right = false;
     const auto take = [&](bool supported, const hidl_vec<uint32_t>& list) {
         right = supported == permitted && list.size() == (permitted ? 6U : 0U);
@@ -90,7 +82,7 @@ class LoadTest : public ServiceTest {
             ++counts[client];
         }
         for (uint32_t client = 1; client <= kSurvivors; ++client)
-            EXPECT_EQ(counts[client], kCallsEach / 3) << client;
+            EXPECT_EQ(counts[client], kCallsEach / 2) << client;
     }
 };
 
@@ -133,33 +125,6 @@ TEST_F(LoadTest, ManyClientsGetTheirOwnAnswersInTheirOwnOrder) {
     EXPECT_LE(residentKiB(), memory + 256);
 #endif
     expectAllCallsInTheTrace();
-}
-
-TEST_F(LoadTest, KilledDaemonIsNoticedAtOnceAndReplaced) {
-    createDriver();
-    start();
-    const auto vibrator = IDaxVibrator::getService();
-    EXPECT_EQ(Status(vibrator->on(5)), Status::OK);
-    // Interrupted for ever, the call is under way when the daemon dies.
-    runProgram({VIBRATOR_SIM, "fault", "state", "write", "EINTR"});
-    Clock::time_point killed;
-    std::thread killer([&] {
-        std::this_thread::sleep_for(std::chrono::milliseconds(200));
-        killed = Clock::now();
-        kill(mService.pid(), SIGKILL);
-    });
-    const auto result = vibrator->on(5);
-    const auto noticed = Clock::now();
-    killer.join();
-    EXPECT_TRUE(result.isDeadObject());
-    EXPECT_LT(noticed - killed, std::chrono::milliseconds(500));
-    EXPECT_TRUE(vibrator->off().isDeadObject());
-
-    mService.kill();
-    createDriver();
-    start();
-    EXPECT_TRUE(vibrator->off().isDeadObject()) << "a dead object stays dead";
-    EXPECT_EQ(Status(IDaxVibrator::getService()->on(5)), Status::OK);
 }
 
 }  // namespace

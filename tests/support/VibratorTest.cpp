@@ -3,7 +3,6 @@
 
 #include "Trace.h"
 
-#include <hwbinder/IPCThreadState.h>
 #include <sys/stat.h>
 
 #include <cerrno>
@@ -30,16 +29,6 @@ void forgetDriver() {
 }
 
 }  // namespace
-
-CallerIdentity::CallerIdentity(uid_t uid) {
-    auto* thread = ::android::hardware::IPCThreadState::self();
-    mOwn = thread->clearCallingIdentity();
-    thread->restoreCallingIdentity(static_cast<int64_t>(uint64_t{uid} << 32 | 1));
-}
-
-CallerIdentity::~CallerIdentity() {
-    ::android::hardware::IPCThreadState::self()->restoreCallingIdentity(mOwn);
-}
 
 VibratorTest::VibratorTest() {
     setenv("VIBRATOR_SIM_DIR", mDirectory.path().c_str(), 1);

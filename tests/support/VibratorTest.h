@@ -4,6 +4,7 @@
 #include "Driver.h"
 #include "NodePathTable.h"
 #include "Vibrator.h"
+#include "libhwbinder/Driver.h"
 #include "support/LogCapture.h"
 #include "support/Operations.h"
 #include "support/TemporaryDirectory.h"
@@ -15,19 +16,8 @@
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 
+using ::android::hardware::CallerIdentity;
 using simulator::Layout;
-
-/** Makes this thread's calls look like another uid's. */
-class CallerIdentity {
-  public:
-    explicit CallerIdentity(uid_t uid);
-    CallerIdentity(const CallerIdentity&) = delete;
-    CallerIdentity& operator=(const CallerIdentity&) = delete;
-    ~CallerIdentity();
-
-  private:
-    int64_t mOwn;
-};
 
 /** A service object on a simulated driver, with the driver's trace and the log to look at. */
 class VibratorTest : public ::testing::Test {
@@ -63,7 +53,7 @@ class VibratorTest : public ::testing::Test {
     }
 
     /** The system user calls, whoever runs the tests. */
-    CallerIdentity mCaller{1000};
+    CallerIdentity mCaller{1000, 1};
     TemporaryDirectory mDirectory;
     LogCapture mLog;
     Layout mLayout = Layout::kLedTrigger;

@@ -147,6 +147,21 @@ TEST_F(CallsTest, ThreadsMayShareAnObject) {
         thread.join();
 }
 
+TEST_F(CallsTest, ClientsMayDieInACall) {
+    const size_t before = mServer.descriptors();
+    stopServer();
+    for (int i = 0; i < 50; ++i) {
+        ChildProcess client;
+        client.startProgram({VIBRATORCTL, "off"}, "/dev/null", {});
+        const std::string state = "/proc/" + std::to_string(client.pid()) + "/stat";
+        // Asleep, it waits for the answer.
+        EXPECT_TRUE(eventually([&] { return readFile(state).find(") S ") != std::string::npos; }));
+    }
+    ::kill(mServer.pid(), SIGCONT);
+    EXPECT_TRUE(eventually([&] { return mServer.descriptors() <= before; }));
+    EXPECT_TRUE(answers());
+}
+
 /** Remembers the news of a death. */
 struct Recipient : hidl_death_recipient {
     void serviceDied(uint64_t cookie, const wp<IBase>& who) override {
@@ -164,7 +179,14 @@ TEST_F(CallsTest, DeathIsToldToThoseWhoAskedAndTheSuccessorIsFound) {
     EXPECT_TRUE(mClient->linkToDeath(told, 42));
     EXPECT_TRUE(mClient->unlinkToDeath(untold));
     EXPECT_FALSE(mClient->unlinkToDeath(untold));
-    mServer.kill();
+    // A call is under way when the daemon dies.
+    stopServer();
+    std::thread killer([&] {
+        std::this_thread::sleep_for(milliseconds(100));
+        mServer.kill();
+    });
+    EXPECT_TRUE(mClient->ping().isDeadObject());
+    killer.join();
     EXPECT_TRUE(eventually([&] { return told->lastCookie == 42; }));
     EXPECT_TRUE(told->wasAlive);
     EXPECT_EQ(untold->lastCookie, 0U);
@@ -223,7 +245,7 @@ TEST_F(CallsTest, CallsCanHaveATimeLimit) {
     host::setCallTimeout(milliseconds(200));
     const sp<IDaxVibrator> impatient = IDaxVibrator::getService();
     EXPECT_TRUE(impatient->ping().isOk());
-    ::kill(mServer.pid(), SIGSTOP);
+    stopServer();
     const auto start = std::chrono::steady_clock::now();
     const Return<void> result = impatient->ping();
     host::setCallTimeout(milliseconds(0));

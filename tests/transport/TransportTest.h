@@ -6,7 +6,9 @@
 #include "support/TemporaryDirectory.h"
 
 #include <gtest/gtest.h>
+#include <sys/wait.h>
 
+#include <csignal>
 #include <cstdlib>
 #include <string>
 #include <vector>
@@ -32,6 +34,11 @@ class TransportTest : public ::testing::Test {
     void serve(const std::string& limits = "true") {
         startDaemon(mServer, limits);
         ASSERT_TRUE(eventually(answers)) << log();
+    }
+    /** Stops the daemon, and waits until it has stopped. */
+    void stopServer() const {
+        ::kill(mServer.pid(), SIGSTOP);
+        EXPECT_EQ(waitpid(mServer.pid(), nullptr, WUNTRACED), mServer.pid());
     }
 
     /** @return what an effect of 1.1, which is never played, is answered with. */

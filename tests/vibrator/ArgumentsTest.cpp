@@ -182,7 +182,7 @@ TEST_P(ArgumentsTest, OfHapticEnginePackets) {
 }
 
 TEST_P(ArgumentsTest, AreNotLookedAtBeforeTheCaller) {
-    const CallerIdentity caller(2000);
+    const CallerIdentity caller(2000, 1);
     const std::string denied = "E Pemission denied (2000)";
     row(call(&I::daxSetAmplitude, 0), "UNKNOWN_ERROR", denied);
     row(call(&I::daxPerformHapticEngine, Packets(340), 0), "UNKNOWN_ERROR", denied);

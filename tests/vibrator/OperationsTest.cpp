@@ -63,10 +63,10 @@ TEST_P(OperationsTest, GateRefusesAllButSystemAndRoot) {
     size_t gated = 0;
     for (const Operation& operation : allOperations()) {
         for (const uid_t uid : {2000U, 1001U, 999U, 1U, 10123U, 4294967295U}) {
-            const CallerIdentity caller(uid);
+            const CallerIdentity caller(uid, 1);
             expect(operation, Circumstances{uid});
         }
-        const CallerIdentity caller(0);
+        const CallerIdentity caller(0, 1);
         expect(operation);
         if (operation.steps.find('@') != std::string::npos) ++gated;
     }

@@ -1,0 +1,338 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "transport/RawClient.h"
+#include "transport/TransportTest.h"
+
+#include <android/hidl/base/1.0/BpHwBase.h>
+#include <android/hidl/manager/1.2/IServiceManager.h>
+#include <hidl/HidlBinderSupport.h>
+#include <hidl/ServiceManagement.h>
+#include <hwbinder/ProcessState.h>
+
+#include <functional>
+
+// What the daemon, and on the kernel's binder the service manager, do with requests that no proxy
+// sends. Runs on sockets everywhere, and on the kernel's binder in a virtual machine.
+
+namespace {
+
+using ::android::sp;
+using ::android::status_t;
+using ::android::hardware::BHwBinder;
+using ::android::hardware::IBinder;
+using ::android::hardware::Parcel;
+using ::android::hardware::ProcessState;
+using ::android::hidl::base::V1_0::BpHwBase;
+
+/** An object of this process that answers as a test wants. */
+struct Peer : BHwBinder {
+    std::function<status_t(RawMessage&)> answer;
+    RawMessage message{std::string(4, '\0')};
+
+  private:
+    status_t onTransact(uint32_t /* code */, const Parcel& /* data */, Parcel* reply,
+                        uint32_t /* flags */, TransactCallback /* callback */) override {
+        const status_t status = answer(message);
+        message.giveTo(reply);
+        return status;
+    }
+};
+
+/** An operation whose first argument is a list or a string. */
+struct Target {
+    const char* name;
+    const char* interface;
+    uint32_t code;
+    /** @return a right request for it. */
+    RawMessage (*right)(const std::string& token);
+
+    friend std::ostream& operator<<(std::ostream& out, const Target& target) {
+        return out << target.name;
+    }
+};
+
+const Target kTargets[] = {
+        {"Service", raw::kV20, raw::kDaxPerformHapticEngine,
+         [](const std::string& token) {
+             RawMessage message = RawMessage::to(token);
+             message.addList(1, std::string(16, '\1'));
+             message.tail = bytesOf(10000);
+             return message;
+         }},
+        {"Manager", raw::kManager, raw::kManagersGet,
+         [](const std::string& token) {
+             RawMessage message = RawMessage::to(token);
+             message.addString(raw::kV21);
+             message.addString("default");
+             return message;
+         }},
+};
+
+constexpr status_t kNoData = android::NOT_ENOUGH_DATA;
+constexpr status_t kBadType = android::BAD_TYPE;
+constexpr status_t kBadValue = android::BAD_VALUE;
+constexpr status_t kFailed = android::FAILED_TRANSACTION;
+
+const struct {
+    const char* name;
+    /** Makes the right request wrong. */
+    void (*change)(RawMessage&);
+    status_t status;
+    /** What it is on the kernel's binder, which copies objects but does not judge all of them. */
+    status_t onKernel;
+} kAttacks[] = {
+        {"none", [](auto&) {}, android::OK, android::OK},
+        {"no arguments", [](auto& m) { m.keep(0); }, kNoData, kNoData},
+        {"last argument missing", [](auto& m) { m.keep(2); }, kNoData, kNoData},
+        {"half an object",
+         [](auto& m) {
+             m.keep(1);
+             m.tail = std::string(20, '\0');
+         },
+         kNoData, kNoData},
+        {"numbers for objects",
+         [](auto& m) {
+             m.keep(0);
+             m.tail = std::string(256, 'A');
+         },
+         kBadType, kBadType},
+        {"count beyond the buffer", [](auto& m) { m.setCount(60); }, kBadValue, kBadValue},
+        // Its size in bytes is that of the buffer, in 32 bits.
+        {"count that overflows", [](auto& m) { m.setCount(0x10000001); }, kBadValue, kBadValue},
+        {"largest count", [](auto& m) { m.setCount(UINT32_MAX); }, kBadValue, kBadValue},
+        {"no elements", [](auto& m) { m.set(1, ""); }, kBadValue, kBadValue},
+        {"short header", [](auto& m) { m.set(0, "12345678"); }, kBadValue, kBadValue},
+        {"length beyond the memory", [](auto& m) { m.objects[1].length = UINT64_MAX; }, kFailed,
+         kFailed},
+        {"length that overflows", [](auto& m) { m.objects[1].length = UINT64_MAX - 6; }, kFailed,
+         kFailed},
+        {"short length", [](auto& m) { m.objects[1].length = 8; }, kFailed, kBadValue},
+        {"elements without parent", [](auto& m) { m.objects[1].flags = 0; }, kBadValue, kBadValue},
+        {"parent of the first", [](auto& m) { m.objects[0].flags = 1; }, kFailed, kFailed},
+        {"parent is itself", [](auto& m) { m.objects[1].parent = 1; }, kFailed, kFailed},
+        {"parent that does not exist", [](auto& m) { m.objects[1].parent = UINT64_MAX; }, kFailed,
+         kFailed},
+        // The address is written over the count then.
+        {"wrong place in parent", [](auto& m) { m.objects[1].parent_offset = 8; }, kBadValue,
+         kBadValue},
+        {"place beyond the parent", [](auto& m) { m.objects[1].parent_offset = 9; }, kFailed,
+         kFailed},
+        {"place that overflows", [](auto& m) { m.objects[1].parent_offset = UINT64_MAX - 7; },
+         kFailed, kFailed},
+        // As objects that overlap could do it.
+        {"address written over", [](auto& m) { m.add("short", true); }, kBadValue, kFailed},
+        {"odd offset", [](auto& m) { m.offsets[0] += 1; }, kFailed, kFailed},
+        {"offset that overflows", [](auto& m) { m.offsets[0] = UINT64_MAX - 3 - m.head.size(); },
+         kFailed, kFailed},
+        {"offset of no object", [](auto& m) { m.offsets[1] += 8; }, kFailed, kFailed},
+        {"offsets in disorder", [](auto& m) { std::swap(m.offsets[0], m.offsets[1]); }, kFailed,
+         kFailed},
+        {"offset twice", [](auto& m) { m.offsets[1] = m.offsets[0]; }, kFailed, kFailed},
+        // Addresses of the sender's choice, if anybody takes them for objects.
+        {"objects not listed", [](auto& m) { m.offsets.clear(); }, kFailed, kBadType},
+        {"elements not listed", [](auto& m) { m.offsets.resize(1); }, kFailed, kBadType},
+        {"object for a buffer",
+         [](auto& m) {
+             static const sp<Peer> peer = new Peer;
+             flat_binder_object object{};
+             object.binder = reinterpret_cast<binder_uintptr_t>(peer->getWeakRefs());
+             object.cookie =
+                     reinterpret_cast<binder_uintptr_t>(static_cast<BHwBinder*>(peer.get()));
+             m.replace(0, BINDER_TYPE_BINDER, object);
+         },
+         kFailed, kBadType},
+        {"handle of nothing",
+         [](auto& m) { m.replace(0, BINDER_TYPE_HANDLE, flat_binder_object{}); }, kFailed, kFailed},
+        {"descriptor", [](auto& m) { m.replace(1, BINDER_TYPE_FD, binder_fd_object{}); }, kFailed,
+         kFailed},
+        {"descriptors",
+         [](auto& m) {
+             binder_fd_array_object descriptors{};
+             descriptors.num_fds = 2;
+             m.replace(1, BINDER_TYPE_FDA, descriptors);
+         },
+         kFailed, kFailed},
+        {"object of no type", [](auto& m) { m.replace(1, 0x12345678, binder_buffer_object{}); },
+         kFailed, kFailed},
+};
+
+class HostileRequestTest : public TransportTest, public ::testing::WithParamInterface<Target> {
+  protected:
+    void SetUp() override { serve(); }
+    /** Nothing that a test does may cost a polite client anything. */
+    void TearDown() override { expectService(); }
+    static void expectService() { EXPECT_TRUE(answers()); }
+    static bool isManager() { return GetParam().interface == std::string(raw::kManager); }
+
+    /** @return what comes of a call; of one that is oneway, whether it could be sent. */
+    status_t call(RawMessage message, uint32_t code, uint32_t flags = 0) {
+        if (!isKernel()) {
+            if (mClient == nullptr) mClient = std::make_unique<RawClient>(mDirectory.path());
+            const auto packet = message.packet(code, flags);
+            if ((flags & TF_ONE_WAY) != 0) return mClient->send(packet) ? 0 : -EPIPE;
+            const Received answer = mClient->call(packet);
+            return answer.isClosed ? -EPIPE : answer.status;
+        }
+        if (mObject == nullptr) {
+            mObject = isManager() ? ProcessState::self()->getStrongProxyForHandle(0)
+                                  : android::hardware::getOrCreateCachedBinder(
+                                            IDaxVibrator::getService().get());
+        }
+        Parcel parcel;
+        message.giveTo(&parcel);
+        Parcel reply;
+        int32_t exception = 0;
+        const status_t status = mObject->transact(code, parcel, &reply, flags);
+        if (status == android::OK && (flags & TF_ONE_WAY) == 0) reply.readInt32(&exception);
+        EXPECT_EQ(exception, 0);
+        return status;
+    }
+    RawMessage right() const { return GetParam().right(GetParam().interface); }
+
+    std::unique_ptr<RawClient> mClient;
+    sp<IBinder> mObject;
+};
+
+// Over sockets there is no service manager.
+const size_t kTargetCount = getenv("HWBINDER_DEVICE") != nullptr ? 2 : 1;
+
+INSTANTIATE_TEST_SUITE_P(Of, HostileRequestTest,
+                         ::testing::ValuesIn(kTargets, kTargets + kTargetCount),
+                         [](const auto& target) { return target.param.name; });
+
+TEST_P(HostileRequestTest, WrongArgumentsAreRefused) {
+    for (const auto& [name, change, status, onKernel] : kAttacks) {
+        SCOPED_TRACE(name);
+        RawMessage message = right();
+        change(message);
+        EXPECT_EQ(call(message, GetParam().code), isKernel() ? onKernel : status);
+        expectService();
+    }
+}
+
+TEST_P(HostileRequestTest, WrongTokensAndCodesAreRefused) {
+    const std::string token = GetParam().interface;
+    for (const std::string& wrong :
+         {std::string(), std::string(raw::kV10), std::string(raw::kBase), token + "x",
+          token.substr(0, token.size() - 1), std::string(60'000, 'x')}) {
+        EXPECT_EQ(call(GetParam().right(wrong), GetParam().code), kBadType) << wrong.substr(0, 60);
+    }
+    // Without its end, and without anything.
+    EXPECT_EQ(call(RawMessage(token.substr(0, token.size() / 4 * 4)), GetParam().code), kBadType);
+    EXPECT_EQ(call(RawMessage(""), GetParam().code), kBadType);
+    for (const uint32_t code : {0U, 26U, 0x0f000000U, 0x5f504e47U, UINT32_MAX})
+        EXPECT_EQ(call(right(), code), android::UNKNOWN_TRANSACTION) << code;
+    EXPECT_EQ(call(right(), raw::kPing), kBadType);
+}
+
+TEST_P(HostileRequestTest, OnewayOfEverythingCostsNobodyAnything) {
+    std::vector<uint32_t> codes = {raw::kPing, raw::kInterfaceChain, raw::kDebug};
+    for (uint32_t code = 0; code <= 26; ++code)
+        codes.push_back(code);
+    for (const uint32_t code : codes) {
+        // The driver may refuse it, as long as others of the same process wait.
+        for (const char* token : {GetParam().interface, raw::kV10, raw::kBase})
+            call(GetParam().right(token), code, TF_ONE_WAY);
+    }
+    expectService();
+    for (int i = 0; i < 300; ++i)
+        call(RawMessage::to(GetParam().interface), GetParam().code, TF_ONE_WAY);
+}
+
+TEST_P(HostileRequestTest, LargeRefusedRequestsLeaveNothing) {
+    const std::string large(isKernel() ? 200'000 : 60'000, 'x');
+    for (int i = 0; i < 300; ++i) {
+        RawMessage token = RawMessage::to("x");
+        token.tail = large;
+        RawMessage count = right();
+        count.set(1, large);
+        // Not for lack of space.
+        ASSERT_EQ(call(token, GetParam().code), kBadType) << i;
+        ASSERT_EQ(call(count, GetParam().code), kBadValue) << i;
+    }
+}
+
+TEST_P(HostileRequestTest, DescriptorsDoNotStay) {
+    RawMessage request = right();
+    request.add("");
+    request.replace(request.objects.size() - 1, BINDER_TYPE_FD, binder_fd_object{});
+    // As the platform carries a native handle: its size, its numbers, and eight descriptors.
+    RawMessage debug = RawMessage::to(raw::kBase);
+    debug.add(bytesOf(12) + bytesOf(8) + std::string(36, '\0'));
+    debug.add("");
+    binder_fd_array_object descriptors{};
+    descriptors.num_fds = 8;
+    descriptors.parent_offset = 12;
+    debug.replace(1, BINDER_TYPE_FDA, descriptors);
+    debug.head += bytesOf(uint64_t{48});
+    const size_t before = mServer.descriptors();
+    for (int i = 0; i < 100; ++i) {
+        EXPECT_EQ(call(request, GetParam().code, TF_ACCEPT_FDS), kFailed);
+        EXPECT_EQ(call(debug, raw::kDebug, TF_ACCEPT_FDS), kFailed);
+    }
+    // The client's own connection counts.
+    EXPECT_LE(mServer.descriptors(), before + 1);
+    debug.keep(0);
+    EXPECT_EQ(call(debug, raw::kDebug), android::INVALID_OPERATION);
+}
+
+TEST_P(HostileRequestTest, BufferIsReadAsNothingElse) {
+    RawMessage debug = RawMessage::to(raw::kBase);
+    debug.add("a number");
+    EXPECT_EQ(call(debug, raw::kDebug), kNoData);
+    if (!isManager()) return;
+    RawMessage add = RawMessage::to(raw::kManager);
+    add.addString("name");
+    add.add("an object");
+    EXPECT_EQ(call(add, raw::kManagersAdd), kBadType);
+}
+
+constexpr char kPeer[] = "vendor.velmora.hardware.peer@1.0::IPeer";
+
+/** @return whether the service manager knows an object that answers so when it is registered. */
+bool isRegistered(const std::function<status_t(RawMessage&)>& answer) {
+    const auto manager = android::hardware::defaultServiceManager1_2();
+    const sp<Peer> peer = new Peer;
+    peer->answer = answer;
+    const bool isAdded = manager->add("peer", new BpHwBase(peer)).withDefault(false);
+    size_t known = 0;
+    manager->listByInterface(kPeer, [&](const auto& instances) { known = instances.size(); });
+    EXPECT_EQ(known, isAdded ? 1 : 0);
+    return isAdded;
+}
+
+/** Answers with a chain of one name, whose count may be wrong. */
+status_t answerChain(RawMessage& reply, uint32_t count) {
+    const std::string name = kPeer;
+    reply.addList(count, bytesOf(uint64_t{0}) + bytesOf(name.size()));
+    reply.add(name + std::string(1, '\0'), true, 1);
+    return android::OK;
+}
+
+TEST(HostilePeerTest, DISABLED_DiesWhenItIsAsked) {
+    isRegistered([](RawMessage&) -> status_t { _exit(0); });
+}
+
+TEST(HostilePeerTest, WrongChainsRegisterNothing) {
+    if (kTargetCount == 1) GTEST_SKIP() << "there is no service manager";
+    EXPECT_FALSE(isRegistered([](RawMessage&) { return kBadType; }));
+    EXPECT_FALSE(isRegistered([](RawMessage& reply) {
+        reply.head.clear();
+        return android::OK;
+    }));
+    EXPECT_FALSE(isRegistered([](RawMessage& reply) {
+        reply.addList(0, "");
+        return android::OK;
+    }));
+    EXPECT_FALSE(isRegistered([](RawMessage& reply) { return answerChain(reply, 1000); }));
+    EXPECT_FALSE(isRegistered([](RawMessage& reply) {
+        const status_t status = answerChain(reply, 1);
+        reply.keep(2);
+        return status;
+    }));
+    const Outcome outcome = runProgram({"/proc/self/exe", "--gtest_also_run_disabled_tests",
+                                        "--gtest_filter=*DISABLED_DiesWhenItIsAsked"});
+    EXPECT_EQ(outcome.exitCode, 0) << outcome.output;
+    EXPECT_TRUE(isRegistered([](RawMessage& reply) { return answerChain(reply, 1); }));
+}
+
+}  // namespace
