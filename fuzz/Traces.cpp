@@ -6,15 +6,15 @@
 
 /** Any bytes as a trace and as a log, drawn all ways, whole and in part. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-    TraceReader trace;
-    LogReader log;
-    TimelineMaker maker;
+    AccessReader trace(false);
+    AccessReader log(true);
+    std::vector<NodeAccess> accesses;
     std::istringstream lines(std::string(reinterpret_cast<const char*>(data), size));
     for (std::string line; std::getline(lines, line);) {
-        if (const auto access = trace.read(line)) maker.add(*access);
-        if (const auto access = log.read(line)) maker.add(*access);
+        if (const auto access = trace.read(line)) accesses.push_back(*access);
+        if (const auto access = log.read(line)) accesses.push_back(*access);
     }
-    Timeline timeline = maker.finish();
+    Timeline timeline = makeTimeline(accesses);
     for (const Timeline::Segment& segment : timeline.segments) {
         if (!(segment.start <= segment.end && segment.end <= timeline.end)) abort();
     }

@@ -3,8 +3,6 @@
 
 #include <dirent.h>
 #include <fcntl.h>
-#include <linux/openat2.h>
-#include <sys/syscall.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -21,22 +19,6 @@ const char* inside(const std::string& name) {
     return leaves ? "" : name.c_str();
 }
 
-/** Opens the folder at a relative path, one after the other of those on the way. */
-int walk(int above, std::string_view path, bool create) {
-    int file = fcntl(above, F_DUPFD_CLOEXEC, 0);
-    while (file >= 0 && !path.empty()) {
-        const std::string name(path.substr(0, path.find('/')));
-        path.remove_prefix(std::min(name.size() + 1, path.size()));
-        if (create) mkdirat(file, inside(name), 0755);
-        const int next = openat(file, inside(name), kOpenFolder | O_NOFOLLOW);
-        const int error = errno;
-        close(file);
-        errno = error;
-        file = next;
-    }
-    return file;
-}
-
 }  // namespace
 
 // openat throughout: in a program with the stand-ins, open is one of them.
@@ -45,19 +27,19 @@ Folder::Folder(const std::string& path)
     if (mFile < 0) mError = errno;
 }
 
-Folder::Folder(const Folder& above, const std::string& path, bool create)
-    : mFile(-1), mError(above.mError) {
+Folder::Folder(const Folder& above, std::string_view path, bool create) : mError(above.mError) {
     if (mError != 0) return;
-    open_how how{};
-    how.flags = kOpenFolder;
-    how.resolve = RESOLVE_BENEATH | RESOLVE_NO_SYMLINKS;
-    if (!create) {
-        mFile = static_cast<int>(
-                syscall(SYS_openat2, above.mFile, path.c_str(), &how, sizeof(how)));
+    mFile = fcntl(above.mFile, F_DUPFD_CLOEXEC, 0);
+    mError = mFile < 0 ? errno : 0;
+    while (mFile >= 0 && !path.empty()) {
+        const std::string name(path.substr(0, path.find('/')));
+        path.remove_prefix(std::min(name.size() + 1, path.size()));
+        if (create) mkdirat(mFile, inside(name), 0755);
+        const int next = openat(mFile, inside(name), kOpenFolder | O_NOFOLLOW);
+        mError = next < 0 ? errno : 0;
+        close(mFile);
+        mFile = next;
     }
-    // Neither old kernels nor emulators know that call.
-    if (create || (mFile < 0 && errno == ENOSYS)) mFile = walk(above.mFile, path, create);
-    if (mFile < 0) mError = errno;
 }
 
 Folder::~Folder() {
@@ -96,12 +78,8 @@ int Folder::replace(const std::string& name, std::string_view text, mode_t mode)
     if (mError != 0) return mError;
     // One for each thread; what a killed one has left is taken away.
     const std::string fresh = ".new." + std::to_string(gettid());
-    constexpr int kNew = O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC;
-    int file = openat(mFile, fresh.c_str(), kNew, 0600);
-    if (file < 0 && errno == EEXIST) {
-        remove(fresh);
-        file = openat(mFile, fresh.c_str(), kNew, 0600);
-    }
+    remove(fresh);
+    const int file = openat(mFile, fresh.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600);
     if (file < 0) return errno;
     errno = ENOSPC;
     const bool isDone =
@@ -118,26 +96,16 @@ void Folder::remove(const std::string& name) const {
 }
 
 std::vector<std::string> Folder::names() const {
-    std::vector<std::string> names = allNames();
-    names.erase(std::remove_if(names.begin(), names.end(),
-                               [](const std::string& name) { return name[0] == '.'; }),
-                names.end());
-    std::sort(names.begin(), names.end());
-    return names;
-}
-
-bool Folder::isEmpty() const {
-    return allNames().size() == 2;  // . and ..
-}
-
-std::vector<std::string> Folder::allNames() const {
     std::vector<std::string> names;
     const int file = openat(mFile, ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     DIR* folder = file < 0 ? nullptr : fdopendir(file);
     if (folder == nullptr) return names;
-    while (const dirent* entry = readdir(folder))
-        names.emplace_back(entry->d_name);
+    while (const dirent* entry = readdir(folder)) {
+        const std::string name = entry->d_name;
+        if (name != "." && name != "..") names.push_back(name);
+    }
     closedir(folder);
+    std::sort(names.begin(), names.end());
     return names;
 }
 

@@ -18,7 +18,7 @@ class Folder {
     /** Opens a folder by its path, in which links are followed: the user has named it. */
     explicit Folder(const std::string& path);
     /** Opens the folder at a relative path below another; makes it where asked to. */
-    Folder(const Folder& above, const std::string& path, bool create = false);
+    Folder(const Folder& above, std::string_view path, bool create = false);
     Folder(const Folder&) = delete;
     Folder& operator=(const Folder&) = delete;
     ~Folder();
@@ -35,15 +35,11 @@ class Folder {
     int replace(const std::string& name, std::string_view text, mode_t mode) const;
     /** Removes a file, or a link itself. */
     void remove(const std::string& name) const;
-    /** @return the sorted names of all in it, without those that begin with a dot. */
+    /** @return the sorted names of all in it. */
     std::vector<std::string> names() const;
-    /** @return whether nothing at all is in it. */
-    bool isEmpty() const;
 
   private:
-    std::vector<std::string> allNames() const;
-
-    int mFile;
+    int mFile = -1;
     int mError = 0;
 };
 

@@ -11,14 +11,15 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <array>
 #include <cerrno>
 #include <csignal>
+#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <functional>
 #include <iostream>
+#include <stdexcept>
 
 namespace simulator {
 namespace {
@@ -39,7 +40,8 @@ fs::path findProgram(const std::string& name, const std::vector<const char*>& pl
         fs::path path = (own / place / name).lexically_normal();
         if (access(path.c_str(), R_OK) == 0) return path;
     }
-    throw SessionError(name + " is neither beside vibrator-sim nor where it is built or installed");
+    throw std::runtime_error(name +
+                             " is neither beside vibrator-sim nor where it is built or installed");
 }
 
 /** A program that this one starts; it is killed in the destructor at the latest. */
@@ -53,7 +55,7 @@ class Child {
             arguments.push_back(const_cast<char*>(word.c_str()));
         arguments.push_back(nullptr);
         mPid = fork();
-        if (mPid < 0) throw SessionError(failure("fork"));
+        if (mPid < 0) throw std::runtime_error(failure("fork"));
         if (mPid != 0) return;
         prepare();
         sigset_t none;
@@ -97,51 +99,23 @@ class PrivateDirectory {
   public:
     // Not in $TMPDIR: the path of a socket must be short, and one to preload without blanks.
     PrivateDirectory() {
-        if (mkdtemp(mPath.data()) == nullptr) throw SessionError(failure(mPath));
-        std::array<int, 2> channel{};
-        if (pipe2(channel.data(), O_CLOEXEC) != 0) throw SessionError(failure("pipe"));
-        mLifeline = channel[1];
-        mRemover = fork();
-        if (mRemover != 0) {
-            close(channel[0]);
-            return;
-        }
-        setsid();
-        close(mLifeline);
-        const int nothing = open("/dev/null", O_RDWR);
-        for (const int file : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO})
-            dup2(nothing, file);
-        char none = 0;
-        // Ends when the last process that has the other end does.
-        while (read(channel[0], &none, 1) < 0 && errno == EINTR) {
-        }
-        // A dying daemon may still put something there.
-        std::error_code error;
-        for (int attempt = 0; attempt < 50 && fs::exists(mPath); ++attempt) {
-            fs::remove_all(mPath, error);
-            if (error) usleep(20'000);
-        }
-        _exit(0);
+        if (mkdtemp(mPath.data()) == nullptr) throw std::runtime_error(failure(mPath));
+        // Its input ends when this process does. A dying daemon may still put something there.
+        const std::string remover =
+                "exec >/dev/null 2>&1; cat; for attempt in 1 2 3 4 5; do rm -rf " + mPath +
+                " && break; sleep 0.2; done";
+        mRemover = popen(remover.c_str(), "we");
+        if (mRemover == nullptr) throw std::runtime_error(failure("sh"));
     }
     PrivateDirectory(const PrivateDirectory&) = delete;
     PrivateDirectory& operator=(const PrivateDirectory&) = delete;
-    ~PrivateDirectory() {
-        close(mLifeline);
-        waitpid(mRemover, nullptr, 0);
-    }
+    ~PrivateDirectory() { pclose(mRemover); }
 
     std::string operator/(const std::string& name) const { return mPath + "/" + name; }
-    /** Makes a link in it, whose path has neither blanks nor colons. */
-    void link(const std::string& name, const fs::path& target) const {
-        if (symlink(target.c_str(), (*this / name).c_str()) != 0) {
-            throw SessionError(failure(*this / name));
-        }
-    }
 
   private:
     std::string mPath = "/tmp/vibrator-sim.XXXXXX";
-    int mLifeline = -1;
-    pid_t mRemover = -1;
+    std::FILE* mRemover;
 };
 
 /** The signals that end this program or tell of a child's end. They wait until they are taken. */
@@ -195,18 +169,18 @@ void awaitDaemon(Child& daemon, const std::string& client, const std::string& di
         siginfo_t info{};
         const int number = signals.take(&info);
         if (number != 0 && number != SIGCHLD) {
-            throw SessionError(std::string("ended by ") + strsignal(number));
+            throw std::runtime_error(std::string("ended by ") + strsignal(number));
         }
         const bool hasEnded = daemon.hasEnded();
         if (hasEnded || attempt == kAttempts) {
-            throw SessionError(std::string("the daemon ") +
-                               (hasEnded ? "has ended" : "does not answer") +
-                               "; the end of its log: " + lastLine(Folder(directory).read("log")));
+            throw std::runtime_error(
+                    std::string("the daemon ") + (hasEnded ? "has ended" : "does not answer") +
+                    "; the end of its log: " + lastLine(Folder(directory).read("log")));
         }
     }
     struct stat trace;
     if (stat(traceFile(directory).c_str(), &trace) != 0 || trace.st_size == 0) {
-        throw SessionError("the daemon does not use the simulated driver");
+        throw std::runtime_error("the daemon does not use the simulated driver");
     }
 }
 
@@ -232,10 +206,10 @@ int awaitCommand(Child& command, const Signals& signals) {
 void makeDriver(const std::string& directory, Layout layout, const Features& features) {
     const int error = createDriver(directory, layout, features);
     if (error == ENOTEMPTY) {
-        throw SessionError("\"" + directory +
-                           "\" is neither empty nor a driver's; name a new directory");
+        throw std::runtime_error("\"" + directory +
+                                 "\" is neither empty nor a driver's; name a new directory");
     }
-    if (error != 0) throw SessionError("\"" + directory + "\": " + strerror(error));
+    if (error != 0) throw std::runtime_error("\"" + directory + "\": " + strerror(error));
 }
 
 int runSession(const SessionOptions& options) {
@@ -243,6 +217,7 @@ int runSession(const SessionOptions& options) {
     const fs::path preload = findProgram(kPreload, {".", "../" LIBRARY_DIRECTORY});
     const fs::path client = findProgram("vibratorctl", {"../tools", "."});
 
+    // In this order: what removes the directory must not get the signals, either.
     const Signals signals;
     const PrivateDirectory place;
     const std::string directory =
@@ -250,11 +225,12 @@ int runSession(const SessionOptions& options) {
     makeDriver(directory, options.layout, options.features);
     const Folder driver(directory);
     driver.remove("trace");
-    if (driver.replace("log", "", 0644) != 0) throw SessionError(failure(directory + "/log"));
-    place.link(kPreload, preload);
+    if (driver.replace("log", "", 0644) != 0) throw std::runtime_error(failure(directory + "/log"));
+    // Links, whose paths have neither blanks nor colons.
+    fs::create_symlink(preload, place / kPreload);
     fs::create_directory(place / "bin");
-    place.link("bin/vibratorctl", client);
-    place.link("bin/vibrator-sim", fs::read_symlink("/proc/self/exe"));
+    fs::create_symlink(client, place / "bin/vibratorctl");
+    fs::create_symlink(fs::read_symlink("/proc/self/exe"), place / "bin/vibrator-sim");
     setenv("VIBRATOR_SIM_DIR", directory.c_str(), 1);
     setenv("HWBINDER_DIR", (place / "sockets").c_str(), 1);
 

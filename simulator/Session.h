@@ -3,19 +3,12 @@
 
 #include "Driver.h"
 
-#include <stdexcept>
 #include <string>
 #include <vector>
 
 namespace simulator {
 
-/** What kept the daemon from running on a simulated driver; what() says it in one line. */
-class SessionError : public std::runtime_error {
-  public:
-    using runtime_error::runtime_error;
-};
-
-/** Makes a driver in a directory; throws a SessionError that says why it cannot. */
+/** Makes a driver in a directory. @throw std::runtime_error that says why it cannot. */
 void makeDriver(const std::string& directory, Layout layout, const Features& features);
 
 struct SessionOptions {
@@ -32,6 +25,7 @@ struct SessionOptions {
  * ends, or this process in whatever way, the daemon is ended and what was made is removed.
  *
  * @return the command's exit code; 128 and the number of the signal that has ended it.
+ * @throw std::runtime_error that says what kept the daemon from running on the driver.
  */
 int runSession(const SessionOptions& options);
 

@@ -18,6 +18,7 @@
 #include <atomic>
 #include <cerrno>
 #include <cstdarg>
+#include <cstdint>
 #include <cstdlib>
 #include <cstring>
 #include <map>
@@ -105,65 +106,64 @@ auto answer(Call call) {
     return std::max<decltype(call())>(result, -1);
 }
 
-const char* accessName(int flags) {
-    constexpr const char* kNames[] = {"O_RDONLY", "O_WRONLY", "O_RDWR", "O_ACCMODE"};
-    return kNames[flags & O_ACCMODE];
+/**
+ * Does what an access asks for, unless a fault keeps it from that, and traces it.
+ *
+ * @param action gets the most bytes that it may move, less than SIZE_MAX where a fault cuts it
+ *     short; returns the result, or a negative errno.
+ * @param shown where a read puts its bytes.
+ */
+template <typename Action>
+ssize_t simulate(const OpenNode& open, const std::string& name, const std::string& argument,
+                 Action action, const void* shown = nullptr) {
+    const auto fault = simulator::takeFault(*open.directory, open.node.leaf(), name);
+    const ssize_t result =
+            fault && fault->error != 0 ? -fault->error : action(fault ? fault->bytes : SIZE_MAX);
+    std::string bytes;
+    if (shown != nullptr && result >= 0)
+        bytes = simulator::quote({static_cast<const char*>(shown), static_cast<size_t>(result)});
+    simulator::trace(*open.directory, open.node.name() + ' ' + name + argument, result, bytes);
+    return result;
 }
 
 int simulateOpen(const Node& node, int flags) {
-    const auto directory = std::make_shared<const Folder>(node.directory);
-    const std::string access = node.name() + " open " + accessName(flags);
-    const auto fault = simulator::takeFault(*directory, node.leaf(), "open");
-    const int file = fault ? -fault->error : simulator::openNode(node, flags);
-    simulator::trace(*directory, access, std::min(file, 0));
-    if (file >= 0) OpenNodes::instance().add(file, {node, directory, {}});
+    constexpr const char* kNames[] = {" O_RDONLY", " O_WRONLY", " O_RDWR", " O_ACCMODE"};
+    const OpenNode open{node, std::make_shared<const Folder>(node.directory), {}};
+    int file = -1;
+    const ssize_t result = simulate(open, "open", kNames[flags & O_ACCMODE], [&](size_t) {
+        file = simulator::openNode(node, flags);
+        return std::min(file, 0);
+    });
+    if (result < 0) return static_cast<int>(result);
+    OpenNodes::instance().add(file, open);
     return file;
 }
 
 ssize_t simulateRead(OpenNode& open, void* buffer, size_t size) {
-    const auto fault = simulator::takeFault(*open.directory, open.node.leaf(), "read");
-    ssize_t result = 0;
-    if (fault && fault->error != 0) {
-        result = -fault->error;
-    } else {
+    const auto read = [&](size_t most) {
         if (open.offset == 0) open.shown = simulator::show(open.node);
-        const std::string& text = open.shown;
-        const size_t start = std::min(open.offset, text.size());
-        size_t length = std::min(size, text.size() - start);
-        if (fault) length = std::min(length, fault->bytes);
-        memcpy(buffer, text.data() + start, length);
-        open.offset = start + length;
-        result = static_cast<ssize_t>(length);
-    }
-    const auto shown = static_cast<size_t>(std::max<ssize_t>(result, 0));
-    simulator::trace(*open.directory, open.node.name() + " read " + std::to_string(size), result,
-                     result < 0 ? "" : simulator::quote({static_cast<char*>(buffer), shown}));
-    return result;
+        const size_t length = std::min({size, most, open.shown.size() - open.offset});
+        memcpy(buffer, open.shown.data() + open.offset, length);
+        open.offset += length;
+        return static_cast<ssize_t>(length);
+    };
+    return simulate(open, "read", ' ' + std::to_string(size), read, buffer);
 }
 
 ssize_t simulateWrite(const OpenNode& open, const void* buffer, size_t size) {
     const std::string bytes(static_cast<const char*>(buffer), size);
-    const auto fault = simulator::takeFault(*open.directory, open.node.leaf(), "write");
-    ssize_t result = 0;
-    if (!fault) {
-        result = simulator::store(open.node, bytes);
-    } else {
+    return simulate(open, "write", ' ' + simulator::quote(bytes), [&](size_t most) {
         // A driver that is cut short has not taken the value.
-        result = fault->error != 0 ? -fault->error
-                                   : static_cast<ssize_t>(std::min(size, fault->bytes));
-    }
-    simulator::trace(*open.directory, open.node.name() + " write " + simulator::quote(bytes),
-                     result);
-    return result;
+        return most < SIZE_MAX ? static_cast<ssize_t>(std::min(size, most))
+                               : simulator::store(open.node, bytes);
+    });
 }
 
 int simulateClose(int file, const OpenNode& open) {
-    const auto fault = simulator::takeFault(*open.directory, open.node.leaf(), "close");
-    const int result = fault ? -fault->error : 0;
-    simulator::trace(*open.directory, open.node.name() + " close", result);
+    const ssize_t result = simulate(open, "close", "", [](size_t) { return 0; });
     OpenNodes::instance().remove(file);
     kernelClose(file);
-    return result;
+    return static_cast<int>(result);
 }
 
 bool takesMode(int flags) {

@@ -40,10 +40,10 @@ std::string unquote(std::string_view text) {
     return bytes;
 }
 
-/** @return the name of an errno. */
-std::string errorName(int error) {
-    const char* name = strerrorname_np(error);
-    return name == nullptr ? std::to_string(error) : name;
+/** @return the name of the errno that a text gives. */
+std::string errorName(const std::string& number) {
+    const char* name = strerrorname_np(atoi(number.c_str()));
+    return name == nullptr ? number : name;
 }
 
 /** @return what follows a mark in a text, without trailing blanks; nothing where it is not there.
@@ -94,181 +94,152 @@ std::string nodeName(std::string_view path) {
     return std::string(path.substr(0, directory)) + std::string(path.substr(leaf));
 }
 
+/** What a line of the log tells. */
+enum Step {
+    kNothing,
+    kRefusal,
+    /** An access of the node that follows begins. */
+    kProbe,
+    kRead,
+    kWrite,
+    kEnd,
+    kProbeEnd,
+    /** All of a text that was read follows. */
+    kTextRead,
+    /** The write of the text that follows begins. */
+    kText,
+    kTextEnd,
+};
+
+/** The lines of the log that tell of accesses. The first whose mark is in a line holds. */
+constexpr struct {
+    const char* mark;
+    Step step;
+    /** Of a text the leaf of its node; of a refusal or an end the error, nullptr for an errno. */
+    const char* detail;
+} kLogLines[] = {
+        {"Pemission denied (", kRefusal, "not permitted to this uid"},
+        {" is abnormal ", kRefusal, "out of range"},
+        {" BAD_VALUE", kRefusal, "out of range"},
+        {" packet size is exceed", kRefusal, "too many packets"},
+        {" while vibrating. Not supported", kRefusal, "the motor counts as running"},
+        {" is impossible because of intensity", kRefusal, "no control of the strength"},
+        {" unsupports", kRefusal, "the driver has none"},
+        {"perform_1_", kRefusal, "no such effect"},
+        {"perform start effect : 0,", kNothing, ""},
+        {"perform start effect : ", kRefusal, "no such effect"},
+        {"daxSupportsFolderStatusSetting string : ", kTextRead, "event_cmd"},
+        {"daxSupportsEnhancedVelmoraHapticPattern string : ", kTextRead, "motor_type"},
+        {"getMotorIndex string : ", kTextRead, "motor_type"},
+        {"daxPerformHapticEngine : ", kText, "haptic_engine"},
+        {"daxPerformPrebakedHapticPattern : ", kText, "cp_trigger_queue"},
+        {": FOLDER_", kText, "event_cmd"},
+        {" is fail: ", kTextEnd, nullptr},
+        {"repeat error", kTextEnd, "not taken"},
+        {"daxSetFolderStatus error", kTextEnd, "not taken"},
+        {"daxPerformHapticEngine UNKNOWN_ERROR", kTextEnd, "not taken"},
+        {"daxSetFolderStatus end", kTextEnd, ""},
+        {"isNodeExist node:", kProbe, ""},
+        {"isNodeExistForRead node:", kProbe, ""},
+        {">> readNode node:", kRead, ""},
+        {">> writeNode node:", kWrite, ""},
+        {"failed. errno: ", kEnd, nullptr},
+        {"<< readNode done", kEnd, ""},
+        {"<< writeNode node OK", kEnd, ""},
+        {"<< writeNode node UNKNOWN_ERROR", kEnd, "not taken"},
+        {": true", kProbeEnd, ""},
+        {": false", kProbeEnd, "cannot be opened"},
+};
+
 }  // namespace
 
-std::optional<NodeAccess> TraceReader::read(std::string_view line) {
+std::optional<NodeAccess> AccessReader::read(std::string_view line) {
+    return mIsLog ? readLog(line) : readTrace(line);
+}
+
+std::optional<NodeAccess> AccessReader::readTrace(std::string_view line) {
     constexpr double kLatest = 1e12;
     const std::string clock(takeWord(&line));
     const double time = strtod(clock.c_str(), nullptr);
     const std::string node(takeWord(&line));
     const std::string_view call = takeWord(&line);
-    if (!(time >= 0 && time < kLatest)) return std::nullopt;
-    const size_t equals = line.rfind(" = ");
-    // A close has nothing between the call and the result.
-    const std::string_view result = line.substr(0, 2) == "= "          ? line.substr(2)
-                                    : equals == std::string_view::npos ? std::string_view()
-                                                                       : line.substr(equals + 3);
-    if (result.empty()) return std::nullopt;
-    const bool failed = result.substr(0, 2) == "-1";
-    const std::string error(failed && result.size() > 3 ? result.substr(3) : "");
+    const bool isTransfer = call == "read" || call == "write";
+    const size_t equals = line.rfind("= ");
+    if (!(time >= 0 && time < kLatest) || equals == std::string_view::npos) return std::nullopt;
+    if (!isTransfer && call != "open" && call != "close") return std::nullopt;
 
+    std::string_view error = line.substr(equals + 2);
+    const std::string result(takeWord(&error));
+    if (result != "-1") error = {};
+    // Interrupted, it is tried again.
+    if (error == "EINTR" && call != "close") return std::nullopt;
     NodeAccess& access = mOpen[node];
-    if (call == "open") {
-        // Interrupted, it is tried again.
-        if (error == "EINTR") return std::nullopt;
-        access = {};
-        access.node = node;
-        access.error = error;
-    } else if (call == "read" || call == "write") {
-        if (error == "EINTR") return std::nullopt;
+    if (call == "open") access = {node, NodeAccess::kProbe, "", "", 0, ""};
+    if (call != "close") access.error = error;
+    if (isTransfer) {
         access.kind = call == "read" ? NodeAccess::kRead : NodeAccess::kWrite;
         access.bytes = unquote(line);
-        access.error = error;
-        if (!failed && call == "write" &&
-            strtoul(std::string(result).c_str(), nullptr, 10) != access.bytes.size()) {
-            access.error = "cut short";
-        }
-        return std::nullopt;
-    } else if (call != "close") {
-        mOpen.erase(node);
+        const bool isShort = strtoul(result.c_str(), nullptr, 10) != access.bytes.size();
+        if (call == "write" && error.empty() && isShort) access.error = "cut short";
         return std::nullopt;
     }
-    if (call == "open" && access.error.empty()) return std::nullopt;
+    if (call == "open" && error.empty()) return std::nullopt;
+    access.node = node;
     access.time = time;
     access.clock = clock;
-    access.node = node;
-    NodeAccess done = std::move(access);
-    mOpen.erase(node);
-    return done;
+    return mOpen.extract(node).mapped();
 }
 
-void LogReader::begin(NodeAccess::Kind kind, std::string_view path, const std::string& bytes) {
-    mCurrent = NodeAccess{0, nodeName(path), kind, bytes, "", ""};
-    mDirectory = mCurrent->node.substr(0, mCurrent->node.find('/'));
-}
-
-std::optional<NodeAccess> LogReader::read(std::string_view line) {
-    auto done = readMessage(line);
-    if (done) {
-        const size_t tag = line.find("QorVibrator");
-        if (tag != std::string_view::npos)
-            done->time = readClock(std::string(line.substr(0, tag)), &done->clock);
-    }
-    return done;
-}
-
-std::optional<NodeAccess> LogReader::readMessage(std::string_view line) {
-    if (auto refusal = readRefusal(line)) return refusal;
-    if (auto done = readText(line)) return done;
-    return readNumber(line);
-}
-
-std::optional<NodeAccess> LogReader::readRefusal(std::string_view line) {
-    constexpr struct {
-        const char* mark;
-        const char* reason;
-    } kRefusals[] = {
-            {"Pemission denied (", "not permitted to this uid"},
-            {" is abnormal ", "out of range"},
-            {" BAD_VALUE", "out of range"},
-            {" packet size is exceed", "too many packets"},
-            {" while vibrating. Not supported", "the motor counts as running"},
-            {" is impossible because of intensity", "no control of the strength"},
-            {" unsupports", "the driver has none"},
-            {"perform_1_", "no such effect"},
+std::optional<NodeAccess> AccessReader::readLog(std::string_view line) {
+    std::optional<std::string_view> rest;
+    const auto* row = std::find_if(std::begin(kLogLines), std::end(kLogLines),
+                                   [&](const auto& each) { return rest = after(line, each.mark); });
+    if (!rest) return std::nullopt;
+    const std::string text(*rest);
+    const size_t tag = std::min(line.find("QorVibrator"), line.size());
+    std::optional<NodeAccess> done;
+    const auto begin = [&](std::string_view path, NodeAccess::Kind kind, const std::string& bytes) {
+        mNumber = {nodeName(path), kind, bytes, "", 0, ""};
+        mDirectory = mNumber->node.substr(0, mNumber->node.find('/'));
     };
-    const auto effect = after(line, "perform start effect : ");
-    for (const auto& [mark, reason] : kRefusals) {
-        const bool isUnknownEffect = effect && effect->substr(0, 2) != "0,";
-        if (!after(line, mark) && !isUnknownEffect) continue;
-        const size_t tag = std::min(line.find("QorVibrator"), line.size());
+    const auto end = [&](std::optional<NodeAccess>* access) {
+        done.swap(*access);
+        if (done) done->error = row->detail != nullptr ? row->detail : errorName(text);
+    };
+    if (row->step == kRefusal) {
         const std::string message(after(line.substr(tag), ": ").value_or(line));
         const std::string word = message.substr(0, message.find(' '));
-        return NodeAccess{0,
-                          word == "Pemission" ? "" : word,
-                          NodeAccess::kRefusal,
-                          message,
-                          isUnknownEffect ? "no such effect" : reason,
-                          ""};
-    }
-    return std::nullopt;
-}
-
-std::optional<NodeAccess> LogReader::readText(std::string_view line) {
-    // A text that was read is all in one line.
-    const std::pair<const char*, const char*> reads[] = {
-            {"daxSupportsFolderStatusSetting string : ", "/event_cmd"},
-            {"daxSupportsEnhancedVelmoraHapticPattern string : ", "/motor_type"},
-            {"getMotorIndex string : ", "/motor_type"}};
-    for (const auto& [mark, leaf] : reads) {
-        if (const auto text = after(line, mark)) {
-            return NodeAccess{0, mDirectory + leaf, NodeAccess::kRead, std::string(*text), "", ""};
+        done = {word == "Pemission" ? "" : word, NodeAccess::kRefusal, message, row->detail, 0, ""};
+    } else if (row->step == kProbe) {
+        begin(text, NodeAccess::kProbe, "");
+    } else if (row->step == kRead) {
+        begin(text, NodeAccess::kRead, "");
+    } else if (row->step == kWrite) {
+        constexpr std::string_view kValue = " val:";
+        const size_t value = std::min(text.rfind(kValue), text.size());
+        const std::string path = text.substr(0, value);
+        // The success of these texts shows by the motor's start.
+        const bool isStart = !mNumber && path.find("/cp_trigger_index") == std::string::npos;
+        if (isStart && mText && mText->leaf() != "event_cmd") done.swap(mText);
+        if (value < text.size()) {
+            begin(path, NodeAccess::kWrite, text.substr(value + kValue.size()) + "\n");
         }
+    } else if (row->step == kEnd ||
+               (row->step == kProbeEnd && mNumber && mNumber->kind == NodeAccess::kProbe)) {
+        end(&mNumber);
+    } else if (row->step == kTextRead) {
+        done = {mDirectory + '/' + row->detail, NodeAccess::kRead, text, "", 0, ""};
+    } else if (row->step == kText) {
+        std::string bytes = text.substr(0, text.rfind(" , "));
+        // The log escapes the newline at the end.
+        if (const size_t newline = bytes.find("\\n"); newline != std::string::npos)
+            bytes.replace(newline, 2, "\n");
+        mText = {mDirectory + '/' + row->detail, NodeAccess::kWrite, bytes, "", 0, ""};
+        if (mText->leaf() == "event_cmd") mText->bytes.insert(0, "FOLDER_");
+    } else if (row->step == kTextEnd) {
+        end(&mText);
     }
-    const std::pair<const char*, const char*> writes[] = {
-            {"daxPerformHapticEngine : ", "/haptic_engine"},
-            {"daxPerformPrebakedHapticPattern : ", "/cp_trigger_queue"},
-            {": FOLDER_", "/event_cmd"}};
-    for (const auto& [mark, leaf] : writes) {
-        if (const auto text = after(line, mark)) {
-            std::string bytes(text->substr(0, text->rfind(" , ")));
-            // The log escapes the newline at the end.
-            if (const size_t newline = bytes.find("\\n"); newline != std::string::npos)
-                bytes.replace(newline, 2, "\n");
-            if (*leaf == '/' && leaf[1] == 'e') bytes.insert(0, "FOLDER_");
-            mText = NodeAccess{0, mDirectory + leaf, NodeAccess::kWrite, bytes, "", ""};
-            return std::nullopt;
-        }
-    }
-    if (!mText) return std::nullopt;
-    if (const auto error = after(line, " is fail: ")) {
-        mText->error = errorName(atoi(std::string(*error).c_str()));
-    } else if (after(line, "repeat error") || after(line, "daxSetFolderStatus error") ||
-               after(line, "daxPerformHapticEngine UNKNOWN_ERROR")) {
-        mText->error = "not taken";
-    } else if (!after(line, "daxSetFolderStatus end") &&
-               !(mText->leaf() != "event_cmd" && !mCurrent && after(line, ">> writeNode node:") &&
-                 !after(line, "/cp_trigger_index val:"))) {
-        // Its success shows by what comes next: for two of the three, that the motor is started.
-        return std::nullopt;
-    }
-    std::optional<NodeAccess> done;
-    done.swap(mText);
-    readNumber(line);
-    return done;
-}
-
-std::optional<NodeAccess> LogReader::readNumber(std::string_view line) {
-    if (const auto written = after(line, ">> writeNode node:")) {
-        const size_t value = written->rfind(" val:");
-        if (value == std::string_view::npos) return std::nullopt;
-        begin(NodeAccess::kWrite, written->substr(0, value),
-              std::string(written->substr(value + strlen(" val:"))) + "\n");
-        return std::nullopt;
-    }
-    if (const auto node = after(line, ">> readNode node:")) {
-        begin(NodeAccess::kRead, *node, "");
-        return std::nullopt;
-    }
-    for (const char* mark : {"isNodeExist node:", "isNodeExistForRead node:"}) {
-        if (const auto node = after(line, mark)) {
-            begin(NodeAccess::kProbe, *node, "");
-            return std::nullopt;
-        }
-    }
-    if (!mCurrent) return std::nullopt;
-    const bool probes = mCurrent->kind == NodeAccess::kProbe;
-    if (const auto error = after(line, "failed. errno: ")) {
-        mCurrent->error = errorName(atoi(std::string(*error).c_str()));
-    } else if (after(line, "<< writeNode node UNKNOWN_ERROR")) {
-        mCurrent->error = "not taken";
-    } else if (probes && after(line, ": false")) {
-        mCurrent->error = "cannot be opened";
-    } else if (!after(line, "<< writeNode node OK") && !after(line, "<< readNode done") &&
-               !(probes && after(line, ": true"))) {
-        return std::nullopt;
-    }
-    std::optional<NodeAccess> done;
-    done.swap(mCurrent);
+    if (done && tag < line.size())
+        done->time = readClock(std::string(line.substr(0, tag)), &done->clock);
     return done;
 }

@@ -7,6 +7,8 @@
 #include <charconv>
 #include <cstdint>
 #include <nlohmann/json.hpp>
+#include <optional>
+#include <sstream>
 #include <string_view>
 
 namespace {
@@ -22,45 +24,33 @@ std::string_view trimmed(std::string_view text) {
     return text.substr(start, text.find_last_not_of(kBlanks) - start + 1);
 }
 
-bool parseNumber(std::string_view word, int32_t* number, std::string* error) {
-    word = trimmed(word);
-    const auto [end, status] = std::from_chars(word.data(), word.data() + word.size(), *number);
-    if (status == std::errc() && end == word.data() + word.size()) return true;
-    *error = cli::inQuotes(word) + " is no whole number of 32 bits";
-    return false;
-}
-
 void append(const int32_t (&values)[4], HapticEnginePackets* packets) {
     packets->push_back({values[0], values[1], values[2], values[3]});
 }
 
 bool parseCsv(const std::string& text, HapticEnginePackets* packets, std::string* error) {
-    size_t start = 0;
-    for (int line = 1; start < text.size(); ++line) {
-        const size_t end = std::min(text.find('\n', start), text.size());
-        const std::string_view content = trimmed(std::string_view(text).substr(start, end - start));
-        start = end + 1;
+    std::istringstream lines(text);
+    std::string line;
+    for (int number = 1; std::getline(lines, line); ++number) {
+        const std::string content(trimmed(line));
         if (content.empty() || content.front() == '#') continue;
-        if (!parsePacket(std::string(content), packets, error)) {
-            *error = "line " + std::to_string(line) + ": " + *error;
-            return false;
-        }
+        if (parsePacket(content, packets, error)) continue;
+        *error = "line " + std::to_string(number) + ": " + *error;
+        return false;
     }
     return true;
 }
 
-/** @return the four values' place in an element: a list of four, or an object of four members. */
-const json* field(const json& element, size_t index) {
-    if (element.is_array()) return element.size() == 4 ? &element[index] : nullptr;
-    if (!element.is_object() || element.size() != 4) return nullptr;
-    const auto member = element.find(kFields[index]);
-    return member == element.end() ? nullptr : &*member;
-}
-
-bool isInt32(const json& value) {
-    if (!value.is_number_integer()) return false;
-    if (value.is_number_unsigned()) return value.get<uint64_t>() <= INT32_MAX;
-    return value.get<int64_t>() >= INT32_MIN && value.get<int64_t>() <= INT32_MAX;
+/** @return the number of 32 bits that an element has, by its index or by a name. */
+std::optional<int32_t> numberOf(const json& element, size_t index) {
+    if (element.size() != 4) return std::nullopt;
+    json value;
+    if (element.is_array()) value = element[index];
+    if (element.is_object()) value = element.value(kFields[index], json());
+    if (!value.is_number_integer()) return std::nullopt;
+    const auto number = value.get<double>();
+    if (number < INT32_MIN || number > INT32_MAX) return std::nullopt;
+    return static_cast<int32_t>(number);
 }
 
 bool parseJson(const std::string& text, HapticEnginePackets* packets, std::string* error) {
@@ -72,14 +62,14 @@ bool parseJson(const std::string& text, HapticEnginePackets* packets, std::strin
     for (size_t i = 0; i < list.size(); ++i) {
         int32_t values[4];
         for (size_t k = 0; k < 4; ++k) {
-            const json* value = field(list[i], k);
-            if (value == nullptr || !isInt32(*value)) {
+            const auto value = numberOf(list[i], k);
+            if (!value) {
                 *error = "packet " + std::to_string(i + 1) +
                          ": not four whole numbers of 32 bits, in a list or as param0, intensity, "
                          "param2 and param3";
                 return false;
             }
-            values[k] = value->get<int32_t>();
+            values[k] = *value;
         }
         append(values, packets);
     }
@@ -89,16 +79,20 @@ bool parseJson(const std::string& text, HapticEnginePackets* packets, std::strin
 }  // namespace
 
 bool parsePacket(const std::string& text, HapticEnginePackets* packets, std::string* error) {
+    if (std::count(text.begin(), text.end(), ',') != 3) {
+        *error = cli::inQuotes(text) + " is not PARAM0,INTENSITY,PARAM2,PARAM3";
+        return false;
+    }
     int32_t values[4];
     std::string_view rest = text;
-    for (size_t i = 0; i < 4; ++i) {
-        const size_t comma = rest.find(',');
-        if ((comma == std::string_view::npos) != (i == 3)) {
-            *error = cli::inQuotes(text) + " is not PARAM0,INTENSITY,PARAM2,PARAM3";
-            return false;
-        }
-        if (!parseNumber(rest.substr(0, comma), &values[i], error)) return false;
-        if (i < 3) rest.remove_prefix(comma + 1);
+    for (int32_t& value : values) {
+        const std::string_view word = trimmed(rest.substr(0, rest.find(',')));
+        rest.remove_prefix(std::min(rest.find(',') + 1, rest.size()));
+        const char* const end = word.data() + word.size();
+        const auto [number, status] = std::from_chars(word.data(), end, value);
+        if (status == std::errc() && number == end) continue;
+        *error = cli::inQuotes(word) + " is no whole number of 32 bits";
+        return false;
     }
     append(values, packets);
     return true;

@@ -13,10 +13,9 @@ std::string plotScript(const Timeline& timeline, PictureFormat format);
 /**
  * Lets gnuplot draw a timeline.
  *
- * @param picture set to the bytes of the picture.
- * @return what is wrong, and what to do; empty where nothing is.
+ * @return the bytes of the picture. @throw std::runtime_error that says what to do.
  */
-std::string drawPicture(const Timeline& timeline, PictureFormat format, std::string* picture);
+std::string drawPicture(const Timeline& timeline, PictureFormat format);
 
 /** @return the timeline for a terminal of some columns. */
 std::string plotText(const Timeline& timeline, size_t columns);

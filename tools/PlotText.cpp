@@ -39,8 +39,6 @@ std::string plotText(const Timeline& timeline, size_t columns) {
     const double perColumn = length / static_cast<double>(width);
     const std::vector<double> strong = strengths(timeline, width, perColumn);
     const auto& segments = timeline.segments;
-    const bool isOpen = std::any_of(segments.begin(), segments.end(),
-                                    [](const auto& each) { return each.isOpen; });
     const bool isBeyond = std::any_of(segments.begin(), segments.end(),
                                       [](const auto& each) { return each.strength > 1; });
 
@@ -62,13 +60,13 @@ std::string plotText(const Timeline& timeline, size_t columns) {
                 static_cast<size_t>((mark.time - timeline.start) / perColumn + kInexact);
         axis[std::min(width - 1, column)] = '|';
     }
-    if (isOpen) axis.back() = '>';
+    if (timeline.goesOn) axis.back() = '>';
     const std::string from = durationInWords(timeline.start);
     const std::string to = durationInWords(timeline.end);
     const size_t between = width - std::min(width, from.size() + to.size());
     const std::string indent(kMargin, ' ');
     text += indent + axis + '\n' + indent + from + std::string(between, ' ') + to + '\n';
-    if (isOpen) text += indent + "> goes on\n";
+    if (timeline.goesOn) text += indent + "> goes on\n";
     if (isBeyond) text += indent + "! beyond full strength\n";
     if (!plotNote(timeline).empty()) text += indent + plotNote(timeline) + '\n';
     text += '\n';

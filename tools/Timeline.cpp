@@ -6,8 +6,11 @@
 #include <cstdint>
 #include <cstdlib>
 #include <sstream>
+#include <utility>
 
 namespace {
+
+using Segment = Timeline::Segment;
 
 /** The full strength of the driver's scales. */
 constexpr double kFull = 10000;
@@ -22,12 +25,10 @@ constexpr long long kEngineMs = 1;
 
 /** @return the amplitude from 1 to 255 that the service turns into an intensity; 0 for none. */
 int amplitudeOf(long long intensity) {
-    if (intensity < 1 || intensity > 10000) return 0;
-    const double exact = static_cast<double>(intensity - 1) * 254 / 9999 + 1;
-    const long amplitude = std::lround(exact);
-    const bool isOne =
-            std::lround(static_cast<double>(amplitude - 1) / 254 * 9999 + 1) == intensity;
-    return isOne ? static_cast<int>(amplitude) : 0;
+    int amplitude = 255;
+    while (amplitude > 0 && std::lround((amplitude - 1) / 254.0 * 9999 + 1) != intensity)
+        --amplitude;
+    return amplitude;
 }
 
 /** @return the strength of the click with an amplitude; nullptr for that of none. */
@@ -38,217 +39,220 @@ const char* clickOf(int amplitude) {
                               : nullptr;
 }
 
+class TimelineMaker {
+  public:
+    void add(const NodeAccess& access) {
+        const bool isGood = access.error.empty();
+        if (access.kind == NodeAccess::kWrite && isGood) {
+            if (mTimeline.marks.empty()) {
+                mFirst = access.time;
+                mTimeline.isTimed = !access.clock.empty();
+            }
+            if (!access.clock.empty()) {
+                // After a clock that was set back, the time goes on from there.
+                mFirst = std::min(mFirst, access.time - mNow);
+                mNow = access.time - mFirst;
+            }
+            write(access.leaf(), access.bytes);
+        }
+        mProbed = access.kind == NodeAccess::kProbe && isGood && access.leaf() == "intensity";
+    }
+
+    Timeline finish() {
+        // A run that nothing ends is drawn for a short while, or as long as all before it.
+        constexpr double kTail = 60;
+        const double last = mSegments.empty() ? mNow : std::max(mNow, mSegments.back().start);
+        if (!mSegments.empty() && mSegments.back().end - last > std::max(kTail, last)) {
+            mSegments.back().end = last + std::max(1.0, last / 20);
+            mTimeline.goesOn = true;
+        }
+        mTimeline.end = mSegments.empty() ? last : std::max(last, mSegments.back().end);
+        return std::move(mTimeline);
+    }
+
+  private:
+    /** What a call that has begun may turn out to be. */
+    enum Begun { kNothing, kOn, kIntensity, kPattern, kEngine };
+
+    void write(const std::string& leaf, const std::string& bytes) {
+        const long long value = strtoll(bytes.c_str(), nullptr, 10);
+        const std::string number = std::to_string(value);
+        if (leaf == "enable") {
+            start(value);
+        } else if (leaf == "duration") {
+            mDuration = value;
+        } else if (leaf == "activate") {
+            activate(value != 0);
+        } else if (leaf == "intensity") {
+            setIntensity(value);
+        } else if (leaf == "haptic_engine") {
+            takePackets(bytes);
+        } else if (leaf == "cp_trigger_index") {
+            choosePattern(value);
+        } else if (leaf == "cp_trigger_queue") {
+            // "PATTERN.PERCENT, REPEATS, DELAY~"
+            const size_t dot = std::min(bytes.find('.'), bytes.size() - 1);
+            const long long percent = strtoll(bytes.c_str() + dot + 1, nullptr, 10);
+            mQueueStrength = static_cast<double>(std::max(0LL, percent)) / 100;
+            mark("pattern " + number + " repeat", kPattern);
+        } else if (leaf == "event_cmd") {
+            set(bytes == "FOLDER_OPEN\n" ? "fold open" : "fold close");
+        } else if (leaf == "ext_control") {
+            set(value == 0 ? "external off" : "external on");
+        } else if (leaf == "multi_freq") {
+            set("frequency " + number);
+        } else if (leaf == "force_touch_intensity") {
+            set("force-touch " + number);
+        }
+    }
+
+    /** @return whether the last call may be still going on. */
+    bool isSoon() const {
+        return !mTimeline.isTimed || mNow - mTimeline.marks.back().time < kSameCall;
+    }
+
+    /** Notes a call; without times it comes after the motor has stopped, or after some s. */
+    void mark(const std::string& label, Begun begun = kNothing, double latest = 1) {
+        if (!mTimeline.isTimed && !mTimeline.marks.empty()) {
+            mNow = std::clamp(mStop + kGap, mNow + kGap, mNow + latest);
+        }
+        mTimeline.marks.push_back({mNow, label});
+        mBegun = begun;
+    }
+    /** Notes a call that does not wait for the motor. */
+    void set(const std::string& label, Begun begun = kNothing) { mark(label, begun, kGap); }
+
+    void setIntensity(long long value) {
+        const double strength = std::max(0.0, static_cast<double>(value) / kFull);
+        // The service looks for the node before it sets an amplitude, and not before an intensity.
+        const int amplitude = mProbed ? amplitudeOf(value) : 0;
+        mStrength = strength;
+        if (mBegun == kOn && isSoon() && clickOf(amplitude) != nullptr) {
+            // It starts the motor before it sets the strength; to the eye that is one.
+            mTimeline.marks.back().label = std::string("click ") + clickOf(amplitude);
+            mSegments.back().strength = strength;
+            mBegun = kNothing;
+            return;
+        }
+        set(amplitude > 0 ? "amplitude " + std::to_string(amplitude)
+                          : "intensity " + std::to_string(value),
+            kIntensity);
+        if (mSegments.empty()) return;
+        const Segment running = mSegments.back();
+        if (running.kind != Segment::kRun || running.end <= mNow) return;
+        stop();
+        mSegments.push_back({mNow, running.end, strength, Segment::kRun});
+    }
+
+    void takePackets(const std::string& text) {
+        std::istringstream numbers(text);
+        int64_t count = 0;
+        int64_t values[4];
+        numbers >> count;
+        mPackets.clear();
+        while (numbers >> values[0] >> values[1] >> values[2] >> values[3]) {
+            mPackets.emplace_back(std::max(0.0, static_cast<double>(values[0]) / 1000),
+                                  std::max(0.0, static_cast<double>(values[1]) / kFull));
+        }
+        mark("engine, " + std::to_string(mPackets.size()) +
+                     (mPackets.size() == 1 ? " packet" : " packets"),
+             kEngine);
+    }
+
+    void choosePattern(long long value) {
+        mQueueStrength = -1;
+        // The text in the queue tells which pattern.
+        if (value == kQueueIndex) return;
+        const std::string label = "pattern " + std::to_string(value);
+        if (mBegun == kIntensity && isSoon()) {
+            mTimeline.marks.back().label = label;
+        } else {
+            mark(label);
+        }
+        mBegun = value == 0 ? kNothing : kPattern;
+    }
+
+    void activate(bool isOn) {
+        if (isOn && mTimeline.isTimed && mBegun < kPattern && mNow < mStop) {
+            // While it runs, the trigger goes on as it is.
+            mark("on " + std::to_string(mDuration) + " (running)");
+        } else if (isOn && mDuration == 0) {
+            mark("on 0");
+        } else {
+            start(isOn ? mDuration : 0);
+        }
+    }
+
+    void start(long long ms) {
+        const Begun begun = mBegun;
+        const bool isUsual =
+                (begun == kEngine && ms == kEngineMs) || (begun == kPattern && ms == kPatternMs);
+        if (!isUsual) mark(ms > 0 ? "on " + std::to_string(ms) : "off");
+        mBegun = begun < kPattern && ms == kClickMs ? kOn : kNothing;
+        stop();
+        mStop = mNow;
+        if (begun == kEngine && ms > 0) {
+            // The packets have their own times; this only sets them off.
+            for (const auto& [length, strength] : mPackets) {
+                mSegments.push_back({mStop, mStop + length, strength, Segment::kPacket});
+                mStop += length;
+            }
+        } else if (ms > 0) {
+            mStop += static_cast<double>(ms) / 1000;
+            const bool isPattern = begun == kPattern;
+            mSegments.push_back({mNow, mStop,
+                                 isPattern && mQueueStrength >= 0 ? mQueueStrength : mStrength,
+                                 isPattern ? Segment::kPattern : Segment::kRun});
+        }
+    }
+
+    void stop() {
+        while (!mSegments.empty() && mSegments.back().start >= mNow)
+            mSegments.pop_back();
+        if (!mSegments.empty()) mSegments.back().end = std::min(mSegments.back().end, mNow);
+    }
+
+    /** Between calls without times, in s. */
+    static constexpr double kGap = 0.02;
+
+    Timeline mTimeline;
+    std::vector<Segment>& mSegments = mTimeline.segments;
+    double mFirst = 0;
+    double mNow = 0;
+    /** When the motor stops, as far as it was told. */
+    double mStop = -1;
+    double mStrength = 1;
+    long long mDuration = 0;
+    Begun mBegun = kNothing;
+    /** Whether the last access found the node of the strength. */
+    bool mProbed = false;
+    /** Strength of the pattern in the driver's queue; less than 0 where it has the motor's. */
+    double mQueueStrength = -1;
+    /** Length in s and strength of the packets that the next start sets off. */
+    std::vector<std::pair<double, double>> mPackets;
+};
+
 }  // namespace
 
-void TimelineMaker::add(const NodeAccess& access) {
-    const bool isStrength = access.leaf() == "intensity";
-    const bool isUsed = access.kind == NodeAccess::kWrite && access.error.empty();
-    if (isUsed) {
-        if (mTimeline.marks.empty()) {
-            mFirst = access.time;
-            mTimeline.isTimed = !access.clock.empty();
-        }
-        if (!access.clock.empty()) {
-            // After a clock that was set back, the time goes on from there.
-            mFirst = std::min(mFirst, access.time - mNow);
-            mNow = access.time - mFirst;
-        }
-        write(access.leaf(), access.bytes);
-    }
-    mProbed = access.kind == NodeAccess::kProbe && isStrength && access.error.empty();
-}
-
-void TimelineMaker::write(const std::string& leaf, const std::string& bytes) {
-    const long long value = strtoll(bytes.c_str(), nullptr, 10);
-    const std::string number = std::to_string(value);
-    if (leaf == "enable") {
-        start(value);
-    } else if (leaf == "duration") {
-        mDuration = value;
-    } else if (leaf == "activate" && value == 0) {
-        start(0);
-    } else if (leaf == "activate" && mTimeline.isTimed && mBegun < kPattern && mNow < mStop) {
-        // While it runs, the trigger goes on as it is.
-        mark("on " + std::to_string(mDuration) + " (running)");
-    } else if (leaf == "activate" && mDuration == 0) {
-        mark("on 0");
-    } else if (leaf == "activate") {
-        start(mDuration);
-    } else if (leaf == "intensity") {
-        writeIntensity(value);
-    } else if (leaf == "haptic_engine") {
-        writeHapticEngine(bytes);
-    } else if (leaf == "cp_trigger_index") {
-        writeIndex(value);
-    } else if (leaf == "cp_trigger_queue") {
-        writeQueue(bytes);
-    } else if (leaf == "event_cmd") {
-        mark(bytes == "FOLDER_OPEN\n" ? "fold open" : "fold close", true);
-    } else if (leaf == "ext_control") {
-        mark(value == 0 ? "external off" : "external on", true);
-    } else if (leaf == "multi_freq") {
-        mark("frequency " + number, true);
-    } else if (leaf == "force_touch_intensity") {
-        mark("force-touch " + number, true);
-    }
-}
-
-bool TimelineMaker::isSoon() const {
-    return !mTimeline.isTimed || mNow - mTimeline.marks.back().time < kSameCall;
-}
-
-void TimelineMaker::mark(const std::string& label, bool isSetting) {
-    constexpr double kGap = 0.02;
-    constexpr double kLongest = 1;
-    if (!mTimeline.isTimed && !mTimeline.marks.empty()) {
-        mNow = isSetting ? mNow + kGap : std::clamp(mStop + kGap, mNow + kGap, mNow + kLongest);
-    }
-    mTimeline.marks.push_back({mNow, label});
-    mBegun = kNothing;
-}
-
-void TimelineMaker::writeIntensity(long long value) {
-    const double strength = std::max(0.0, static_cast<double>(value) / kFull);
-    // The service looks for the node before it sets an amplitude, and not before an intensity.
-    const int amplitude = mProbed ? amplitudeOf(value) : 0;
-    if (mBegun == kOn && isSoon() && clickOf(amplitude) != nullptr) {
-        // It starts the motor before it sets the strength; to the eye that is one.
-        mTimeline.marks.back().label = std::string("click ") + clickOf(amplitude);
-        mTimeline.segments.back().strength = mStrength = strength;
-        mBegun = kNothing;
-        return;
-    }
-    mark(amplitude > 0 ? "amplitude " + std::to_string(amplitude)
-                       : "intensity " + std::to_string(value),
-         true);
-    mBegun = kIntensity;
-    setStrength(strength);
-}
-
-void TimelineMaker::setStrength(double strength) {
-    mStrength = strength;
-    if (mTimeline.segments.empty()) return;
-    Timeline::Segment& running = mTimeline.segments.back();
-    if (running.kind != Timeline::Segment::kRun || running.end <= mNow) return;
-    if (running.start >= mNow) {
-        running.strength = strength;
-        return;
-    }
-    const double end = running.end;
-    running.end = mNow;
-    mTimeline.segments.push_back({mNow, end, strength, Timeline::Segment::kRun, false});
-}
-
-void TimelineMaker::writeHapticEngine(const std::string& text) {
-    std::istringstream numbers(text);
-    int64_t count = 0;
-    int64_t values[4];
-    numbers >> count;
-    mPackets.clear();
-    while (numbers >> values[0] >> values[1] >> values[2] >> values[3]) {
-        mPackets.emplace_back(std::max(0.0, static_cast<double>(values[0]) / 1000),
-                              std::max(0.0, static_cast<double>(values[1]) / kFull));
-    }
-    const std::string plural = mPackets.size() == 1 ? "" : "s";
-    mark("engine, " + std::to_string(mPackets.size()) + " packet" + plural);
-    mBegun = kEngine;
-}
-
-void TimelineMaker::writeIndex(long long value) {
-    mQueueStrength = -1;
-    // The text in the queue tells which pattern.
-    if (value == kQueueIndex) return;
-    const std::string label = "pattern " + std::to_string(value);
-    if (mBegun == kIntensity && isSoon()) {
-        mTimeline.marks.back().label = label;
-    } else {
-        mark(label);
-    }
-    mBegun = value == 0 ? kNothing : kPattern;
-}
-
-void TimelineMaker::writeQueue(const std::string& text) {
-    // "PATTERN.PERCENT, REPEATS, DELAY~"
-    char* rest = nullptr;
-    const long long pattern = strtoll(text.c_str(), &rest, 10);
-    const long long percent = *rest == '.' ? strtoll(rest + 1, nullptr, 10) : 0;
-    mQueueStrength = static_cast<double>(std::max(0LL, percent)) / 100;
-    mark("pattern " + std::to_string(pattern) + " repeat");
-    mBegun = kPattern;
-}
-
-void TimelineMaker::start(long long ms) {
-    const Begun begun = mBegun;
-    if (begun == kEngine && ms > 0) {
-        // The packets have their own times; this only sets them off.
-        if (ms != kEngineMs) mark("on " + std::to_string(ms));
-        stop();
-        double time = mNow;
-        for (const auto& [length, strength] : mPackets) {
-            mTimeline.segments.push_back(
-                    {time, time + length, strength, Timeline::Segment::kPacket, false});
-            time += length;
-        }
-        mStop = time;
-        mBegun = kNothing;
-        return;
-    }
-    if (begun != kPattern || ms != kPatternMs) mark(ms > 0 ? "on " + std::to_string(ms) : "off");
-    stop();
-    mStop = mNow;
-    mBegun = kNothing;
-    if (ms <= 0) return;
-    mStop = mNow + static_cast<double>(ms) / 1000;
-    const bool isQueued = begun == kPattern && mQueueStrength >= 0;
-    mTimeline.segments.push_back(
-            {mNow, mStop, isQueued ? mQueueStrength : mStrength,
-             begun == kPattern ? Timeline::Segment::kPattern : Timeline::Segment::kRun, false});
-    if (ms == kClickMs && begun != kPattern) mBegun = kOn;
-}
-
-void TimelineMaker::stop() {
-    auto& segments = mTimeline.segments;
-    while (!segments.empty() && segments.back().start >= mNow)
-        segments.pop_back();
-    if (!segments.empty()) segments.back().end = std::min(segments.back().end, mNow);
-}
-
-Timeline TimelineMaker::finish() {
-    // A run that nothing ends is drawn for a short while, or as long as all before it.
-    constexpr double kTail = 60;
-    auto& segments = mTimeline.segments;
-    double last = mNow;
-    for (const Timeline::Segment& segment : segments)
-        last = std::max(last, segment.start);
-    for (Timeline::Segment& segment : segments) {
-        if (segment.end - last > std::max(kTail, last)) {
-            segment.end = last + std::max(1.0, last / 20);
-            segment.isOpen = true;
-        }
-        mTimeline.end = std::max(mTimeline.end, segment.end);
-    }
-    mTimeline.end = std::max(mTimeline.end, last);
-    return std::move(mTimeline);
+Timeline makeTimeline(const std::vector<NodeAccess>& accesses) {
+    TimelineMaker maker;
+    for (const NodeAccess& access : accesses)
+        maker.add(access);
+    return maker.finish();
 }
 
 void cut(Timeline* timeline, double from, double to) {
-    timeline->start = std::max(timeline->start, from);
-    timeline->end = std::min(timeline->end, to);
-    auto& segments = timeline->segments;
-    auto& marks = timeline->marks;
-    const auto isOutside = [&](const auto& start, const auto& end) {
-        return start > timeline->end || end < timeline->start;
-    };
-    segments.erase(
-            std::remove_if(segments.begin(), segments.end(),
-                           [&](const auto& each) { return isOutside(each.start, each.end); }),
-            segments.end());
-    marks.erase(std::remove_if(marks.begin(), marks.end(),
-                               [&](const auto& each) { return isOutside(each.time, each.time); }),
-                marks.end());
-    for (Timeline::Segment& segment : segments) {
-        segment.start = std::max(segment.start, timeline->start);
-        segment.isOpen = segment.isOpen || segment.end > timeline->end;
-        segment.end = std::min(segment.end, timeline->end);
+    timeline->goesOn = timeline->goesOn && to >= timeline->end;
+    const double start = timeline->start = std::max(timeline->start, from);
+    const double end = timeline->end = std::min(timeline->end, to);
+    for (Segment segment : std::exchange(timeline->segments, {})) {
+        if (segment.start > end || segment.end < start) continue;
+        timeline->goesOn = timeline->goesOn || segment.end > end;
+        segment.start = std::max(segment.start, start);
+        segment.end = std::min(segment.end, end);
+        timeline->segments.push_back(segment);
+    }
+    for (Timeline::Mark& mark : std::exchange(timeline->marks, {})) {
+        if (mark.time >= start && mark.time <= end) timeline->marks.push_back(std::move(mark));
     }
 }

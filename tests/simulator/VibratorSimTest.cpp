@@ -235,9 +235,10 @@ TEST_F(VibratorSimTest, RunCleansUpWhateverEndsIt) {
         // A shell starts what runs in its background with some of these ignored.
         if (signal != SIGKILL) ::signal(signal, SIG_DFL);
         // The daemon's pid stands in its log.
+        // The shell is gone before a signal comes: it might take one for that of its last child.
         const std::string script = std::string(trap) +
                                    "; { grep -om1 '[0-9]*):' $VIBRATOR_SIM_DIR/log; dirname "
-                                   "$HWBINDER_DIR; } >$0.new; mv $0.new $0; "
+                                   "$HWBINDER_DIR; } >$0.new; (sleep 0.1; mv $0.new $0) & "
                                    "exec sleep 10";
         ChildProcess session;
         session.startProgram({VIBRATOR_SIM, "run", "bash", "-c", script, ready}, "/dev/null", {});

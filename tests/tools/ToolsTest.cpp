@@ -12,7 +12,9 @@
 #include <map>
 #include <nlohmann/json.hpp>
 #include <pugixml.hpp>
+#include <set>
 #include <sstream>
+#include <tuple>
 
 namespace {
 
@@ -251,7 +253,7 @@ TEST_F(ToolsTest, WatchFollowsAFileThatGrowsAndBeginsAnew) {
         EXPECT_EQ(run(words, repeated("some text\n", 150)).errors, complaint);
 }
 
-TEST(LogReaderTest, TellsTimesAndRefusals) {
+TEST(AccessReaderTest, TellsTimesAndRefusals) {
     const std::string write = "QorVibrator-HAL2.1(  539): << writeNode node OK";
     const struct {
         std::string start;
@@ -266,7 +268,7 @@ TEST(LogReaderTest, TellsTimesAndRefusals) {
             {"[   77.500000] host vibrator[539]: D/", "77.500000", 77.5},
             {"1732486683.125   539   541 D ", "1732486683.125", 1732486683.125 - 20051 * 86400.0}};
     for (const auto& [start, clock, seconds] : forms) {
-        LogReader reader;
+        AccessReader reader(true);
         reader.read(start +
                     "QorVibrator-HAL2.1(  539): >> writeNode node:/sys/class/leds/vibrator/state "
                     "val:1");
@@ -294,7 +296,7 @@ TEST(LogReaderTest, TellsTimesAndRefusals) {
     for (const auto& [message, refusal] : refusals) {
         for (const std::string start :
              {"E QorVibrator-HAL2.1: ", "E/QorVibrator-HAL2.1(  539): "}) {
-            const auto access = LogReader().read(start + message);
+            const auto access = AccessReader(true).read(start + message);
             ASSERT_EQ(access.has_value(), !refusal.empty()) << message;
             if (!access) continue;
             EXPECT_EQ(access->kind, NodeAccess::kRefusal);
@@ -305,292 +307,239 @@ TEST(LogReaderTest, TellsTimesAndRefusals) {
 }
 
 /**
- * @return a timeline of writes, like "activate 1" at 250 ms, and probes, "?intensity"; without a
- *     time for those at less than 0.
+ * @return a timeline of accesses, like "250 activate 1; 260 ?intensity": a write at 250 ms, then a
+ *     probe; -1 for those without a time.
  */
-Timeline timelineOf(const std::vector<std::pair<double, std::string>>& accesses) {
-    TimelineMaker maker;
-    for (const auto& [ms, text] : accesses) {
-        const size_t blank = std::min(text.find(' '), text.size());
-        const bool isProbe = text[0] == '?';
+Timeline timelineOf(const std::string& text) {
+    std::vector<NodeAccess> accesses;
+    std::istringstream all(text);
+    for (std::string each; std::getline(all >> std::ws, each, ';');) {
+        std::istringstream words(each);
+        double ms = 0;
         NodeAccess access;
+        words >> ms >> access.node >> std::ws;
+        std::getline(words, access.bytes);
+        access.bytes += '\n';
         access.time = 100 + ms / 1000;
         access.clock = ms < 0 ? "" : "time";
-        access.node = "leds/" + text.substr(isProbe ? 1 : 0, blank);
-        access.kind = isProbe ? NodeAccess::kProbe : NodeAccess::kWrite;
-        if (!isProbe) access.bytes = text.substr(std::min(blank + 1, text.size())) + "\n";
-        maker.add(access);
+        access.kind = access.node[0] == '?' ? NodeAccess::kProbe : NodeAccess::kWrite;
+        access.node.erase(0, access.node.find_first_not_of('?')).insert(0, "leds/");
+        accesses.push_back(access);
+        if (access.kind == NodeAccess::kProbe) continue;
         // What the driver has not taken counts for nothing.
-        access.kind = NodeAccess::kWrite;
         access.bytes = "700\n";
         access.error = "EINVAL";
-        if (!isProbe) maker.add(access);
+        accesses.push_back(access);
     }
-    return maker.finish();
+    return makeTimeline(accesses);
 }
 
-/** @return a timeline's calls, and its segments in ms and %, like "on 20 at 0" and "0-20 100 run".
- */
-Words inWords(const Timeline& timeline) {
-    Words words;
-    for (const Timeline::Mark& mark : timeline.marks) {
-        std::ostringstream text;
-        text << mark.label << " at " << std::round(mark.time * 1000);
-        words.push_back(text.str());
-    }
+/** @return a timeline's calls, and its segments in ms and %: "on 20 at 0; 0-20 100 run". */
+std::string inWords(const Timeline& timeline) {
+    std::ostringstream text;
+    for (const Timeline::Mark& mark : timeline.marks)
+        text << mark.label << " at " << std::round(mark.time * 1000) << "; ";
     for (const Timeline::Segment& segment : timeline.segments) {
-        std::ostringstream text;
-        const char* const kinds[] = {" run", " packet", " pattern"};
+        const char* const kinds[] = {" run; ", " packet; ", " pattern; "};
         text << std::round(segment.start * 1000) << '-' << std::round(segment.end * 1000) << ' '
-             << segment.strength * 100 << kinds[segment.kind] << (segment.isOpen ? " open" : "");
-        words.push_back(text.str());
+             << segment.strength * 100 << kinds[segment.kind];
     }
-    return words;
+    return text.str() + (timeline.goesOn ? "goes on" : "");
 }
 
 TEST(TimelineTest, ShowsWhatTheDriverWasTold) {
-    using Accesses = std::vector<std::pair<double, std::string>>;
-    const std::pair<Accesses, Words> cases[] = {
-            {{{1000, "enable 500"}}, {"on 500 at 0", "0-500 100 run"}},
-            {{{1000, "enable 500"}, {1250, "enable 500"}, {1500, "enable 0"}},
-             {"on 500 at 0", "on 500 at 250", "off at 500", "0-250 100 run", "250-500 100 run"}},
-            {{{0, "duration 500"},
-              {0, "activate 1"},
-              {250, "duration 900"},
-              {250, "activate 1"},
-              {600, "activate 0"},
-              {700, "duration 0"},
-              {700, "activate 1"}},
-             {"on 500 at 0", "on 900 (running) at 250", "off at 600", "on 0 at 700",
-              "0-500 100 run"}},
+    const std::pair<std::string, std::string> cases[] = {
+            {"1000 enable 500", "on 500 at 0; 0-500 100 run"},
+            {"1000 enable 500; 1250 enable 500; 1500 enable 0",
+             "on 500 at 0; on 500 at 250; off at 500; 0-250 100 run; 250-500 100 run"},
+            {"0 duration 500; 0 activate 1; 250 duration 900; 250 activate 1; 600 activate 0; 700 "
+             "duration 0; 700 activate 1",
+             "on 500 at 0; on 900 (running) at 250; off at 600; on 0 at 700; 0-500 100 run"},
             // A clock that is set back.
-            {{{500, "enable 100"}, {900, "enable 100"}, {0, "multi_freq 1"}, {50, "multi_freq 2"}},
-             {"on 100 at 0", "on 100 at 400", "frequency 1 at 400", "frequency 2 at 450",
-              "0-100 100 run", "400-500 100 run"}},
-            {{{0, "enable 20"}, {1, "?intensity"}, {2, "intensity 1379"}},
-             {"click light at 0", "0-20 13.79 run"}},
-            {{{0, "enable 20"}, {1, "?intensity"}, {2, "intensity 5001"}, {2, "intensity 10000"}},
-             {"click medium at 0", "intensity 10000 at 2", "0-2 50.01 run", "2-20 100 run"}},
+            {"500 enable 100; 900 enable 100; 0 multi_freq 1; 50 multi_freq 2",
+             "on 100 at 0; on 100 at 400; frequency 1 at 400; frequency 2 at 450; 0-100 100 run; "
+             "400-500 100 run"},
+            {"0 enable 20; 1 ?intensity; 2 intensity 1379", "click light at 0; 0-20 13.79 run"},
+            {"0 enable 20; 1 ?intensity; 2 intensity 5001; 2 intensity 10000",
+             "click medium at 0; intensity 10000 at 2; 0-2 50.01 run; 2-20 100 run"},
             // Not a click: without the probe, another strength, another time, too late.
-            {{{0, "enable 20"},
-              {2, "intensity 10000"},
-              {100, "enable 20"},
-              {101, "?intensity"},
-              {102, "intensity 5040"},
-              {200, "enable 30"},
-              {201, "?intensity"},
-              {202, "intensity 10000"},
-              {300, "enable 20"},
-              {351, "?intensity"},
-              {351, "intensity 1"}},
-             {"on 20 at 0", "intensity 10000 at 2", "on 20 at 100", "amplitude 129 at 102",
-              "on 30 at 200", "amplitude 255 at 202", "on 20 at 300", "amplitude 1 at 351",
-              "0-2 100 run", "2-20 100 run", "100-102 100 run", "102-120 50.4 run",
-              "200-202 50.4 run", "202-230 100 run", "300-320 100 run"}},
-            {{{0, "intensity 5000"},
-              {0, "enable 500"},
-              {250, "?intensity"},
-              {250, "intensity 2500"}},
-             {"intensity 5000 at 0", "on 500 at 0", "intensity 2500 at 250", "0-250 50 run",
-              "250-500 25 run"}},
-            {{{0, "haptic_engine 8 125 5000 0 0 250 20000 0 0"},
-              {9, "enable 1"},
-              {100, "enable 0"}},
-             {"engine, 2 packets at 0", "off at 100", "9-100 50 packet"}},
-            {{{0, "haptic_engine 4 -1 -5 0 0"}, {0, "enable 7"}},
-             {"engine, 1 packet at 0", "on 7 at 0", "0-0 0 packet"}},
-            {{{0, "duration 900"},
-              {0, "activate 1"},
-              {9, "haptic_engine 4 30 20000 0 0"},
-              {9, "duration 1"},
-              {9, "activate 1"}},
-             {"on 900 at 0", "engine, 1 packet at 9", "0-9 100 run", "9-39 200 packet"}},
-            {{{0, "intensity 5000"}, {1, "cp_trigger_index 7"}, {2, "enable 1000"}},
-             {"pattern 7 at 0", "2-1002 50 pattern"}},
-            {{{0, "cp_trigger_index 7"},
-              {2, "enable 900"},
-              {2000, "cp_trigger_index 0"},
-              {2000, "enable 1000"}},
-             {"pattern 7 at 0", "on 900 at 2", "pattern 0 at 2000", "on 1000 at 2000",
-              "2-902 100 pattern", "2000-3000 100 run"}},
-            {{{0, "intensity 5000"},
-              {60, "cp_trigger_index 65534"},
-              {60, "cp_trigger_queue 3.25, 10, 0~"},
-              {61, "enable 1000"},
-              {500, "enable 0"},
-              {500, "enable 20"}},
-             {"intensity 5000 at 0", "pattern 3 repeat at 60", "off at 500", "on 20 at 500",
-              "61-500 25 pattern", "500-520 50 run"}},
-            {{{0, "cp_trigger_queue 3.25, 10, 0~"}, {0, "cp_trigger_index 7"}, {0, "enable 1000"}},
-             {"pattern 3 repeat at 0", "pattern 7 at 0", "0-1000 100 pattern"}},
-            {{{0, "ext_control 1"},
-              {0, "ext_control 0"},
-              {0, "force_touch_intensity 9"},
-              {0, "event_cmd FOLDER_OPEN"},
-              {0, "event_cmd FOLDER_CLOSE"}},
-             {"external on at 0", "external off at 0", "force-touch 9 at 0", "fold open at 0",
-              "fold close at 0"}},
-            {{{0, "enable 61100"}}, {"on 61100 at 0", "0-1000 100 run open"}},
-            {{{0, "enable 59000"}}, {"on 59000 at 0", "0-59000 100 run"}},
-            {{{0, "enable 9"}, {100000, "enable 99000"}, {100000, "intensity 1"}},
-             {"on 9 at 0", "on 99000 at 100000", "intensity 1 at 100000", "0-9 100 run",
-              "100000-199000 0.01 run"}},
+            {"0 enable 20; 2 intensity 10000; 100 enable 20; 101 ?intensity; 102 intensity 5040; "
+             "200 enable 30; 201 ?intensity; 202 intensity 10000; 300 enable 20; 351 ?intensity; "
+             "351 intensity 1",
+             "on 20 at 0; intensity 10000 at 2; on 20 at 100; amplitude 129 at 102; on 30 at 200; "
+             "amplitude 255 at 202; on 20 at 300; amplitude 1 at 351; 0-2 100 run; 2-20 100 run; "
+             "100-102 100 run; 102-120 50.4 run; 200-202 50.4 run; 202-230 100 run; 300-320 100 "
+             "run"},
+            {"0 intensity 5000; 0 enable 500; 250 ?intensity; 250 intensity 2500",
+             "intensity 5000 at 0; on 500 at 0; intensity 2500 at 250; 0-250 50 run; 250-500 25 "
+             "run"},
+            {"0 haptic_engine 8 125 5000 0 0 250 20000 0 0; 9 enable 1; 100 enable 0",
+             "engine, 2 packets at 0; off at 100; 9-100 50 packet"},
+            {"0 haptic_engine 4 -1 -5 0 0; 0 enable 7",
+             "engine, 1 packet at 0; on 7 at 0; 0-0 0 packet"},
+            {"0 duration 900; 0 activate 1; 9 haptic_engine 4 30 20000 0 0; 9 duration 1; 9 "
+             "activate 1",
+             "on 900 at 0; engine, 1 packet at 9; 0-9 100 run; 9-39 200 packet"},
+            {"0 intensity 5000; 1 cp_trigger_index 7; 2 enable 1000",
+             "pattern 7 at 0; 2-1002 50 pattern"},
+            {"0 cp_trigger_index 7; 2 enable 900; 2000 cp_trigger_index 0; 2000 enable 1000",
+             "pattern 7 at 0; on 900 at 2; pattern 0 at 2000; on 1000 at 2000; 2-902 100 pattern; "
+             "2000-3000 100 run"},
+            {"0 intensity 5000; 60 cp_trigger_index 65534; 60 cp_trigger_queue 3.25, 10, 0~; 61 "
+             "enable 1000; 500 enable 0; 500 enable 20",
+             "intensity 5000 at 0; pattern 3 repeat at 60; off at 500; on 20 at 500; 61-500 25 "
+             "pattern; 500-520 50 run"},
+            {"0 cp_trigger_queue 3.25, 10, 0~; 0 cp_trigger_index 7; 0 enable 1000",
+             "pattern 3 repeat at 0; pattern 7 at 0; 0-1000 100 pattern"},
+            {"0 ext_control 1; 0 ext_control 0; 0 force_touch_intensity 9; 0 event_cmd "
+             "FOLDER_OPEN; 0 event_cmd FOLDER_CLOSE",
+             "external on at 0; external off at 0; force-touch 9 at 0; fold open at 0; fold close "
+             "at 0"},
+            {"0 enable 61100", "on 61100 at 0; 0-1000 100 run; goes on"},
+            {"0 enable 59000", "on 59000 at 0; 0-59000 100 run"},
+            {"0 enable 9; 100000 enable 99000; 100000 intensity 1",
+             "on 9 at 0; on 99000 at 100000; intensity 1 at 100000; 0-9 100 run; 100000-199000 "
+             "0.01 run"},
             // Without times, each call follows the one before.
-            {{{-1, "enable 20"},
-              {-1, "?intensity"},
-              {-1, "intensity 1379"},
-              {-1, "enable 500"},
-              {-1, "intensity 5000"},
-              {-1, "enable 5000"},
-              {-1, "enable 0"}},
-             {"click light at 0", "on 500 at 40", "intensity 5000 at 60", "on 5000 at 560",
-              "off at 1560", "0-20 13.79 run", "40-60 13.79 run", "60-540 50 run",
-              "560-1560 50 run"}},
+            {"-1 enable 20; -1 ?intensity; -1 intensity 1379; -1 enable 500; -1 intensity 5000; -1 "
+             "enable 5000; -1 enable 0",
+             "click light at 0; on 500 at 40; intensity 5000 at 60; on 5000 at 560; off at 1560; "
+             "0-20 13.79 run; 40-60 13.79 run; 60-540 50 run; 560-1560 50 run"},
     };
-    for (const auto& [accesses, words] : cases)
-        EXPECT_EQ(inWords(timelineOf(accesses)), words) << accesses[0].second;
-
-    Timeline part = timelineOf({{0, "enable 100"}, {200, "enable 100"}, {400, "enable 100"}});
-    cut(&part, 0.25, 0.45);
-    EXPECT_EQ(inWords(part), (Words{"on 100 at 400", "250-300 100 run", "400-450 100 run open"}));
-    EXPECT_DOUBLE_EQ(part.start + part.end, 0.7);
-}
-
-/** @return the lines of a plot's script that hold a text, of which a final $ is their end. */
-Words scriptLines(const Timeline& timeline, const std::string& text) {
-    Words found;
-    std::istringstream lines(plotScript(timeline, PictureFormat::kSvg));
-    for (std::string line; std::getline(lines, line);) {
-        if ((line + '$').find(text) != std::string::npos) found.push_back(line);
+    for (const auto& [accesses, words] : cases) {
+        const std::string shown = inWords(timelineOf(accesses));
+        EXPECT_EQ(shown.substr(0, shown.find_last_not_of("; ") + 1), words) << accesses;
     }
-    return found;
+    Timeline part = timelineOf("0 enable 100; 200 enable 100; 400 enable 100");
+    cut(&part, 0.25, 0.45);
+    EXPECT_EQ(inWords(part), "on 100 at 400; 250-300 100 run; 400-450 100 run; goes on");
+    EXPECT_DOUBLE_EQ(part.start + part.end, 0.7);
+    part = timelineOf("0 enable 100; 200 enable 100000");
+    cut(&part, 0, 10);
+    EXPECT_TRUE(part.goesOn) << "as before";
+    cut(&part, 0, 0.15);
+    EXPECT_EQ(inWords(part), "on 100 at 0; 0-100 100 run; ");
 }
 
-TEST(PlotTest, ScriptPutsEverythingInItsPlace) {
-    const Timeline timeline = timelineOf({{-1, "enable 100"},
-                                          {-1, "haptic_engine 8 3 20000 0 0 100 5000 0 0"},
-                                          {-1, "enable 1"},
-                                          {-1, "cp_trigger_index 4"},
-                                          {-1, "enable 300"},
-                                          {-1, "enable 20"},
-                                          {-1, "intensity 20000"},
-                                          {-1, "enable 90000"}});
-    EXPECT_EQ(plotScript(timeline, PictureFormat::kSvg),
-              R"(set terminal svg size 1000,537.1 font 'sans-serif,14' background '#ffffff'
-set termoption noenhanced
-set border 3 lc rgb '#444444'
-set tics nomirror out
-set lmargin at screen 0.084
-set rmargin at screen 0.88
-set bmargin at screen 0.197356172
-set tmargin at screen 0.606963322
-set label 'What the driver was told: 7 calls in 1.623 s' at screen 0.016, screen 0.959039285 font ',16'
-set xrange [0:1639.23]
-set xtics 200
-set xlabel 'time in ms' offset 0,0.4
-set yrange [0:100]
-set ytics 25
-set grid ytics lc rgb '#dddddd' lt 1
-set ylabel 'strength in %' offset 1,0
-set key at screen 0.88, screen 0.0446844163 right center horizontal Left reverse samplen 1.5
-set label 'The log has no times: each call is drawn after the one before.' at screen 0.016, screen 0.0446844163 font ',12'
-set label 'on 100' at 0, graph 1.02 rotate by 45 tc rgb '#222222'
-set label 'engine, 2 packets' at 120, graph 1.02 rotate by 45 tc rgb '#222222'
-set label 'pattern 4, on 300' at 243, graph 1.02 rotate by 45 tc rgb '#222222'
-set label 'on 20, intensity 20000 +1' at 583, graph 1.02 rotate by 45 tc rgb '#222222'
-set arrow from 1623,50 rto 49.4240201,0 filled lw 2 lc rgb '#444444'
-set label 'goes on' at 1684.78003,50
-$on << END
-0 98.9703329 100
-583 601.970333 100
-623 1621.97033 100
-END
-$packets << END
-120 123 100
-123 221.970333 50
-END
-$patterns << END
-263 561.970333 100
-END
-$beyond << END
-120 123 100
-623 1621.97033 100
-END
+/** @return what a script or a picture has between two texts, the first ones. */
+std::string between(const std::string& text, const std::string& start, const std::string& end) {
+    const size_t found = text.find(start);
+    if (found == std::string::npos) return "no " + start;
+    const size_t first = found + start.size();
+    return text.substr(first, text.find(end, first) - first);
+}
+
+/** @return a block of the data that gnuplot gets. */
+std::string dataOf(const Timeline& timeline, const std::string& name) {
+    return between(plotScript(timeline, PictureFormat::kSvg), "$" + name + " << END\n", "END\n");
+}
+
+/** @return the texts in a picture. */
+std::multiset<std::string> textsOf(const pugi::xml_node& picture) {
+    std::multiset<std::string> texts;
+    for (const auto& each : picture.select_nodes("//text"))
+        texts.insert(each.node().first_child().value() +
+                     std::string(each.node().child_value("tspan")));
+    return texts;
+}
+
+TEST(PlotTest, ScriptHasEverythingInItsPlace) {
+    const Timeline timeline = timelineOf(
+            "-1 enable 100; -1 haptic_engine 8 3 20000 0 0 100 5000 0 0; -1 enable 1; "
+            "-1 cp_trigger_index 4; -1 enable 300; -1 enable 20; -1 intensity 20000; "
+            "-1 enable 90000");
+    EXPECT_EQ(between(plotScript(timeline, PictureFormat::kSvg), "", "# "), R"(terminal = 'svg'
+title = 'What the driver was told: 7 calls in 1.623 s'
+note = 'The log has no times: each call is drawn after the one before.'
+start = 0
+length = 1.63923
+columns = 796
+going_on = 100
 $calls << END
 0
-120
-243
-263
-583
-603
-623
+0.12
+0.243
+0.263
+0.583
+0.603
+0.623
 END
-plot $calls using 1:(100) with impulses lc rgb '#999999' dt 3 notitle, $on using 1:3:1:2:(0):3 with boxxyerror fs solid noborder lc rgb '#0072b2' title 'motor on', $packets using 1:3:1:2:(0):3 with boxxyerror fs solid noborder lc rgb '#e69f00' title 'haptic engine packets', $patterns using 1:3:1:2:(0):3 with boxxyerror fs solid noborder lc rgb '#009e73' title 'stored pattern', $beyond using 1:3:1:2:(96):3 with boxxyerror fs solid noborder lc rgb '#d55e00' title 'beyond full strength'
+$labels << END
+0 on 100
+0.12 engine, 2 packets
+0.243 pattern 4, on 300
+0.583 on 20, intensity 20000 +1
+END
+$run << END
+0 0.0989703329 0 100
+0.583 0.601970333 0 100
+0.623 1.62197033 0 100
+END
+$packet << END
+0.12 0.123 0 100
+0.123 0.22197033 0 50
+END
+$pattern << END
+0.263 0.56197033 0 100
+END
+$beyond << END
+0.12 0.123 96 100
+0.623 1.62197033 96 100
+END
 )");
-    EXPECT_EQ(plotScript(timeline, PictureFormat::kPng)
-                      .find("set terminal pngcairo fontscale 0.75 size 1000,"),
-              0U);
+    EXPECT_EQ(plotScript(timeline, PictureFormat::kPng).find("terminal = 'pngcairo "), 0U);
 }
 
 TEST(PlotTest, AxesSuitTheLength) {
-    const struct {
-        double length;
-        std::string tics;
-        std::string title;
-    } cases[] = {{0.019, "2", "ms"},
-                 {1.9, "200", "ms"},
-                 {1.99, "0.5", "s"},
-                 {49, "5", "s"},
-                 {118, "20", "s"},
-                 {119, "15 time format '%tM:%tS'", "min:s"},
-                 {7000, "900 time format '%tM:%tS'", "min:s"},
-                 {7200, "900 time format '%tH:%tM'", "h:min"},
-                 {100 * 86400, "950400 time format '%tH:%tM'", "h:min"}};
-    for (const auto& [length, tics, title] : cases) {
+    const std::tuple<double, std::string, std::string> cases[] = {
+            {0.019, "14", "ms"},     {1.9, "1800", "ms"},       {1.99, "1.5", "s"},
+            {118, "80", "s"},        {119, "01:45", "min:s"},   {7000, "110:00", "min:s"},
+            {7200, "1:45", "h:min"}, {200000, "48:00", "h:min"}};
+    for (const auto& [length, tic, title] : cases) {
         Timeline timeline;
         timeline.marks.push_back({0, "off"});
         timeline.end = length;
-        EXPECT_EQ(scriptLines(timeline, "set xtics "), Words{"set xtics " + tics}) << length;
-        EXPECT_EQ(scriptLines(timeline, "set xlabel 'time in " + title + "'").size(), 1U) << length;
+        pugi::xml_document svg;
+        ASSERT_TRUE(svg.load_string(drawPicture(timeline, PictureFormat::kSvg).c_str()));
+        const auto texts = textsOf(svg);
+        EXPECT_EQ(texts.count("time in " + title), 1U) << length;
+        EXPECT_EQ(texts.count(tic), 1U) << length << testing::PrintToString(texts);
     }
-    // Its end is not on the frame.
-    EXPECT_EQ(scriptLines(timelineOf({{0, "enable 20"}}), "set xrange"),
-              Words{"set xrange [0:20.2]"});
 }
 
 TEST(PlotTest, CrowdsAreThinnedAndNothingLeavesItsQuotes) {
-    using Segment = Timeline::Segment;
     Timeline timeline;
     timeline.end = 100;
     for (int i = 0; i < 10000; ++i) {
         timeline.marks.push_back({i * 0.01, "off"});
         timeline.segments.push_back(
-                {i * 0.01, i * 0.01 + 0.001, i % 7 == 0 ? 0.5 : 0.25, Segment::kRun, false});
+                {i * 0.01, i * 0.01 + 0.001, i % 7 == 0 ? 0.5 : 0.25, Timeline::Segment::kRun});
     }
-    const Words labels = scriptLines(timeline, "rotate by 45");
-    ASSERT_GT(labels.size(), 30U);
-    EXPECT_LT(labels.size(), 50U);
-    EXPECT_EQ(labels[0].find("set label 'off, off, off, off +"), 0U) << labels[0];
-    EXPECT_EQ(labels[0].find(" +"), labels[0].rfind(" +"));
+    const auto linesOf = [&](const std::string& block) {
+        const std::string data = dataOf(timeline, block);
+        return std::count(data.begin(), data.end(), '\n');
+    };
+    EXPECT_NEAR(static_cast<double>(linesOf("labels")), 37, 1);
+    EXPECT_NEAR(static_cast<double>(linesOf("calls")), 256, 10);
+    EXPECT_EQ(dataOf(timeline, "labels").find("0 off, off, off, off +263\n2.67 off, off, "), 0U)
+            << dataOf(timeline, "labels");
     // A bar holds what is in its pixel.
-    EXPECT_LE(scriptLines(timeline, " 25$").size(), 2U) << "the tics, and the last bar";
-    EXPECT_GT(scriptLines(timeline, " 50$").size(), 700U);
-    EXPECT_LT(scriptLines(timeline, " 50$").size(), 800U);
+    EXPECT_NEAR(static_cast<double>(linesOf("run")), 750, 50);
+    const std::string bars = dataOf(timeline, "run");
+    EXPECT_GE(bars.find(" 25\n"), bars.size() - 4) << "only the last bar may have no other";
 
     timeline = {};
     timeline.end = 1;
     timeline.marks.push_back({0, "it's `d`\n\"\\ <&> @x \xff"});
-    EXPECT_EQ(scriptLines(timeline, "graph 1.02"), Words{"set label 'it?s ?d???? ??"
-                                                         "? ?x ?' at 0, graph 1.02 rotate by 45 tc "
-                                                         "rgb '#222222'"});
+    EXPECT_EQ(dataOf(timeline, "labels"),
+              "0 it?s ?d???? ??"
+              "? ?x ?\n");
 }
 
 TEST(PlotTest, TextFitsTheColumns) {
-    const Timeline timeline = timelineOf({{0, "enable 100"},
-                                          {200, "haptic_engine 4 100 20000 0 0"},
-                                          {200, "enable 1"},
-                                          {300, "intensity 1250"},
-                                          {300, "enable 100000"}});
+    const Timeline timeline = timelineOf(
+            "0 enable 100; 200 haptic_engine 4 100 20000 0 0; 200 enable 1; 300 intensity 1250; "
+            "300 enable 100000");
     const std::string wanted =
             "What the driver was told: 4 calls in 1.3 s\n"
             "100 % ██  !!                    \n"
@@ -608,20 +557,20 @@ TEST(PlotTest, TextFitsTheColumns) {
             "      300 ms  intensity 1250\n"
             "      300 ms  on 100000\n";
     EXPECT_EQ(plotText(timeline, 32), wanted);
-    Timeline part = timelineOf({{0, "enable 100"}, {200, "enable 100"}});
+    Timeline part = timelineOf("0 enable 100; 200 enable 100");
     cut(&part, 0.15, 0.25);
     EXPECT_NE(plotText(part, 26).find("\n 20 %           ██████████\n      ----------|-------->\n"),
               std::string::npos)
             << plotText(part, 26);
-    std::vector<std::pair<double, std::string>> many;
+    std::string many;
     for (int i = 0; i < 42; ++i)
-        many.emplace_back(i * 60000.0, "enable 0");
+        many += std::to_string(i * 60000) + " enable 0; ";
     const std::string text = plotText(timelineOf(many), 0);
     EXPECT_NE(text.find("\n   38:00 min  off\n   39:00 min  off\n  and 2 more calls;"),
               std::string::npos)
             << text;
     EXPECT_NE(text.find("|\n      0 ms       41:00 min\n\n"), std::string::npos) << text;
-    EXPECT_NE(plotText(timelineOf({{-1, "enable 5"}}), 80).find("The log has no times"),
+    EXPECT_NE(plotText(timelineOf("-1 enable 5"), 80).find("The log has no times"),
               std::string::npos);
 }
 
@@ -641,32 +590,22 @@ TEST_F(ToolsTest, PicturesShowTheCallsInTheirPlaces) {
               0U)
             << root.child_value("desc");
     EXPECT_NE(std::string(root.child_value("style")).find("dark"), std::string::npos);
-    Words texts;
-    std::map<std::string, std::pair<double, double>> bars;
-    const auto visit = [&](const auto& self, const pugi::xml_node& parent) -> void {
-        for (const pugi::xml_node& each : parent.children()) {
-            const std::string name = each.name();
-            if (name == "text")
-                texts.push_back(each.first_child().value() +
-                                std::string(each.child_value("tspan")));
-            if (name == "polygon") {
-                double left = 0;
-                double bottom = 0;
-                double right = 0;
-                std::istringstream points(each.attribute("points").value());
-                char comma = 0;
-                points >> left >> comma >> bottom >> right;
-                // The legend's is at the bottom, and comes first.
-                bars[each.attribute("fill").value()] = {left, right};
-            }
-            self(self, each);
-        }
-    };
-    visit(visit, root);
-    for (const std::string text :
+    const auto texts = textsOf(svg);
+    for (const char* text :
          {"on 200", "click light +1", "pattern 3", "motor on", "haptic engine packets",
           "stored pattern", "beyond full strength", "strength in %", "time in ms"}) {
-        EXPECT_EQ(std::count(texts.begin(), texts.end(), text), 1) << text;
+        EXPECT_EQ(texts.count(text), 1U) << text;
+    }
+    std::map<std::string, std::pair<double, double>> bars;
+    for (const auto& each : svg.select_nodes("//polygon")) {
+        double left = 0;
+        double bottom = 0;
+        double right = 0;
+        std::istringstream points(each.node().attribute("points").value());
+        char comma = 0;
+        points >> left >> comma >> bottom >> right;
+        // The legend's is at the bottom, and comes first.
+        bars[each.node().attribute("fill").value()] = {left, right};
     }
     ASSERT_EQ(bars.size(), 4U);
     const auto [packetLeft, packetRight] = bars["rgb(230, 159,   0)"];

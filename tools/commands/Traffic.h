@@ -4,12 +4,29 @@
 #include "Client.h"
 #include "Trace.h"
 
-/** @return the file of node traffic to read: the one that was named, or the simulated driver's. */
-inline std::string trafficFile(const std::string& named, bool isLog) {
-    const std::string simulation = simulationDirectory();
-    if (!named.empty()) return named;
-    if (isLog || simulation.empty()) {
-        throw cli::UsageError("no FILE: name a trace, or a log with --log");
+#include <string>
+
+/** The arguments of a command that reads node traffic. */
+class Traffic {
+  public:
+    explicit Traffic(cli::Command* command)
+        : mFile(command->file("FILE",
+                              "trace of the simulated driver (default: the one in "
+                              "VIBRATOR_SIM_DIR), - for standard input",
+                              "")),
+          mIsLog(command->flag("--log", "FILE is the daemon's log, as on a device")) {}
+
+    bool isLog() const { return *mIsLog; }
+    /** @return the file to read: the one that was named, or the simulated driver's. */
+    std::string file() const {
+        if (!mFile->empty()) return *mFile;
+        if (isLog() || simulationDirectory().empty()) {
+            throw cli::UsageError("no FILE: name a trace, or a log with --log");
+        }
+        return simulator::traceFile(simulationDirectory());
     }
-    return simulator::traceFile(simulation);
-}
+
+  private:
+    cli::Value<std::string> mFile;
+    cli::Value<bool> mIsLog;
+};

@@ -1,24 +1,172 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Watch.h"
-
 #include "Commands.h"
+#include "NodeAccess.h"
 #include "Traffic.h"
+#include "cli/Text.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <chrono>
+#include <cstdlib>
+#include <cstring>
+#include <iomanip>
+#include <iostream>
+#include <sstream>
+#include <thread>
+
+namespace {
+
+constexpr const char* kKinds[] = {"probe", "read", "write", "refused"};
+constexpr const char* kFaint = "\033[2m";
+constexpr const char* kCyan = "\033[36m";
+constexpr const char* kGreen = "\033[32m";
+constexpr const char* kRed = "\033[31m";
+constexpr const char* kPlain = "\033[0m";
+/** Of accesses that went well, by their kinds. */
+constexpr const char* kColours[] = {kFaint, kCyan, kGreen, kRed};
+
+/** Colours are for people's eyes, and for those who have not said no; see https://no-color.org. */
+bool wantsColour() {
+    const char* no = getenv("NO_COLOR");
+    return isatty(STDOUT_FILENO) != 0 && (no == nullptr || *no == '\0');
+}
+
+void print(const NodeAccess& access, bool isColoured) {
+    const bool isGood = access.error.empty();
+    std::ostringstream line;
+    if (!access.clock.empty()) line << std::setw(12) << cli::printable(access.clock) << "  ";
+    line << std::left << std::setw(30)
+         << (access.node.empty() ? "a call" : cli::printable(access.node)) << "  " << std::setw(7)
+         << kKinds[access.kind] << "  ";
+    if (access.kind != NodeAccess::kProbe) line << simulator::quote(access.bytes) << "  ";
+    line << (isGood ? "ok" : cli::printable(access.error));
+    std::cout << (!isColoured ? ""
+                  : isGood    ? kColours[access.kind]
+                              : kRed)
+              << line.str() << (isColoured ? kPlain : "") << std::endl;
+}
+
+/** Prints what becomes of each line, and warns once where nothing does. */
+class Printer {
+  public:
+    explicit Printer(const Traffic& traffic) : mTraffic(traffic), mReader(traffic.isLog()) {}
+
+    void take(const std::string& line) {
+        constexpr size_t kMany = 100;
+        const auto access = mReader.read(line);
+        mIsKnown = mIsKnown || access;
+        if (++mLines == kMany) end();
+        if (access) print(*access, mIsColoured);
+    }
+
+    /** What there is has been read. */
+    void end() {
+        if (mIsKnown || mLines == 0) return;
+        mIsKnown = true;
+        std::cerr << "vibratorctl: watch: " << cli::printable(mTraffic.file()) << ": "
+                  << (mTraffic.isLog() ? "no log of the daemon"
+                                       : "no trace of the driver; for a log give --log, too")
+                  << std::endl;
+    }
+
+  private:
+    const Traffic& mTraffic;
+    AccessReader mReader;
+    bool mIsColoured = wantsColour();
+    size_t mLines = 0;
+    bool mIsKnown = false;
+};
+
+/** A file that others append to, and may begin anew; or standard input, "-". */
+class GrowingFile {
+  public:
+    explicit GrowingFile(const std::string& name) : mName(name) { open(); }
+    GrowingFile(const GrowingFile&) = delete;
+    GrowingFile& operator=(const GrowingFile&) = delete;
+    ~GrowingFile() { close(mFile); }
+
+    void skip() const { lseek(mFile, 0, SEEK_END); }
+    /** @return some of what comes next; "" at the end. */
+    std::string read() const {
+        char part[65536];
+        const ssize_t size = ::read(mFile, part, sizeof(part));
+        if (size < 0) fail();
+        return {part, static_cast<size_t>(size)};
+    }
+    /** Opens the file again where it is another one by now, or shorter. @return whether it did. */
+    bool openIfNew() {
+        struct stat now = {};
+        struct stat opened = {};
+        if (stat(mName.c_str(), &now) != 0 || !S_ISREG(now.st_mode)) return false;
+        fstat(mFile, &opened);
+        const bool isSame = now.st_dev == opened.st_dev && now.st_ino == opened.st_ino;
+        if (isSame && lseek(mFile, 0, SEEK_CUR) <= now.st_size) return false;
+        close(mFile);
+        open();
+        return true;
+    }
+
+  private:
+    void open() {
+        mFile = mName == "-" ? dup(STDIN_FILENO) : ::open(mName.c_str(), O_RDONLY | O_CLOEXEC);
+        if (mFile < 0) fail();
+    }
+    [[noreturn]] void fail() const {
+        throw cli::UsageError(mName + ": cannot be read: " + strerror(errno));
+    }
+
+    std::string mName;
+    int mFile = -1;
+};
+
+}  // namespace
 
 void addWatch(Client& client) {
     cli::Command& command = client.program().command(
             kTools, "watch", "show the service's node traffic as it comes", "--all --once");
-    const auto file = command.file("FILE",
-                                   "trace of the simulated driver (default: the one in "
-                                   "VIBRATOR_SIM_DIR), - for standard input",
-                                   "");
-    const auto isLog = command.flag("--log", "FILE is the daemon's log, as on a device");
+    const Traffic traffic(&command);
     const auto fromStart = command.flag("--all", "show what is there already, too");
     const auto once = command.flag("--once", "end instead of waiting for more");
     command.note(
             "Calls that the service refuses leave no trace in the driver: only its log, with "
             "--log, tells of them.");
     command.withoutJson().run([=] {
-        watch({trafficFile(*file, *isLog), *isLog, *fromStart, *once});
+        constexpr size_t kLongest = 1 << 20;
+        const std::string name = traffic.file();
+        const bool isInput = name == "-";
+        GrowingFile file(name);
+        if (!isInput && !*fromStart) file.skip();
+        if (!*once) {
+            std::cerr << "Waiting for "
+                      << (traffic.isLog() ? "lines of the daemon's log" : "accesses") << " in "
+                      << (isInput ? "standard input" : cli::printable(name)) << "; Ctrl-C ends it."
+                      << std::endl;
+        }
+        Printer printer(traffic);
+        std::string line;
+        while (std::cout) {
+            const std::string part = file.read();
+            for (const char c : part) {
+                if (c != '\n') {
+                    line += c;
+                    continue;
+                }
+                printer.take(line);
+                line.clear();
+            }
+            if (line.size() > kLongest) throw cli::UsageError(name + ": a line of more than 1 MiB");
+            if (!part.empty()) continue;
+            if (*once || isInput) break;
+            printer.end();
+            // Half a line is kept until its rest comes.
+            if (file.openIfNew()) line.clear();
+            std::this_thread::sleep_for(std::chrono::milliseconds(50));
+        }
+        if (!line.empty()) printer.take(line);
+        printer.end();
         return kSuccess;
     });
 }

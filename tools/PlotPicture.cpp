@@ -1,0 +1,197 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Duration.h"
+#include "Plot.h"
+#include "PlotScript.h"
+#include "cli/Text.h"
+
+#include <sys/mman.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cctype>
+#include <cstdio>
+#include <cstring>
+#include <fstream>
+#include <iomanip>
+#include <iterator>
+#include <regex>
+#include <sstream>
+#include <stdexcept>
+#include <vector>
+
+namespace {
+
+/** The width that the time takes up, in pixels. */
+constexpr int kColumns = 796;
+
+/** @return text that gnuplot takes for nothing but text. */
+std::string plain(std::string text) {
+    std::replace_if(
+            text.begin(), text.end(),
+            [](unsigned char c) { return isalnum(c) == 0 && !strchr(" ,.:%()+-", c); }, '?');
+    return text;
+}
+
+struct Bar {
+    double start;
+    double end;
+    double bottom;
+    double top;
+};
+
+/** Adds a bar; what is narrower than a pixel shares one with its neighbours there. */
+void add(Bar bar, double pixel, std::vector<Bar>* bars) {
+    bar.end = std::max(bar.end, bar.start + pixel);
+    if (!bars->empty() && bar.end <= bars->back().start + 2 * pixel) {
+        bars->back().end = std::max(bar.end, bars->back().end);
+        bars->back().top = std::max(bar.top, bars->back().top);
+    } else {
+        bars->push_back(bar);
+    }
+}
+
+/** @return the labels of the calls: one for a crowd, which says how many more there are. */
+std::vector<Timeline::Mark> labelsOf(const std::vector<Timeline::Mark>& marks, double pixel) {
+    constexpr double kLineHeight = 21;
+    constexpr size_t kLongest = 22;
+    std::vector<Timeline::Mark> labels;
+    size_t more = 0;
+    for (const Timeline::Mark& mark : marks) {
+        if (labels.empty() || mark.time - labels.back().time > kLineHeight * pixel) {
+            labels.push_back({mark.time, plain(mark.label)});
+            more = 0;
+            continue;
+        }
+        std::string& label = labels.back().label;
+        if (more == 0 && label.size() + mark.label.size() + 2 <= kLongest) {
+            label += ", " + plain(mark.label);
+            continue;
+        }
+        if (more > 0) label.erase(label.rfind(" +"));
+        label += " +" + std::to_string(++more);
+    }
+    return labels;
+}
+
+/** A file without a name, gone when it is closed. */
+class MemoryFile {
+  public:
+    explicit MemoryFile(const std::string& text = {}) : mFile(memfd_create("plot", 0)) {
+        // What does not fit shows in what gnuplot makes of the rest.
+        [[maybe_unused]] const ssize_t written = write(mFile, text.data(), text.size());
+    }
+    MemoryFile(const MemoryFile&) = delete;
+    MemoryFile& operator=(const MemoryFile&) = delete;
+    ~MemoryFile() { close(mFile); }
+
+    /** @return its name, in this process and those that it starts. */
+    std::string name() const { return "/dev/fd/" + std::to_string(mFile); }
+
+  private:
+    int mFile;
+};
+
+std::string runGnuplot(const std::string& script) {
+    const MemoryFile input(script);
+    const MemoryFile complaints;
+    // Without the user's own settings.
+    const std::string command = "exec timeout -v 30 gnuplot --default-settings " + input.name() +
+                                " 2>" + complaints.name();
+    std::FILE* output = popen(command.c_str(), "re");
+    if (output == nullptr) throw std::runtime_error("gnuplot cannot be started");
+    std::string picture;
+    char part[65536];
+    for (size_t size; (size = fread(part, 1, sizeof(part), output)) > 0;)
+        picture.append(part, size);
+    const int status = pclose(output);
+    if (status == 0 && !picture.empty()) return picture;
+    if (WEXITSTATUS(status) == 127) {
+        throw std::runtime_error(
+                "gnuplot is not installed; install the package gnuplot-nox, or leave out -o for a "
+                "plot in text");
+    }
+    std::string complaint(200, '\0');
+    std::ifstream(complaints.name()).read(complaint.data(), 200);
+    throw std::runtime_error("gnuplot failed: " + cli::printable(complaint.c_str()));
+}
+
+/** Gives an SVG a title and a description, and dark colours for where the reader wants such. */
+std::string described(const Timeline& timeline, const std::string& svg) {
+    constexpr size_t kMostCalls = 20;
+    std::string calls;
+    for (size_t i = 0; i < timeline.marks.size() && i < kMostCalls; ++i) {
+        calls += (i == 0 ? ": " : "; ") + timeline.marks[i].label + " at " +
+                 durationInWords(timeline.marks[i].time);
+    }
+    calls += timeline.marks.size() > kMostCalls ? "; and more." : ".";
+    const std::string note = plotNote(timeline);
+    const std::string head = "<title>" + plotTitle(timeline) +
+                             "</title>\n<desc>Strength over time" + calls +
+                             (note.empty() ? "" : " ") + note +
+                             "</desc>\n<style>@media (prefers-color-scheme: dark) "
+                             "{ svg { filter: invert(1) hue-rotate(180deg) } }</style>";
+    const std::string text =
+            std::regex_replace(svg, std::regex("<title>.*</title>\\s*<desc>.*</desc>"), head);
+    // Names of no meaning, which a reader would be told.
+    return std::regex_replace(text, std::regex("<title>gnuplot_plot_[0-9]+</title>"), "");
+}
+
+}  // namespace
+
+std::string plotTitle(const Timeline& timeline) {
+    const size_t calls = timeline.marks.size();
+    return "What the driver was told: " + std::to_string(calls) +
+           (calls == 1 ? " call" : " calls") + " in " +
+           durationInWords(timeline.end - timeline.start);
+}
+
+std::string plotNote(const Timeline& timeline) {
+    return timeline.isTimed ? "" : "The log has no times: each call is drawn after the one before.";
+}
+
+std::string plotScript(const Timeline& timeline, PictureFormat format) {
+    // Its end is not on the frame.
+    const double length = std::max((timeline.end - timeline.start) * 1.01, 0.001);
+    const double pixel = length / kColumns;
+    const auto percentOf = [](double strength) { return std::min(1.0, strength) * 100; };
+    std::vector<Bar> layers[4];
+    for (const Timeline::Segment& segment : timeline.segments) {
+        const double top = percentOf(segment.strength);
+        add({segment.start, segment.end, 0, top}, pixel, &layers[segment.kind]);
+        if (segment.strength > 1) add({segment.start, segment.end, 96, 100}, pixel, &layers[3]);
+    }
+    std::ostringstream out;
+    out << std::setprecision(9) << "terminal = '"
+        << (format == PictureFormat::kSvg ? "svg" : "pngcairo fontscale 0.75") << "'\ntitle = '"
+        << plain(plotTitle(timeline)) << "'\nnote = '" << plotNote(timeline)
+        << "'\nstart = " << timeline.start << "\nlength = " << length << "\ncolumns = " << kColumns
+        << "\ngoing_on = " << (timeline.goesOn ? percentOf(timeline.segments.back().strength) : -1)
+        << "\n$calls << END\n";
+    double last = timeline.start - length;
+    for (const Timeline::Mark& mark : timeline.marks) {
+        if (mark.time - last <= 3 * pixel) continue;
+        last = mark.time;
+        out << last << '\n';
+    }
+    out << "END\n$labels << END\n";
+    for (const Timeline::Mark& label : labelsOf(timeline.marks, pixel))
+        out << label.time << ' ' << label.label << '\n';
+    out << "END\n";
+    const char* const names[] = {"$run", "$packet", "$pattern", "$beyond"};
+    for (size_t i = 0; i < std::size(layers); ++i) {
+        out << names[i] << " << END\n";
+        for (const auto& [start, end, bottom, top] : layers[i]) {
+            // A hair's breadth lies between one and the next.
+            const double gap = end - start > 4 * pixel ? pixel / 2 : 0;
+            out << start << ' ' << end - gap << ' ' << bottom << ' ' << top << '\n';
+        }
+        out << "END\n";
+    }
+    return out.str() + kPlotScript;
+}
+
+std::string drawPicture(const Timeline& timeline, PictureFormat format) {
+    const std::string picture = runGnuplot(plotScript(timeline, format));
+    return format == PictureFormat::kSvg ? described(timeline, picture) : picture;
+}
