@@ -3,36 +3,56 @@
 
 #include "Client.h"
 
-/** All commands, in the order of the help. Each NAME has a file NAME.cpp with an addNAME(). */
-#define VIBRATORCTL_COMMANDS(ADD) \
-    ADD(OnOff)                    \
-    ADD(Click)                    \
-    ADD(External)                 \
-    ADD(Supports)                 \
-    ADD(Status)                   \
-    ADD(Amplitude)                \
-    ADD(Frequency)                \
-    ADD(Fold)                     \
-    ADD(Prebaked)                 \
-    ADD(Engine)                   \
-    ADD(Ladder)                   \
-    ADD(Motor)                    \
-    ADD(Doctor)                   \
-    ADD(Play)                     \
-    ADD(Watch)                    \
-    ADD(Plot)                     \
-    ADD(Completion)
+#include <functional>
+#include <optional>
+#include <string>
+#include <vector>
 
-#define DECLARE(name) void add##name(Client& client);
-VIBRATORCTL_COMMANDS(DECLARE)
-#undef DECLARE
+/** Adds all commands, in the order of the help. */
+void addCommands(Client& client);
+
+// Each subject's commands are in a file of its name.
+void addVibration(Client& client);
+void addSettings(Client& client);
+void addPatterns(Client& client);
+void addQueries(Client& client);
+void addDoctor(Client& client);
+void addPlay(Client& client);
+void addWatch(Client& client);
+void addPlot(Client& client);
 
 // The groups of the help.
 inline constexpr char kForAll[] = "For everybody";
 inline constexpr char kRestricted[] = "For root and system";
 inline constexpr char kTools[] = "Tools";
 
-/** A time that the motor runs. */
-inline constexpr cli::Numbers kTimes = {"a time in ms", 0, INT32_MAX};
 /** Full strength and less on the driver's own scale; the service judges what is beyond. */
 inline constexpr cli::Numbers kIntensities = {"an intensity", 1, 10000, UINT32_MAX};
+
+/** A call with a number, or the index of a choice. */
+using Call = std::function<::android::hardware::Return<VibratorStatus>(service::IDaxVibrator&,
+                                                                       uint32_t)>;
+
+/** @return the call of an operation with one argument. */
+template <typename Interface, typename T>
+Call callOf(::android::hardware::Return<VibratorStatus> (Interface::*operation)(T)) {
+    return [operation](service::IDaxVibrator& vibrator, uint32_t number) {
+        return (vibrator.*operation)(static_cast<T>(number));
+    };
+}
+
+/** A command that makes one call with one argument, and is a step of scores. */
+struct OneCall {
+    const char* group;
+    const char* name;
+    const char* help;
+    const char* example;
+    const char* argument;
+    const char* argumentHelp;
+    /** What the argument may be: a number, or else one of some words. */
+    std::optional<cli::Numbers> numbers;
+    std::vector<cli::Choice> choices;
+    Operation operation;
+    Call call;
+};
+void addCall(Client& client, const OneCall& call);
