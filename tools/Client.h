@@ -33,6 +33,11 @@ class Client {
     const std::string& instance() const { return *mInstance; }
     const Report& report() const { return mReport; }
     cli::Program& program() { return mProgram; }
+    /** Adds a command; see cli::Program. */
+    cli::Command& command(const std::string& group, const std::string& name,
+                          const std::string& help, const std::string& example) {
+        return mProgram.command(group, name, help, example);
+    }
 
     /** Lets scores have a command as a step, by a name of its own. */
     void addStep(StepKind kind) { mStepKinds.push_back(std::move(kind)); }

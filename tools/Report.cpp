@@ -11,11 +11,6 @@ using nlohmann::ordered_json;
 
 namespace {
 
-/** Prints an object in one line, of ASCII only: safe for terminals, whatever is in it. */
-void print(const ordered_json& object) {
-    std::cout << object.dump(-1, ' ', true, ordered_json::error_handler_t::replace) << '\n';
-}
-
 /** @return the name of a status, like "BAD_VALUE". */
 std::string statusName(VibratorStatus status) {
     constexpr const char* kNames[] = {"OK", "UNKNOWN_ERROR", "BAD_VALUE", "UNSUPPORTED_OPERATION"};
@@ -37,46 +32,49 @@ std::string notPermitted() {
 int Report::answer(const std::string& command, const Operation& operation, VibratorStatus status,
                    const Answer& answer) const {
     const bool ok = status == VibratorStatus::OK;
-    const std::string reason =
-            ok || !answer.reason.empty() ? answer.reason : reasonOf(operation, status);
-    if (isJson) {
-        ordered_json object = {{"command", command}};
-        if (!answer.argument.empty()) object["argument"] = answer.argument;
-        object.update({{"operation", operation.name}, {"ok", ok}, {"status", statusName(status)}});
-        if (!ok) object["reason"] = reason;
-        object.update(answer.members);
-        print(object);
+    ordered_json members = {{"argument", answer.argument},
+                            {"operation", operation.name},
+                            {"ok", ok},
+                            {"status", statusName(status)}};
+    if (answer.argument.empty()) members.erase("argument");
+    std::string words = command + (answer.argument.empty() ? "" : " ") + answer.argument + ": ";
+    if (ok) {
+        words += "OK" + (answer.words.empty() ? "" : ", " + answer.words);
     } else {
-        const std::string ending =
-                isVerbose ? " [" + operation.name + ": " + statusName(status) + "]" : "";
-        (ok ? std::cout : std::cerr)
-                << cli::printable(command + (answer.argument.empty() ? "" : " ") + answer.argument +
-                                  ": " + (ok ? "OK" : reason) +
-                                  (ok && !answer.words.empty() ? ", " + answer.words : "") + ending)
-                << '\n';
+        members["reason"] = answer.reason.empty() ? reasonOf(operation, status) : answer.reason;
+        words += members["reason"].get<std::string>();
     }
-    return ok ? kSuccess : kRefused;
+    if (isVerbose) words += " [" + operation.name + ": " + statusName(status) + "]";
+    members.update(answer.members);
+    return print(ok ? std::cout : std::cerr, command, words + "\n", members);
 }
 
 int Report::found(const std::string& command, const std::string& words, const ordered_json& members,
                   bool ok) const {
+    ordered_json all = {{"ok", ok}};
+    all.update(members);
+    return print(std::cout, command, words, all);
+}
+
+int Report::print(std::ostream& stream, const std::string& command, const std::string& words,
+                  const ordered_json& members) const {
+    ordered_json object = {{"command", nullptr}};
+    if (!command.empty()) object["command"] = command;
+    object.update(members);
     if (isJson) {
-        ordered_json object = {{"command", command}, {"ok", ok}};
-        object.update(members);
-        print(object);
+        // In one line, of ASCII only: safe for terminals, whatever is in it.
+        std::cout << object.dump(-1, ' ', true, ordered_json::error_handler_t::replace) << '\n';
     } else {
-        std::cout << cli::printableLines(words);
+        stream << cli::printableLines(words);
     }
-    return ok ? kSuccess : kRefused;
+    return object["ok"] ? kSuccess : kRefused;
 }
 
 void Report::failure(const std::string& command, const std::string& status,
                      const std::string& reason) const {
-    if (!isJson) return warn((command.empty() ? "" : command + ": ") + reason);
-    ordered_json object = {{"command", nullptr}};
-    if (!command.empty()) object["command"] = command;
-    object.update({{"ok", false}, {"status", status}, {"reason", reason}});
-    print(object);
+    const std::string start = "vibratorctl: " + (command.empty() ? "" : command + ": ");
+    print(std::cerr, command, start + cli::printable(reason) + "\n",
+          {{"ok", false}, {"status", status}, {"reason", reason}});
 }
 
 void Report::warn(const std::string& text) const {

@@ -3,6 +3,7 @@
 
 #include <android/hardware/vibrator/1.0/types.h>
 
+#include <iosfwd>
 #include <nlohmann/json.hpp>
 #include <string>
 #include <vector>
@@ -74,4 +75,9 @@ struct Report {
                  const std::string& reason) const;
     /** Warns on standard error, in words only. */
     void warn(const std::string& text) const;
+
+  private:
+    /** Prints the words or, on standard output, the members. @return the exit code. */
+    int print(std::ostream& stream, const std::string& command, const std::string& words,
+              const nlohmann::ordered_json& members) const;
 };

@@ -23,9 +23,7 @@ bool isOption(const std::string& word) {
            std::isdigit(static_cast<unsigned char>(word[1])) == 0;
 }
 
-std::string missing(const Argument& argument) {
-    return argument.name + " is missing: " + argument.help;
-}
+constexpr char kTooMany[] = " is one argument too many";
 
 std::string afterBlank(const std::string& text) {
     return text.empty() ? "" : text + " ";
@@ -135,45 +133,45 @@ Value<bool> Command::flag(const std::string& name, const std::string& help) {
                [](bool* value, const std::string& /* word */, bool) { *value = true; });
 }
 
-Command& Command::note(const std::string& text) {
-    mNotes.push_back(text);
-    return *this;
-}
-
-Command& Command::withoutJson() {
-    mHasJson = false;
-    return *this;
-}
-
-void Command::readStep(const std::vector<std::string>& words) {
-    size_t next = 0;
-    const auto isFlag = [&](const std::string& word) {
-        return std::any_of(mArguments.begin(), mArguments.end(), [&](const Argument& each) {
-            return each.isFlag() && each.name == "--" + word;
-        });
-    };
-    const auto isFor = [&](const Argument& argument) {
-        if (next == words.size() || argument.isFile) return false;
-        return argument.isFlag() ? argument.name == "--" + words[next] : !isFlag(words[next]);
-    };
-    for (const Argument& argument : mArguments) {
+void Command::read(const Given& given, bool isStep) const {
+    for (const Argument& argument : mArguments)
         argument.reset();
-        const bool isGiven = isFor(argument);
-        for (bool more = isGiven; more; more = argument.isMany && isFor(argument)) {
-            try {
-                argument.read(words[next], true);
-            } catch (const UsageError& error) {
-                throw WordError(next, error.what());
-            }
-            ++next;
-        }
-        if (!isGiven && (argument.isRequired || argument.isMany)) {
-            throw WordError(next, missing(argument));
+    for (size_t i = 0; i < given.size(); ++i) {
+        const auto& [argument, word] = given[i];
+        try {
+            argument->read(word, isStep);
+        } catch (const UsageError& error) {
+            const bool isNamed = argument->isOption() && !isStep;
+            throw WordError(i, (isNamed ? argument->name + ": " : "") + error.what());
         }
     }
-    if (next < words.size()) {
-        throw WordError(next, inQuotes(words[next]) + " is one argument too many");
+    for (const Argument& argument : mArguments) {
+        const bool isGiven = std::any_of(given.begin(), given.end(),
+                                         [&](const auto& each) { return each.first == &argument; });
+        if (!isGiven && (argument.isRequired || (isStep && argument.isMany))) {
+            throw WordError(given.size(), argument.name + " is missing: " + argument.help);
+        }
     }
+}
+
+void Command::readStep(const std::vector<std::string>& words) const {
+    Given given;
+    auto next = mArguments.begin();
+    for (const std::string& word : words) {
+        const auto isItsFlag = [&](const Argument& each) {
+            return each.isFlag() && each.name == "--" + word;
+        };
+        const bool isFlag = std::any_of(mArguments.begin(), mArguments.end(), isItsFlag);
+        next = std::find_if(next, mArguments.end(), [&](const Argument& each) {
+            return isFlag ? isItsFlag(each) : !each.isFlag() && !each.isFile;
+        });
+        if (next == mArguments.end()) {
+            throw WordError(given.size(), inQuotes(word) + kTooMany);
+        }
+        given.emplace_back(&*next, word);
+        if (!next->isMany) ++next;
+    }
+    read(given, true);
 }
 
 Program::Program(std::string name, std::string version, const std::string& about)
@@ -267,7 +265,7 @@ void Program::parseWord(const std::string& word, Line* line) const {
         line->given.emplace_back(argument, word);
         if (argument->takesOptions) line->taking = argument;
     } else {
-        line->complain(inQuotes(word) + " is one argument too many");
+        line->complain(inQuotes(word) + kTooMany);
     }
 }
 
@@ -291,7 +289,9 @@ void Program::parseOption(const std::string& word, Line* line) const {
     const bool hasValue = end < word.size();
     if (option.isFlag()) {
         if (hasValue) return line->complain(option.name + ": takes no value");
+        // Also of a line with a mistake in it.
         option.read("", false);
+        line->given.emplace_back(&option, "");
     } else if (hasValue) {
         line->given.emplace_back(&option, word.substr(isLetter ? end : end + 1));
     } else {
@@ -307,21 +307,6 @@ void Program::parseCommand(const std::string& word, Line* line) const {
     }
     line->typed = name;
     line->command = find(name);
-}
-
-void Program::read(const Line& line) const {
-    for (const auto& [argument, word] : line.given) {
-        try {
-            argument->read(word, false);
-        } catch (const UsageError& error) {
-            throw UsageError((argument->isOption() ? argument->name + ": " : "") + error.what());
-        }
-    }
-    for (const Argument& argument : line.command->mArguments) {
-        const bool isGiven = std::any_of(line.given.begin(), line.given.end(),
-                                         [&](const auto& each) { return each.first == &argument; });
-        if (argument.isRequired && !isGiven) throw UsageError(missing(argument));
-    }
 }
 
 int Program::run(int argc, char** argv, const std::function<bool()>& isJson) {
@@ -350,7 +335,7 @@ int Program::run(int argc, char** argv, const std::function<bool()>& isJson) {
                                         join(valuesOf(commandsAfter(line.typed)), ", ", " or "));
     }
     if (!line.problem.empty()) throw UsageError(line.problem);
-    read(line);
+    mCurrent->read(line.given, false);
     if (isJson() && !mCurrent->mHasJson) throw UsageError("has no JSON answer; leave out --json");
     return mCurrent->perform();
 }

@@ -101,9 +101,9 @@ class Command {
     Value<bool> flag(const std::string& name, const std::string& help);
 
     /** Says more in the command's help. */
-    Command& note(const std::string& text);
+    Command& note(const std::string& text) { return mNotes.push_back(text), *this; }
     /** For a command whose output is no answer that could be JSON. */
-    Command& withoutJson();
+    Command& withoutJson() { return mHasJson = false, *this; }
     /** Says what the command does; it returns the exit code. */
     void run(std::function<int()> action) { mAction = std::move(action); }
 
@@ -116,13 +116,18 @@ class Command {
      *
      * @throw WordError
      */
-    void readStep(const std::vector<std::string>& words);
+    void readStep(const std::vector<std::string>& words) const;
     /** Does what the command does, with what was read last. */
     int perform() const { return mAction(); }
 
   private:
     friend class Program;
 
+    /** Words, and what each was given for; of flags nothing but that they were given. */
+    using Given = std::vector<std::pair<const Argument*, std::string>>;
+
+    /** Reads what was given. @throw WordError */
+    void read(const Given& given, bool isStep) const;
     template <typename T, typename Read>
     Value<T> add(const std::string& name, const std::string& help, const std::optional<T>& initial,
                  Read read);
@@ -173,7 +178,7 @@ class Program {
         const Command* command = nullptr;
         /** The words of the command, as far as they go. */
         std::string typed;
-        std::vector<std::pair<const Argument*, std::string>> given;
+        Command::Given given;
         /** What takes the next word, whatever it is: an option without its value yet, or a rest. */
         const Argument* taking = nullptr;
         bool hasOptionsEnded = false;
@@ -188,8 +193,6 @@ class Program {
     void parseWord(const std::string& word, Line* line) const;
     void parseOption(const std::string& word, Line* line) const;
     void parseCommand(const std::string& word, Line* line) const;
-    /** Reads the values that were given. @throw UsageError */
-    void read(const Line& line) const;
     /** @return the options that a command may have, its own first: effect has a --version, too. */
     std::vector<const Argument*> optionsOf(const Command* command) const;
     /** @return the argument that the next word is for, if it is no option; nullptr for none. */

@@ -9,24 +9,22 @@ void addCommands(Client& client) {
     client.program().addCompletion(kTools);
 }
 
-void addCall(Client& client, const OneCall& call) {
-    cli::Command& command =
-            client.program().command(call.group, call.name, call.help, call.example);
+void addCall(Client& client, cli::Command& command, const OneArgument& argument,
+             Operation operation, const Call& call) {
     std::function<uint32_t()> number;
-    std::function<std::string()> argument;
-    Operation operation = call.operation;
-    if (call.numbers) {
-        const auto value = command.number(call.argument, *call.numbers, call.argumentHelp);
-        operation.range = std::string(call.numbers->what) + " is " + call.numbers->range();
+    if (argument.choices.empty()) {
+        const auto value = command.number(argument.name, argument.numbers, argument.help);
+        operation.range = std::string(argument.numbers.what) + " is " + argument.numbers.range();
         number = [value] { return *value; };
-        argument = [value] { return std::to_string(*value); };
     } else {
-        const auto value = command.choice(call.argument, call.choices, call.argumentHelp);
+        const auto value = command.choice(argument.name, argument.choices, argument.help);
         number = [value] { return static_cast<uint32_t>(*value); };
-        argument = [value, choices = call.choices] { return choices[*value].value; };
     }
-    command.run([&client, operation, number, argument, make = call.call] {
-        return client.answer(operation, make(*client.service(), number()), {argument()});
+    const auto shown = [number, choices = argument.choices] {
+        return choices.empty() ? std::to_string(number()) : choices[number()].value;
+    };
+    command.run([=, &client] {
+        return client.answer(operation, call(*client.service(), number()), {shown()});
     });
-    client.addStep({call.name, &command});
+    client.addStep({command.name(), &command});
 }

@@ -4,7 +4,6 @@
 #include "Client.h"
 
 #include <functional>
-#include <optional>
 #include <string>
 #include <vector>
 
@@ -29,6 +28,14 @@ inline constexpr char kTools[] = "Tools";
 /** Full strength and less on the driver's own scale; the service judges what is beyond. */
 inline constexpr cli::Numbers kIntensities = {"an intensity", 1, 10000, UINT32_MAX};
 
+/** What the only argument of a command may be: a number, or else one of some words. */
+struct OneArgument {
+    const char* name;
+    const char* help;
+    cli::Numbers numbers = {};
+    std::vector<cli::Choice> choices = {};
+};
+
 /** A call with a number, or the index of a choice. */
 using Call = std::function<::android::hardware::Return<VibratorStatus>(service::IDaxVibrator&,
                                                                        uint32_t)>;
@@ -41,18 +48,6 @@ Call callOf(::android::hardware::Return<VibratorStatus> (Interface::*operation)(
     };
 }
 
-/** A command that makes one call with one argument, and is a step of scores. */
-struct OneCall {
-    const char* group;
-    const char* name;
-    const char* help;
-    const char* example;
-    const char* argument;
-    const char* argumentHelp;
-    /** What the argument may be: a number, or else one of some words. */
-    std::optional<cli::Numbers> numbers;
-    std::vector<cli::Choice> choices;
-    Operation operation;
-    Call call;
-};
-void addCall(Client& client, const OneCall& call);
+/** Lets a command make one call with one argument, and scores have it as a step. */
+void addCall(Client& client, cli::Command& command, const OneArgument& argument,
+             Operation operation, const Call& call);

@@ -20,54 +20,52 @@ struct NodeUse {
     bool isOnlyRead = false;
 };
 
-/** @return the nodes of the driver's layout. */
+/** @return all nodes; those that run the motor, for both layouts, stand first. */
 std::vector<NodeUse> nodeUses() {
-    std::vector<NodeUse> uses = {{THE_DEVICE_ENABLE, "on, off, is it running"},
-                                 {THE_DEVICE_ACTIVATE, "on, off"},
-                                 {THE_DEVICE_DURATION, "on, is it running"},
-                                 {THE_DEVICE_STATE, "on"},
-                                 {THE_DEVICE_INTENSITY, "amplitudes, patterns"},
-                                 {THE_DEVICE_FORCE_TOUCH_INTENSITY, "force-touch"},
-                                 {THE_DEVICE_MULTI_FREQ, "frequency types"},
-                                 {THE_DEVICE_HAPTIC_ENGINE, "engine packets"},
-                                 {THE_DEVICE_HAPTIC_ENGINE_INDEX, "stored patterns"},
-                                 {THE_DEVICE_HAPTIC_PLAYBACK_QUEUE, "repeated patterns"},
-                                 {THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES, "number of patterns", true},
-                                 {THE_DEVICE_MOTOR_TYPE, "name of the motor"},
-                                 {THE_DEVICE_EVENT_CMD, "fold state"},
-                                 {THE_DEVICE_PATTERN_LENGTH, "only logged", true},
-                                 {THE_DEVICE_EXT_CONTROL, "external control"}};
-    return uses;
+    return {{THE_DEVICE_ENABLE, "on, off, is it running"},
+            {THE_DEVICE_ACTIVATE, "on, off"},
+            {THE_DEVICE_DURATION, "on, is it running"},
+            {THE_DEVICE_STATE, "on"},
+            {THE_DEVICE_INTENSITY, "amplitudes, patterns"},
+            {THE_DEVICE_FORCE_TOUCH_INTENSITY, "force-touch"},
+            {THE_DEVICE_MULTI_FREQ, "frequency types"},
+            {THE_DEVICE_HAPTIC_ENGINE, "engine packets"},
+            {THE_DEVICE_HAPTIC_ENGINE_INDEX, "stored patterns"},
+            {THE_DEVICE_HAPTIC_PLAYBACK_QUEUE, "repeated patterns"},
+            {THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES, "number of patterns", true},
+            {THE_DEVICE_MOTOR_TYPE, "name of the motor"},
+            {THE_DEVICE_EVENT_CMD, "fold state"},
+            {THE_DEVICE_PATTERN_LENGTH, "only logged", true},
+            {THE_DEVICE_EXT_CONTROL, "external control"}};
 }
 
-/** Looks at all that the service needs, and says in words and as JSON what it has found. */
+/** Looks at all that the service needs; what it finds is JSON, of which the words are made. */
 class Examination {
   public:
     explicit Examination(const Client& client) {
         ::android::sp<service::IDaxVibrator> vibrator;
-        std::string whyNot;
+        std::string answer = "answers";
         try {
             vibrator = client.service();
         } catch (const service::Unreachable& error) {
-            whyNot = error.what();
+            answer = error.what();
+            find("the service cannot be reached: " + answer,
+                 "start the daemon, or give the client the daemon's HWBINDER_DIR");
         }
         mAnswers = vibrator != nullptr;
         const service::Description description = service::describe(vibrator);
-        mReport = {{"layout", mDriver.layout()},     {"service", mAnswers ? "answers" : whyNot},
+        mReport = {{"layout", mDriver.layout()},     {"service", answer},
                    {"server", description.server},   {"transport", description.transport},
                    {"manager", description.manager}, {"nodes", ordered_json::array()}};
-        check(!mAnswers, "the service cannot be reached: " + whyNot,
-              "start the daemon, or give the client the daemon's HWBINDER_DIR");
-        examineLayout();
+        if (!mDriver.isUsable()) examineLayout();
         if (mDriver.isThere()) examineNodes();
         if (mDriver.isUsable() && mayCallRestricted()) examineMotor();
         if (!mayCallRestricted()) {
             mNotes.push_back(mUser +
-                             " may not set amplitudes, nor use what is for root and uid 1000 "
-                             "(system)");
+                             " may not set amplitudes, nor use what is for root and uid "
+                             "1000 (system)");
         }
-        mReport["findings"] = mFindings;
-        mReport["notes"] = mNotes;
+        mReport.update({{"findings", mFindings}, {"notes", mNotes}});
     }
 
     bool isHealthy() const { return mFindings.empty(); }
@@ -75,10 +73,9 @@ class Examination {
     std::string inWords() const;
 
   private:
-    void check(bool isWrong, const std::string& problem, const std::string& advice) {
-        if (isWrong) mFindings.push_back({{"problem", problem}, {"advice", advice}});
+    void find(const std::string& problem, const std::string& advice) {
+        mFindings.push_back({{"problem", problem}, {"advice", advice}});
     }
-
     void examineLayout();
     void examineNodes();
     void examineMotor();
@@ -92,38 +89,40 @@ class Examination {
     ordered_json mNotes = ordered_json::array();
 };
 
+/** Says why the service's code finds no driver. */
 void Examination::examineLayout() {
-    check(mDriver.isUsable() && DriverMode == kTimedOutputMode &&
-                  mDriver.look(THE_DEVICE_ACTIVATE).exists,
-          "the kernel has both layouts, and the service takes the timed output",
-          "remove the driver that is not the motor's from the kernel");
-    if (mDriver.isUsable()) return;
-    for (const std::string* path :
-         {&THE_DEVICE_ENABLE, &THE_DEVICE_ACTIVATE, &THE_DEVICE_DURATION, &THE_DEVICE_STATE}) {
-        const LocalDriver::Node node = mDriver.look(*path);
+    for (const NodeUse& use : nodeUses()) {
+        const LocalDriver::Node node = mDriver.look(use.path);
         if (!node.exists || (node.reads && node.writes)) continue;
         // What is closed to root is closed to the service, too.
-        const bool isClosed = !mAnswers || getuid() == 0;
-        check(isClosed, *path + " cannot be opened for reading and writing by " + mUser,
-              "give the node to the service's user, as the init declaration in device/ does");
-        if (!isClosed) {
+        if (mAnswers && getuid() != 0) {
             mNotes.push_back(mUser + " cannot open the nodes; root can, and sees more here");
+        } else {
+            find(use.path + " cannot be opened for reading and writing by " + mUser,
+                 "give the node to the service's user, as the init declaration in device/ does");
         }
         return;
     }
     const std::string led = THE_DEVICE_ACTIVATE.substr(0, THE_DEVICE_ACTIVATE.rfind('/'));
-    const bool hasTrigger = mDriver.look(led + "/trigger").exists;
-    check(hasTrigger, led + " has no transient trigger",
-          "load ledtrig-transient, and write \"transient\" to " + led + "/trigger");
-    check(!hasTrigger, "the kernel offers no vibrator driver in /sys/class",
-          "build the motor's driver in, or load it; docs/device.md tells how for a GPIO");
+    if (mDriver.look(led + "/trigger").exists) {
+        find(led + " has no transient trigger",
+             "load ledtrig-transient, and write \"transient\" to " + led + "/trigger");
+    } else {
+        find("the kernel offers no vibrator driver in /sys/class",
+             "build the motor's driver in, or load it; docs/device.md tells how for a GPIO");
+    }
 }
 
 void Examination::examineNodes() {
     for (const NodeUse& use : nodeUses()) {
-        // The nodes that run the motor are known for both layouts.
-        if (use.path.find(mDriver.directory()) != 0) continue;
         const LocalDriver::Node node = mDriver.look(use.path);
+        if (use.path.find(mDriver.directory()) != 0) {
+            if (mDriver.isUsable() && use.path == THE_DEVICE_ACTIVATE && node.exists) {
+                find("the kernel has both layouts, and the service takes the timed output",
+                     "remove the driver that is not the motor's from the kernel");
+            }
+            continue;
+        }
         mReport["nodes"].push_back({{"path", use.path},
                                     {"exists", node.exists},
                                     {"mode", node.mode},
@@ -132,40 +131,40 @@ void Examination::examineNodes() {
                                     {"writable", node.writes},
                                     {"value", node.value},
                                     {"serves", use.serves}});
-        check(node.exists && mDriver.isUsable() && !(node.reads && (use.isOnlyRead || node.writes)),
-              use.path + " is there, but " + mUser + " cannot " + (node.reads ? "write" : "read") +
-                      " it",
-              "give the node to the service's user, or give it a mode of 0644");
+        const bool suffices = node.reads && (use.isOnlyRead || node.writes);
+        if (node.exists && !suffices && mDriver.isUsable()) {
+            find(use.path + " is there, but " + mUser + " cannot " +
+                         (node.reads ? "write" : "read") + " it",
+                 "give the node to the service's user, or give it a mode of 0644");
+        }
     }
     const LocalDriver::Node control = mDriver.look(THE_DEVICE_EXT_CONTROL);
-    check(control.value == "1\n", "external control is on, so the motor may not follow the service",
-          "switch it off with \"vibratorctl external off\"");
-    if (mDriver.isVibrating() && control.exists) {
-        mNotes.push_back("the motor counts as running, so external control is refused; " +
-                         std::string(DriverMode == kLedTriggerMode
-                                             ? "the trigger keeps its last duration until "
-                                               "\"vibratorctl on 0\""
-                                             : "\"vibratorctl off\" stops it"));
+    if (control.value == "1\n") {
+        find("external control is on, so the motor may not follow the service",
+             "switch it off with \"vibratorctl external off\"");
     }
+    if (!mDriver.isVibrating() || !control.exists) return;
+    const bool isLed = DriverMode == kLedTriggerMode;
+    mNotes.push_back(std::string("the motor counts as running, so external control is refused; ") +
+                     (isLed ? "the trigger keeps its last duration until \"vibratorctl on 0\""
+                            : "\"vibratorctl off\" stops it"));
 }
 
 void Examination::examineMotor() {
     LocalDriver::Vibrator& vibrator = *mDriver.vibrator();
     for (const Query& query : kQueries) {
-        if (query.feature != nullptr) {
-            mReport["features"][query.feature] = service::reached((vibrator.*query.ask)());
-        }
+        if (query.feature == nullptr) continue;
+        mReport["features"][query.feature] = service::reached((vibrator.*query.ask)());
     }
     const LocalDriver::Motor motor = mDriver.motor();
     mReport["motor"] = {{"name", motor.name}, {"number", motor.number}, {"found", motor.found}};
     for (const uint32_t type : {0U, 1U})
         mReport["ladders"][std::to_string(type)] = askLadder(vibrator, type);
-
     const LocalDriver::Node node = mDriver.look(THE_DEVICE_MOTOR_TYPE);
-    const std::string name = node.firstLine();
-    check(node.reads && name != motor.name,
-          "the driver's name for the motor, \"" + name + "\", is not a known one",
-          "have the driver show one of the known names in " + THE_DEVICE_MOTOR_TYPE);
+    if (node.reads && node.firstLine() != motor.name) {
+        find("the driver's name for the motor, \"" + node.firstLine() + "\", is not a known one",
+             "have the driver show one of the known names in " + THE_DEVICE_MOTOR_TYPE);
+    }
 }
 
 /** @return a text in a column of a table. */
@@ -227,8 +226,8 @@ std::string Examination::inWords() const {
 }  // namespace
 
 void addDoctor(Client& client) {
-    cli::Command& command = client.program().command(
-            kTools, "doctor", "say what is wrong with the driver or the service", "");
+    cli::Command& command = client.command(kTools, "doctor",
+                                           "say what is wrong with the driver or the service", "");
     command.run([&client] {
         const Examination examination(client);
         return client.report().found("doctor", examination.inWords(), examination.asJson(),

@@ -18,8 +18,8 @@ VibratorStatus countPatterns(const Client& client, uint32_t* count) {
 }
 
 void addCount(Client& client) {
-    cli::Command& command = client.program().command(
-            kRestricted, "prebaked count", "tell how many patterns the driver has stored", "");
+    cli::Command& command = client.command(kRestricted, "prebaked count",
+                                           "tell how many patterns the driver has stored", "");
     command.run([&client] {
         uint32_t count = 0;
         const VibratorStatus status = countPatterns(client, &count);
@@ -54,9 +54,9 @@ int playPattern(const Client& client, uint32_t pattern, uint32_t amplitude, bool
 
 void addPattern(Client& client) {
     constexpr cli::Numbers kPatterns = {"the number of a pattern", 0, INT32_MAX};
-    cli::Command& command = client.program().command(kRestricted, "prebaked play",
-                                                     "play a pattern that the driver has stored",
-                                                     "3 --amplitude 5000");
+    cli::Command& command =
+            client.command(kRestricted, "prebaked play",
+                           "play a pattern that the driver has stored", "3 --amplitude 5000");
     const auto pattern = command.number("PATTERN", kPatterns, "0 selects without playing");
     const auto amplitude =
             command.number("--amplitude N", kIntensities, "how strong; 10000 is full", 10000);
@@ -91,14 +91,12 @@ HapticEnginePackets readPackets(const std::vector<std::string>& words, const std
  * @throw cli::UsageError
  */
 void checkScaling(const HapticEnginePackets& packets, uint32_t amplitude) {
+    const uint32_t most = UINT32_MAX / std::max(amplitude, 1U);
     for (const auto& packet : packets) {
-        const bool isNegative = packet.intensity < 0;
-        if (!isNegative &&
-            uint64_t{amplitude} * static_cast<uint32_t>(packet.intensity) <= UINT32_MAX)
-            continue;
+        if (packet.intensity >= 0 && static_cast<uint32_t>(packet.intensity) <= most) continue;
         throw cli::UsageError("intensity " + std::to_string(packet.intensity) +
                               " cannot be scaled by amplitude " + std::to_string(amplitude) +
-                              "; it is 0 to " + std::to_string(UINT32_MAX / amplitude));
+                              "; it is 0 to " + std::to_string(most));
     }
 }
 
@@ -119,8 +117,8 @@ double judgePackets(const HapticEnginePackets& packets) {
 
 void addEngine(Client& client) {
     cli::Command& command =
-            client.program().command(kRestricted, "engine", "play a waveform packet by packet",
-                                     "10,5000,150,0 20,10000,200,1 --amplitude 5000");
+            client.command(kRestricted, "engine", "play a waveform packet by packet",
+                           "10,5000,150,0 20,10000,200,1 --amplitude 5000");
     const auto file =
             command.file("--file FILE", "CSV or JSON file of packets; - is standard input", "");
     const auto amplitude = command.number("--amplitude N", kIntensities,

@@ -113,7 +113,7 @@ int play(Client& client, const std::string& file, bool isCheck) {
 
 void addPlay(Client& client) {
     cli::Command& command =
-            client.program().command(kTools, "play", "play a score", "docs/examples/clicks.score");
+            client.command(kTools, "play", "play a score", "docs/examples/clicks.score");
     const auto file = command.file("SCORE", "file with a step a line, - for standard input");
     const auto check = command.flag("--check", "only say whether it can be played, and how long");
     command.note(

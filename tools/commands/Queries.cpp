@@ -155,13 +155,12 @@ int motor(const Client& client) {
 }  // namespace
 
 void addQueries(Client& client) {
-    cli::Program& program = client.program();
-    program.command(kForAll, "supports", "ask the service what it can do here", "").run([&client] {
+    client.command(kForAll, "supports", "ask the service what it can do here", "").run([&client] {
         return supports(client);
     });
 
     constexpr cli::Numbers kWaits = {"a time in s", 0, 3600};
-    cli::Command& waiting = program.command(
+    cli::Command& waiting = client.command(
             kForAll, "status", "tell whether the service answers, and what it is", "--wait 10");
     const auto wait =
             waiting.number("--wait SECONDS", kWaits, "how long to wait for the service", 0);
@@ -169,11 +168,11 @@ void addQueries(Client& client) {
 
     constexpr cli::Numbers kTypes = {"the type of a ladder", 0, 1, UINT32_MAX};
     cli::Command& typed =
-            program.command(kRestricted, "ladder",
-                            "print the ladder of intensities that suits the motor", "--type 1");
+            client.command(kRestricted, "ladder",
+                           "print the ladder of intensities that suits the motor", "--type 1");
     const auto type = typed.number("--type N", kTypes, "variant of the ladder", 0);
     typed.run([&client, type] { return ladder(client, *type); });
 
-    program.command(kRestricted, "motor", "tell the name, number and ladders of the motor", "")
+    client.command(kRestricted, "motor", "tell the name, number and ladders of the motor", "")
             .run([&client] { return motor(client); });
 }

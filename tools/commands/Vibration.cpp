@@ -45,8 +45,8 @@ int performEffect(const Client& client, const std::string& argument, uint32_t ef
 }
 
 void addClick(Client& client) {
-    cli::Command& click = client.program().command(kForAll, "click", "play the predefined click",
-                                                   "--strength strong");
+    cli::Command& click =
+            client.command(kForAll, "click", "play the predefined click", "--strength strong");
     const auto strength = addStrength(click);
     click.run([&client, strength] { return performEffect(client, "", 0, 0, *strength); });
     client.addStep({"click", &click, [] { return 20; }});
@@ -54,7 +54,7 @@ void addClick(Client& client) {
 
 void addEffect(Client& client) {
     constexpr cli::Numbers kEffects = {"the number of an effect", 0, UINT32_MAX};
-    cli::Command& effect = client.program().command(
+    cli::Command& effect = client.command(
             kForAll, "effect", "ask for a predefined effect by its number", "0 --strength light");
     const auto number = effect.number("NUMBER", kEffects, "0 is the click");
     const auto version = effect.choice("--version VERSION",
@@ -73,30 +73,28 @@ void addEffect(Client& client) {
 
 void addVibration(Client& client) {
     constexpr cli::Numbers kTimes = {"a time in ms", 0, INT32_MAX};
-    cli::Command& on = client.program().command(kForAll, "on", "run the motor", "500");
+    cli::Command& on = client.command(kForAll, "on", "run the motor", "500");
     const auto ms = on.number("MS", kTimes, "how long, in ms");
     on.run([&client, ms] {
         return client.answer({"on"}, client.service()->on(*ms), {std::to_string(*ms)});
     });
     client.addStep({"on", &on, [ms] { return *ms; }});
 
-    cli::Command& off = client.program().command(kForAll, "off", "stop the motor", "");
+    cli::Command& off = client.command(kForAll, "off", "stop the motor", "");
     off.run([&client] { return client.answer({"off"}, client.service()->off()); });
     client.addStep({"off", &off, [] { return 0; }});
 
     addClick(client);
     addEffect(client);
     addCall(client,
-            {kForAll,
-             "external",
-             "hand the motor to an external control, or take it back",
-             "on",
-             "STATE",
+            client.command(kForAll, "external",
+                           "hand the motor to an external control, or take it back", "on"),
+            {"STATE",
              "who runs the motor",
              {},
-             {{"on", "something else runs the motor"}, {"off", "the service runs the motor"}},
-             {"setExternalControl", false, {"ext_control"}},
-             [](IDaxVibrator& vibrator, uint32_t index) {
-                 return vibrator.setExternalControl(index == 0);
-             }});
+             {{"on", "something else runs the motor"}, {"off", "the service runs the motor"}}},
+            {"setExternalControl", false, {"ext_control"}},
+            [](IDaxVibrator& vibrator, uint32_t index) {
+                return vibrator.setExternalControl(index == 0);
+            });
 }
