@@ -15,13 +15,12 @@ using nlohmann::json;
 class VibratorctlTest : public ServiceTest {
   protected:
     /** Runs the client with the words of a command line. */
-    static Outcome run(const std::string& line, uid_t uid = geteuid(),
-                       const std::string& input = {}) {
+    static Outcome run(const std::string& line) {
         std::istringstream words(line);
         std::vector<std::string> command = {VIBRATORCTL};
         for (std::string word; words >> word;)
             command.push_back(word);
-        return runProgram(command, uid, input);
+        return runProgram(command);
     }
     /** Runs a line of the shell, in which v is the client. @return all that it prints. */
     static std::string shell(const std::string& line, const std::string& program = "bash") {
