@@ -1,15 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Client.h"
 
-#include "Driver.h"
-#include "Reasons.h"
-
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
 #include <fstream>
 #include <iostream>
-#include <sstream>
 
 Client::Client()
     : mProgram("vibratorctl", VERSION,
@@ -41,10 +37,9 @@ int Client::run(int argc, char** argv) {
 }
 
 int Client::runCommand(int argc, char** argv) {
-    // A command line with a mistake in it is still to be answered in JSON.
-    for (int i = 1; i < argc && strcmp(argv[i], "--") != 0; ++i)
-        mReport.isJson = mReport.isJson || strcmp(argv[i], "--json") == 0;
     const auto fail = [this](const char* status, const std::string& reason, int code) {
+        // A command line with a mistake in it is still to be answered in JSON.
+        mReport.isJson = *mJson;
         const cli::Command* command = mProgram.current();
         mReport.failure(command == nullptr ? "" : command->name(), status, reason);
         return code;
@@ -57,7 +52,7 @@ int Client::runCommand(int argc, char** argv) {
         });
     } catch (const cli::UsageError& error) {
         return fail("USAGE", error.what(), kUsage);
-    } catch (const Unreachable& error) {
+    } catch (const service::Unreachable& error) {
         return fail("UNREACHABLE",
                     std::string("the service cannot be reached: ") + error.what() +
                             "; \"vibratorctl doctor\" says what to do",
@@ -67,21 +62,13 @@ int Client::runCommand(int argc, char** argv) {
     }
 }
 
-::android::sp<service::IDaxVibrator> Client::service() const {
-    std::string whyNot;
-    auto vibrator = service::connect(*mInstance, &whyNot);
-    if (vibrator == nullptr) throw Unreachable(whyNot);
-    return vibrator;
-}
-
-int Client::answer(const Call& call, const ::android::hardware::Return<VibratorStatus>& status,
-                   const Details& details) const {
-    return answer(call, reached(status), details);
-}
-
-int Client::answer(const Call& call, VibratorStatus status, const Details& details) const {
-    const std::string reason = status == VibratorStatus::OK ? "" : reasonOf(call, status);
-    return mReport.answer(call, status, details, reason);
+int Client::answer(const Operation& operation, VibratorStatus status, Answer answer) const {
+    if (mStep == nullptr) {
+        return mReport.answer(mProgram.current()->name(), operation, status, answer);
+    }
+    answer.argument = mStep->argument();
+    answer.members.update(mStep->place());
+    return mReport.answer(mStep->name, operation, status, answer);
 }
 
 std::string simulationDirectory() {

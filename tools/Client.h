@@ -2,19 +2,14 @@
 #pragma once
 
 #include "Report.h"
+#include "Score.h"
 #include "Service.h"
 #include "cli/CommandLine.h"
 
-#include <hidl/Status.h>
-
-#include <stdexcept>
+#include <optional>
 #include <string>
-
-/** The service cannot be reached; what() says why. */
-class Unreachable : public std::runtime_error {
-  public:
-    using runtime_error::runtime_error;
-};
+#include <utility>
+#include <vector>
 
 /** What the commands have in common: the options before them, the service, the report. */
 class Client {
@@ -24,32 +19,31 @@ class Client {
     /** Runs a command line. @return the exit code. */
     int run(int argc, char** argv);
 
-    /**
-     * Makes a call and reports its answer.
-     *
-     * @return the exit code.
-     * @throw Unreachable
-     */
-    int answer(const Call& call, const ::android::hardware::Return<VibratorStatus>& status,
-               const Details& details = {}) const;
     /** Reports the answer to a call. @return the exit code. */
-    int answer(const Call& call, VibratorStatus status, const Details& details = {}) const;
+    int answer(const Operation& operation, VibratorStatus status, Answer answer = {}) const;
+    /** The same for a call just made. @throw service::Unreachable */
+    int answer(const Operation& operation,
+               const ::android::hardware::Return<VibratorStatus>& status,
+               Answer answer = {}) const {
+        return this->answer(operation, service::reached(status), std::move(answer));
+    }
 
-    /** @return the service. @throw Unreachable */
-    ::android::sp<service::IDaxVibrator> service() const;
+    /** @return the service. @throw service::Unreachable */
+    ::android::sp<service::IDaxVibrator> service() const { return service::connect(*mInstance); }
     const std::string& instance() const { return *mInstance; }
     const Report& report() const { return mReport; }
     cli::Program& program() { return mProgram; }
+    /** Adds a command; see cli::Program. */
+    cli::Command& command(const std::string& group, const std::string& name,
+                          const std::string& help, const std::string& example) {
+        return mProgram.command(group, name, help, example);
+    }
 
-    /** @return the result of a call that reached the service. @throw Unreachable */
-    template <typename T>
-    static T reached(const ::android::hardware::Return<T>& result) {
-        if (!result.isOk()) throw Unreachable(result.description());
-        return result;
-    }
-    static void reached(const ::android::hardware::Return<void>& result) {
-        if (!result.isOk()) throw Unreachable(result.description());
-    }
+    /** Lets scores have a command as a step, by a name of its own. */
+    void addStep(StepKind kind) { mStepKinds.push_back(std::move(kind)); }
+    const std::vector<StepKind>& stepKinds() const { return mStepKinds; }
+    /** Says which step of a score is played from now on: answers are its. */
+    void setStep(const ScoreStep* step) { mStep = step; }
 
   private:
     /** @return the exit code of the command, or of what kept it from its end. */
@@ -61,6 +55,8 @@ class Client {
     cli::Value<bool> mJson;
     cli::Value<bool> mVerbose;
     Report mReport;
+    std::vector<StepKind> mStepKinds;
+    const ScoreStep* mStep = nullptr;
 };
 
 /** @return the simulated driver's directory, as the environment names it; empty for the kernel's.

@@ -24,6 +24,9 @@ class LocalDriver {
         std::string mode;
         std::string owner;
         std::string value;
+
+        /** @return the value without the newline that ends it. */
+        std::string firstLine() const { return value.substr(0, value.find('\n')); }
     };
     Node look(const std::string& path) const;
 
@@ -42,6 +45,10 @@ class LocalDriver {
         std::string name;
         /** How the service's code has found it out. */
         std::string found;
+
+        std::string inWords() const {
+            return name + ", number " + std::to_string(number) + ", found " + found;
+        }
     };
     /** @return the motor of a usable driver, for a user who may make the restricted calls. */
     Motor motor() const;

@@ -9,11 +9,16 @@
 
 using nlohmann::ordered_json;
 
+namespace {
+
+/** @return the name of a status, like "BAD_VALUE". */
 std::string statusName(VibratorStatus status) {
     constexpr const char* kNames[] = {"OK", "UNKNOWN_ERROR", "BAD_VALUE", "UNSUPPORTED_OPERATION"};
     const auto number = static_cast<uint32_t>(status);
     return number < std::size(kNames) ? kNames[number] : std::to_string(number);
 }
+
+}  // namespace
 
 bool mayCallRestricted() {
     return getuid() == 0 || getuid() == 1000;
@@ -24,57 +29,54 @@ std::string notPermitted() {
            std::to_string(getuid());
 }
 
-int Report::answer(const Call& call, VibratorStatus status, const Details& details,
-                   const std::string& reason) const {
+int Report::answer(const std::string& command, const Operation& operation, VibratorStatus status,
+                   const Answer& answer) const {
     const bool ok = status == VibratorStatus::OK;
-    if (isJson) {
-        ordered_json object = {{"command", call.command}};
-        if (!call.argument.empty()) object["argument"] = call.argument;
-        object.update({{"operation", call.operation}, {"ok", ok}, {"status", statusName(status)}});
-        if (!ok) object["reason"] = reason;
-        object.update(details.members);
-        print(object);
-        return ok ? kSuccess : kRefused;
-    }
-    std::string line = call.command + (call.argument.empty() ? "" : " ") + call.argument + ": ";
+    ordered_json members = {{"argument", answer.argument},
+                            {"operation", operation.name},
+                            {"ok", ok},
+                            {"status", statusName(status)}};
+    if (answer.argument.empty()) members.erase("argument");
+    std::string words = command + (answer.argument.empty() ? "" : " ") + answer.argument + ": ";
     if (ok) {
-        line += "OK" + (details.words.empty() ? "" : ", " + details.words);
+        words += "OK" + (answer.words.empty() ? "" : ", " + answer.words);
     } else {
-        line += reason;
+        members["reason"] = answer.reason.empty() ? reasonOf(operation, status) : answer.reason;
+        words += members["reason"].get<std::string>();
     }
-    if (isVerbose) line += std::string(" [") + call.operation + ": " + statusName(status) + "]";
-    (ok ? std::cout : std::cerr) << cli::printable(line) << '\n';
-    return ok ? kSuccess : kRefused;
+    if (isVerbose) words += " [" + operation.name + ": " + statusName(status) + "]";
+    members.update(answer.members);
+    return print(ok ? std::cout : std::cerr, command, words + "\n", members);
 }
 
 int Report::found(const std::string& command, const std::string& words, const ordered_json& members,
                   bool ok) const {
+    ordered_json all = {{"ok", ok}};
+    all.update(members);
+    return print(std::cout, command, words, all);
+}
+
+int Report::print(std::ostream& stream, const std::string& command, const std::string& words,
+                  const ordered_json& members) const {
+    ordered_json object = {{"command", nullptr}};
+    if (!command.empty()) object["command"] = command;
+    object.update(members);
     if (isJson) {
-        ordered_json object = {{"command", command}, {"ok", ok}};
-        object.update(members);
-        print(object);
+        // In one line, of ASCII only: safe for terminals, whatever is in it.
+        std::cout << object.dump(-1, ' ', true, ordered_json::error_handler_t::replace) << '\n';
     } else {
-        std::cout << cli::printableLines(words);
+        stream << cli::printableLines(words);
     }
-    return ok ? kSuccess : kRefused;
+    return object["ok"] ? kSuccess : kRefused;
 }
 
 void Report::failure(const std::string& command, const std::string& status,
                      const std::string& reason) const {
-    if (isJson) {
-        ordered_json object = {{"command", nullptr}};
-        if (!command.empty()) object["command"] = command;
-        object.update({{"ok", false}, {"status", status}, {"reason", reason}});
-        print(object);
-    } else {
-        warn((command.empty() ? "" : command + ": ") + reason);
-    }
+    const std::string start = "vibratorctl: " + (command.empty() ? "" : command + ": ");
+    print(std::cerr, command, start + cli::printable(reason) + "\n",
+          {{"ok", false}, {"status", status}, {"reason", reason}});
 }
 
 void Report::warn(const std::string& text) const {
     if (!isJson) std::cerr << "vibratorctl: " << cli::printable(text) << '\n';
-}
-
-void Report::print(const ordered_json& object) {
-    std::cout << object.dump(-1, ' ', true, ordered_json::error_handler_t::replace) << '\n';
 }

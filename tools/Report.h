@@ -3,8 +3,10 @@
 
 #include <android/hardware/vibrator/1.0/types.h>
 
+#include <iosfwd>
 #include <nlohmann/json.hpp>
 #include <string>
+#include <vector>
 
 using VibratorStatus = ::android::hardware::vibrator::V1_0::Status;
 
@@ -19,8 +21,28 @@ enum ExitCode {
     kUnreachable = 3,
 };
 
-/** @return the name of a status, like "BAD_VALUE". */
-std::string statusName(VibratorStatus status);
+/** An operation of the interface, and what a call of it needs. */
+struct Operation {
+    std::string name;
+    /** Whether only root and the system user may call it. */
+    bool isRestricted = false;
+    /** Nodes beside those that run the motor. */
+    std::vector<std::string> nodes = {};
+    /** What its arguments may be: "an amplitude is 1 to 255". */
+    std::string range = {};
+};
+
+/** The answer to a call, beside its status. */
+struct Answer {
+    /** What the command was given: "5". */
+    std::string argument = {};
+    /** For a person: "20 ms". */
+    std::string words = {};
+    /** The same, as members of the JSON. */
+    nlohmann::ordered_json members = nlohmann::ordered_json::object();
+    /** Why it was refused, where that is known; otherwise reasonOf() finds out. */
+    std::string reason = {};
+};
 
 /** @return whether this process's user may make the calls that not everybody may. */
 bool mayCallRestricted();
@@ -28,34 +50,17 @@ bool mayCallRestricted();
 /** @return why a call was refused to this process's user. */
 std::string notPermitted();
 
-/** What is known of a call before it is made, to explain its answer. */
-struct Call {
-    /** The command: "intensity". */
-    std::string command;
-    /** The operation as the interface names it. */
-    const char* operation;
-    /** Whether only the system user and root may call it. */
-    bool restricted = false;
-    /** What the command was given: "5"; for the answer. */
-    std::string argument = {};
-};
-
-/** The answer to a call beside its status. */
-struct Details {
-    /** For a person: "20 ms". */
-    std::string words;
-    /** The same, as members of the JSON. */
-    nlohmann::ordered_json members = nlohmann::ordered_json::object();
-};
+/** @return why the service refused a call, as far as the driver tells; with what to do. */
+std::string reasonOf(const Operation& operation, VibratorStatus status);
 
 /** Tells the user what came of a command, in words or as JSON: one line, one object, a call. */
 struct Report {
     bool isJson = false;
     bool isVerbose = false;
 
-    /** Reports the answer to a call. @param reason why it was refused. @return the exit code. */
-    int answer(const Call& call, VibratorStatus status, const Details& details,
-               const std::string& reason) const;
+    /** Reports the answer to a command's call. @return the exit code. */
+    int answer(const std::string& command, const Operation& operation, VibratorStatus status,
+               const Answer& answer) const;
     /**
      * Reports what a command that is no single call found.
      *
@@ -71,6 +76,8 @@ struct Report {
     /** Warns on standard error, in words only. */
     void warn(const std::string& text) const;
 
-    /** Prints an object in one line, of ASCII only: safe for terminals, whatever is in it. */
-    static void print(const nlohmann::ordered_json& object);
+  private:
+    /** Prints the words or, on standard output, the members. @return the exit code. */
+    int print(std::ostream& stream, const std::string& command, const std::string& words,
+              const nlohmann::ordered_json& members) const;
 };

@@ -4,51 +4,44 @@
 #include "cli/Text.h"
 
 #include <algorithm>
-#include <cstring>
-#include <optional>
+#include <nlohmann/json.hpp>
 #include <sstream>
-#include <string_view>
 
 namespace {
 
-constexpr uint32_t kLongestMs = INT32_MAX;
-constexpr uint32_t kLongestWaitMs = 3'600'000;
-constexpr uint32_t kFullAmplitude = 10000;
-constexpr size_t kMostPackets = 339;
 /** Steps that a score plays, those of its blocks counted each time. */
 constexpr size_t kMostSteps = 1'000'000;
-constexpr size_t kLongestText = 60;
 constexpr char kTooMany[] = "more than 1000000 steps to play";
-
-struct Word {
-    std::string text;
-    size_t column;
-};
-
-std::vector<Word> wordsOf(std::string_view line) {
-    constexpr std::string_view kBlanks = " \t\r";
-    line = line.substr(0, line.find('#'));
-    std::vector<Word> words;
-    size_t start = line.find_first_not_of(kBlanks);
-    while (start != std::string_view::npos) {
-        const size_t end = std::min(line.find_first_of(kBlanks, start), line.size());
-        words.push_back({std::string(line.substr(start, end - start)), start + 1});
-        start = line.find_first_not_of(kBlanks, end);
-    }
-    return words;
-}
 
 /** Reads a score line by line. */
 class ScoreParser {
   public:
-    ScoreParser(Score* score, std::vector<ScoreError>* errors) : mScore(*score), mErrors(*errors) {}
+    ScoreParser(const std::vector<StepKind>& kinds, Score* score, std::vector<ScoreError>* errors)
+        : mKinds(kinds), mScore(*score), mErrors(*errors) {}
 
-    void parseLine(std::string_view line) {
+    void parseLine(const std::string& line) {
         ++mLine;
-        mWords = wordsOf(line);
-        mNext = 0;
-        mEnd = line.size() + 1;
-        if (!mWords.empty()) parseWords();
+        std::istringstream words(line.substr(0, line.find('#')));
+        std::vector<size_t> columns;
+        ScoreStep step;
+        for (std::string word; words >> word;) {
+            const auto end = words.eof() ? words.str().size() : static_cast<size_t>(words.tellg());
+            columns.push_back(end - word.size() + 1);
+            step.words.push_back(std::move(word));
+        }
+        if (columns.empty()) return;
+        step.name = step.words.front();
+        step.words.erase(step.words.begin());
+        step.line = mLine;
+        step.column = columns.front();
+        columns.push_back(line.size() + 1);
+        try {
+            parseStep(std::move(step));
+        } catch (const cli::WordError& error) {
+            complain(columns[error.index + 1], error.what());
+        } catch (const cli::UsageError& error) {
+            complain(columns.front(), error.what());
+        }
     }
 
     void finish() {
@@ -66,80 +59,53 @@ class ScoreParser {
         size_t line;
         size_t column;
     };
-    struct Command {
-        const char* name;
-        ScoreStep::Kind kind;
-        void (ScoreParser::*parse)(ScoreStep*);
-    };
-    static const std::vector<Command>& commands() {
-        static const std::vector<Command> all = {
-                {"click", ScoreStep::kClick, &ScoreParser::click},
-                {"on", ScoreStep::kOn, &ScoreParser::on},
-                {"off", ScoreStep::kOff, &ScoreParser::off},
-                {"wait", ScoreStep::kWait, &ScoreParser::wait},
-                {"amplitude", ScoreStep::kAmplitude, &ScoreParser::amplitude},
-                {"intensity", ScoreStep::kIntensity, &ScoreParser::intensity},
-                {"pattern", ScoreStep::kPattern, &ScoreParser::pattern},
-                {"engine", ScoreStep::kEngine, &ScoreParser::engine},
-                {"external", ScoreStep::kExternal, &ScoreParser::external},
-                {"frequency", ScoreStep::kFrequency, &ScoreParser::frequency},
-                {"force-touch", ScoreStep::kForceTouch, &ScoreParser::intensity},
-                {"fold", ScoreStep::kFold, &ScoreParser::fold},
-        };
-        return all;
-    }
 
-    void parseWords() {
-        const Word name = *take();
-        const size_t before = mErrors.size();
-        if (name.text == "repeat") {
-            uint32_t times = 1;
-            number("a number of times", 1, kMostSteps, &times);
-            mBlocks.push_back({mScore.order.size(), times, mLine, name.column});
-        } else if (name.text == "end") {
-            endBlock(name);
+    void parseStep(ScoreStep step) {
+        if (step.name == "repeat") {
+            mBlocks.push_back({mScore.order.size(), 1, step.line, step.column});
+            mRepeat.readStep(step.words);
+            mBlocks.back().times = *mTimes;
+        } else if (step.name == "end") {
+            endBlock(step);
         } else {
-            const auto command =
-                    std::find_if(commands().begin(), commands().end(),
-                                 [&](const Command& each) { return name.text == each.name; });
-            if (command == commands().end()) return complainOfName(name);
-            ScoreStep step;
-            step.kind = command->kind;
-            step.line = mLine;
-            step.column = name.column;
-            step.name = name.text;
-            for (const Word& word : mWords) {
-                if (word.column != name.column) step.argument += " " + word.text;
-            }
-            step.argument.erase(0, 1);
-            if (step.argument.size() > kLongestText) {
-                step.argument.replace(kLongestText - 3, step.argument.size(), "...");
-            }
-            (this->*command->parse)(&step);
+            // Even one with a mistake is a step.
             mScore.order.push_back(static_cast<uint32_t>(mScore.lines.size()));
-            mScore.lines.push_back(std::move(step));
-            if (mScore.order.size() > kMostSteps) complain(name, kTooMany);
-        }
-        if (mErrors.size() == before && mNext < mWords.size()) {
-            complain(mWords[mNext], cli::inQuotes(mWords[mNext].text) + " is one word too many");
+            mScore.lines.push_back(step);
+            readStep(&mScore.lines.back());
+            if (mScore.order.size() > kMostSteps) throw cli::UsageError(kTooMany);
         }
     }
 
-    void complainOfName(const Word& name) {
+    void readStep(ScoreStep* step) {
+        if (step->name == "wait") {
+            mWait.readStep(step->words);
+            step->pause = *mPause;
+            return;
+        }
+        const auto kind = std::find_if(mKinds.begin(), mKinds.end(), [&](const StepKind& each) {
+            return step->name == each.name;
+        });
+        if (kind == mKinds.end()) throw cli::UsageError(noStep(step->name));
+        step->command = kind->command;
+        step->command->readStep(step->words);
+        step->runs = kind->runs();
+    }
+
+    std::string noStep(const std::string& name) const {
         std::vector<std::string> names;
-        for (const Command& command : commands())
-            names.emplace_back(command.name);
-        names.insert(names.end(), {"repeat", "end"});
-        const std::string nearest = cli::suggestion(name.text, names);
-        complain(name, "no step " + cli::inQuotes(name.text) +
-                               (nearest.empty() ? "; there are " + cli::join(names, ", ", " and ")
-                                                : nearest));
+        for (const StepKind& kind : mKinds)
+            names.push_back(kind.name);
+        names.insert(names.end(), {"wait", "repeat", "end"});
+        const std::string nearest = cli::suggestion(name, names);
+        return "no step " + cli::inQuotes(name) +
+               (nearest.empty() ? "; there are " + cli::join(names, ", ", " and ") : nearest);
     }
 
-    void endBlock(const Word& word) {
-        if (mBlocks.empty()) return complain(word, R"("end" without a "repeat")");
+    void endBlock(const ScoreStep& step) {
+        if (mBlocks.empty()) throw cli::UsageError(R"("end" without a "repeat")");
         const Block block = mBlocks.back();
         mBlocks.pop_back();
+        cli::Command().readStep(step.words);
         auto& order = mScore.order;
         const size_t size = order.size() - block.start;
         if (block.start + size * block.times > kMostSteps) {
@@ -150,116 +116,50 @@ class ScoreParser {
             order.push_back(order[order.size() - size]);
     }
 
-    void click(ScoreStep* step) {
-        step->number = 1;
-        if (mNext < mWords.size()) choose({"light", "medium", "strong"}, step);
-    }
-    void on(ScoreStep* step) { number("a time in ms", 1, kLongestMs, &step->number); }
-    void off(ScoreStep* /* step */) {}
-    void wait(ScoreStep* step) { number("a time in ms", 0, kLongestWaitMs, &step->number); }
-    void amplitude(ScoreStep* step) { number("an amplitude", 1, 255, &step->number); }
-    void intensity(ScoreStep* step) { number("an intensity", 1, kFullAmplitude, &step->number); }
-    void external(ScoreStep* step) { choose({"off", "on"}, step); }
-    void frequency(ScoreStep* step) { number("a frequency type", 0, 4, &step->number); }
-    void fold(ScoreStep* step) { choose({"open", "close"}, step); }
-
-    void pattern(ScoreStep* step) {
-        number("a pattern's number", 0, kLongestMs, &step->number);
-        if (mNext < mWords.size() && mWords[mNext].text != "repeat") {
-            number("an amplitude", 1, kFullAmplitude, &step->amplitude);
-        }
-        if (mNext < mWords.size() && mWords[mNext].text == "repeat") {
-            step->repeat = true;
-            ++mNext;
-        }
+    void complain(size_t column, const std::string& what) {
+        mErrors.push_back({mLine, column, what});
     }
 
-    void engine(ScoreStep* step) {
-        number("an amplitude", 1, kFullAmplitude, &step->amplitude);
-        if (mNext == mWords.size()) complain({"", mEnd}, "packets are missing");
-        while (const std::optional<Word> word = take()) {
-            std::string error;
-            if (!parsePacket(word->text, &step->packets, &error)) {
-                complain(*word, error);
-            } else if (step->packets.size() > kMostPackets) {
-                return complain(*word, "more than 339 packets");
-            } else if (!isShort(step->packets.back())) {
-                complain(*word,
-                         cli::inQuotes(word->text) + " has a value of more than 8 characters");
-            }
-        }
-    }
-
-    static bool isShort(const HapticEnginePackets::value_type& packet) {
-        const int32_t unscaled[] = {packet.param0, packet.param2, packet.param3};
-        return std::all_of(std::begin(unscaled), std::end(unscaled), [](int32_t value) {
-            return value >= -9'999'999 && value <= 99'999'999;
-        });
-    }
-
-    void number(const std::string& what, uint32_t least, uint32_t most, uint32_t* value) {
-        const std::string range =
-                " (" + std::to_string(least) + " to " + std::to_string(most) + ")";
-        const std::optional<Word> word = take();
-        if (!word) return complain({"", mEnd}, what + range + " is missing");
-        const auto parsed = cli::parseNumber(word->text, least, most);
-        if (!parsed) return complain(*word, cli::inQuotes(word->text) + " is not " + what + range);
-        *value = *parsed;
-    }
-
-    /** Reads one of some words into the step's number. */
-    void choose(const std::vector<std::string>& words, ScoreStep* step) {
-        const std::string list = cli::join(words, ", ", " or ");
-        const std::optional<Word> word = take();
-        if (!word) return complain({"", mEnd}, list + " is missing");
-        const auto found = std::find(words.begin(), words.end(), word->text);
-        if (found == words.end())
-            return complain(*word, cli::inQuotes(word->text) + " is not " + list);
-        step->number = static_cast<uint32_t>(found - words.begin());
-    }
-
-    std::optional<Word> take() {
-        if (mNext == mWords.size()) return std::nullopt;
-        return mWords[mNext++];
-    }
-    void complain(const Word& word, const std::string& what) {
-        mErrors.push_back({mLine, word.column, what});
-    }
-
+    const std::vector<StepKind>& mKinds;
     Score& mScore;
     std::vector<ScoreError>& mErrors;
+    cli::Command mWait;
+    cli::Value<uint32_t> mPause =
+            mWait.number("MS", {"a time in ms", 0, 3'600'000}, "how long, in ms");
+    cli::Command mRepeat;
+    cli::Value<uint32_t> mTimes =
+            mRepeat.number("N", {"a number of times", 1, kMostSteps}, "how often");
     std::vector<Block> mBlocks;
-    std::vector<Word> mWords;
-    size_t mNext = 0;
     size_t mLine = 0;
-    size_t mEnd = 0;
 };
 
 }  // namespace
 
+std::string ScoreStep::argument() const {
+    constexpr size_t kLongest = 60;
+    const std::string all = cli::join(words, " ", " ");
+    return all.size() <= kLongest ? all : all.substr(0, kLongest - 3) + "...";
+}
+
+nlohmann::ordered_json ScoreStep::place() const {
+    return {{"line", line}, {"column", column}};
+}
+
 double Score::seconds() const {
-    constexpr double kPatternMs = 1000;
-    constexpr double kClickMs = 20;
     double now = 0;
     double stop = 0;
     for (const uint32_t index : order) {
         const ScoreStep& step = lines[index];
-        if (step.kind == ScoreStep::kWait) now += step.number;
-        if (step.kind == ScoreStep::kOn) stop = now + step.number;
-        if (step.kind == ScoreStep::kOff) stop = now;
-        if (step.kind == ScoreStep::kClick) stop = now + kClickMs;
-        if (step.kind == ScoreStep::kPattern && step.number != 0) stop = now + kPatternMs;
-        if (step.kind != ScoreStep::kEngine) continue;
-        stop = now;
-        for (const auto& packet : step.packets)
-            stop += std::max(0, packet.param0);
+        now += step.pause;
+        if (step.runs) stop = now + *step.runs;
     }
     return std::max(now, stop) / 1000;
 }
 
-std::vector<ScoreError> parseScore(const std::string& text, Score* score) {
+std::vector<ScoreError> parseScore(const std::string& text, const std::vector<StepKind>& kinds,
+                                   Score* score) {
     std::vector<ScoreError> errors;
-    ScoreParser parser(score, &errors);
+    ScoreParser parser(kinds, score, &errors);
     std::istringstream lines(text);
     for (std::string line; errors.size() < kMostScoreErrors && std::getline(lines, line);)
         parser.parseLine(line);

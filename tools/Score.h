@@ -1,42 +1,46 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Packets.h"
+#include "cli/CommandLine.h"
 
 #include <cstdint>
+#include <functional>
+#include <nlohmann/json_fwd.hpp>
+#include <optional>
 #include <string>
 #include <vector>
 
-/** One line of a score: a call, or a pause between two. */
-struct ScoreStep {
-    enum Kind {
-        kClick,
-        kOn,
-        kOff,
-        kWait,
-        kAmplitude,
-        kIntensity,
-        kPattern,
-        kEngine,
-        kExternal,
-        kFrequency,
-        kForceTouch,
-        kFold,
-    };
-    Kind kind = kOff;
-    /** Milliseconds, a strength, a number of a pattern or type, or the index of a word: of
-     * "light medium strong", "off on" or "open close". */
-    uint32_t number = 0;
-    /** Amplitude of a pattern or of packets, 1 to 10000. */
-    uint32_t amplitude = 10000;
-    bool repeat = false;
-    HapticEnginePackets packets;
-    /** Where it stands, counted from 1, the column in bytes. */
-    size_t line = 0;
-    size_t column = 0;
-    /** Its first word, and the others; not all of many. */
+/** A command as a step of a score. */
+struct StepKind {
     std::string name;
-    std::string argument;
+    cli::Command* command;
+    /**
+     * Judges the step that the command has read last.
+     *
+     * @return for how long the motor runs from it on, in ms; none where that stays as it was.
+     * @throw cli::UsageError
+     */
+    std::function<std::optional<double>()> runs = [] { return std::nullopt; };
+};
+
+/** One line of a score: a command, or a pause between two. */
+struct ScoreStep {
+    std::string name;
+    std::vector<std::string> words;
+    /** Where it stands, counted from 1, the column in bytes. */
+    size_t line;
+    size_t column;
+    /** nullptr for a pause. */
+    cli::Command* command = nullptr;
+    /** For how long it waits, in ms. */
+    uint32_t pause = 0;
+    /** For how long the motor runs from it on, in ms, if it says so. */
+    std::optional<double> runs = {};
+
+    /** @return the words, for people; not all of many. */
+    std::string argument() const;
+    /** @return the place, as members of the JSON. */
+    nlohmann::ordered_json place() const;
 };
 
 constexpr size_t kMostScoreErrors = 20;
@@ -61,6 +65,8 @@ struct Score {
  * Reads a score: a step a line, its words between blanks; # begins a comment; the lines between
  * "repeat N" and "end" are played N times.
  *
+ * @param kinds all steps beside "wait", which takes a time in ms.
  * @return what is wrong with it, kMostScoreErrors mistakes at most; empty where it can be played.
  */
-std::vector<ScoreError> parseScore(const std::string& text, Score* score);
+std::vector<ScoreError> parseScore(const std::string& text, const std::vector<StepKind>& kinds,
+                                   Score* score);

@@ -10,9 +10,9 @@ namespace host = ::android::hardware::host;
 
 namespace service {
 
-::android::sp<IDaxVibrator> connect(const std::string& instance, std::string* whyNot) {
+::android::sp<IDaxVibrator> connect(const std::string& instance) {
     ::android::sp<IDaxVibrator> vibrator = IDaxVibrator::tryGetService(instance);
-    if (vibrator == nullptr) *whyNot = host::lookupError();
+    if (vibrator == nullptr) throw Unreachable(host::lookupError());
     return vibrator;
 }
 

@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <hidl/Status.h>
 #include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
 
 #include <cstdint>
+#include <stdexcept>
 #include <string>
 
 /** How the client finds the service. All that depends on the runtime's transport is here. */
@@ -11,16 +13,24 @@ namespace service {
 
 using ::vendor::velmora::hardware::vibrator::V2_1::IDaxVibrator;
 
-/**
- * Finds the service, without waiting for it.
- *
- * @param whyNot set, where there is none, to the reason in words.
- * @return nullptr where none answers.
- */
-::android::sp<IDaxVibrator> connect(const std::string& instance, std::string* whyNot);
+/** The service cannot be reached; what() says why. */
+class Unreachable : public std::runtime_error {
+  public:
+    using runtime_error::runtime_error;
+};
+
+/** Finds the service, without waiting for it. @throw Unreachable */
+::android::sp<IDaxVibrator> connect(const std::string& instance);
 
 /** Limits the time that a call may take from now on. @param seconds 0 for no limit. */
 void setCallTimeout(uint32_t seconds);
+
+/** @return the result of a call that reached the service. @throw Unreachable */
+template <typename T>
+T reached(const ::android::hardware::Return<T>& result) {
+    if (!result.isOk()) throw Unreachable(result.description());
+    return static_cast<T>(result);
+}
 
 /** Who serves the calls, and how they get there; in words for a person. */
 struct Description {

@@ -3,8 +3,6 @@
 
 int main(int argc, char** argv) {
     Client client;
-#define ADD(name) add##name(client);
-    VIBRATORCTL_COMMANDS(ADD)
-#undef ADD
+    addCommands(client);
     return client.run(argc, argv);
 }

@@ -3,25 +3,12 @@
 
 #include "Text.h"
 
-#include <CLI/CLI.hpp>
-
 #include <algorithm>
+#include <cctype>
 #include <iostream>
-#include <utility>
 
 namespace cli {
 namespace {
-
-using Given = std::vector<std::string>;
-
-std::string rangeInWords(const Numbers& numbers) {
-    return std::to_string(numbers.least) + " to " + std::to_string(numbers.most);
-}
-
-/** @throw UsageError that names the option; an argument is plain without its name. */
-[[noreturn]] void complain(const Argument& argument, const std::string& what) {
-    throw UsageError((argument.isOption() ? argument.name + ": " : "") + what);
-}
 
 /** @return what stands in brackets behind a help: "1 to 255; default: 7". */
 std::string bracketed(const std::string& range, const std::string& initial) {
@@ -30,13 +17,23 @@ std::string bracketed(const std::string& range, const std::string& initial) {
     return all.empty() ? "" : " (" + all + ")";
 }
 
-/** @return what a command has not taken; behind "--" the parser leaves it to the program. */
-Given leftOver(const CLI::App& program, const CLI::App& command) {
-    const Given words = command.remaining();
-    return words.empty() ? program.remaining() : words;
+/** @return whether a word looks like an option; a negative number does not. */
+bool isOption(const std::string& word) {
+    return word.size() > 1 && word[0] == '-' &&
+           std::isdigit(static_cast<unsigned char>(word[1])) == 0;
+}
+
+constexpr char kTooMany[] = " is one argument too many";
+
+std::string afterBlank(const std::string& text) {
+    return text.empty() ? "" : text + " ";
 }
 
 }  // namespace
+
+std::string Numbers::range() const {
+    return std::to_string(least) + " to " + std::to_string(most);
+}
 
 std::vector<std::string> valuesOf(const std::vector<Choice>& choices) {
     std::vector<std::string> values;
@@ -46,67 +43,64 @@ std::vector<std::string> valuesOf(const std::vector<Choice>& choices) {
     return values;
 }
 
-Argument& Command::add(const std::string& name, const std::string& help, bool isRequired) {
-    const size_t blank = name.find(' ');
-    const std::string names = name.substr(0, blank);
+template <typename T, typename Read>
+Value<T> Command::add(const std::string& name, const std::string& help,
+                      const std::optional<T>& initial, Read read) {
+    const T first = initial.value_or(T());
+    auto value = std::make_shared<T>(first);
     Argument& argument = mArguments.emplace_back();
+    const size_t blank = std::min(name.find(' '), name.size());
     // "-v,--verbose"; without a comma npos + 1 is 0.
-    const size_t comma = names.find(',');
-    argument.name = names.substr(comma + 1);
-    argument.names =
-            (comma == std::string::npos ? "" : names.substr(0, comma) + ", ") + argument.name;
-    argument.placeholder = blank == std::string::npos ? "" : name.substr(blank + 1);
+    const size_t start = name.find(',') + 1;
+    argument.name = name.substr(start, blank - start);
+    argument.letter = name.substr(0, start == 0 ? 0 : start - 1);
+    argument.placeholder = name.substr(std::min(blank + 1, name.size()));
     argument.help = help;
-    argument.isRequired = isRequired;
-    argument.option = argument.isOption() && argument.placeholder.empty() ? mApp->add_flag(names)
-                                                                          : mApp->add_option(names);
-    mApp->get_option(argument.name)->multi_option_policy(CLI::MultiOptionPolicy::TakeAll);
-    return argument;
-}
-
-Value<uint32_t> Command::number(const std::string& name, const Numbers& numbers,
-                                const std::string& help, std::optional<uint32_t> initial) {
-    auto value = std::make_shared<uint32_t>(initial.value_or(0));
-    const std::string shown = initial ? std::to_string(*initial) : "";
-    Argument& argument = add(name, help + bracketed(rangeInWords(numbers), shown), !initial);
-    argument.read = [=, &argument](const Given& given) {
-        const uint32_t least = numbers.passed != 0 ? 0 : numbers.least;
-        const uint32_t most = std::max(numbers.most, numbers.passed);
-        const auto number = parseNumber(given.back(), least, most);
-        if (!number) {
-            complain(argument, inQuotes(given.back()) + " is not " + numbers.what + " (" +
-                                       rangeInWords(numbers) + ")");
-        }
-        *value = *number;
+    argument.isRequired = !initial;
+    argument.reset = [=] { *value = first; };
+    argument.read = [=](const std::string& word, bool isStrict) {
+        read(value.get(), word, isStrict);
     };
     return value;
 }
 
+Value<uint32_t> Command::number(const std::string& name, const Numbers& numbers,
+                                const std::string& help, std::optional<uint32_t> initial) {
+    const std::string shown = initial ? std::to_string(*initial) : "";
+    return add(name, help + bracketed(numbers.range(), shown), initial,
+               [numbers](uint32_t* value, const std::string& word, bool isStrict) {
+                   const bool passes = numbers.passed != 0 && !isStrict;
+                   const auto number = parseNumber(word, passes ? 0 : numbers.least,
+                                                   passes ? numbers.passed : numbers.most);
+                   if (!number) {
+                       throw UsageError(inQuotes(word) + " is not " + numbers.what + " (" +
+                                        numbers.range() + ")");
+                   }
+                   *value = *number;
+               });
+}
+
 Value<size_t> Command::choice(const std::string& name, std::vector<Choice> choices,
                               const std::string& help, std::optional<size_t> initial) {
-    auto value = std::make_shared<size_t>(initial.value_or(0));
     const std::vector<std::string> values = valuesOf(choices);
-    const std::string shown = initial ? values[*initial] : "";
     const std::string list = join(values, ", ", " or ");
-    Argument& argument = add(name, help + bracketed(list, shown), !initial);
-    argument.choices = std::move(choices);
-    argument.read = [=, &argument](const Given& given) {
-        const auto found = std::find(values.begin(), values.end(), given.back());
-        if (found == values.end()) {
-            complain(argument,
-                     inQuotes(given.back()) + " is not " + list + suggestion(given.back(), values));
-        }
-        *value = static_cast<size_t>(found - values.begin());
-    };
+    auto value = add(
+            name, help + bracketed(list, initial ? values[*initial] : ""), initial,
+            [=](size_t* index, const std::string& word, bool /* isStrict */) {
+                const auto found = std::find(values.begin(), values.end(), word);
+                if (found == values.end()) {
+                    throw UsageError(inQuotes(word) + " is not " + list + suggestion(word, values));
+                }
+                *index = static_cast<size_t>(found - values.begin());
+            });
+    mArguments.back().choices = std::move(choices);
     return value;
 }
 
 Value<std::string> Command::text(const std::string& name, const std::string& help,
                                  std::optional<std::string> initial) {
-    auto value = std::make_shared<std::string>(initial.value_or(""));
-    add(name, help + bracketed("", initial.value_or("")), !initial).read =
-            [value](const Given& given) { *value = given.back(); };
-    return value;
+    return add(name, help + bracketed("", initial.value_or("")), initial,
+               [](std::string* value, const std::string& word, bool) { *value = word; });
 }
 
 Value<std::string> Command::file(const std::string& name, const std::string& help,
@@ -116,51 +110,75 @@ Value<std::string> Command::file(const std::string& name, const std::string& hel
     return value;
 }
 
-Value<std::vector<std::string>> Command::words(const std::string& name, const std::string& help) {
-    auto value = std::make_shared<std::vector<std::string>>();
-    Argument& argument = add(name, help, false);
-    argument.isMany = true;
-    argument.read = [value](const Given& given) { *value = given; };
-    mApp->get_option(name)->expected(-1);
+Value<std::vector<std::string>> Command::words(const std::string& name, const std::string& help,
+                                               std::function<void(const std::string&)> check) {
+    using Words = std::vector<std::string>;
+    auto value = add(name, help, std::optional<Words>(Words()),
+                     [=](Words* words, const std::string& word, bool /* isStrict */) {
+                         if (check) check(word);
+                         words->push_back(word);
+                     });
+    mArguments.back().isMany = true;
     return value;
 }
 
 Value<std::vector<std::string>> Command::rest(const std::string& name, const std::string& help) {
     auto value = words(name, help);
-    mApp->remove_option(mApp->get_option(name));
-    mArguments.back().option = nullptr;
-    mApp->fallthrough(false)->prefix_command();
+    mArguments.back().takesOptions = true;
     return value;
 }
 
 Value<bool> Command::flag(const std::string& name, const std::string& help) {
-    auto value = std::make_shared<bool>(false);
-    Argument& argument = add(name, help, false);
-    argument.read = [=, &argument](const Given& given) {
-        if (given.back() != "true") complain(argument, "takes no value");
-        *value = true;
-    };
-    return value;
+    return add(name, help, std::optional<bool>(false),
+               [](bool* value, const std::string& /* word */, bool) { *value = true; });
 }
 
-Command& Command::note(const std::string& text) {
-    mNotes.push_back(text);
-    return *this;
+void Command::read(const Given& given, bool isStep) const {
+    for (const Argument& argument : mArguments)
+        argument.reset();
+    for (size_t i = 0; i < given.size(); ++i) {
+        const auto& [argument, word] = given[i];
+        try {
+            argument->read(word, isStep);
+        } catch (const UsageError& error) {
+            const bool isNamed = argument->isOption() && !isStep;
+            throw WordError(i, (isNamed ? argument->name + ": " : "") + error.what());
+        }
+    }
+    for (const Argument& argument : mArguments) {
+        const bool isGiven = std::any_of(given.begin(), given.end(),
+                                         [&](const auto& each) { return each.first == &argument; });
+        if (!isGiven && (argument.isRequired || (isStep && argument.isMany))) {
+            throw WordError(given.size(), argument.name + " is missing: " + argument.help);
+        }
+    }
 }
 
-Command& Command::withoutJson() {
-    mHasJson = false;
-    return *this;
+void Command::readStep(const std::vector<std::string>& words) const {
+    Given given;
+    auto next = mArguments.begin();
+    for (const std::string& word : words) {
+        const auto isItsFlag = [&](const Argument& each) {
+            return each.isFlag() && each.name == "--" + word;
+        };
+        const bool isFlag = std::any_of(mArguments.begin(), mArguments.end(), isItsFlag);
+        next = std::find_if(next, mArguments.end(), [&](const Argument& each) {
+            return isFlag ? isItsFlag(each) : !each.isFlag() && !each.isFile;
+        });
+        if (next == mArguments.end()) {
+            throw WordError(given.size(), inQuotes(word) + kTooMany);
+        }
+        given.emplace_back(&*next, word);
+        if (!next->isMany) ++next;
+    }
+    read(given, true);
 }
 
-Program::Program(const std::string& name, std::string version, const std::string& about)
-    : mApp(std::make_unique<CLI::App>(about, name)), mVersion(std::move(version)) {
-    mApp->set_help_flag();
-    mApp->allow_extras()->require_subcommand(0, 1);
-    mRoot.mApp = mApp.get();
+Program::Program(std::string name, std::string version, const std::string& about)
+    : mName(std::move(name)), mVersion(std::move(version)) {
     mRoot.mHelp = about;
-    mRoot.flag("-h,--help", "print the help of the command, or this one");
-    mRoot.flag("--version", "print the version");
+    mWantsHelp = mRoot.flag("-h,--help", "print the help of the command, or this one");
+    mWantsVersion = mRoot.flag("--version", "print the version");
     Command& helpCommand = command("Help", "help", "print the help of a command", "prebaked play");
     const auto words = helpCommand.words("COMMAND", "a command, in one or two words");
     helpCommand.withoutJson().run([this, words] {
@@ -169,45 +187,14 @@ Program::Program(const std::string& name, std::string version, const std::string
     });
 }
 
-Program::~Program() = default;
-
 Command& Program::command(const std::string& group, const std::string& name,
                           const std::string& help, const std::string& example) {
-    const size_t blank = name.find(' ');
-    CLI::App* parent = mApp.get();
-    if (blank != std::string::npos) {
-        const std::string first = name.substr(0, blank);
-        parent = commandsAfter(first).empty() ? mApp->add_subcommand(first)
-                                              : mApp->get_subcommand(first);
-        parent->fallthrough()->require_subcommand(0, 1);
-    }
     Command& added = mCommands.emplace_back();
     added.mName = name;
     added.mGroup = group;
     added.mHelp = help;
     added.mExample = example;
-    // In a name of one word there is no blank, and npos + 1 is 0.
-    added.mApp = parent->add_subcommand(name.substr(blank + 1))->fallthrough();
     return added;
-}
-
-std::string Program::parse(int argc, char** argv) {
-    std::string problem;
-    try {
-        mApp->parse(argc, argv);
-    } catch (const CLI::ParseError& error) {
-        // The library says "--option: what it thinks".
-        const std::string what = error.what();
-        problem = what.substr(0, what.find(':')) + ": the value is missing";
-    }
-    std::string typed;
-    for (const CLI::App* app = mApp.get(); !app->get_subcommands().empty();) {
-        app = app->get_subcommands()[0];
-        typed += (typed.empty() ? "" : " ") + app->get_name();
-    }
-    mCurrent = find(typed);
-    if (!problem.empty()) throw UsageError(problem);
-    return typed;
 }
 
 const Command* Program::find(const std::string& name) const {
@@ -218,91 +205,139 @@ const Command* Program::find(const std::string& name) const {
 
 std::vector<Choice> Program::commandsAfter(const std::string& typed) const {
     std::vector<Choice> words;
-    const std::string start = typed.empty() ? "" : typed + " ";
+    const std::string start = afterBlank(typed);
     for (const Command& each : mCommands) {
         if (each.mName.compare(0, start.size(), start) != 0) continue;
         const std::string word = each.mName.substr(start.size());
-        const size_t blank = word.find(' ');
-        if (blank == std::string::npos) {
+        const std::string group = word.substr(0, word.find(' '));
+        if (group == word) {
             words.push_back({word, each.mHelp});
-            continue;
+        } else if (words.empty() || words.back().value != group) {
+            // One entry for a group of commands.
+            words.push_back({group, join(valuesOf(commandsAfter(group)), ", ", " or ")});
         }
-        // One entry for a group of commands.
-        const std::string group = word.substr(0, blank);
-        if (!words.empty() && words.back().value == group) continue;
-        words.push_back({group, join(valuesOf(commandsAfter(group)), ", ", " or ")});
     }
     return words;
 }
 
-void Program::complainOf(const std::string& word, const std::string& typed) const {
-    if (word.size() > 1 && word[0] == '-') {
-        std::vector<std::string> options;
-        for (const Command* command : {&mRoot, mCurrent}) {
-            if (command == nullptr) continue;
-            for (const Argument& each : command->mArguments) {
-                if (each.isOption()) options.push_back(each.name);
-            }
+std::vector<const Argument*> Program::optionsOf(const Command* command) const {
+    std::vector<const Argument*> options;
+    for (const Command* each : {command, &mRoot}) {
+        if (each == nullptr) continue;
+        for (const Argument& argument : each->mArguments) {
+            if (argument.isOption()) options.push_back(&argument);
         }
-        const std::string name = word.substr(0, word.find('='));
-        throw UsageError("no option " + inQuotes(name) + suggestion(name, options));
     }
-    if (mCurrent != nullptr) throw UsageError(inQuotes(word) + " is one argument too many");
-    const std::string start = typed.empty() ? "" : typed + " ";
-    throw UsageError("no command " + inQuotes(start + word) +
-                     suggestion(word, valuesOf(commandsAfter(typed))));
+    return options;
 }
 
-void Program::read(const Command& command) const {
-    for (const Argument& argument : command.mArguments) {
-        const Given given = argument.option != nullptr ? argument.option->results()
-                                                       : leftOver(*mApp, *command.mApp);
-        if (!given.empty()) {
-            argument.read(given);
-        } else if (argument.isRequired) {
-            throw UsageError(argument.name + " is missing: " + argument.help);
-        }
+const Argument* Program::nextArgument(const Line& line) {
+    auto before = std::count_if(line.given.begin(), line.given.end(),
+                                [](const auto& each) { return !each.first->isOption(); });
+    for (const Argument& argument : line.command->mArguments) {
+        if (!argument.isOption() && (argument.isMany || before-- == 0)) return &argument;
     }
+    return nullptr;
+}
+
+void Program::Line::complain(const std::string& what) {
+    if (problem.empty()) problem = what;
+}
+
+Program::Line Program::parse(const std::vector<std::string>& words) const {
+    Line line;
+    for (const std::string& word : words)
+        parseWord(word, &line);
+    return line;
+}
+
+void Program::parseWord(const std::string& word, Line* line) const {
+    if (line->taking != nullptr) {
+        line->given.emplace_back(line->taking, word);
+        if (!line->taking->isMany) line->taking = nullptr;
+    } else if (!line->hasOptionsEnded && word == "--") {
+        line->hasOptionsEnded = true;
+    } else if (!line->hasOptionsEnded && isOption(word)) {
+        parseOption(word, line);
+    } else if (line->command == nullptr) {
+        parseCommand(word, line);
+    } else if (const Argument* argument = nextArgument(*line)) {
+        line->given.emplace_back(argument, word);
+        if (argument->takesOptions) line->taking = argument;
+    } else {
+        line->complain(inQuotes(word) + kTooMany);
+    }
+}
+
+void Program::parseOption(const std::string& word, Line* line) const {
+    // "--wait=5", "-oFILE"
+    const bool isLetter = word[1] != '-';
+    const size_t end = isLetter ? 2 : std::min(word.find('='), word.size());
+    const std::string name = word.substr(0, end);
+    const auto options = optionsOf(line->command);
+    const auto found = std::find_if(options.begin(), options.end(), [&](const Argument* each) {
+        return (isLetter ? each->letter : each->name) == name;
+    });
+    if (found == options.end()) {
+        std::vector<std::string> names;
+        for (const Argument* each : options)
+            names.push_back(each->name);
+        const std::string typed = word.substr(0, word.find('='));
+        return line->complain("no option " + inQuotes(typed) + suggestion(typed, names));
+    }
+    const Argument& option = **found;
+    const bool hasValue = end < word.size();
+    if (option.isFlag()) {
+        if (hasValue) return line->complain(option.name + ": takes no value");
+        // Also of a line with a mistake in it.
+        option.read("", false);
+        line->given.emplace_back(&option, "");
+    } else if (hasValue) {
+        line->given.emplace_back(&option, word.substr(isLetter ? end : end + 1));
+    } else {
+        line->taking = &option;
+    }
+}
+
+void Program::parseCommand(const std::string& word, Line* line) const {
+    const std::vector<std::string> known = valuesOf(commandsAfter(line->typed));
+    const std::string name = afterBlank(line->typed) + word;
+    if (std::find(known.begin(), known.end(), word) == known.end()) {
+        return line->complain("no command " + inQuotes(name) + suggestion(word, known));
+    }
+    line->typed = name;
+    line->command = find(name);
 }
 
 int Program::run(int argc, char** argv, const std::function<bool()>& isJson) {
-    const Given words(argv + std::min(argc, 1), argv + argc);
+    const std::vector<std::string> words(argv + std::min(argc, 1), argv + argc);
     if (words.size() > 1 && words[0] == "--complete") {
         complete({words.begin() + 1, words.end()});
         return 0;
     }
-    const std::string typed = parse(argc, argv);
-    const Argument& helpFlag = mRoot.mArguments[0];
-    const Argument& versionFlag = mRoot.mArguments[1];
-    const bool takesRest = mCurrent != nullptr && !mCurrent->mArguments.empty() &&
-                           mCurrent->mArguments.back().option == nullptr;
-    Given unknown = takesRest ? leftOver(*mApp, *mCurrent->mApp) : mApp->remaining(true);
-    // The parser leaves the mark of the options' end over.
-    unknown.erase(std::remove(unknown.begin(), unknown.end(), "--"), unknown.end());
-    // A command that leaves options over leaves this one over, too.
-    const bool isLeft =
-            takesRest && !unknown.empty() && (unknown[0] == "-h" || unknown[0] == helpFlag.name);
-    if (isLeft || helpFlag.option->count() > 0) {
-        help(typed);
+    Line line = parse(words);
+    mCurrent = line.command;
+    if (*mWantsHelp) {
+        help(line.typed);
         return 0;
     }
-    if (versionFlag.option->count() > 0) {
-        std::cout << mApp->get_name() << ' ' << mVersion << '\n';
+    if (*mWantsVersion) {
+        std::cout << mName << ' ' << mVersion << '\n';
         return 0;
     }
-    if (!unknown.empty() && (!takesRest || unknown[0][0] == '-')) complainOf(unknown[0], typed);
-    if (mCurrent == nullptr) {
-        const std::string list = join(valuesOf(commandsAfter(typed)), ", ", " or ");
-        throw UsageError(typed.empty() ? "no command; " + inQuotes(mApp->get_name() + " help") +
-                                                 " lists them"
-                                       : typed + ": no command; " + list);
+    if (line.taking != nullptr && line.taking->isOption()) {
+        line.complain(line.taking->name + ": the value is missing");
     }
-    const Command& command = *std::exchange(mCurrent, nullptr);
-    read(mRoot);
-    mCurrent = &command;
-    read(command);
-    if (isJson() && !command.mHasJson) throw UsageError("has no JSON answer; leave out --json");
-    return command.mAction();
+    if (line.command == nullptr) {
+        line.complain(line.typed.empty()
+                              ? "no command; " + inQuotes(mName + " help") + " lists them"
+                              : line.typed + ": no command; " +
+                                        join(valuesOf(commandsAfter(line.typed)), ", ", " or "));
+    }
+    if (!line.problem.empty()) throw UsageError(line.problem);
+    mCurrent->read(line.given, false);
+    if (isJson() && !mCurrent->mHasJson) throw UsageError("has no JSON answer; leave out --json");
+    return mCurrent->perform();
 }
 
 }  // namespace cli

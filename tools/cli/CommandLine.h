@@ -8,12 +8,8 @@
 #include <optional>
 #include <stdexcept>
 #include <string>
+#include <utility>
 #include <vector>
-
-namespace CLI {
-class App;
-class Option;
-}  // namespace CLI
 
 namespace cli {
 
@@ -21,6 +17,14 @@ namespace cli {
 class UsageError : public std::runtime_error {
   public:
     using runtime_error::runtime_error;
+};
+
+/** A mistake in one of several words. */
+class WordError : public UsageError {
+  public:
+    WordError(size_t word, const std::string& what) : UsageError(what), index(word) {}
+    /** Index of the word; how many there are, where one is missing. */
+    const size_t index;
 };
 
 /** The whole decimal numbers that an argument may be. */
@@ -31,6 +35,9 @@ struct Numbers {
     uint32_t most;
     /** The greatest that is passed on, where somebody else judges; 0: most. */
     uint32_t passed = 0;
+
+    /** @return the range in words: "1 to 255". */
+    std::string range() const;
 };
 
 struct Choice {
@@ -49,21 +56,24 @@ using Value = std::shared_ptr<const T>;
 struct Argument {
     /** "MS", or "--strength" for an option. */
     std::string name;
-    /** "-v, --verbose": all names that it has. */
-    std::string names;
+    /** The option as a letter, "-v"; most have none. */
+    std::string letter;
     /** What stands for the option's value; empty for a flag. */
     std::string placeholder;
     std::string help;
     std::vector<Choice> choices;
     bool isFile = false;
     bool isRequired = false;
+    /** Whether it takes any number of words, and whether options among them. */
     bool isMany = false;
-    /** Where the parser puts what was given; nullptr for all that it leaves over. */
-    const CLI::Option* option = nullptr;
-    /** Takes over what was given, of which there is some; throws a UsageError. */
-    std::function<void(const std::vector<std::string>& given)> read;
+    bool takesOptions = false;
+    /** Goes back to the initial value. */
+    std::function<void()> reset;
+    /** Reads a word. @param isStrict whether nobody else judges it. @throw UsageError */
+    std::function<void(const std::string& word, bool isStrict)> read;
 
     bool isOption() const { return name[0] == '-'; }
+    bool isFlag() const { return isOption() && placeholder.empty(); }
 };
 
 /**
@@ -83,28 +93,45 @@ class Command {
     /** Like text, for the name of a file. */
     Value<std::string> file(const std::string& name, const std::string& help,
                             std::optional<std::string> initial = {});
-    /** Any number of words. */
-    Value<std::vector<std::string>> words(const std::string& name, const std::string& help);
+    /** Any number of words. @param check throws a UsageError for a wrong one. */
+    Value<std::vector<std::string>> words(const std::string& name, const std::string& help,
+                                          std::function<void(const std::string&)> check = {});
     /** All that stands behind the options, options of another command included. */
     Value<std::vector<std::string>> rest(const std::string& name, const std::string& help);
     Value<bool> flag(const std::string& name, const std::string& help);
 
     /** Says more in the command's help. */
-    Command& note(const std::string& text);
+    Command& note(const std::string& text) { return mNotes.push_back(text), *this; }
     /** For a command whose output is no answer that could be JSON. */
-    Command& withoutJson();
+    Command& withoutJson() { return mHasJson = false, *this; }
     /** Says what the command does; it returns the exit code. */
     void run(std::function<int()> action) { mAction = std::move(action); }
 
     /** The words that call it, like "prebaked play". */
     const std::string& name() const { return mName; }
 
+    /**
+     * Reads a step of a script: the values in the order in which they were added, options as well
+     * and without their names; a flag as its name without the dashes. There are no files in it.
+     *
+     * @throw WordError
+     */
+    void readStep(const std::vector<std::string>& words) const;
+    /** Does what the command does, with what was read last. */
+    int perform() const { return mAction(); }
+
   private:
     friend class Program;
 
-    Argument& add(const std::string& name, const std::string& help, bool isRequired);
+    /** Words, and what each was given for; of flags nothing but that they were given. */
+    using Given = std::vector<std::pair<const Argument*, std::string>>;
 
-    CLI::App* mApp = nullptr;
+    /** Reads what was given. @throw WordError */
+    void read(const Given& given, bool isStep) const;
+    template <typename T, typename Read>
+    Value<T> add(const std::string& name, const std::string& help, const std::optional<T>& initial,
+                 Read read);
+
     std::string mName;
     std::string mGroup;
     std::string mHelp;
@@ -118,10 +145,9 @@ class Command {
 /** A program of many commands: reads its command line, helps, and completes for shells. */
 class Program {
   public:
-    Program(const std::string& name, std::string version, const std::string& about);
+    Program(std::string name, std::string version, const std::string& about);
     Program(const Program&) = delete;
     Program& operator=(const Program&) = delete;
-    ~Program();
 
     /** What stands before all commands: the options that they share, and the help's notes. */
     Command& shared() { return mRoot; }
@@ -147,31 +173,48 @@ class Program {
     const Command* current() const { return mCurrent; }
 
   private:
+    /** What a command line says, as far as it makes sense. */
+    struct Line {
+        const Command* command = nullptr;
+        /** The words of the command, as far as they go. */
+        std::string typed;
+        Command::Given given;
+        /** What takes the next word, whatever it is: an option without its value yet, or a rest. */
+        const Argument* taking = nullptr;
+        bool hasOptionsEnded = false;
+        /** The first thing that makes no sense. */
+        std::string problem;
+
+        void complain(const std::string& what);
+    };
+
+    /** Reads a command line, and those flags that are in it. */
+    Line parse(const std::vector<std::string>& words) const;
+    void parseWord(const std::string& word, Line* line) const;
+    void parseOption(const std::string& word, Line* line) const;
+    void parseCommand(const std::string& word, Line* line) const;
+    /** @return the options that a command may have, its own first: effect has a --version, too. */
+    std::vector<const Argument*> optionsOf(const Command* command) const;
+    /** @return the argument that the next word is for, if it is no option; nullptr for none. */
+    static const Argument* nextArgument(const Line& line);
+    /** @return the words that may follow those of a command, with what they mean. */
+    std::vector<Choice> commandsAfter(const std::string& typed) const;
+    const Command* find(const std::string& name) const;
+
     /** Prints the help of the commands with a name, or of the program. */
     void help(const std::string& name) const;
     void helpProgram() const;
     void helpCommand(const Command& command) const;
     /** Prints what the last of some words may become: each a word, a tabulator and its meaning. */
     void complete(const std::vector<std::string>& words) const;
-    /** @return the options of a command, if there is one, and of the program. */
-    std::vector<Choice> optionsOf(const Command* command) const;
-    /** @return the argument at a place among those that are no options; nullptr for none. */
-    static const Argument* plainArgument(const Command& command, size_t position);
-    /** @return what may stand in the place of the last word; ":files" for a file's name. */
-    std::vector<Choice> answersFor(const std::vector<std::string>& words) const;
-    const Argument* findOption(const Command* command, const std::string& name) const;
+    /** @return what may stand behind a line in the place of a word; ":files" for a file's name. */
+    std::vector<Choice> answersFor(const Line& line, const std::string& word) const;
 
-    /** @return the words of the command that was recognised, as far as they go. */
-    std::string parse(int argc, char** argv);
-    void read(const Command& command) const;
-    [[noreturn]] void complainOf(const std::string& word, const std::string& typed) const;
-    /** @return the words that may follow those of a command, with what they mean. */
-    std::vector<Choice> commandsAfter(const std::string& typed) const;
-    const Command* find(const std::string& name) const;
-
-    std::unique_ptr<CLI::App> mApp;
+    std::string mName;
     std::string mVersion;
     Command mRoot;
+    Value<bool> mWantsHelp;
+    Value<bool> mWantsVersion;
     std::deque<Command> mCommands;
     const Command* mCurrent = nullptr;
 };

@@ -6,8 +6,6 @@
 #include <cctype>
 #include <iostream>
 
-#include <CLI/App.hpp>
-
 namespace cli {
 namespace {
 
@@ -21,22 +19,33 @@ void printEntry(const std::string& name, const std::string& meaning) {
               << wrap(meaning, kColumn);
 }
 
-std::string shown(const Argument& argument) {
-    if (argument.isOption()) {
-        return argument.names + (argument.placeholder.empty() ? "" : " " + argument.placeholder);
+/** @return the arguments as they stand in a call, without the options: " PATTERN [FILE...]". */
+std::string inCall(const std::deque<Argument>& arguments) {
+    std::string words;
+    for (const Argument& each : arguments) {
+        if (each.isOption()) continue;
+        const std::string name = each.name + (each.isMany ? "..." : "");
+        words += " " + (each.isRequired ? name : "[" + name + "]");
     }
-    const std::string name = argument.name + (argument.isMany ? "..." : "");
-    return argument.isRequired ? name : "[" + name + "]";
+    return words;
 }
 
-void printOptions(const std::string& heading, const std::deque<Argument>& arguments) {
+/** Prints either the options or the other arguments. */
+void printList(const std::string& heading, const std::deque<Argument>& arguments, bool options) {
     bool any = false;
     for (const Argument& each : arguments) {
-        if (!each.isOption()) continue;
+        if (each.isOption() != options) continue;
         if (!any) std::cout << '\n' << heading << ":\n";
         any = true;
-        printEntry(shown(each), each.help);
+        printEntry((each.letter.empty() ? "" : each.letter + ", ") + each.name +
+                           (each.placeholder.empty() ? "" : " " + each.placeholder),
+                   each.help);
     }
+}
+
+void printNotes(const std::vector<std::string>& notes) {
+    for (const std::string& note : notes)
+        std::cout << '\n' << wrap(note, 0);
 }
 
 std::string sentence(std::string text) {
@@ -44,36 +53,22 @@ std::string sentence(std::string text) {
     return text + ".";
 }
 
-/** @return a command's name and its arguments, without the options. */
-std::string call(const std::string& name, const std::deque<Argument>& arguments) {
-    std::string words = name;
-    for (const Argument& each : arguments) {
-        if (!each.isOption()) words += " " + shown(each);
-    }
-    return words;
-}
-
 }  // namespace
 
 void Program::help(const std::string& name) const {
-    const Command* command = find(name);
-    if (command != nullptr) {
-        helpCommand(*command);
-    } else if (name.empty()) {
-        helpProgram();
-    } else {
-        const std::vector<Choice> commands = commandsAfter(name);
-        if (commands.empty()) {
-            throw UsageError("no command " + inQuotes(name) +
-                             suggestion(name, valuesOf(commandsAfter(""))));
-        }
-        for (const Choice& each : commands)
-            helpCommand(*find(name + " " + each.value));
+    if (name.empty()) return helpProgram();
+    if (const Command* command = find(name)) return helpCommand(*command);
+    const std::vector<Choice> commands = commandsAfter(name);
+    if (commands.empty()) {
+        throw UsageError("no command " + inQuotes(name) +
+                         suggestion(name, valuesOf(commandsAfter(""))));
     }
+    for (const Choice& each : commands)
+        helpCommand(*find(name + " " + each.value));
 }
 
 void Program::helpProgram() const {
-    std::cout << "Usage: " << mApp->get_name() << " [OPTION...] COMMAND [ARGUMENT...]\n"
+    std::cout << "Usage: " << mName << " [OPTION...] COMMAND [ARGUMENT...]\n"
               << wrap(mRoot.mHelp, 0);
     std::vector<std::string> groups;
     for (const Command& each : mCommands) {
@@ -86,32 +81,24 @@ void Program::helpProgram() const {
     for (const std::string& group : groups) {
         std::cout << '\n' << group << ":\n";
         for (const Command& each : mCommands) {
-            if (each.mGroup == group) printEntry(call(each.mName, each.mArguments), each.mHelp);
+            if (each.mGroup == group) printEntry(each.mName + inCall(each.mArguments), each.mHelp);
         }
     }
-    printOptions("Options of every command", mRoot.mArguments);
-    for (const std::string& note : mRoot.mNotes)
-        std::cout << '\n' << wrap(note, 0);
+    printList("Options of every command", mRoot.mArguments, true);
+    printNotes(mRoot.mNotes);
 }
 
 void Program::helpCommand(const Command& command) const {
     const auto& arguments = command.mArguments;
     const bool hasOptions = std::any_of(arguments.begin(), arguments.end(),
                                         [](const Argument& each) { return each.isOption(); });
-    std::cout << "Usage: " << mApp->get_name() << ' ' << call(command.mName, arguments)
+    std::cout << "Usage: " << mName << ' ' << command.mName << inCall(arguments)
               << (hasOptions ? " [OPTION...]" : "") << '\n'
               << wrap(sentence(command.mHelp), 0);
-    bool any = false;
-    for (const Argument& each : arguments) {
-        if (each.isOption()) continue;
-        if (!any) std::cout << "\nArguments:\n";
-        any = true;
-        printEntry(each.name, each.help);
-    }
-    printOptions("Options", arguments);
-    for (const std::string& note : command.mNotes)
-        std::cout << '\n' << wrap(note, 0);
-    std::cout << "\nExample: " << mApp->get_name() << ' ' << command.mName
+    printList("Arguments", arguments, false);
+    printList("Options", arguments, true);
+    printNotes(command.mNotes);
+    std::cout << "\nExample: " << mName << ' ' << command.mName
               << (command.mExample.empty() ? "" : " ") << command.mExample << '\n';
 }
 

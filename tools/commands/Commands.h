@@ -3,36 +3,51 @@
 
 #include "Client.h"
 
-/** All commands, in the order of the help. Each NAME has a file NAME.cpp with an addNAME(). */
-#define VIBRATORCTL_COMMANDS(ADD) \
-    ADD(OnOff)                    \
-    ADD(Click)                    \
-    ADD(External)                 \
-    ADD(Supports)                 \
-    ADD(Status)                   \
-    ADD(Amplitude)                \
-    ADD(Frequency)                \
-    ADD(Fold)                     \
-    ADD(Prebaked)                 \
-    ADD(Engine)                   \
-    ADD(Ladder)                   \
-    ADD(Motor)                    \
-    ADD(Doctor)                   \
-    ADD(Play)                     \
-    ADD(Watch)                    \
-    ADD(Plot)                     \
-    ADD(Completion)
+#include <functional>
+#include <string>
+#include <vector>
 
-#define DECLARE(name) void add##name(Client& client);
-VIBRATORCTL_COMMANDS(DECLARE)
-#undef DECLARE
+/** Adds all commands, in the order of the help. */
+void addCommands(Client& client);
+
+// Each subject's commands are in a file of its name.
+void addVibration(Client& client);
+void addSettings(Client& client);
+void addPatterns(Client& client);
+void addQueries(Client& client);
+void addDoctor(Client& client);
+void addPlay(Client& client);
+void addWatch(Client& client);
+void addPlot(Client& client);
 
 // The groups of the help.
 inline constexpr char kForAll[] = "For everybody";
 inline constexpr char kRestricted[] = "For root and system";
 inline constexpr char kTools[] = "Tools";
 
-/** A time that the motor runs. */
-inline constexpr cli::Numbers kTimes = {"a time in ms", 0, INT32_MAX};
 /** Full strength and less on the driver's own scale; the service judges what is beyond. */
 inline constexpr cli::Numbers kIntensities = {"an intensity", 1, 10000, UINT32_MAX};
+
+/** What the only argument of a command may be: a number, or else one of some words. */
+struct OneArgument {
+    const char* name;
+    const char* help;
+    cli::Numbers numbers = {};
+    std::vector<cli::Choice> choices = {};
+};
+
+/** A call with a number, or the index of a choice. */
+using Call = std::function<::android::hardware::Return<VibratorStatus>(service::IDaxVibrator&,
+                                                                       uint32_t)>;
+
+/** @return the call of an operation with one argument. */
+template <typename Interface, typename T>
+Call callOf(::android::hardware::Return<VibratorStatus> (Interface::*operation)(T)) {
+    return [operation](service::IDaxVibrator& vibrator, uint32_t number) {
+        return (vibrator.*operation)(static_cast<T>(number));
+    };
+}
+
+/** Lets a command make one call with one argument, and scores have it as a step. */
+void addCall(Client& client, cli::Command& command, const OneArgument& argument,
+             Operation operation, const Call& call);

@@ -1,0 +1,30 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Commands.h"
+
+void addCommands(Client& client) {
+    for (const auto add : {addVibration, addSettings, addPatterns, addQueries, addDoctor, addPlay,
+                           addWatch, addPlot}) {
+        add(client);
+    }
+    client.program().addCompletion(kTools);
+}
+
+void addCall(Client& client, cli::Command& command, const OneArgument& argument,
+             Operation operation, const Call& call) {
+    std::function<uint32_t()> number;
+    if (argument.choices.empty()) {
+        const auto value = command.number(argument.name, argument.numbers, argument.help);
+        operation.range = std::string(argument.numbers.what) + " is " + argument.numbers.range();
+        number = [value] { return *value; };
+    } else {
+        const auto value = command.choice(argument.name, argument.choices, argument.help);
+        number = [value] { return static_cast<uint32_t>(*value); };
+    }
+    const auto shown = [number, choices = argument.choices] {
+        return choices.empty() ? std::to_string(number()) : choices[number()].value;
+    };
+    command.run([=, &client] {
+        return client.answer(operation, call(*client.service(), number()), {shown()});
+    });
+    client.addStep({command.name(), &command});
+}

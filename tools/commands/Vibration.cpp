@@ -1,0 +1,100 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Commands.h"
+
+namespace platform = ::android::hardware::vibrator;
+using platform::V1_0::EffectStrength;
+using service::IDaxVibrator;
+
+namespace {
+
+cli::Value<size_t> addStrength(cli::Command& command) {
+    constexpr size_t kMedium = 1;
+    return command.choice("--strength STRENGTH",
+                          {{"light", "weak"}, {"medium", "as usual"}, {"strong", "full strength"}},
+                          "how strong", kMedium);
+}
+
+/**
+ * Asks for a predefined effect, and reports the answer.
+ *
+ * @param argument what the user asked for, for the report.
+ * @param version which minor version of the platform's interface has the effect, 0 to 3.
+ */
+int performEffect(const Client& client, const std::string& argument, uint32_t effect,
+                  size_t version, size_t strengthIndex) {
+    constexpr const char* kOperations[] = {"perform", "perform_1_1", "perform_1_2", "perform_1_3"};
+    const auto strength = static_cast<EffectStrength>(strengthIndex);
+    const ::android::sp<IDaxVibrator> vibrator = client.service();
+    VibratorStatus status = VibratorStatus::UNKNOWN_ERROR;
+    Answer answer{argument};
+    const auto take = [&](VibratorStatus answered, uint32_t lengthMs) {
+        status = answered;
+        if (status != VibratorStatus::OK) return;
+        answer.words = std::to_string(lengthMs) + " ms";
+        answer.members["lengthMs"] = lengthMs;
+    };
+    service::reached(
+            version == 1 ? vibrator->perform_1_1(platform::V1_1::Effect_1_1{effect}, strength, take)
+            : version == 2 ? vibrator->perform_1_2(platform::V1_2::Effect{effect}, strength, take)
+            : version == 3 ? vibrator->perform_1_3(platform::V1_3::Effect{effect}, strength, take)
+                           : vibrator->perform(platform::V1_0::Effect{effect}, strength, take));
+    if (status == VibratorStatus::UNSUPPORTED_OPERATION) {
+        answer.reason = "this service plays one effect only: effect 0 of version 1.0, the click";
+    }
+    return client.answer({kOperations[version]}, status, answer);
+}
+
+void addClick(Client& client) {
+    cli::Command& click =
+            client.command(kForAll, "click", "play the predefined click", "--strength strong");
+    const auto strength = addStrength(click);
+    click.run([&client, strength] { return performEffect(client, "", 0, 0, *strength); });
+    client.addStep({"click", &click, [] { return 20; }});
+}
+
+void addEffect(Client& client) {
+    constexpr cli::Numbers kEffects = {"the number of an effect", 0, UINT32_MAX};
+    cli::Command& effect = client.command(
+            kForAll, "effect", "ask for a predefined effect by its number", "0 --strength light");
+    const auto number = effect.number("NUMBER", kEffects, "0 is the click");
+    const auto version = effect.choice("--version VERSION",
+                                       {{"1.0", "perform"},
+                                        {"1.1", "perform_1_1"},
+                                        {"1.2", "perform_1_2"},
+                                        {"1.3", "perform_1_3"}},
+                                       "version of the interface that has the effect", 0);
+    const auto strength = addStrength(effect);
+    effect.run([=, &client] {
+        return performEffect(client, std::to_string(*number), *number, *version, *strength);
+    });
+}
+
+}  // namespace
+
+void addVibration(Client& client) {
+    constexpr cli::Numbers kTimes = {"a time in ms", 0, INT32_MAX};
+    cli::Command& on = client.command(kForAll, "on", "run the motor", "500");
+    const auto ms = on.number("MS", kTimes, "how long, in ms");
+    on.run([&client, ms] {
+        return client.answer({"on"}, client.service()->on(*ms), {std::to_string(*ms)});
+    });
+    client.addStep({"on", &on, [ms] { return *ms; }});
+
+    cli::Command& off = client.command(kForAll, "off", "stop the motor", "");
+    off.run([&client] { return client.answer({"off"}, client.service()->off()); });
+    client.addStep({"off", &off, [] { return 0; }});
+
+    addClick(client);
+    addEffect(client);
+    addCall(client,
+            client.command(kForAll, "external",
+                           "hand the motor to an external control, or take it back", "on"),
+            {"STATE",
+             "who runs the motor",
+             {},
+             {{"on", "something else runs the motor"}, {"off", "the service runs the motor"}}},
+            {"setExternalControl", false, {"ext_control"}},
+            [](IDaxVibrator& vibrator, uint32_t index) {
+                return vibrator.setExternalControl(index == 0);
+            });
+}
