@@ -137,7 +137,7 @@ const struct {
              object.binder = reinterpret_cast<binder_uintptr_t>(peer->getWeakRefs());
              object.cookie =
                      reinterpret_cast<binder_uintptr_t>(static_cast<BHwBinder*>(peer.get()));
-             m.replace(0, BINDER_TYPE_BINDER, object);
+             m.replace(1, BINDER_TYPE_BINDER, object);
          },
          kFailed, kBadType},
         {"handle of nothing",
