@@ -29,6 +29,7 @@ set terminal @terminal size width, height font 'sans-serif,'.font_size backgroun
 set termoption noenhanced
 set border 3 lc rgb '#444444'
 set tics nomirror out
+set format '%g'
 set lmargin at screen real(left) / width
 set rmargin at screen 1 - real(right) / width
 set bmargin at screen bottom / height

@@ -23,7 +23,7 @@ using Clock = std::chrono::steady_clock;
 constexpr uint32_t kClients = 64;
 constexpr uint32_t kKilled = kClients / 3;
 constexpr uint32_t kSurvivors = kClients - kKilled;
-constexpr uint32_t kCallsEach = 100'000 / kSurvivors / 2 * 2;
+constexpr uint32_t kCallsEach = 20'000 / kSurvivors / 2 * 2;
 
 /** A number that no other call has, and that grows from call to call of a client. */
 uint32_t markOf(uint32_t client, uint32_t call) {

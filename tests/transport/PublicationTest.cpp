@@ -6,12 +6,9 @@
 #include <sys/stat.h>
 #include <sys/un.h>
 
-#include <algorithm>
-#include <chrono>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
-#include <iostream>
 
 namespace {
 
@@ -151,35 +148,6 @@ TEST_F(PublicationTest, FileSystemThatTakesNothingIsSaid) {
         EXPECT_TRUE(eventually([&] { return log().find(complaint) != std::string::npos; }))
                 << log();
     }
-}
-
-TEST_F(PublicationTest, RestartIsAnsweredSoon) {
-#ifdef SANITIZED
-    GTEST_SKIP() << "a sanitizer takes its time to start";
-#endif
-    const std::string socket = mDirectory.path() + "/" + kName;
-    double median = 1000;
-    // Other programs may keep the processor busy: of five tries one is enough.
-    for (int i = 0; i < 5 && median > 5; ++i) {
-        std::vector<double> times(21);
-        for (double& time : times) {
-            mServer.kill();
-            unlink(socket.c_str());
-            const auto start = std::chrono::steady_clock::now();
-            mServer.startProgram({SERVICE}, logFile(), {});
-            // A look that costs the processor next to nothing.
-            while (access(socket.c_str(), F_OK) != 0)
-                usleep(20);
-            EXPECT_TRUE(eventually(answers));
-            time = std::chrono::duration<double, std::milli>(std::chrono::steady_clock::now() -
-                                                             start)
-                           .count();
-        }
-        std::sort(times.begin(), times.end());
-        median = times[times.size() / 2];
-    }
-    std::cout << "answered after " << median << " ms, the median\n";
-    EXPECT_LE(median, 5);
 }
 
 TEST_F(PublicationTest, DirectoryOfAnotherUserIsNotUsed) {
