@@ -131,8 +131,8 @@ void addWatch(Client& client) {
     const auto fromStart = command.flag("--all", "also show what is there already");
     const auto once = command.flag("--once", "end instead of waiting for more");
     command.note(
-            "Calls that the service refuses do not reach the driver; only the daemon's log, read "
-            "with --log, shows them.");
+            "A trace does not show the calls that the service refused; the daemon's log, read with "
+            "--log, does.");
     command.withoutJson().run([=] {
         constexpr size_t kLongest = 1 << 20;
         const std::string name = traffic.file();

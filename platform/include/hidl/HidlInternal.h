@@ -31,8 +31,7 @@ std::string toHexString(T number) {
     return "0x" + digits;
 }
 
-/** Base of generated classes that could report their calls; this platform has no instrumentation.
- */
+/** Base of generated classes that could report their calls, which this platform does not do. */
 class HidlInstrumentor {
   public:
     HidlInstrumentor(const std::string& /* package */, const std::string& /* interface */) {}
