@@ -6,7 +6,7 @@
 
 #include <csignal>
 
-/** A child process that runs a function; killed in the end. */
+/** A child process that runs a function; the destructor kills it. */
 class Child {
   public:
     template <typename Function>

@@ -17,7 +17,7 @@ void callOverGrpc(benchmark::State& state) {
     const TemporaryDirectory directory;
     const std::string address = "unix:" + directory.path() + "/socket";
     const Child server([&] { execl(GRPC_SERVER, GRPC_SERVER, address.c_str(), nullptr); });
-    // Tried again soon, so that the wait for the server is over before the measurement begins.
+    // Retries soon, so that the server is there before the measurement begins.
     grpc::ChannelArguments arguments;
     arguments.SetInt(GRPC_ARG_INITIAL_RECONNECT_BACKOFF_MS, 10);
     arguments.SetInt(GRPC_ARG_MIN_RECONNECT_BACKOFF_MS, 10);

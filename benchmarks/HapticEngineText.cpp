@@ -16,7 +16,7 @@ using ::vendor::velmora::hardware::vibrator::V2_1::implementation::HapticEngineT
 
 constexpr uint32_t kAmplitude = 5000;
 
-/** As many packets as there may be, with values of all lengths. */
+/** The most packets that are allowed, with values of all lengths. */
 HapticEnginePackets makePackets() {
     std::vector<DaxHapticEnginePacket> packets(339);
     for (int i = 0; i < 339; ++i) {
@@ -36,7 +36,7 @@ void buildText(benchmark::State& state) {
 }
 BENCHMARK(buildText);
 
-/** The same text through one snprintf a value, into a buffer of the same kind. */
+/** The same text by one snprintf for each value, in a buffer of the same kind. */
 size_t printText(const HapticEnginePackets& packets, char (&text)[13600]) {
     memset(text, 0, sizeof(text));
     size_t length = 0;

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 
 /**
- * How long a client that makes a call now and then waits for the answer, beside clients of other
- * users that send all that the daemon takes. Prints a row for each company.
+ * How long a client that makes few calls waits for the answer while clients of other users send as
+ * much as the daemon takes. Prints a row for each set of such flooders.
  */
 #include "Child.h"
 #include "libhwbinder/Packet.h"
@@ -39,7 +39,7 @@ void become(uid_t uid) {
     if (geteuid() == 0 && setuid(uid) != 0) abort();
 }
 
-/** A connection that is never without requests. */
+/** A connection that always has requests waiting. */
 class Flooder {
   public:
     explicit Flooder(const std::string& directory) {
@@ -115,7 +115,7 @@ std::vector<double> waits() {
     return milliseconds;
 }
 
-/** Prints the row of one company. @param goal of the median, in ms; 0 for none. */
+/** Prints the row of one set of flooders. @param goal of the median, in ms; 0 for none. */
 void printWaits(const char* company, double goal) {
     const std::vector<double> all = waits();
     const double median = all[all.size() / 2];
@@ -126,7 +126,7 @@ void printWaits(const char* company, double goal) {
     std::fflush(stdout);
 }
 
-/** Measures beside flooders in the name of so many users, with so many connections each. */
+/** Measures against flooders of a number of users, with a number of connections each. */
 void measure(const std::string& directory, const char* company, uid_t users, int connections,
              double goal) {
     std::vector<std::unique_ptr<Child>> flooders;

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 
-/** Each operation, in process, beside the bare system calls that it makes. */
+/** Each operation, in process, compared with the bare system calls that it makes. */
 #include "support/Operations.h"
 
 #include "PrivateSysfs.h"

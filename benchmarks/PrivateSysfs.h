@@ -2,9 +2,9 @@
 #pragma once
 
 /**
- * Puts a file system in memory over /sys/class, for this process and its children alone, so that
- * the nodes are files of their own paths. Must come before the process has a second thread.
+ * Mounts a file system in memory over /sys/class, only for this process and its children, so that
+ * nodes can be plain files at their own paths. Must be called before there is a second thread.
  *
- * @return whether it could be done: by root, or where users may make namespaces.
+ * @return whether it succeeded, which needs root or user namespaces.
  */
 bool enterPrivateSysfs();

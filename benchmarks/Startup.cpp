@@ -23,12 +23,12 @@ void startUp(benchmark::State& state) {
         unlink(socket.c_str());
         const auto start = std::chrono::steady_clock::now();
         const Child daemon([] { execl(SERVICE, SERVICE, nullptr); });
-        // A look that costs the processor, which both share, next to nothing.
+        // A cheap check, since both processes share the processor.
         while (access(socket.c_str(), F_OK) != 0)
             usleep(20);
         for (android::sp<IDaxVibrator> vibrator; vibrator == nullptr || !vibrator->off().isOk();)
             vibrator = IDaxVibrator::tryGetService();
-        // Without the daemon's end, which comes with that of the scope.
+        // Not counting the daemon's end, at the end of the scope.
         const std::chrono::duration<double> time = std::chrono::steady_clock::now() - start;
         state.SetIterationTime(time.count());
     }

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 
-/** A call from one process to another, beside the least that any transport takes for it. */
+/** A call from one process to another, compared with the least that any transport takes. */
 #include "Child.h"
 #include "support/TemporaryDirectory.h"
 
@@ -34,7 +34,7 @@ class Server {
     std::vector<std::unique_ptr<Child>> mChild;
 };
 
-/** Calls an operation that answers without a look at the driver. */
+/** Calls an operation that does not access the driver. */
 void callOnce(IDaxVibrator& vibrator) {
     Status answer = Status::OK;
     vibrator.perform_1_1(Effect_1_1::CLICK, EffectStrength::LIGHT,
@@ -50,7 +50,7 @@ void call(benchmark::State& state) {
 }
 BENCHMARK(call)->UseRealTime();
 
-/** Calls one after the other by as many connected clients as the argument says. */
+/** Calls by a number of connected clients, one after the other. */
 void callOfManyClients(benchmark::State& state) {
     const Server server;
     std::vector<android::sp<IDaxVibrator>> clients;
@@ -66,7 +66,7 @@ void callOfManyClients(benchmark::State& state) {
 }
 BENCHMARK(callOfManyClients)->Name("clients")->Arg(1)->Arg(64)->UseRealTime();
 
-/** Calls to a daemon that has answered as many before as the argument says. */
+/** Calls to a daemon that has already answered a number of calls. */
 void callAfterManyCalls(benchmark::State& state) {
     const Server server;
     const auto vibrator = IDaxVibrator::tryGetService();
@@ -77,7 +77,7 @@ void callAfterManyCalls(benchmark::State& state) {
 }
 BENCHMARK(callAfterManyCalls)->Name("calls")->Arg(1)->Arg(100'000)->UseRealTime();
 
-/** Messages of the same sizes to and fro, and nothing else. */
+/** Only messages of the same sizes in both directions. */
 void callFloor(benchmark::State& state) {
     constexpr size_t kRequest = 72;
     constexpr size_t kReply = 32;

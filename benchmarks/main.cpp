@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 
 /**
- * Each subject stands beside its floor, the least that any code doing the same would take, as
- * "NAME" and "NAME/floor"; scripts/bench runs them interleaved and prints the ratios.
+ * Each subject "NAME" has a floor "NAME/floor", the least that any code doing the same would take.
+ * scripts/bench runs them interleaved and prints the ratios.
  */
 #include "PrivateSysfs.h"
 
@@ -14,7 +14,7 @@
 void registerOperations();
 
 int main(int argc, char** argv) {
-    // The log is no part of what is measured.
+    // The log is not measured.
     setenv("ANDROID_LOG_TAGS", "*:S", 1);
     benchmark::Initialize(&argc, argv);
     if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 2;

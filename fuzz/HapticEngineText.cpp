@@ -10,7 +10,7 @@ using ::vendor::velmora::hardware::vibrator::V2_1::implementation::HapticEngineT
 
 namespace {
 
-/** The line as the plainest code makes it; empty where a value is too long for its place. */
+/** The line as the simplest code makes it; empty if a value is too long. */
 std::string plainText(const HapticEnginePackets& packets, uint32_t amplitude) {
     std::string text = std::to_string(4 * packets.size());
     for (const auto& packet : packets) {
@@ -27,7 +27,7 @@ std::string plainText(const HapticEnginePackets& packets, uint32_t amplitude) {
 
 }  // namespace
 
-/** Amplitude and packets, as they lie in memory, against the plainest code. */
+/** The input is an amplitude and packets, as in memory. Compares with the simplest code. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     uint16_t number = 0;
     if (size < sizeof(number)) return 0;

@@ -15,7 +15,7 @@ using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
 namespace {
 
-/** What a node's text is after a reader has taken its part of it and one newline from the end. */
+/** @return the part of a node's text that a reader gets, without one final newline. */
 std::string textOf(const std::string& content, size_t most) {
     std::string text = content.substr(0, most);
     if (!text.empty() && text.back() == '\n') text.pop_back();
@@ -38,7 +38,7 @@ int32_t motorOf(const std::string& content) {
 
 }  // namespace
 
-/** Any bytes as the content of a node, against the plainest way to read it. */
+/** The input is the content of a node. Compares with the simplest way to read it. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     [[maybe_unused]] static const int quiet = setenv("ANDROID_LOG_TAGS", "*:S", 1);
     static const ::android::sp<Vibrator> vibrator = new Vibrator;

@@ -3,8 +3,7 @@
 
 #include <cstdlib>
 
-/** Any bytes as the client's packet file: refused with a reason, or taken and told again the same.
- */
+/** The input is a packet file. It is refused with a reason, or its packets survive a round trip. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     const std::string text(reinterpret_cast<const char*>(data), size);
     HapticEnginePackets packets;

@@ -3,8 +3,7 @@
 
 #include <cstdlib>
 
-/** Any bytes as a score: every mistake lies in a line of it, and a score without one can be played.
- */
+/** The input is a score: mistakes are in its lines, and a score without mistakes can be played. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     static Client client;
     if (client.stepKinds().empty()) addCommands(client);

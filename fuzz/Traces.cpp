@@ -4,7 +4,7 @@
 #include <cstdlib>
 #include <sstream>
 
-/** Any bytes as a trace and as a log, drawn all ways, whole and in part. */
+/** The input is a trace and a log, drawn in all ways, whole and in part. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     AccessReader trace(false);
     AccessReader log(true);

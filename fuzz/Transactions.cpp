@@ -17,7 +17,7 @@ namespace {
 
 void keep(const uint8_t* /* bytes */, void* /* packet */) {}
 
-/** Any bytes, as they come from a socket. */
+/** The input as a packet from a socket. */
 std::unique_ptr<Packet> packetOf(const uint8_t* data, size_t size) {
     auto packet = std::unique_ptr<Packet>(new Packet);
     memcpy(packet->bytes, data, size);
@@ -44,7 +44,7 @@ class Answering : public IBinder {
     std::unique_ptr<Packet> mPacket;
 };
 
-/** The bytes as a request to the service object: it gets an answer that can be sent. */
+/** The input as a request to the service object, which gives an answer that can be sent. */
 void request(const uint8_t* data, size_t size) {
     static const ::android::sp<Vibrator> vibrator = new Vibrator;
     static const ::android::sp<IBinder> stub = getOrCreateCachedBinder(vibrator.get());
@@ -64,7 +64,7 @@ void request(const uint8_t* data, size_t size) {
     if (status == ::android::OK && !isSent) send(results);
 }
 
-/** The bytes as the reply to calls: the values that come of them can be used. */
+/** The input as the reply to calls, whose results can be used. */
 void reply(const uint8_t* data, size_t size) {
     const ::android::sp<::android::hidl::manager::V1_2::IServiceManager> manager =
             new ::android::hidl::manager::V1_2::BpHwServiceManager(new Answering(data, size));
@@ -88,7 +88,7 @@ void reply(const uint8_t* data, size_t size) {
 
 }  // namespace
 
-/** The first byte says what the others are. */
+/** The first byte says how the others are used. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     [[maybe_unused]] static const int quiet = setenv("ANDROID_LOG_TAGS", "*:S", 1);
     if (size == 0 || size > Packet::kMaxSize) return 0;

@@ -28,10 +28,10 @@ constexpr std::string_view kDirectories[] = {"/sys/class/timed_output/vibrator/"
 /** Names of the layouts, in the order of their values. */
 constexpr const char* kLayouts[] = {"timed output", "LED trigger"};
 
-/** Marks a folder as one that may be written to. */
+/** Marks a folder as a simulated driver's. */
 constexpr char kMarkFile[] = ".vibrator-sim";
 
-/** Holds, beside the nodes, when the motor stops: nanoseconds of the monotonic clock. */
+/** Holds the time at which the motor stops, in nanoseconds of the monotonic clock. */
 constexpr char kDeadlineFile[] = ".deadline";
 
 /** @return the folder of a sysfs directory, whose path begins and ends with a slash. */
@@ -86,7 +86,7 @@ int storeText(const Node& node, std::string_view text) {
     return -folder.replace(node.leaf(), text, folder.mode(node.leaf()) & 07777);
 }
 
-/** Holds a number from a range that the driver checks. */
+/** Takes a number, whose range the driver checks. */
 template <int least, int most>
 int storeNumber(const Node& node, std::string_view text) {
     int number = 0;
@@ -106,7 +106,7 @@ std::string showEnable(const Node& node) {
     return std::to_string(remaining(node)) + "\n";
 }
 
-/** The transient LED trigger: 1 starts the timer unless it runs or is 0 long, 0 cancels it. */
+/** The transient LED trigger: 1 starts the timer unless it runs, 0 cancels it. */
 int storeActivate(const Node& node, std::string_view text) {
     unsigned long state = 0;
     const int error = parseKernelNumber(text, &state);
@@ -157,14 +157,14 @@ int storeEventCommand(const Node& node, std::string_view text) {
     return known ? storeText(node, text) : -EINVAL;
 }
 
-/** An attribute that the driver only shows. */
+/** A read-only attribute. */
 int storeNothing(const Node& /* node */, std::string_view /* text */) {
     return -EIO;
 }
 
 struct Attribute {
     const char* leaf;
-    /** What it belongs to: a feature, or a layout, all of whose drivers have it. */
+    /** The feature, or else the layout, that it belongs to. */
     const char* feature;
     mode_t mode;
     const char* initial;
@@ -287,7 +287,7 @@ std::vector<Node> listNodes(const std::string& directory) {
 int openNode(const Node& node, int flags) {
     const std::string leaf = node.leaf();
     const Folder folder = folderOf(node);
-    // The driver's own mode binds root too, who is let into any plain file.
+    // The attribute's mode binds root too, who may open any plain file.
     const mode_t mode = folder.mode(leaf);
     const bool reads = (flags & O_ACCMODE) != O_WRONLY;
     const bool writes = (flags & O_ACCMODE) != O_RDONLY;
@@ -303,7 +303,7 @@ std::string show(const Node& node) {
 }
 
 ssize_t store(const Node& node, const std::string& bytes) {
-    // The kernel does not trouble the driver with nothing.
+    // The kernel does not call the driver for an empty write.
     if (bytes.empty()) return 0;
     const std::string_view taken = std::string_view(bytes).substr(0, kPageSize);
     const Attribute* attribute = findAttribute(node.leaf());

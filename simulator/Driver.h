@@ -21,7 +21,7 @@ enum class Layout { kTimedOutput, kLedTrigger };
 /** @return where the kernel has the nodes of a layout; ends in a slash. */
 std::string sysfsDirectory(Layout layout);
 
-/** What a driver offers beside running its motor. */
+/** What a driver offers besides running its motor. */
 struct Features {
     /** Names of featureNames(); each stands for one or more nodes. */
     std::set<std::string> names;
@@ -37,17 +37,17 @@ std::vector<std::string> featureNames();
 /**
  * Takes a directory for a simulated driver: makes it, or marks it when it is empty.
  *
- * @return an errno, 0 for success; ENOTEMPTY for one with something in it and without the mark.
+ * @return an errno, 0 for success; ENOTEMPTY if it has other content and no mark.
  */
 int claimDirectory(const std::string& directory);
 /** @return whether a directory has been claimed. */
 bool isMarked(const Folder& directory);
 /**
- * Makes a driver in a directory that can be claimed, in place of one of the same layout. Follows
+ * Makes a driver in a directory that can be claimed, and replaces one of the same layout. Follows
  * no links inside. @return an errno, 0 for success.
  */
 int createDriver(const std::string& directory, Layout layout, const Features& features);
-/** Makes just the nodes, in any directory, "" being the root. @return an errno, 0 for success. */
+/** Makes only the nodes, in any directory; "" is the root. @return an errno, 0 for success. */
 int createNodes(const std::string& directory, Layout layout, const Features& features);
 
 /** A node of the simulated driver. */
@@ -77,7 +77,7 @@ int openNode(const Node& node, int flags);
 /** @return what reading the node yields now. */
 std::string show(const Node& node);
 
-/** Hands the node what was written. @return the number of bytes taken, or a negative errno. */
+/** Writes to the node. @return the number of bytes taken, or a negative errno. */
 ssize_t store(const Node& node, const std::string& bytes);
 
 }  // namespace simulator

@@ -41,7 +41,7 @@ std::optional<Fault> fromWords(const std::string& text) {
     return fields == 4 ? std::optional(fault) : std::nullopt;
 }
 
-/** Reads a fault from its file, and leaves there what it is after this time. */
+/** Reads a fault from its file, and counts this time in the file. */
 std::optional<Fault> countDown(int file) {
     char text[64] = {};
     if (pread(file, text, sizeof(text) - 1, 0) < 0) return std::nullopt;

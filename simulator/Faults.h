@@ -16,9 +16,9 @@ struct Fault {
     int error = 0;
     /** How many bytes a transfer that is cut short moves. */
     size_t bytes = 0;
-    /** How often it still happens; 0 for ever. */
+    /** How often it still happens; 0: always. */
     unsigned times = 0;
-    /** How often the operation still succeeds before. */
+    /** How often the operation still succeeds first. */
     unsigned after = 0;
 };
 
@@ -26,18 +26,18 @@ struct Fault {
 std::optional<Fault> parseFault(const std::string& text);
 
 /**
- * Makes an operation on a node go wrong from now on; nothing takes back what was set.
+ * Sets the fault of an operation on a node; an empty one removes it.
  *
  * @param leaf the node's name, like "intensity", in either layout.
  * @param operation "open", "read", "write" or "close".
- * @return whether it could be noted down.
+ * @return whether it could be stored.
  */
 bool setFault(const std::string& directory, const std::string& leaf, const std::string& operation,
               const std::optional<Fault>& fault);
 
 /**
- * @return what goes wrong this time. Counts it: of several processes that ask at once, only as many
- *         get the fault as it has times left.
+ * @return the fault that happens this time. Counts it, also between processes: no more of them get
+ *     the fault than it has times left.
  */
 std::optional<Fault> takeFault(const Folder& directory, const std::string& leaf,
                                const std::string& operation);
@@ -45,7 +45,7 @@ std::optional<Fault> takeFault(const Folder& directory, const std::string& leaf,
 /** @return a line for each fault that is set, like "intensity write EIO, 2 times". */
 std::vector<std::string> listFaults(const std::string& directory);
 
-/** Takes back all that was set. @return an errno, 0 for success. */
+/** Removes all faults. @return an errno, 0 for success. */
 int clearFaults(const std::string& directory);
 
 }  // namespace simulator

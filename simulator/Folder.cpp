@@ -13,7 +13,7 @@ namespace {
 
 constexpr int kOpenFolder = O_PATH | O_DIRECTORY | O_CLOEXEC;
 
-/** @return a name that stays in its folder; of what would not, "", which no call takes. */
+/** @return a name; for one that leads out of its folder "", which every system call refuses. */
 const char* inside(const std::string& name) {
     const bool leaves = name.find('/') != std::string::npos || name == "." || name == "..";
     return leaves ? "" : name.c_str();
@@ -53,7 +53,7 @@ mode_t Folder::mode(const std::string& name) const {
 
 int Folder::open(const std::string& name, int flags, mode_t mode) const {
     if (mError != 0) return -mError;
-    // O_NONBLOCK: a pipe in a file's place must not hold anybody up.
+    // O_NONBLOCK: opening a pipe in a file's place must not block.
     constexpr int kSafely = O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC;
     const int file = openat(mFile, inside(name), flags | kSafely, mode);
     if (file < 0) return -errno;
@@ -76,7 +76,7 @@ std::string Folder::read(const std::string& name) const {
 
 int Folder::replace(const std::string& name, std::string_view text, mode_t mode) const {
     if (mError != 0) return mError;
-    // One for each thread; what a killed one has left is taken away.
+    // A name for each thread; a file that a killed one left is removed.
     const std::string fresh = ".new." + std::to_string(gettid());
     remove(fresh);
     const int file = openat(mFile, fresh.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600);

@@ -10,20 +10,20 @@
 namespace simulator {
 
 /**
- * A folder that is open. Whatever is done with it stays inside: names have no slashes, and a
- * symbolic link in a name's place is never followed.
+ * An open folder. Its operations never leave it: names have no slashes, and symbolic links are not
+ * followed.
  */
 class Folder {
   public:
-    /** Opens a folder by its path, in which links are followed: the user has named it. */
+    /** Opens a folder by its path. Follows links in it, since the user has named it. */
     explicit Folder(const std::string& path);
-    /** Opens the folder at a relative path below another; makes it where asked to. */
+    /** Opens the folder at a relative path below another. @param create whether to make it. */
     Folder(const Folder& above, std::string_view path, bool create = false);
     Folder(const Folder&) = delete;
     Folder& operator=(const Folder&) = delete;
     ~Folder();
 
-    /** @return the errno that kept it from being opened; 0 when it is open. */
+    /** @return the errno of opening it; 0 when it is open. */
     int error() const { return mError; }
     /** @return a file's type and mode; 0 when there is no such file. */
     mode_t mode(const std::string& name) const;
@@ -31,11 +31,11 @@ class Folder {
     int open(const std::string& name, int flags, mode_t mode = 0) const;
     /** @return what a plain file holds; "" when there is none. */
     std::string read(const std::string& name) const;
-    /** Gives a file new content at once, whatever it was. @return an errno, 0 for success. */
+    /** Replaces a file, of any type, in one step. @return an errno, 0 for success. */
     int replace(const std::string& name, std::string_view text, mode_t mode) const;
     /** Removes a file, or a link itself. */
     void remove(const std::string& name) const;
-    /** @return the sorted names of all in it. */
+    /** @return the names of its entries, sorted. */
     std::vector<std::string> names() const;
 
   private:

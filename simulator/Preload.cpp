@@ -9,7 +9,7 @@
 
 namespace {
 
-/** Says at the start what would otherwise look like a kernel without a driver. */
+/** Warns at the start of settings that would look like a kernel without a driver. */
 __attribute__((constructor)) void checkDirectory() {
     const char* directory = getenv("VIBRATOR_SIM_DIR");
     if (directory == nullptr || *directory == '\0') {

@@ -44,10 +44,10 @@ fs::path findProgram(const std::string& name, const std::vector<const char*>& pl
                              " is neither beside vibrator-sim nor where it is built or installed");
 }
 
-/** A program that this one starts; it is killed in the destructor at the latest. */
+/** A program that this one starts; the destructor kills it. */
 class Child {
   public:
-    /** @param prepare what the child does before it becomes the program. */
+    /** @param prepare called in the child before it runs the program. */
     Child(const std::vector<std::string>& command, const std::function<void()>& prepare) {
         std::vector<char*> arguments;
         arguments.reserve(command.size() + 1);
@@ -77,7 +77,7 @@ class Child {
     void signal(int number) const {
         if (mPid > 0) kill(mPid, number);
     }
-    /** @return whether the program has ended, now or before. */
+    /** @return whether the program has ended. */
     bool hasEnded(int options = WNOHANG) {
         if (mPid > 0 && waitpid(mPid, &mStatus, options) == mPid) mPid = -1;
         return mPid < 0;
@@ -94,13 +94,13 @@ class Child {
     int mStatus = 0;
 };
 
-/** A directory in /tmp, which a process of its own removes when this one ends, however it does. */
+/** A directory in /tmp; a second process removes it when this one ends, even if it is killed. */
 class PrivateDirectory {
   public:
-    // Not in $TMPDIR: the path of a socket must be short, and one to preload without blanks.
+    // Not in $TMPDIR: a socket's path must be short, and a preloaded library's without blanks.
     PrivateDirectory() {
         if (mkdtemp(mPath.data()) == nullptr) throw std::runtime_error(failure(mPath));
-        // Its input ends when this process does. A dying daemon may still put something there.
+        // Its input ends when this process does. A dying daemon may still add files, so it retries.
         const std::string remover =
                 "exec >/dev/null 2>&1; cat; for attempt in 1 2 3 4 5; do rm -rf " + mPath +
                 " && break; sleep 0.2; done";
@@ -118,7 +118,7 @@ class PrivateDirectory {
     std::FILE* mRemover;
 };
 
-/** The signals that end this program or tell of a child's end. They wait until they are taken. */
+/** The signals that end this program or report a child's end. They are blocked until taken. */
 class Signals {
   public:
     Signals() {
@@ -127,7 +127,7 @@ class Signals {
             sigaddset(&mSet, number);
         sigprocmask(SIG_BLOCK, &mSet, nullptr);
     }
-    /** @return the next signal; 0 when none has come for some time. */
+    /** @return the next signal; 0 if none comes for 20 ms. */
     int take(siginfo_t* info) const {
         const timespec time{0, 20'000'000};
         const int number = sigtimedwait(&mSet, info, &time);
@@ -138,7 +138,7 @@ class Signals {
     sigset_t mSet;
 };
 
-/** Puts the daemon where the terminal's signals do not reach it, and the simulator into it. */
+/** Prepares the daemon's process: its log, no signals of the terminal, the preloaded library. */
 void becomeDaemon(const std::string& directory, const std::string& preload, pid_t parent) {
     setpgid(0, 0);
     prctl(PR_SET_PDEATHSIG, SIGKILL);
@@ -157,7 +157,7 @@ std::string lastLine(std::string text) {
     return text.substr(text.rfind('\n') + 1);
 }
 
-/** Waits until the daemon answers, and sees that it is the simulated driver that it has probed. */
+/** Waits until the daemon answers, and checks that it has probed the simulated driver. */
 void awaitDaemon(Child& daemon, const std::string& client, const std::string& directory,
                  const Signals& signals) {
     constexpr int kAttempts = 500;
@@ -186,14 +186,14 @@ void awaitDaemon(Child& daemon, const std::string& client, const std::string& di
 
 /** Passes signals on to a command until it ends. @return its exit code. */
 int awaitCommand(Child& command, const Signals& signals) {
-    // How often nothing may happen before a command that was told to end is killed: two seconds.
+    // A command that was told to end is killed after so many waits without a signal, two seconds.
     int patience = 100;
     bool isEnding = false;
     while (!command.hasEnded()) {
         siginfo_t info{};
         const int number = signals.take(&info);
         if (number == 0 && isEnding && --patience == 0) command.signal(SIGKILL);
-        // What a terminal sends, the command has had itself.
+        // The terminal has sent its signals to the command, too.
         if (number == 0 || number == SIGCHLD || info.si_code == SI_KERNEL) continue;
         command.signal(number);
         isEnding = isEnding || number == SIGTERM || number == SIGHUP;
@@ -217,7 +217,7 @@ int runSession(const SessionOptions& options) {
     const fs::path preload = findProgram(kPreload, {".", "../" LIBRARY_DIRECTORY});
     const fs::path client = findProgram("vibratorctl", {"../tools", "."});
 
-    // In this order: what removes the directory must not get the signals, either.
+    // In this order: the process that removes the directory must not get the signals either.
     const Signals signals;
     const PrivateDirectory place;
     const std::string directory =
@@ -226,7 +226,7 @@ int runSession(const SessionOptions& options) {
     const Folder driver(directory);
     driver.remove("trace");
     if (driver.replace("log", "", 0644) != 0) throw std::runtime_error(failure(directory + "/log"));
-    // Links, whose paths have neither blanks nor colons.
+    // Links, since a path in LD_PRELOAD or PATH may have no blanks or colons.
     fs::create_symlink(preload, place / kPreload);
     fs::create_directory(place / "bin");
     fs::create_symlink(client, place / "bin/vibratorctl");
@@ -245,7 +245,7 @@ int runSession(const SessionOptions& options) {
         const char* shell = getenv("SHELL");
         words = {shell == nullptr || *shell == '\0' ? "/bin/sh" : shell};
         std::cerr << "vibrator-sim: the driver is in " << cli::inQuotes(directory)
-                  << ", and so is the daemon's log; \"exit\" removes them\n";
+                  << ", and so is the daemon's log; \"exit\" ends the daemon\n";
     }
     Child command(words, [] { prctl(PR_SET_PDEATHSIG, SIGHUP); });
     return awaitCommand(command, signals);

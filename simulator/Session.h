@@ -12,7 +12,7 @@ namespace simulator {
 void makeDriver(const std::string& directory, Layout layout, const Features& features);
 
 struct SessionOptions {
-    /** Where the driver is made; empty for a directory that is removed in the end. */
+    /** The driver's directory; empty for a temporary one. */
     std::string directory;
     Layout layout = Layout::kLedTrigger;
     Features features;
@@ -21,10 +21,10 @@ struct SessionOptions {
 };
 
 /**
- * Makes a driver, starts the daemon on it, and runs a command that finds both; when the command
- * ends, or this process in whatever way, the daemon is ended and what was made is removed.
+ * Makes a driver, starts the daemon on it, and runs a command that uses both. When the command or
+ * this process ends, in whatever way, the daemon is ended and temporary files are removed.
  *
- * @return the command's exit code; 128 and the number of the signal that has ended it.
+ * @return the command's exit code; 128 plus the signal's number if a signal ended it.
  * @throw std::runtime_error that says what kept the daemon from running on the driver.
  */
 int runSession(const SessionOptions& options);

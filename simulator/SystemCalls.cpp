@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 
 /**
- * Stands in for the C library's open, read, write and close, and takes those that concern the
- * driver's nodes to the simulated driver below $VIBRATOR_SIM_DIR. Everything else goes on to the
- * kernel. Preloaded into a daemon or linked into a test, which then need not know of it.
+ * Replaces the C library's open, read, write and close. Calls for the driver's nodes go to the
+ * simulated driver below $VIBRATOR_SIM_DIR, all others to the kernel. It is preloaded into a daemon
+ * or linked into a test, whose own code does not change.
  */
 #undef _FORTIFY_SOURCE
 #include "Driver.h"
@@ -43,11 +43,11 @@ int kernelClose(int file) {
     return static_cast<int>(syscall(SYS_close, file));
 }
 
-/** A node that is open; its descriptor is one of the file that holds its state. */
+/** An open node; its descriptor is that of the file that holds its state. */
 struct OpenNode {
     Node node;
     std::shared_ptr<const Folder> directory;
-    /** What it has shown at its first read: the next ones go on in that. */
+    /** What it showed at the first read; later reads continue in it. */
     std::string shown;
     size_t offset = 0;
 };
@@ -61,10 +61,10 @@ class OpenNodes {
         return *nodes;
     }
 
-    /** @return whether any node is open; does without a lock in the common case that none is. */
+    /** @return whether any node is open, without a lock. */
     static bool any() { return sCount.load(std::memory_order_acquire) > 0; }
 
-    // What goes is destroyed without the lock: it closes a folder, and close takes the lock.
+    // Nodes are destroyed without the lock: that closes a folder, and close takes the lock.
     void add(int file, OpenNode node) {
         const std::lock_guard<std::mutex> lock(mMutex);
         std::swap(mNodes[file], node);
@@ -97,7 +97,7 @@ OpenNode* findOpenNode(int file) {
     return OpenNodes::any() ? OpenNodes::instance().find(file) : nullptr;
 }
 
-/** Makes of a result, or negative errno, what a system call returns; success leaves errno alone. */
+/** Turns a result or negative errno into a system call's; success leaves errno unchanged. */
 template <typename Call>
 auto answer(Call call) {
     const int before = errno;
@@ -107,7 +107,7 @@ auto answer(Call call) {
 }
 
 /**
- * Does what an access asks for, unless a fault keeps it from that, and traces it.
+ * Performs and traces an access, unless a fault makes it fail.
  *
  * @param action gets the most bytes that it may move, less than SIZE_MAX where a fault cuts it
  *     short; returns the result, or a negative errno.
@@ -153,7 +153,7 @@ ssize_t simulateRead(OpenNode& open, void* buffer, size_t size) {
 ssize_t simulateWrite(const OpenNode& open, const void* buffer, size_t size) {
     const std::string bytes(static_cast<const char*>(buffer), size);
     return simulate(open, "write", ' ' + simulator::quote(bytes), [&](size_t most) {
-        // A driver that is cut short has not taken the value.
+        // A driver that gets only a part does not take the value.
         return most < SIZE_MAX ? static_cast<ssize_t>(std::min(size, most))
                                : simulator::store(open.node, bytes);
     });

@@ -65,8 +65,8 @@ void trace(const Folder& directory, const std::string& access, long result,
     const int file = directory.open(kTraceName, O_WRONLY | O_APPEND | O_CREAT, 0644);
     struct stat info;
     if (file < 0 || fstat(file, &info) != 0) return;
-    // One write a line, so that the lines of several processes do not mix. There is nobody to
-    // complain to when it fails.
+    // One write a line, so that the lines of several processes do not mix. A failure cannot be
+    // reported to anybody.
     if (info.st_size < kTraceLimit) {
         [[maybe_unused]] const ssize_t written = write(file, line.data(), line.size());
     }

@@ -10,14 +10,14 @@
 
 namespace simulator {
 
-/** A trace that has this many bytes gets no more; some million accesses. */
+/** Size at which a trace stops growing, in bytes: about a million accesses. */
 constexpr off_t kTraceLimit = off_t{64} << 20;
 
 /** @return the file that every access of the driver below a directory is appended to. */
 std::string traceFile(const std::string& directory);
 
 /**
- * Appends one access to the trace: seconds of the monotonic clock, and what happened, like
+ * Appends one access to the trace, with the seconds of the monotonic clock, like
  * `12.345678 leds/state write "1\n" = 2`. Only in a directory that is marked as a driver's, and up
  * to the limit.
  *
@@ -27,7 +27,7 @@ std::string traceFile(const std::string& directory);
 void trace(const Folder& directory, const std::string& access, long result,
            const std::string& shown = {});
 
-/** From now on this process only looks: its accesses are not traced, and no fault comes of them. */
+/** From now on this process only looks: its accesses are not traced, and faults do not apply. */
 void onlyLook();
 /** @return whether this process only looks. */
 bool onlyLooks();

@@ -88,7 +88,7 @@ class Simulator {
                                             "VIBRATOR_SIM_DIR",
                                             "");
         mProgram.shared().note(
-                "Exit code: 0 done; 1 it cannot be done; 2 a mistake in the command "
+                "Exit code: 0 done; 1 failed; 2 a mistake in the command "
                 "line; run: that of its command.");
         addRun();
         addCreate();
@@ -154,9 +154,9 @@ class Simulator {
         const auto words =
                 command.rest("COMMAND", "the command and its arguments; without one, your shell");
         command.note(
-                "The command has VIBRATOR_SIM_DIR, the directory of the driver with \"trace\", all "
-                "accesses of nodes, and \"log\", the log of the service. In the end the service "
-                "is ended and the directory removed, unless --dir has named one.");
+                "VIBRATOR_SIM_DIR tells the command the driver's directory; in it are \"trace\", "
+                "all accesses of nodes, and \"log\", the log of the service. When the command "
+                "ends, the service is ended and the directory removed, unless --dir named it.");
         command.run([=] {
             return simulator::runSession({kept->empty() ? *mDirectory : *kept, options.layout(),
                                           options.features(), *words});
@@ -165,7 +165,7 @@ class Simulator {
 
     void addCreate() {
         cli::Command& command =
-                mProgram.command(kAlone, "create", "make a driver, in place of what was there",
+                mProgram.command(kAlone, "create", "make a driver, and replace what was there",
                                  "--motor LINEAR_1030 --features intensity,prebaked");
         const DriverOptions options(command);
         command.note("The directory must be new, empty, or a driver's.");
@@ -209,11 +209,11 @@ class Simulator {
         const auto text = command.text("FAULT", "an errno like EINVAL; short=BYTES; none", "");
         constexpr uint32_t kMost = 1'000'000;
         const auto times = command.number(
-                "--times N", {"how often the access fails", 1, kMost, 0},
-                "how often the access fails; without it, until it is set to none", 0);
-        const auto after = command.number("--after N", {"how often it succeeds before", 0, kMost},
-                                          "how often it succeeds before", 0);
-        const auto clear = command.flag("--clear", "take back all faults");
+                "--times N", {"a number of accesses", 1, kMost, 0},
+                "how many accesses fail; without it, all until the fault is set to none", 0);
+        const auto after = command.number("--after N", {"a number of accesses", 0, kMost},
+                                          "how many accesses succeed first", 0);
+        const auto clear = command.flag("--clear", "remove all faults");
         command.run([=] {
             if (*clear && !leaf->empty()) throw UsageError("--clear takes no NODE");
             if (*clear) return simulator::clearFaults(driver()) == 0 ? 0 : kFailed;

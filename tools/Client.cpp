@@ -9,17 +9,17 @@
 
 Client::Client()
     : mProgram("vibratorctl", VERSION,
-               "Calls the vibrator service, and shows what it makes of its calls.") {
+               "Calls the vibrator service, and shows what the driver was told.") {
     constexpr cli::Numbers kTimeouts = {"a time in s", 0, 3600};
     cli::Command& shared = mProgram.shared();
     mInstance = shared.text("--instance NAME", "name of the service's instance", "default");
     mTimeout = shared.number("--timeout SECONDS", kTimeouts,
                              "the longest that a call may take; 0: no limit", 10);
-    mJson = shared.flag("--json", "answer with a JSON object a line");
-    mVerbose = shared.flag("-v,--verbose", "name the interface's operation and its status, too");
-    shared.note("Exit code: 0 done; 1 refused, by the service or by what the output is written "
-                "to, or doctor has found something; 2 a mistake in the command line or in a file; "
-                "3 the service cannot be reached.")
+    mJson = shared.flag("--json", "print each answer as a line of JSON");
+    mVerbose = shared.flag("-v,--verbose", "also print the interface's operation and its status");
+    shared.note("Exit code: 0 done; 1 the service refused, doctor found a problem, or the output "
+                "could not be written; 2 a mistake in the command line or in a file; 3 the "
+                "service cannot be reached.")
             .note("Only root and uid 1000 (system) may make the calls under \"For root and "
                   "system\".")
             .note("\"vibratorctl help COMMAND\" shows a command's options and an example.");

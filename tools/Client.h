@@ -11,7 +11,7 @@
 #include <utility>
 #include <vector>
 
-/** What the commands have in common: the options before them, the service, the report. */
+/** What the commands share: the options of every command, the service, the report. */
 class Client {
   public:
     Client();
@@ -39,14 +39,14 @@ class Client {
         return mProgram.command(group, name, help, example);
     }
 
-    /** Lets scores have a command as a step, by a name of its own. */
+    /** Makes a command a step of scores, under a name of its own. */
     void addStep(StepKind kind) { mStepKinds.push_back(std::move(kind)); }
     const std::vector<StepKind>& stepKinds() const { return mStepKinds; }
-    /** Says which step of a score is played from now on: answers are its. */
+    /** Sets the step of a score to which answers belong from now on; nullptr for none. */
     void setStep(const ScoreStep* step) { mStep = step; }
 
   private:
-    /** @return the exit code of the command, or of what kept it from its end. */
+    /** @return the exit code of the command, or of the error that stopped it. */
     int runCommand(int argc, char** argv);
 
     cli::Program mProgram;
@@ -59,8 +59,7 @@ class Client {
     const ScoreStep* mStep = nullptr;
 };
 
-/** @return the simulated driver's directory, as the environment names it; empty for the kernel's.
- */
+/** @return the simulated driver's directory from the environment; empty for the kernel's driver. */
 std::string simulationDirectory();
 
 /** @return what a file holds, or standard input for "-". @throw cli::UsageError */

@@ -21,12 +21,12 @@ using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
 LocalDriver::LocalDriver() : mSimulation(simulationDirectory()) {
     simulator::onlyLook();
-    // Its log is the daemon's business.
+    // Only the daemon logs.
     setenv("ANDROID_LOG_TAGS", (std::string(kLogTag) + ":S").c_str(), 1);
     mVibrator = new Vibrator();
     mIsUsable = !THE_DEVICE_INTENSITY.empty();
     mIsThere = mIsUsable || look(THE_DEVICE_ENABLE).exists || look(THE_DEVICE_ACTIVATE).exists;
-    // The service's code does not look at nodes that this user cannot open; people want to.
+    // The service's code ignores nodes that this user cannot open; doctor shows them.
     if (!mIsUsable)
         setDriverMode(look(THE_DEVICE_ENABLE).exists ? kTimedOutputMode : kLedTriggerMode);
 }
@@ -40,7 +40,7 @@ LocalDriver::Node LocalDriver::look(const std::string& path) const {
     if (stat(isSimulated ? simulated.file.c_str() : path.c_str(), &info) != 0) return node;
     node.exists = true;
     const auto tryToOpen = [&](int mode, mode_t bits) {
-        // Root is let into any file, but not past the mode of a driver's attribute.
+        // Root may open any file, but the mode of a driver's attribute binds it, too.
         return (info.st_mode & bits) == 0 ? -1 : open(path.c_str(), mode | O_CLOEXEC | O_NONBLOCK);
     };
     const int writable = tryToOpen(O_WRONLY, 0222);

@@ -7,8 +7,8 @@
 
 /**
  * The driver that this process sees, the kernel's or the simulated one, as the service's own code
- * judges it. Looks only: nothing is written, a simulated driver's trace does not show it, and its
- * faults are left for others.
+ * judges it. It only looks: it writes nothing, leaves nothing in a simulated driver's trace, and
+ * uses up none of its faults.
  */
 class LocalDriver {
   public:
@@ -32,7 +32,7 @@ class LocalDriver {
 
     /** @return whether the service's code, run as this user, finds a driver. */
     bool isUsable() const { return mIsUsable; }
-    /** @return whether a driver is there, for another user at least. */
+    /** @return whether a driver is there, even if this user cannot open it. */
     bool isThere() const { return mIsThere; }
     /** @return "LED trigger", "timed output" or "none". */
     std::string layout() const;
@@ -43,7 +43,7 @@ class LocalDriver {
     struct Motor {
         int32_t number = 0;
         std::string name;
-        /** How the service's code has found it out. */
+        /** How the service's code found it. */
         std::string found;
 
         std::string inWords() const {
@@ -52,7 +52,7 @@ class LocalDriver {
     };
     /** @return the motor of a usable driver, for a user who may make the restricted calls. */
     Motor motor() const;
-    /** The service's code itself, to be asked as its clients ask it. */
+    /** @return the service's object, which can be called as its clients call it. */
     const ::android::sp<Vibrator>& vibrator() const { return mVibrator; }
 
   private:

@@ -17,7 +17,7 @@ std::string_view takeWord(std::string_view* text) {
     return word;
 }
 
-/** @return the bytes that stand between quotation marks, escaped as in C. */
+/** @return the bytes between quotation marks, which are escaped as in C. */
 std::string unquote(std::string_view text) {
     const size_t first = text.find('"');
     const size_t last = text.rfind('"');
@@ -68,7 +68,7 @@ double readClock(const std::string& line, std::string* clock) {
                                       "%b%n%d%n%H:%M:%S"};
     const char* start = line.c_str() + std::min(line.find_first_not_of(" ["), line.size());
     for (const char* form : kForms) {
-        // A leap year, for logs that do not say which.
+        // A leap year, for logs that do not name the year.
         tm date{};
         date.tm_year = 100;
         const char* rest = strptime(start, form, &date);
@@ -94,7 +94,7 @@ std::string nodeName(std::string_view path) {
     return std::string(path.substr(0, directory)) + std::string(path.substr(leaf));
 }
 
-/** What a line of the log tells. */
+/** What a line of the log means. */
 enum Step {
     kNothing,
     kRefusal,
@@ -104,18 +104,18 @@ enum Step {
     kWrite,
     kEnd,
     kProbeEnd,
-    /** All of a text that was read follows. */
+    /** A text that was read follows, whole. */
     kTextRead,
     /** The write of the text that follows begins. */
     kText,
     kTextEnd,
 };
 
-/** The lines of the log that tell of accesses. The first whose mark is in a line holds. */
+/** The lines of the log that mean accesses. The first whose mark is in a line applies. */
 constexpr struct {
     const char* mark;
     Step step;
-    /** Of a text the leaf of its node; of a refusal or an end the error, nullptr for an errno. */
+    /** For a text the leaf of its node; for a refusal or an end the error, nullptr: an errno. */
     const char* detail;
 } kLogLines[] = {
         {"Pemission denied (", kRefusal, "not permitted to this uid"},
@@ -171,7 +171,7 @@ std::optional<NodeAccess> AccessReader::readTrace(std::string_view line) {
     std::string_view error = line.substr(equals + 2);
     const std::string result(takeWord(&error));
     if (result != "-1") error = {};
-    // Interrupted, it is tried again.
+    // An interrupted access is repeated.
     if (error == "EINTR" && call != "close") return std::nullopt;
     NodeAccess& access = mOpen[node];
     if (call == "open") access = {node, NodeAccess::kProbe, "", "", 0, ""};

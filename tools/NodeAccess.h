@@ -10,17 +10,17 @@
 struct NodeAccess {
     enum Kind { kProbe, kRead, kWrite, kRefusal };
 
-    /** The node's path below "/sys/class/", without "vibrator/": "leds/state". Of a refusal the
-     * operation, as far as it is known. */
+    /** The node's path below "/sys/class/", without "vibrator/": "leds/state". For a refusal the
+     * operation, if it is known. */
     std::string node;
     Kind kind = kProbe;
-    /** The bytes that were read or written; of a refusal what the service logged. */
+    /** The bytes that were read or written; for a refusal what the service logged. */
     std::string bytes;
-    /** Why it failed, like "ENOENT"; empty where it went well. */
+    /** Why it failed, like "ENOENT"; empty if it succeeded. */
     std::string error;
-    /** When it ended, in s; 0 where the source does not say. */
+    /** When it ended, in s; 0 if the source has no times. */
     double time = 0;
-    /** The time as the source writes it, like "11-24 22:18:03.123"; empty where it does not. */
+    /** The time as the source writes it, like "11-24 22:18:03.123"; empty without times. */
     std::string clock;
 
     /** @return the last part of the node's name, like "state". */
@@ -29,15 +29,14 @@ struct NodeAccess {
 
 /**
  * Puts accesses together from lines: of the simulated driver's trace, or of the daemon's log as the
- * daemon writes it and as journalctl and logcat show it. The times of logcat's forms brief, tag and
- * raw are missing.
+ * daemon writes it and as journalctl and logcat show it. Logcat's forms brief, tag and raw have no
+ * times.
  */
 class AccessReader {
   public:
     explicit AccessReader(bool isLog) : mIsLog(isLog) {}
 
-    /** @return the access that ends with the line; none where it goes on, or the line is another.
-     */
+    /** @return the access that ends with the line; none if the line ends no access. */
     std::optional<NodeAccess> read(std::string_view line);
 
   private:
@@ -45,12 +44,12 @@ class AccessReader {
     std::optional<NodeAccess> readLog(std::string_view line);
 
     bool mIsLog;
-    /** Of a trace: the accesses that have begun, by their nodes. */
+    /** For a trace: the accesses that have begun, by node. */
     std::map<std::string, NodeAccess> mOpen;
-    /** Of a log: the nodes' directory, as far as it has been seen: "leds". */
+    /** For a log: the directory of the last node, like "leds". */
     std::string mDirectory = "vibrator";
-    /** Of a log: the access of a number, or probe, that has begun. */
+    /** For a log: the access of a number, or the probe, that has begun. */
     std::optional<NodeAccess> mNumber;
-    /** Of a log: the write of a text that has begun; that of a number may lie in it. */
+    /** For a log: the write of a text that has begun; one of a number may be inside it. */
     std::optional<NodeAccess> mText;
 };

@@ -7,11 +7,11 @@
 
 enum class PictureFormat { kSvg, kPng };
 
-/** @return a script by which gnuplot writes a timeline as a picture to standard output. */
+/** @return a gnuplot script that draws a timeline and writes the picture to standard output. */
 std::string plotScript(const Timeline& timeline, PictureFormat format);
 
 /**
- * Lets gnuplot draw a timeline.
+ * Draws a timeline with gnuplot.
  *
  * @return the bytes of the picture. @throw std::runtime_error that says what to do.
  */
@@ -20,8 +20,8 @@ std::string drawPicture(const Timeline& timeline, PictureFormat format);
 /** @return the timeline for a terminal of some columns. */
 std::string plotText(const Timeline& timeline, size_t columns);
 
-/** @return what a timeline is about, in a few words. */
+/** @return the title of a plot. */
 std::string plotTitle(const Timeline& timeline);
 
-/** @return what cannot be seen from a plot by itself, like that times are missing; or nothing. */
+/** @return what a plot does not show by itself, like missing times; empty if there is nothing. */
 std::string plotNote(const Timeline& timeline);

@@ -25,7 +25,7 @@ namespace {
 /** The width that the time takes up, in pixels. */
 constexpr int kColumns = 796;
 
-/** @return text that gnuplot takes for nothing but text. */
+/** @return the text without characters that have a meaning for gnuplot. */
 std::string plain(std::string text) {
     std::replace_if(
             text.begin(), text.end(),
@@ -40,7 +40,7 @@ struct Bar {
     double top;
 };
 
-/** Adds a bar; what is narrower than a pixel shares one with its neighbours there. */
+/** Adds a bar; bars narrower than a pixel are merged with their neighbours in it. */
 void add(Bar bar, double pixel, std::vector<Bar>* bars) {
     bar.end = std::max(bar.end, bar.start + pixel);
     if (!bars->empty() && bar.end <= bars->back().start + 2 * pixel) {
@@ -51,7 +51,7 @@ void add(Bar bar, double pixel, std::vector<Bar>* bars) {
     }
 }
 
-/** @return the labels of the calls: one for a crowd, which says how many more there are. */
+/** @return the labels of the calls; labels that would overlap are merged into one, with a count. */
 std::vector<Timeline::Mark> labelsOf(const std::vector<Timeline::Mark>& marks, double pixel) {
     constexpr double kLineHeight = 21;
     constexpr size_t kLongest = 22;
@@ -74,11 +74,11 @@ std::vector<Timeline::Mark> labelsOf(const std::vector<Timeline::Mark>& marks, d
     return labels;
 }
 
-/** A file without a name, gone when it is closed. */
+/** An unnamed file in memory, which is gone when it is closed. */
 class MemoryFile {
   public:
     explicit MemoryFile(const std::string& text = {}) : mFile(memfd_create("plot", 0)) {
-        // What does not fit shows in what gnuplot makes of the rest.
+        // If not everything fits, gnuplot fails.
         [[maybe_unused]] const ssize_t written = write(mFile, text.data(), text.size());
     }
     MemoryFile(const MemoryFile&) = delete;
@@ -95,7 +95,7 @@ class MemoryFile {
 std::string runGnuplot(const std::string& script) {
     const MemoryFile input(script);
     const MemoryFile complaints;
-    // Without the user's own settings.
+    // --default-settings: without the user's own settings.
     const std::string command = "exec timeout -v 30 gnuplot --default-settings " + input.name() +
                                 " 2>" + complaints.name();
     std::FILE* output = popen(command.c_str(), "re");
@@ -116,7 +116,7 @@ std::string runGnuplot(const std::string& script) {
     throw std::runtime_error("gnuplot failed: " + cli::printable(complaint.c_str()));
 }
 
-/** Gives an SVG a title and a description, and dark colours for where the reader wants such. */
+/** Gives an SVG a title, a description, and dark colours for readers who prefer them. */
 std::string described(const Timeline& timeline, const std::string& svg) {
     constexpr size_t kMostCalls = 20;
     std::string calls;
@@ -133,7 +133,7 @@ std::string described(const Timeline& timeline, const std::string& svg) {
                              "{ svg { filter: invert(1) hue-rotate(180deg) } }</style>";
     const std::string text =
             std::regex_replace(svg, std::regex("<title>.*</title>\\s*<desc>.*</desc>"), head);
-    // Names of no meaning, which a reader would be told.
+    // Names without a meaning, which screen readers would read out.
     return std::regex_replace(text, std::regex("<title>gnuplot_plot_[0-9]+</title>"), "");
 }
 
@@ -151,7 +151,7 @@ std::string plotNote(const Timeline& timeline) {
 }
 
 std::string plotScript(const Timeline& timeline, PictureFormat format) {
-    // Its end is not on the frame.
+    // A little longer, so that the end is not on the frame.
     const double length = std::max((timeline.end - timeline.start) * 1.01, 0.001);
     const double pixel = length / kColumns;
     const auto percentOf = [](double strength) { return std::min(1.0, strength) * 100; };
@@ -182,7 +182,7 @@ std::string plotScript(const Timeline& timeline, PictureFormat format) {
     for (size_t i = 0; i < std::size(layers); ++i) {
         out << names[i] << " << END\n";
         for (const auto& [start, end, bottom, top] : layers[i]) {
-            // A hair's breadth lies between one and the next.
+            // A thin gap separates neighbouring bars.
             const double gap = end - start > 4 * pixel ? pixel / 2 : 0;
             out << start << ' ' << end - gap << ' ' << bottom << ' ' << top << '\n';
         }

@@ -11,14 +11,14 @@ namespace {
 
 constexpr long kRows = 5;
 constexpr long kEighths = 8;
-/** Width of what stands left of the strip. */
+/** Width of the column to the left of the strip. */
 constexpr size_t kMargin = 6;
-/** Calls that are listed. */
+/** The most calls that are listed. */
 constexpr size_t kMostCalls = 40;
-/** What times may be off, as a part of a column. */
+/** Tolerance of times, as a part of a column. */
 constexpr double kInexact = 1e-6;
 
-/** @return how strong the motor was told to be at most, in each column. */
+/** @return the greatest strength that the motor was told in each column. */
 std::vector<double> strengths(const Timeline& timeline, size_t width, double perColumn) {
     std::vector<double> columns(width);
     for (const Timeline::Segment& segment : timeline.segments) {

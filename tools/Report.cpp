@@ -62,7 +62,7 @@ int Report::print(std::ostream& stream, const std::string& command, const std::s
     if (!command.empty()) object["command"] = command;
     object.update(members);
     if (isJson) {
-        // In one line, of ASCII only: safe for terminals, whatever is in it.
+        // One line of ASCII, which is safe for terminals.
         std::cout << object.dump(-1, ' ', true, ordered_json::error_handler_t::replace) << '\n';
     } else {
         stream << cli::printableLines(words);

@@ -26,13 +26,13 @@ struct Operation {
     std::string name;
     /** Whether only root and the system user may call it. */
     bool isRestricted = false;
-    /** Nodes beside those that run the motor. */
+    /** The nodes that it needs besides those that run the motor. */
     std::vector<std::string> nodes = {};
     /** What its arguments may be: "an amplitude is 1 to 255". */
     std::string range = {};
 };
 
-/** The answer to a call, beside its status. */
+/** The answer to a call, besides its status. */
 struct Answer {
     /** What the command was given: "5". */
     std::string argument = {};
@@ -40,20 +40,20 @@ struct Answer {
     std::string words = {};
     /** The same, as members of the JSON. */
     nlohmann::ordered_json members = nlohmann::ordered_json::object();
-    /** Why it was refused, where that is known; otherwise reasonOf() finds out. */
+    /** Why it was refused, if that is known; otherwise reasonOf() finds the reason. */
     std::string reason = {};
 };
 
-/** @return whether this process's user may make the calls that not everybody may. */
+/** @return whether this process's user may make the restricted calls. */
 bool mayCallRestricted();
 
 /** @return why a call was refused to this process's user. */
 std::string notPermitted();
 
-/** @return why the service refused a call, as far as the driver tells; with what to do. */
+/** @return why the service refused a call, judged by the driver, and what to do. */
 std::string reasonOf(const Operation& operation, VibratorStatus status);
 
-/** Tells the user what came of a command, in words or as JSON: one line, one object, a call. */
+/** Reports the result of a command, in words or as JSON: one line or one object for each call. */
 struct Report {
     bool isJson = false;
     bool isVerbose = false;
@@ -62,10 +62,10 @@ struct Report {
     int answer(const std::string& command, const Operation& operation, VibratorStatus status,
                const Answer& answer) const;
     /**
-     * Reports what a command that is no single call found.
+     * Reports the result of a command that is not a single call.
      *
      * @param words lines for a person.
-     * @param ok whether all is as it should be.
+     * @param ok whether nothing is wrong.
      * @return the exit code.
      */
     int found(const std::string& command, const std::string& words,

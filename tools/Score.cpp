@@ -9,7 +9,7 @@
 
 namespace {
 
-/** Steps that a score plays, those of its blocks counted each time. */
+/** The most steps that a score plays; those of a block count each time. */
 constexpr size_t kMostSteps = 1'000'000;
 constexpr char kTooMany[] = "more than 1000000 steps to play";
 
@@ -53,7 +53,7 @@ class ScoreParser {
 
   private:
     struct Block {
-        /** Where it begins in the order of the steps. */
+        /** Where the block begins in the order of the steps. */
         size_t start;
         uint32_t times;
         size_t line;
@@ -68,7 +68,7 @@ class ScoreParser {
         } else if (step.name == "end") {
             endBlock(step);
         } else {
-            // Even one with a mistake is a step.
+            // A step with a mistake counts, too.
             mScore.order.push_back(static_cast<uint32_t>(mScore.lines.size()));
             mScore.lines.push_back(step);
             readStep(&mScore.lines.back());

@@ -15,9 +15,9 @@ struct StepKind {
     std::string name;
     cli::Command* command;
     /**
-     * Judges the step that the command has read last.
+     * Checks the step that the command has read last.
      *
-     * @return for how long the motor runs from it on, in ms; none where that stays as it was.
+     * @return the ms that the motor runs from this step on; none if the step does not change it.
      * @throw cli::UsageError
      */
     std::function<std::optional<double>()> runs = [] { return std::nullopt; };
@@ -27,17 +27,17 @@ struct StepKind {
 struct ScoreStep {
     std::string name;
     std::vector<std::string> words;
-    /** Where it stands, counted from 1, the column in bytes. */
+    /** Its place, counted from 1; the column in bytes. */
     size_t line;
     size_t column;
     /** nullptr for a pause. */
     cli::Command* command = nullptr;
     /** For how long it waits, in ms. */
     uint32_t pause = 0;
-    /** For how long the motor runs from it on, in ms, if it says so. */
+    /** How long the motor runs from this step on, in ms; none if the step does not change it. */
     std::optional<double> runs = {};
 
-    /** @return the words, for people; not all of many. */
+    /** @return the words, for people; cut if they are too long. */
     std::string argument() const;
     /** @return the place, as members of the JSON. */
     nlohmann::ordered_json place() const;
@@ -51,22 +51,22 @@ struct ScoreError {
     std::string what;
 };
 
-/** A score as it is played: the steps of its lines, in an order in which some come again. */
+/** A score: its steps, and the order in which they are played, repeated ones several times. */
 struct Score {
     std::vector<ScoreStep> lines;
     /** Indices of lines. */
     std::vector<uint32_t> order;
 
-    /** @return how long it takes until the motor rests, in s, were the calls to take no time. */
+    /** @return the time until the motor stops, in s, not counting the time of the calls. */
     double seconds() const;
 };
 
 /**
- * Reads a score: a step a line, its words between blanks; # begins a comment; the lines between
- * "repeat N" and "end" are played N times.
+ * Reads a score: one step in each line, with blanks between words; # begins a comment; the lines
+ * between "repeat N" and "end" are played N times.
  *
- * @param kinds all steps beside "wait", which takes a time in ms.
- * @return what is wrong with it, kMostScoreErrors mistakes at most; empty where it can be played.
+ * @param kinds all steps besides "wait", which takes a time in ms.
+ * @return the mistakes, at most kMostScoreErrors; empty if the score can be played.
  */
 std::vector<ScoreError> parseScore(const std::string& text, const std::vector<StepKind>& kinds,
                                    Score* score);

@@ -8,7 +8,7 @@
 #include <stdexcept>
 #include <string>
 
-/** How the client finds the service. All that depends on the runtime's transport is here. */
+/** How the client finds the service; only this part depends on the runtime's transport. */
 namespace service {
 
 using ::vendor::velmora::hardware::vibrator::V2_1::IDaxVibrator;

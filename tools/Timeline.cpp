@@ -16,9 +16,9 @@ using Segment = Timeline::Segment;
 constexpr double kFull = 10000;
 /** The index that makes the driver play its queue. */
 constexpr long long kQueueIndex = 0xFFFE;
-/** Accesses of one call lie no further apart, in s. */
+/** The longest time between two accesses of one call, in s. */
 constexpr double kSameCall = 0.05;
-/** How long the service plays a click, a stored pattern, and the start of packets, in ms. */
+/** The times that the service sets for a click, a stored pattern and packets, in ms. */
 constexpr long long kClickMs = 20;
 constexpr long long kPatternMs = 1000;
 constexpr long long kEngineMs = 1;
@@ -31,7 +31,7 @@ int amplitudeOf(long long intensity) {
     return amplitude;
 }
 
-/** @return the strength of the click with an amplitude; nullptr for that of none. */
+/** @return the strength of the click that has an amplitude; nullptr if none has. */
 const char* clickOf(int amplitude) {
     return amplitude == 36    ? "light"
            : amplitude == 128 ? "medium"
@@ -49,7 +49,7 @@ class TimelineMaker {
                 mTimeline.isTimed = !access.clock.empty();
             }
             if (!access.clock.empty()) {
-                // After a clock that was set back, the time goes on from there.
+                // If the clock was set back, time continues from there.
                 mFirst = std::min(mFirst, access.time - mNow);
                 mNow = access.time - mFirst;
             }
@@ -59,7 +59,7 @@ class TimelineMaker {
     }
 
     Timeline finish() {
-        // A run that nothing ends is drawn for a short while, or as long as all before it.
+        // A run that nothing ends is drawn for a short time, or as long as all before it.
         constexpr double kTail = 60;
         const double last = mSegments.empty() ? mNow : std::max(mNow, mSegments.back().start);
         if (!mSegments.empty() && mSegments.back().end - last > std::max(kTail, last)) {
@@ -71,7 +71,7 @@ class TimelineMaker {
     }
 
   private:
-    /** What a call that has begun may turn out to be. */
+    /** What a call that has begun may still become. */
     enum Begun { kNothing, kOn, kIntensity, kPattern, kEngine };
 
     void write(const std::string& leaf, const std::string& bytes) {
@@ -111,7 +111,7 @@ class TimelineMaker {
         return !mTimeline.isTimed || mNow - mTimeline.marks.back().time < kSameCall;
     }
 
-    /** Notes a call; without times it comes after the motor has stopped, or after some s. */
+    /** Adds a call; without times it comes after the motor has stopped, or after some s. */
     void mark(const std::string& label, Begun begun = kNothing, double latest = 1) {
         if (!mTimeline.isTimed && !mTimeline.marks.empty()) {
             mNow = std::clamp(mStop + kGap, mNow + kGap, mNow + latest);
@@ -119,7 +119,7 @@ class TimelineMaker {
         mTimeline.marks.push_back({mNow, label});
         mBegun = begun;
     }
-    /** Notes a call that does not wait for the motor. */
+    /** Adds a call that does not wait for the motor. */
     void set(const std::string& label, Begun begun = kNothing) { mark(label, begun, kGap); }
 
     void setIntensity(long long value) {
@@ -128,7 +128,7 @@ class TimelineMaker {
         const int amplitude = mProbed ? amplitudeOf(value) : 0;
         mStrength = strength;
         if (mBegun == kOn && isSoon() && clickOf(amplitude) != nullptr) {
-            // It starts the motor before it sets the strength; to the eye that is one.
+            // The click starts the motor before it sets the strength; it is drawn as one.
             mTimeline.marks.back().label = std::string("click ") + clickOf(amplitude);
             mSegments.back().strength = strength;
             mBegun = kNothing;
@@ -174,7 +174,7 @@ class TimelineMaker {
 
     void activate(bool isOn) {
         if (isOn && mTimeline.isTimed && mBegun < kPattern && mNow < mStop) {
-            // While it runs, the trigger goes on as it is.
+            // A running trigger is not started again.
             mark("on " + std::to_string(mDuration) + " (running)");
         } else if (isOn && mDuration == 0) {
             mark("on 0");
@@ -192,7 +192,7 @@ class TimelineMaker {
         stop();
         mStop = mNow;
         if (begun == kEngine && ms > 0) {
-            // The packets have their own times; this only sets them off.
+            // The packets have their own times; this only starts them.
             for (const auto& [length, strength] : mPackets) {
                 mSegments.push_back({mStop, mStop + length, strength, Segment::kPacket});
                 mStop += length;
@@ -219,16 +219,16 @@ class TimelineMaker {
     std::vector<Segment>& mSegments = mTimeline.segments;
     double mFirst = 0;
     double mNow = 0;
-    /** When the motor stops, as far as it was told. */
+    /** When the motor stops, by what it was told. */
     double mStop = -1;
     double mStrength = 1;
     long long mDuration = 0;
     Begun mBegun = kNothing;
     /** Whether the last access found the node of the strength. */
     bool mProbed = false;
-    /** Strength of the pattern in the driver's queue; less than 0 where it has the motor's. */
+    /** Strength of the pattern in the driver's queue; below 0 if it has the motor's. */
     double mQueueStrength = -1;
-    /** Length in s and strength of the packets that the next start sets off. */
+    /** Length in s and strength of the packets that the next start plays. */
     std::vector<std::pair<double, double>> mPackets;
 };
 

@@ -7,10 +7,10 @@
 #include <vector>
 
 /**
- * What the driver was told, as a motor would do it that does all it is told at once. The time of a
- * run is the kernel's, and so is that a running LED trigger is not started anew. What only the
- * driver knows is assumed: a packet of the haptic engine lasts param0 ms, one after the other, and
- * has its full strength at an intensity of 10000; a stored pattern lasts as long as its run.
+ * What the driver was told, as an ideal motor would do it, without delay. As in the kernel, a run
+ * ends by itself, and a running LED trigger is not started again. What only the driver knows is
+ * assumed: packets of the haptic engine last param0 ms each, one after the other, with full
+ * strength at an intensity of 10000; a stored pattern lasts as long as its run.
  */
 struct Timeline {
     /** A span in which the motor runs. */
@@ -18,18 +18,18 @@ struct Timeline {
         enum Kind { kRun, kPacket, kPattern };
         double start;
         double end;
-        /** 1 is full strength; more where the driver was told more. */
+        /** 1 is full strength; it is greater if the driver was told more. */
         double strength;
         Kind kind;
     };
-    /** A client's call, as its node accesses show it. */
+    /** A client's call, inferred from its node accesses. */
     struct Mark {
         double time;
         /** In the words of a score, like "click light"; letters, digits, blanks and commas. */
         std::string label;
     };
 
-    /** In s from the first mark on; one after the other. */
+    /** In s from the first mark on, in order. */
     std::vector<Segment> segments;
     std::vector<Mark> marks;
     /** Where the timeline begins and ends, in s. */
@@ -41,7 +41,7 @@ struct Timeline {
     bool isTimed = true;
 };
 
-/** @return the timeline of accesses, of which those that failed count for nothing. */
+/** @return the timeline of accesses; those that failed are ignored. */
 Timeline makeTimeline(const std::vector<NodeAccess>& accesses);
 
 /** Cuts a timeline to the part between two times in it. */

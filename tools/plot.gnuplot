@@ -1,9 +1,9 @@
-# Draws what the driver was told over the time. The client sets before:
+# Draws what the driver was told over time. The client sets these before:
 #   terminal               "svg" or "pngcairo"
-#   title, note            texts above, of which the note may be empty
+#   title, note            texts above the plot; the note may be empty
 #   start, length          the time that is shown, in s
 #   columns                its width in pixels
-#   going_on               strength in % of what goes on at the end, -1 where nothing does
+#   going_on               strength in % of a run that goes on at the end, -1 if none does
 #   $calls                 times of the calls in s
 #   $labels                times in s, and the labels of the calls there
 #   $run, $packet, $pattern, $beyond
@@ -16,7 +16,7 @@ bottom = 106
 width = left + columns + right
 font_size = 14
 
-# Above the strip is room for the texts and the longest label, which rises at 45 degrees.
+# The space above the strip holds the texts and the longest label, which rises at 45 degrees.
 called(label) = label[strstrt(label, ' ') + 1:*]
 longest = 0
 do for [i = 1:|$labels|] {
@@ -64,7 +64,7 @@ if (going_on >= 0) {
     set label 'goes on' at end * unit, going_on / 2 offset graph 30.0 / columns, 0
 }
 
-# A layer of bars; what there is none of is not in the legend, either.
+# A layer of bars; an empty one is not in the legend.
 layer(block, size, colour, name) = size == 0 ? '' : \
     ', '.block.' using ($1 * unit):3:($1 * unit):($2 * unit):3:4 with boxxyerror fs solid noborder'. \
     " lc rgb '".colour."' title '".name."'"

@@ -127,7 +127,7 @@ class Vibrator : public IDaxVibrator {
      * @param packets at most 339.
      * @param amplitude 1 to 10000; scales the packets' intensities, 10000 leaves them unchanged.
      * @return OK; BAD_VALUE for too many packets, an amplitude out of range or a value of more
-     *     than 9 characters; UNKNOWN_ERROR when the driver did not take the waveform.
+     *     than 8 characters; UNKNOWN_ERROR when the driver did not take the waveform.
      */
     Return<Status> daxPerformHapticEngine(const hidl_vec<DaxHapticEnginePacket>& packets,
                                           uint32_t amplitude) override;

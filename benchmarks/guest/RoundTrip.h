@@ -7,8 +7,8 @@
 #include <ctime>
 
 /**
- * Prints how many instructions a round trip takes, as "NAME<tab>INSTRUCTIONS": the user's and the
- * kernel's, of both processes. Only right in a machine whose clock counts instructions.
+ * Prints how many instructions a round trip takes, in user and kernel code of both processes, as
+ * "NAME<tab>INSTRUCTIONS". Correct only in a machine whose clock counts instructions.
  */
 template <typename Function>
 void measure(const char* name, Function roundTrip) {
@@ -18,7 +18,7 @@ void measure(const char* name, Function roundTrip) {
         clock_gettime(CLOCK_MONOTONIC, &time);
         return static_cast<double>(time.tv_sec) * 1e9 + static_cast<double>(time.tv_nsec);
     };
-    // What is done once, for the first calls, does not count.
+    // The first calls are not counted, since they also set things up.
     for (int i = 0; i < kCount / 5; ++i)
         roundTrip();
     const double start = now();

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 
-/** The least that a call takes over each of the two transports: messages to and fro. */
+/** The least that a call takes over each of the two transports: a message in each direction. */
 #include "../Child.h"
 #include "RoundTrip.h"
 
@@ -19,22 +19,22 @@
 
 namespace {
 
-/** What a call sends to and fro: the sizes of its parcels, in bytes. */
+/** The sizes of a call's request and reply parcels, in bytes. */
 struct Sizes {
     const char* call;
     size_t request;
     size_t reply;
 };
-/** As guest-ping calls: a ping's token and status; two numbers more in a call, and one back. */
+/** As in guest-ping: a ping's token and status; a call has two more numbers, its reply one. */
 constexpr Sizes kSizes[] = {{"ping", 32, 4}, {"call", 52, 12}};
 constexpr size_t kMost = 128;
 
-/** @return the size of a parcel's packet: with a header, both filled up to a multiple of 8. */
+/** @return the size of a parcel's packet: with a header, both padded to a multiple of 8. */
 constexpr size_t packetSize(size_t parcel) {
     return 16 + (parcel + 7) / 8 * 8;
 }
 
-/** A server of one client, whose name it does not ask. */
+/** A server of one client, whose identity it does not check. */
 [[noreturn]] void echo(int socket, size_t reply) {
     char message[kMost];
     while (recv(socket, message, sizeof(message), 0) > 0) {
@@ -43,7 +43,7 @@ constexpr size_t packetSize(size_t parcel) {
     _exit(0);
 }
 
-/** A server that could have several clients, and hears of the kernel whose each message is. */
+/** A server for several clients, which gets the sender of each message from the kernel. */
 [[noreturn]] void echoToAnybody(int socket, size_t reply) {
     const int on = 1;
     setsockopt(socket, SOL_SOCKET, SO_PASSCRED, &on, sizeof(on));
@@ -88,13 +88,13 @@ void echoOverSocket(const char* server, void (*serve)(int socket, size_t reply),
 /** A process's use of the driver: one buffer of commands out, one in. */
 class Binder {
   public:
-    // Not the device that the service manager is to have.
+    // Another device than the service manager's.
     Binder() : mDevice(open("/dev/binder", O_RDWR | O_CLOEXEC)) {
         if (mDevice < 0 || mmap(nullptr, 1 << 20, PROT_READ, MAP_PRIVATE, mDevice, 0) == MAP_FAILED)
             abort();
     }
     void becomeManager() {
-        // The kernel may not have done with the one before.
+        // The kernel may still be busy with the previous one.
         while (ioctl(mDevice, BINDER_SET_CONTEXT_MGR, 0) != 0) {
             if (errno != EBUSY) abort();
             usleep(1000);
@@ -108,7 +108,7 @@ class Binder {
         message.data.ptr.buffer = reinterpret_cast<binder_uintptr_t>(data);
         add(command, &message, sizeof(message));
     }
-    /** Performs the commands and waits until a message comes, whose buffer then goes back. */
+    /** Sends the commands and waits until a message comes, whose buffer then goes back. */
     void exchange(uint32_t awaited) {
         for (bool arrived = false; !arrived;) {
             alignas(8) char in[256];

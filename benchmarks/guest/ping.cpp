@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 
 /**
- * Calls of the daemon: a ping, and an operation that answers without a look at the driver. The
- * environment says where the daemon is; the argument says so in the names of the rows.
+ * Calls of the daemon: a ping, and an operation that does not access the driver. The environment
+ * selects the transport; the argument is its name in the rows.
  */
 #include "RoundTrip.h"
 

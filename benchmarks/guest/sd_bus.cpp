@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 
-/** Calls over sd-bus, peer to peer: one without arguments, and one with a number to and fro. */
+/** Calls over sd-bus, peer to peer: one without arguments, and one with a number each way. */
 #include "../Child.h"
 #include "RoundTrip.h"
 

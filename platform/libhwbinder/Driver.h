@@ -35,7 +35,7 @@ class Driver {
     virtual void serve() = 0;
 
     // Called when the proxy of a handle is made, and when it is destroyed.
-    /** @return what the driver wants to have with each call, so that it need not search. */
+    /** @return data that the driver gets with each call, to save it a search. */
     virtual void* acquire(uint32_t handle) = 0;
     virtual void release(uint32_t handle) = 0;
     /** Asks for news of the death of the process behind a handle: BpHwBinder::sendObituary. */
@@ -65,11 +65,11 @@ int callTimeout();
 /** @return why this thread's last search for a service has failed; set by what searches. */
 std::string& lookupError();
 
-/** Makes somebody this thread's caller, as long as one of his calls is served. */
+/** Sets this thread's caller while one of its calls is served. */
 class CallerIdentity {
   public:
     CallerIdentity(uid_t uid, pid_t pid)
-        // Not by clearCallingIdentity, which asks the kernel who this process is.
+        // Without clearCallingIdentity, which makes system calls for this process's own identity.
         : mBefore(IPCThreadState::identityToken(IPCThreadState::self()->getCallingUid(),
                                                 IPCThreadState::self()->getCallingPid())) {
         IPCThreadState::self()->restoreCallingIdentity(IPCThreadState::identityToken(uid, pid));

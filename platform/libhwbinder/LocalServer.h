@@ -22,10 +22,10 @@ namespace android::hardware {
 /**
  * Serves the clients of this process's objects with one thread, one call at a time.
  *
- * Everybody gets the same: in each round every uid that has calls waiting gets one of them served,
- * the one that has waited longest, however many connections it has. Nobody is waited for: a client
- * that does not take its replies loses its connection. When there are too many connections, one
- * that is idle gives way; one that is busy does to a uid that has fewer.
+ * Every uid gets the same: in each round every uid that has calls waiting gets one of them served,
+ * the one that has waited longest, however many connections it has. The server never waits for a
+ * client: one that does not read its replies loses its connection. If there are too many
+ * connections, an idle one is closed, or a busy one in favour of a uid that has fewer.
  */
 class LocalServer {
   public:

@@ -32,7 +32,7 @@ bool Packet::append(const void* source, size_t length) {
     if (length > kMaxSize || roundUp(length) > kMaxSize - size) return false;
     if (length == 0) return true;
     size += roundUp(length);
-    // What fills the last 8 bytes up is zero.
+    // The padding of the last 8 bytes is zero.
     memset(bytes + size - 8, 0, 8);
     memcpy(bytes + size - roundUp(length), source, length);
     return true;
@@ -70,8 +70,8 @@ status_t Packet::packObjects(const Parcel& parcel) {
         if (!append(reinterpret_cast<const void*>(object.buffer), object.length)) {
             return FAILED_TRANSACTION;
         }
-        // Where it lies in this process is nobody else's business, so the place in the packet
-        // stands for that here, and nothing in the parent.
+        // Addresses of this process must not leave it: the offset in the packet replaces the
+        // object's, and zero the parent's.
         object.buffer = at;
         memcpy(place, &object, sizeof(object));
         if ((object.flags & BINDER_BUFFER_FLAG_HAS_PARENT) != 0 &&

@@ -25,7 +25,7 @@ struct Packet {
         uint32_t code;
         /** TF_ONE_WAY in a request, TF_STATUS_CODE in a reply that is just a status. */
         uint32_t flags;
-        // In bytes, without what fills them up to a multiple of 8.
+        // In bytes, without the padding to a multiple of 8.
         uint32_t dataSize;
         uint32_t offsetsSize;
     };
@@ -46,7 +46,7 @@ struct Packet {
     status_t unpack(Header* header, Parcel* parcel, Parcel::ReleaseBuffer release, void* owner);
 
     size_t size = 0;
-    // Left uninitialised: 64 KiB would be cleared for packets of some 100 bytes.
+    // Left uninitialised, to save clearing 64 KiB for packets of some 100 bytes.
     alignas(8) uint8_t bytes[kMaxSize];
 
   private:

@@ -205,7 +205,7 @@ TEST_F(VibratorctlTest, ShellsCompleteCommandsOptionsAndValues) {
             {"fold --json c", "close\tthe device is folded\n"},
             {"help prebaked p", "play\tplay a pattern that the driver has stored\n"},
             {"fold open ''", ""},
-            {"fold open --js", "--json\tanswer with a JSON object a line\n"},
+            {"fold open --js", "--json\tprint each answer as a line of JSON\n"},
             {"nonsense ''", ""},
             {"on ''", ""},
             {"engine --file ''", ":files\n"},

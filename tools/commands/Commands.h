@@ -25,10 +25,10 @@ inline constexpr char kForAll[] = "For everybody";
 inline constexpr char kRestricted[] = "For root and system";
 inline constexpr char kTools[] = "Tools";
 
-/** Full strength and less on the driver's own scale; the service judges what is beyond. */
+/** The driver's own scale, up to full strength; numbers out of range go to the service, too. */
 inline constexpr cli::Numbers kIntensities = {"an intensity", 1, 10000, UINT32_MAX};
 
-/** What the only argument of a command may be: a number, or else one of some words. */
+/** The only argument of a command: a number, or one of some words. */
 struct OneArgument {
     const char* name;
     const char* help;
@@ -48,6 +48,6 @@ Call callOf(::android::hardware::Return<VibratorStatus> (Interface::*operation)(
     };
 }
 
-/** Lets a command make one call with one argument, and scores have it as a step. */
+/** Adds a command that makes one call with one argument, and that is also a step of scores. */
 void addCall(Client& client, cli::Command& command, const OneArgument& argument,
              Operation operation, const Call& call);

@@ -39,7 +39,7 @@ std::vector<NodeUse> nodeUses() {
             {THE_DEVICE_EXT_CONTROL, "external control"}};
 }
 
-/** Looks at all that the service needs; what it finds is JSON, of which the words are made. */
+/** Examines all that the service needs. The result is JSON; the words are made from it. */
 class Examination {
   public:
     explicit Examination(const Client& client) {
@@ -62,7 +62,7 @@ class Examination {
         if (mDriver.isUsable() && mayCallRestricted()) examineMotor();
         if (!mayCallRestricted()) {
             mNotes.push_back(mUser +
-                             " may not set amplitudes, nor use what is for root and uid "
+                             " may not set amplitudes or make the calls for root and uid "
                              "1000 (system)");
         }
         mReport.update({{"findings", mFindings}, {"notes", mNotes}});
@@ -94,9 +94,9 @@ void Examination::examineLayout() {
     for (const NodeUse& use : nodeUses()) {
         const LocalDriver::Node node = mDriver.look(use.path);
         if (!node.exists || (node.reads && node.writes)) continue;
-        // What is closed to root is closed to the service, too.
+        // What root cannot open, the service cannot open either.
         if (mAnswers && getuid() != 0) {
-            mNotes.push_back(mUser + " cannot open the nodes; root can, and sees more here");
+            mNotes.push_back(mUser + " cannot open the nodes; run doctor as root to see more");
         } else {
             find(use.path + " cannot be opened for reading and writing by " + mUser,
                  "give the node to the service's user, as the init declaration in device/ does");

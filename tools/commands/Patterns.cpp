@@ -85,8 +85,7 @@ HapticEnginePackets readPackets(const std::vector<std::string>& words, const std
 }
 
 /**
- * Checks that the service's scaling of intensities, by amplitude / 10000 in 32 bits, wraps none
- * around, so that it would come out as something else.
+ * Checks that no intensity overflows 32 bits when the service scales it by amplitude / 10000.
  *
  * @throw cli::UsageError
  */
@@ -100,7 +99,7 @@ void checkScaling(const HapticEnginePackets& packets, uint32_t amplitude) {
     }
 }
 
-/** Checks what the service would refuse. @return how long the packets last, in ms. */
+/** Refuses what the service would refuse. @return how long the packets last, in ms. */
 double judgePackets(const HapticEnginePackets& packets) {
     constexpr size_t kMost = 339;
     if (packets.size() > kMost) throw cli::UsageError("more than 339 packets");

@@ -11,8 +11,8 @@ namespace {
 
 volatile std::sig_atomic_t interruption = 0;
 
-/** Lets the signals that end a program end the play first; a second one ends it at once. Those that
- * are ignored, as nohup has it, stay so. */
+/** Makes the signals that end a program stop the play first; a second one ends it at once. Signals
+ * that are ignored, as under nohup, stay ignored. */
 void catchInterruptions() {
     struct sigaction action = {};
     action.sa_handler = [](int signal) { interruption = signal; };
@@ -24,7 +24,7 @@ void catchInterruptions() {
     }
 }
 
-/** Waits, up to an interruption. */
+/** Waits, unless interrupted. */
 void wait(uint32_t ms) {
     constexpr auto kSlice = std::chrono::milliseconds(20);
     const auto end = std::chrono::steady_clock::now() + std::chrono::milliseconds(ms);
@@ -42,7 +42,7 @@ int playStep(Client& client, const ScoreStep& step) {
         members.update(step.place());
         return client.report().found(step.name, "", members);
     }
-    // The same command may be another step, too.
+    // Other steps may have set the command's arguments.
     step.command->readStep(step.words);
     client.setStep(&step);
     const int code = step.command->perform();
@@ -56,7 +56,7 @@ int stop(const Client& client, const char* status, const std::string& why) {
     try {
         isStopped = service::reached(client.service()->off()) == VibratorStatus::OK;
     } catch (const service::Unreachable&) {
-        // As good as refused.
+        // The same as a refusal.
     }
     client.report().failure(
             "play", status,
@@ -115,12 +115,12 @@ void addPlay(Client& client) {
     cli::Command& command =
             client.command(kTools, "play", "play a score", "docs/examples/clicks.score");
     const auto file = command.file("SCORE", "file with a step a line, - for standard input");
-    const auto check = command.flag("--check", "only say whether it can be played, and how long");
+    const auto check = command.flag("--check", "only check the score, and print how long it takes");
     command.note(
             "Steps: click [light|medium|strong], on MS, off, wait MS, amplitude N, intensity N, "
             "pattern N [AMPLITUDE] [repeat], engine AMPLITUDE PACKET..., external on|off, "
-            "frequency N, force-touch N, fold open|close; repeat N and end stand around steps that "
-            "are played N times; # begins a comment. The whole score is checked before the first "
-            "call. The motor is stopped when a step fails or the play is interrupted.");
+            "frequency N, force-touch N, fold open|close; the steps between repeat N and end are "
+            "played N times; # begins a comment. The whole score is checked before the first call. "
+            "The motor is stopped when a step fails or the play is interrupted.");
     command.run([=, &client] { return play(client, *file, *check); });
 }

@@ -96,10 +96,10 @@ void addPlot(Client& client) {
                                        {{"auto", "as the file's name ends; SVG for -"},
                                         {"svg", "lines that stay sharp"},
                                         {"png", "pixels"}},
-                                       "of the picture", 0);
-    const auto from = command.text("--from TIME", "leave out what is before, like 10s or 2m", "");
-    const auto to = command.text("--to TIME", "leave out what is after", "");
-    const auto last = command.text("--last TIME", "draw the end only", "");
+                                       "format of the picture", 0);
+    const auto from = command.text("--from TIME", "start of the part to draw, like 10s or 2m", "");
+    const auto to = command.text("--to TIME", "end of the part to draw", "");
+    const auto last = command.text("--last TIME", "draw only the end, of this length", "");
     command.note("Times count from the first call on.");
     command.withoutJson().run([=] {
         const bool isText = output->empty();

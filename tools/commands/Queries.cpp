@@ -161,7 +161,7 @@ void addQueries(Client& client) {
 
     constexpr cli::Numbers kWaits = {"a time in s", 0, 3600};
     cli::Command& waiting = client.command(
-            kForAll, "status", "tell whether the service answers, and what it is", "--wait 10");
+            kForAll, "status", "say whether the service answers, and who serves it", "--wait 10");
     const auto wait =
             waiting.number("--wait SECONDS", kWaits, "how long to wait for the service", 0);
     waiting.run([&client, wait] { return status(client, *wait); });

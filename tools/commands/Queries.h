@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-/** A query that is answered with yes or no. */
+/** A query that the service answers with yes or no. */
 struct Query {
     const char* operation;
     /** What it asks for, in words. */

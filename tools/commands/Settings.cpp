@@ -23,7 +23,7 @@ void addSettings(Client& client) {
         {"daxSetForceTouchAmplitude", true, {"force_touch_intensity"}},
         callOf(&IDaxVibrator::daxSetForceTouchAmplitude));
     add("frequency", "choose the frequency type of the motor", "3",
-        {"TYPE", "the driver gives it its meaning", kFrequencyTypes},
+        {"TYPE", "the driver defines its meaning", kFrequencyTypes},
         {"daxSetFrequencyType", true, {"multi_freq"}}, callOf(&IDaxVibrator::daxSetFrequencyType));
     add("fold", "tell the driver that the device is open or folded", "close",
         {"STATE",

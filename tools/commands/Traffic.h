@@ -14,7 +14,7 @@ class Traffic {
                               "trace of the simulated driver (default: the one in "
                               "VIBRATOR_SIM_DIR), - for standard input",
                               "")),
-          mIsLog(command->flag("--log", "FILE is the daemon's log, as on a device")) {}
+          mIsLog(command->flag("--log", "FILE is the daemon's log, not a trace")) {}
 
     bool isLog() const { return *mIsLog; }
     /** @return the file to read: the one that was named, or the simulated driver's. */

@@ -25,10 +25,10 @@ constexpr const char* kCyan = "\033[36m";
 constexpr const char* kGreen = "\033[32m";
 constexpr const char* kRed = "\033[31m";
 constexpr const char* kPlain = "\033[0m";
-/** Of accesses that went well, by their kinds. */
+/** The colours of accesses that succeeded, by kind. */
 constexpr const char* kColours[] = {kFaint, kCyan, kGreen, kRed};
 
-/** Colours are for people's eyes, and for those who have not said no; see https://no-color.org. */
+/** @return whether to use colours: on a terminal, unless NO_COLOR is set (no-color.org). */
 bool wantsColour() {
     const char* no = getenv("NO_COLOR");
     return isatty(STDOUT_FILENO) != 0 && (no == nullptr || *no == '\0');
@@ -49,7 +49,7 @@ void print(const NodeAccess& access, bool isColoured) {
               << line.str() << (isColoured ? kPlain : "") << std::endl;
 }
 
-/** Prints what becomes of each line, and warns once where nothing does. */
+/** Prints the access that each line ends; warns once if no line does. */
 class Printer {
   public:
     explicit Printer(const Traffic& traffic) : mTraffic(traffic), mReader(traffic.isLog()) {}
@@ -62,7 +62,7 @@ class Printer {
         if (access) print(*access, mIsColoured);
     }
 
-    /** What there is has been read. */
+    /** Called when all that there is has been read. */
     void end() {
         if (mIsKnown || mLines == 0) return;
         mIsKnown = true;
@@ -80,7 +80,7 @@ class Printer {
     bool mIsKnown = false;
 };
 
-/** A file that others append to, and may begin anew; or standard input, "-". */
+/** A file that others append to or replace; or standard input, "-". */
 class GrowingFile {
   public:
     explicit GrowingFile(const std::string& name) : mName(name) { open(); }
@@ -89,14 +89,14 @@ class GrowingFile {
     ~GrowingFile() { close(mFile); }
 
     void skip() const { lseek(mFile, 0, SEEK_END); }
-    /** @return some of what comes next; "" at the end. */
+    /** @return some of the next bytes; "" at the end. */
     std::string read() const {
         char part[65536];
         const ssize_t size = ::read(mFile, part, sizeof(part));
         if (size < 0) fail();
         return {part, static_cast<size_t>(size)};
     }
-    /** Opens the file again where it is another one by now, or shorter. @return whether it did. */
+    /** Opens the file again if it was replaced or cut. @return whether it did. */
     bool openIfNew() {
         struct stat now = {};
         struct stat opened = {};
@@ -128,11 +128,11 @@ void addWatch(Client& client) {
     cli::Command& command = client.program().command(
             kTools, "watch", "show the service's node traffic as it comes", "--all --once");
     const Traffic traffic(&command);
-    const auto fromStart = command.flag("--all", "show what is there already, too");
+    const auto fromStart = command.flag("--all", "also show what is there already");
     const auto once = command.flag("--once", "end instead of waiting for more");
     command.note(
-            "Calls that the service refuses leave no trace in the driver: only its log, with "
-            "--log, tells of them.");
+            "A trace does not show the calls that the service refused; the daemon's log, read with "
+            "--log, does.");
     command.withoutJson().run([=] {
         constexpr size_t kLongest = 1 << 20;
         const std::string name = traffic.file();
@@ -161,7 +161,7 @@ void addWatch(Client& client) {
             if (!part.empty()) continue;
             if (*once || isInput) break;
             printer.end();
-            // Half a line is kept until its rest comes.
+            // An incomplete line is kept until the rest comes.
             if (file.openIfNew()) line.clear();
             std::this_thread::sleep_for(std::chrono::milliseconds(50));
         }

@@ -13,12 +13,12 @@
 #include <cstddef>
 #include <cstdint>
 
-// How the types of interfaces get into parcels and out of them, and objects of interfaces become
-// binders and back.
+// Converts the types of interfaces to parcels and back, and objects of interfaces to binders and
+// back.
 
 namespace android::hardware {
 
-/** Tells the recipient of an interface what that of its binder is told. */
+/** Passes the death notice of a binder on to the recipient of its interface. */
 class hidl_binder_death_recipient : public IBinder::DeathRecipient {
   public:
     hidl_binder_death_recipient(const sp<hidl_death_recipient>& recipient, uint64_t cookie,
@@ -61,11 +61,11 @@ status_t readEmbeddedFromParcel(const hidl_vec<T>& list, const Parcel& parcel, s
                                      parentOffset + hidl_vec<T>::kOffsetOfBuffer, &buffer);
 }
 
-/** Writes the word, and the text if there is one, that a reply begins with. */
+/** Writes the exception code, and its text if it has one, with which a reply begins. */
 status_t writeToParcel(const Status& status, Parcel* parcel);
 status_t readFromParcel(Status* status, const Parcel& parcel);
 
-/** @return the binder of an object: its proxy's, or a stub, of which each object has one. */
+/** @return the binder of an object: its proxy's, or its only stub. */
 sp<IBinder> getOrCreateCachedBinder(::android::hidl::base::V1_0::IBase* object);
 
 namespace details {
@@ -77,7 +77,7 @@ sp<::android::hidl::base::V1_0::IBase> localObject(const sp<IBinder>& binder);
 Return<bool> canCastInterface(::android::hidl::base::V1_0::IBase* object, const char* interface,
                               bool emitError = false);
 
-/** @return the object as a more specific interface; nullptr when it has not got it. */
+/** @return the object as a more specific interface; nullptr if it does not have that one. */
 template <typename Child, typename Parent, typename BpChild>
 Return<sp<Child>> castInterface(const sp<Parent>& parent, const char* interface, bool emitError) {
     if (parent == nullptr) return sp<Child>();
@@ -95,7 +95,7 @@ template <typename Interface, typename Proxy, typename Stub>
 sp<Interface> fromBinder(const sp<IBinder>& binder) {
     if (binder == nullptr) return nullptr;
     if (binder->localBinder() == nullptr) return new Proxy(binder);
-    // What is local is a stub, and every stub is one of the base interface.
+    // A local binder is a stub, and every stub is one of the base interface.
     const sp<::android::hidl::base::V1_0::IBase> base = details::localObject(binder);
     if (!details::canCastInterface(base.get(), Interface::descriptor).withDefault(false)) {
         return nullptr;

@@ -8,7 +8,7 @@
 
 namespace android::hardware::details {
 
-/** Marks of the four kinds of classes that the interface compiler makes. */
+/** Tags of the four kinds of classes that the interface compiler generates. */
 struct i_tag {};
 struct bnhw_tag {};
 struct bphw_tag {};
@@ -31,7 +31,7 @@ std::string toHexString(T number) {
     return "0x" + digits;
 }
 
-/** Base of generated classes that could report their calls; this platform has no instruments. */
+/** Base of generated classes that could report their calls, which this platform does not do. */
 class HidlInstrumentor {
   public:
     HidlInstrumentor(const std::string& /* package */, const std::string& /* interface */) {}

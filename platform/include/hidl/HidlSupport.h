@@ -26,7 +26,7 @@ namespace android::hardware {
 // Strings, lists and handles lie in memory as on the wire. Their padding has a name and is zero, so
 // that no uninitialised memory of this process is sent.
 
-/** Is told when a remote object's process has ended. */
+/** Receives the notice that a remote object's process has ended. */
 struct hidl_death_recipient : public virtual RefBase {
     /**
      * @param cookie what was given to linkToDeath.
@@ -58,7 +58,7 @@ class hidl_handle {
 /** Text that crosses an interface. */
 class hidl_string {
   public:
-    /** Where the pointer to the characters lies in it, for those that pack and unpack it. */
+    /** Offset of the pointer to the characters, for packing and unpacking. */
     static constexpr size_t kOffsetOfBuffer = 0;
 
     hidl_string() = default;
@@ -116,11 +116,11 @@ class hidl_string {
     [[maybe_unused]] uint8_t mZero[3] = {};
 };
 
-/** List that crosses an interface: owns its elements or refers to somebody else's. */
+/** List that crosses an interface. It owns its elements or refers to those of another owner. */
 template <typename T>
 class hidl_vec {
   public:
-    /** Where the pointer to the elements lies in it, for those that pack and unpack it. */
+    /** Offset of the pointer to the elements, for packing and unpacking. */
     static constexpr size_t kOffsetOfBuffer = 0;
 
     hidl_vec() = default;
@@ -215,7 +215,7 @@ class hidl_array {
     T mElements[N] = {};
 };
 
-/** Shared memory; generated code asks for its size, and nothing here uses it. */
+/** Shared memory; generated code needs its size, but nothing here uses it. */
 class hidl_memory {
     hidl_handle mHandle;
     [[maybe_unused]] uint64_t mSize = 0;

@@ -16,20 +16,20 @@ namespace android::hardware {
 /**
  * Announces how calls will be served.
  *
- * @param maxThreads threads that serve calls at the most. This platform always has one, and logs a
- *     warning if another number is asked for.
- * @param callerWillJoin whether the caller provides that one with joinRpcThreadpool.
+ * @param maxThreads the most threads that serve calls. This platform always has one, and logs a
+ *     warning if another number is given.
+ * @param callerWillJoin whether the caller provides this thread, with joinRpcThreadpool.
  */
 void configureRpcThreadpool(size_t maxThreads, bool callerWillJoin);
 
-/** Serves calls with the calling thread. Returns only where that is impossible, with a log line. */
+/** Serves calls with the calling thread. Returns only if that is impossible, with a log line. */
 void joinRpcThreadpool();
 
 namespace details {
 
 /** @return the process's id, for getDebugInfo. */
 int32_t getPidIfSharable();
-/** @return whether callers may learn addresses of this process: never. */
+/** @return whether callers may learn addresses of this process: no. */
 inline bool debuggable() {
     return false;
 }

@@ -7,7 +7,7 @@ namespace android::hardware {
 
 enum MQFlavor : uint32_t { kSynchronizedReadWrite = 1, kUnsynchronizedWrite = 2 };
 
-/** Message queue; generated code asks for its size, and nothing here uses it. */
+/** Message queue; generated code needs its size, but nothing here uses it. */
 template <typename T, MQFlavor flavor>
 class MQDescriptor {
     hidl_vec<T> mGrantors;

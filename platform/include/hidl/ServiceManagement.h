@@ -19,7 +19,7 @@ namespace android::hardware {
 /**
  * Finds the service manager, and waits for at most 5 s if none answers yet.
  *
- * @return nullptr where none has come.
+ * @return nullptr if none has answered.
  */
 sp<::android::hidl::manager::V1_0::IServiceManager> defaultServiceManager();
 sp<::android::hidl::manager::V1_2::IServiceManager> defaultServiceManager1_2();
@@ -30,7 +30,7 @@ namespace details {
  * Finds a service.
  *
  * @param retry whether to wait for it, for at most 5 s.
- * @return nullptr where it is not there; host::lookupError() says why.
+ * @return nullptr if it is not there; host::lookupError() says why.
  */
 sp<::android::hidl::base::V1_0::IBase> getRawServiceInternal(const std::string& interface,
                                                              const std::string& instance,
@@ -49,10 +49,10 @@ sp<typename Proxy::Pure> getServiceInternal(const std::string& instance, bool re
 }
 
 /**
- * Registers an object with the service manager, for which it waits, under the names of all of its
- * interfaces.
+ * Registers an object under the names of all of its interfaces. Waits until the service manager
+ * answers.
  *
- * @return OK; UNKNOWN_ERROR where the manager refuses it.
+ * @return OK; UNKNOWN_ERROR if the manager refuses it.
  */
 status_t registerAsServiceInternal(const sp<::android::hidl::base::V1_0::IBase>& service,
                                    const std::string& instance);

@@ -14,7 +14,7 @@ namespace android::hidl::base::V1_0 {
 struct IBase;
 }
 
-/** What generated code keeps for the life of the process. */
+/** Data that generated code keeps for the life of the process. */
 namespace android::hardware::details {
 
 /** A map that threads share. */
@@ -25,7 +25,7 @@ class ConcurrentMap {
         const std::lock_guard<std::mutex> lock(mMutex);
         mMap[std::move(key)] = std::move(value);
     }
-    /** @return the value of a key, or another one where it has none. */
+    /** @return the value of a key, or another one if it has none. */
     Value get(const Key& key, Value otherwise) const {
         const std::lock_guard<std::mutex> lock(mMutex);
         const auto found = mMap.find(key);
@@ -35,7 +35,7 @@ class ConcurrentMap {
         const std::lock_guard<std::mutex> lock(mMutex);
         mMap.erase(key);
     }
-    /** Erases a key, unless its value is another one by now. */
+    /** Erases a key, unless its value has changed. */
     void eraseIfEqual(const Key& key, const void* object) {
         const std::lock_guard<std::mutex> lock(mMutex);
         const auto found = mMap.find(key);
@@ -47,7 +47,7 @@ class ConcurrentMap {
     std::map<Key, Value> mMap;
 };
 
-/** Settings of objects that nothing here changes: every object has the given default. */
+/** Settings of objects, which are never changed here: every object has the given default. */
 template <typename Value>
 struct DefaultsOnly {
     template <typename Object>

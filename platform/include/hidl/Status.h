@@ -11,7 +11,7 @@
 
 namespace android::hardware {
 
-/** Outcome of the transport of a call; what the operation itself answers is not in it. */
+/** Outcome of the transport of a call, without the operation's own answer. */
 class Status {
   public:
     /** The published exception codes that generated code uses; they travel in replies. */
@@ -27,7 +27,7 @@ class Status {
     static Status fromExceptionCode(int32_t code, std::string message = {});
     static Status fromStatusT(status_t error);
 
-    /** Becomes what an error of the transport means. */
+    /** Sets the outcome that an error of the transport means. */
     void setFromStatusT(status_t error);
 
     bool isOk() const { return mException == EX_NONE; }
@@ -53,7 +53,7 @@ class return_status {
 
     /** @return whether the call reached its object and the answer came back. */
     bool isOk() const { return mStatus.isOk(); }
-    /** @return whether there is no process any more behind the object. */
+    /** @return whether the object's process has ended. */
     bool isDeadObject() const { return mStatus.transactionError() == DEAD_OBJECT; }
     /** @return the outcome of the transport in words, "No error" for success. */
     std::string description() const { return mStatus.description(); }
@@ -89,7 +89,7 @@ class Return : public details::return_status {
     T mValue{};
 };
 
-/** As above; an object may be given and taken as one of its bases, too. */
+/** As above; an object also converts to and from its base classes. */
 template <typename T>
 class Return<sp<T>> : public details::return_status {
   public:

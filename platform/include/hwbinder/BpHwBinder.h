@@ -30,7 +30,7 @@ class BpHwBinder : public IBinder {
   private:
     Driver& mDriver;
     const uint32_t mHandle;
-    /** What the driver has with it. */
+    /** The driver's data for the handle. */
     void* const mLink;
     std::mutex mMutex;
     bool mAlive = true;

@@ -4,10 +4,10 @@
 #include <chrono>
 #include <string>
 
-/** What this platform offers beyond a device's: only for programs that are not for a device. */
+/** What only this platform offers, for programs that are not built for a device's runtime. */
 namespace android::hardware::host {
 
-/** @return what the calls of this process go over, and why: "/dev/hwbinder: ...". */
+/** @return the transport of this process's calls, and why it is used. */
 std::string transportDescription();
 
 /** @return whether a service manager answers, in words. */
@@ -18,7 +18,7 @@ std::string lookupError();
 
 /**
  * Limits how long a call may take; one that takes longer fails with TIMED_OUT. Over sockets its
- * object then stays unusable, and the limit holds for objects that are found afterwards.
+ * object then stays unusable, and the limit applies only to objects that are found afterwards.
  *
  * @param limit 0 for no limit, which is the default.
  */

@@ -13,16 +13,16 @@ class BHwBinder;
 class BpHwBinder;
 class Parcel;
 
-/** What calls go to: an object of this process or of another one. */
+/** An object that can be called, of this process or of another one. */
 class IBinder : public virtual RefBase {
   public:
-    /** Takes the reply while the results that it refers to are still there. */
+    /** Gets the reply while the results that it refers to still exist. */
     using TransactCallback = std::function<void(Parcel&)>;
 
     /** Flag of a call that has no reply and is not waited for. */
     static constexpr uint32_t FLAG_ONEWAY = 0x01;
 
-    /** Is told when the process of a remote object has ended. */
+    /** Receives the notice that the process of a remote object has ended. */
     class DeathRecipient : public virtual RefBase {
       public:
         virtual void binderDied(const wp<IBinder>& who) = 0;
@@ -37,9 +37,9 @@ class IBinder : public virtual RefBase {
     virtual status_t transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags = 0,
                               TransactCallback callback = nullptr) = 0;
 
-    /** @return OK; DEAD_OBJECT when it is too late; INVALID_OPERATION for a local object. */
+    /** @return OK; DEAD_OBJECT if the process has ended; INVALID_OPERATION for a local object. */
     virtual status_t linkToDeath(const sp<DeathRecipient>& recipient) = 0;
-    /** @return OK, or NAME_NOT_FOUND when it was not linked, or has been told already. */
+    /** @return OK, or NAME_NOT_FOUND if it was not linked or has had its notice. */
     virtual status_t unlinkToDeath(const sp<DeathRecipient>& recipient) = 0;
 
     /** @return this as an object of this process; nullptr when it is remote. */

@@ -6,7 +6,7 @@
 
 namespace android::hardware {
 
-/** The side of a generated proxy that knows the remote object. */
+/** The part of a generated proxy that knows the remote object. */
 class IInterface : public virtual RefBase {
   public:
     /** @return the remote object behind a proxy. */

@@ -20,9 +20,9 @@ namespace android::hardware {
  * to buffers elsewhere in memory, or to other objects of any process. The driver knows from the
  * list of offsets where the objects lie.
  *
- * A parcel that is written refers to its buffers until it has been sent. One that was received
- * refers to memory of the driver, which it gives back in the end. Reading past the end, or
- * another kind of object than there is, is an error and changes nothing outside the parcel.
+ * A written parcel refers to its buffers until it has been sent. A received one refers to memory of
+ * the driver, which it gives back in the end. Reading past the end, or an object of another kind
+ * than the next one, is an error and changes nothing outside the parcel.
  */
 class Parcel {
   public:
@@ -47,9 +47,9 @@ class Parcel {
     status_t writeUint64(uint64_t value) { return writePadded(value); }
     /** Writes text as UTF-16; only for ASCII. */
     status_t writeString16(const char* text, size_t length);
-    /** Refers to a buffer. @param handle its number, for what is embedded in it; may be nullptr. */
+    /** Refers to a buffer. @param handle its number, for buffers embedded in it; may be nullptr. */
     status_t writeBuffer(const void* buffer, size_t length, size_t* handle);
-    /** Refers to a buffer whose address stands in another one, its parent. */
+    /** Refers to a buffer whose address is in another one, its parent. */
     status_t writeEmbeddedBuffer(const void* buffer, size_t length, size_t* handle,
                                  size_t parentHandle, size_t parentOffset);
     /** @param binder nullptr for no object. */
@@ -57,7 +57,7 @@ class Parcel {
     /** @return INVALID_OPERATION for any handle but nullptr: no descriptors travel. */
     status_t writeNativeHandleNoDup(const native_handle_t* handle);
 
-    // Reading. NOT_ENOUGH_DATA past the end; BAD_TYPE for something else than what was asked for.
+    // Reading. Fails with NOT_ENOUGH_DATA past the end, with BAD_TYPE for another type.
 
     /** @return whether the request names this interface. */
     bool enforceInterface(const char* interface) const;
@@ -70,11 +70,11 @@ class Parcel {
     status_t readUint64(uint64_t* value) const { return readPadded(value); }
     /** Reads text; what is not ASCII becomes "?". */
     status_t readString16(std::string* text) const;
-    /** @param length what the buffer must measure. */
+    /** @param length the size that the buffer must have. */
     status_t readBuffer(size_t length, size_t* handle, const void** buffer) const;
     status_t readEmbeddedBuffer(size_t length, size_t* handle, size_t parentHandle,
                                 size_t parentOffset, const void** buffer) const;
-    /** @param binder nullptr where no object was sent. */
+    /** @param binder nullptr if no object was sent. */
     status_t readNullableStrongBinder(sp<IBinder>* binder) const;
     /** @return INVALID_OPERATION for any handle but none: no descriptors travel. */
     status_t readNullableNativeHandleNoDup(const native_handle_t** handle) const;
@@ -88,7 +88,7 @@ class Parcel {
     /** @return the room that its buffers need, each rounded up to 8, in bytes. */
     size_t buffersSize() const;
     void setDataPosition(size_t position) const { mPosition = position; }
-    /** Becomes what the driver has received. */
+    /** Takes over data that the driver has received. */
     void ipcSetDataReference(const uint8_t* data, size_t size, const binder_size_t* offsets,
                              size_t offsetCount, ReleaseBuffer release, void* owner) {
         if (mRelease != nullptr || mSize > 0) clear();
@@ -102,7 +102,7 @@ class Parcel {
         mRelease = release;
         mOwner = owner;
     }
-    /** Becomes empty. */
+    /** Empties the parcel. */
     void clear();
 
   private:
@@ -140,7 +140,7 @@ class Parcel {
         const size_t needed = start + padded(size);
         if ((needed > mCapacity || needed < start) && !reserve(needed)) return nullptr;
         mSize = needed;
-        // What fills the last 4 bytes up is zero.
+        // The padding of the last 4 bytes is zero.
         if (size > 0) memset(mData + needed - 4, 0, 4);
         return mData + start;
     }
@@ -160,7 +160,7 @@ class Parcel {
     status_t readObject(uint32_t type, void* object, size_t size, size_t* index) const;
     status_t readPointer(size_t length, size_t* handle, binder_buffer_object* object) const;
 
-    // What most calls need lies in the parcel itself, so that they need no memory from the heap.
+    // Most calls fit into the parcel itself and need no memory from the heap.
     // Left uninitialised: it is written before it is read.
     alignas(8) uint8_t mInlineData[256];
     binder_size_t mInlineOffsets[8];
@@ -172,7 +172,7 @@ class Parcel {
     binder_size_t* mOffsets = mInlineOffsets;
     size_t mOffsetCount = 0;
     size_t mOffsetCapacity = sizeof(mInlineOffsets) / sizeof(mInlineOffsets[0]);
-    /** Which of the offsets is the next to be read. */
+    /** Index of the next offset to read. */
     mutable size_t mNextObject = 0;
     ReleaseBuffer mRelease = nullptr;
     void* mOwner = nullptr;

@@ -14,7 +14,7 @@ namespace android::hardware {
 
 class Driver;
 
-/** What this process has of the binder: its driver, its pool of threads and its proxies. */
+/** This process's part of the binder: its driver, its pool of threads and its proxies. */
 class ProcessState {
   public:
     /** @return the state of this process, made at the first call. */
@@ -26,21 +26,21 @@ class ProcessState {
     const std::string& driverDescription() const { return mDescription; }
 
     /**
-     * @param maxThreads threads that serve calls at the most; this platform always has one.
-     * @param callerJoins whether a thread of the caller's will be that one.
+     * @param maxThreads the most threads that serve calls; this platform always has one.
+     * @param callerJoins whether the caller provides this thread.
      */
     void setThreadPoolConfiguration(size_t maxThreads, bool callerJoins);
-    /** Starts the thread that serves calls, unless one of the caller's will do it. */
+    /** Starts the thread that serves calls, unless the caller provides it. */
     void startThreadPool();
     /**
      * Serves calls with the calling thread, until that becomes impossible. While another thread
-     * does so this one waits: objects never have two calls at once.
+     * does so, this one waits: calls never run at the same time.
      */
     void joinThreadPool();
 
     /** @return the one proxy of a handle. */
     sp<IBinder> getStrongProxyForHandle(uint32_t handle);
-    /** Forgets a proxy that is going away. @return false when it has a successor already. */
+    /** Forgets a proxy that is being destroyed. @return false if it has a successor already. */
     bool expungeHandle(uint32_t handle, IBinder* proxy);
     /** Tells the proxy of a handle, if it still lives, that the process behind it has ended. */
     void sendObituary(uint32_t handle);

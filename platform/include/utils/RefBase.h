@@ -12,14 +12,14 @@ namespace android {
 /** Base of objects that live as long as one sp<> holds them, and that wp<> can watch. */
 class RefBase {
   public:
-    /** What outlives the object as long as somebody watches it: its two counts. */
+    /** The two counts of an object, which exist as long as the object or a wp<> to it. */
     class weakref_type {
       public:
         explicit weakref_type(RefBase* object) : mObject(object) {}
 
         void incWeak(const void* id);
         void decWeak(const void* id);
-        /** Takes a strong reference, unless there is none left. @return whether it did. */
+        /** Takes a strong reference, if there is still one. @return whether it did. */
         bool attemptIncStrong(const void* id);
 
         /** @return the object, alive or not. */
@@ -29,7 +29,7 @@ class RefBase {
         friend class RefBase;
 
         std::atomic<int32_t> mStrong{0};
-        /** Those who watch, and the object itself. */
+        /** Counts each wp<>, and the object itself as one. */
         std::atomic<int32_t> mWeak{1};
         RefBase* const mObject;
     };
