@@ -36,6 +36,9 @@ TEST_F(VibratorctlTest, AnswersAsInTheTranscript) {
     if (geteuid() != 0) GTEST_SKIP() << "only root can be another user";
     createDriver();
     start();
+    // Others may not see the folder in which it was built.
+    const std::string client = mDirectory.path() + "/vibratorctl";
+    std::filesystem::copy_file(VIBRATORCTL, client);
     const std::string prelude =
             "set -o pipefail; cd \"$VIBRATOR_SIM_DIR/sys/class/leds/vibrator\"; "
             "PATH=$PATH:${0%/*}:" +
@@ -58,12 +61,17 @@ TEST_F(VibratorctlTest, AnswersAsInTheTranscript) {
         if (prompt == std::string::npos || line.find_first_not_of("0123456789") != prompt) continue;
         got += line + "\n";
         const uid_t uid = prompt == 0 ? 0 : static_cast<uid_t>(std::stoul(line));
-        const Outcome outcome = runProgram(
-                {"/bin/bash", "-c", prelude + line.substr(prompt + 2), VIBRATORCTL}, uid);
+        const Outcome outcome =
+                runProgram({"/bin/bash", "-c", prelude + line.substr(prompt + 2), client}, uid);
         got += print(outcome.output, "") + print(outcome.errors, "! ");
         if (outcome.exitCode != 0) got += "[" + std::to_string(outcome.exitCode) + "]\n";
     }
-    EXPECT_EQ(got, wanted);
+    if (got == wanted) return;
+    const std::string file = mDirectory.path() + "/transcript.txt";
+    std::ofstream(file) << got;
+    FAIL() << runProgram({"/usr/bin/diff", "-U1", SOURCE_DIRECTORY "/tests/tools/transcript.txt",
+                          file})
+                      .output;
 }
 
 TEST_F(VibratorctlTest, TimedOutputIsStoppedBeforeExternalControl) {
