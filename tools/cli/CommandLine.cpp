@@ -301,11 +301,10 @@ Program::Line Program::parse(const std::vector<std::string>& words) const {
             }
         }
     }
-    const auto known = optionsOf(line.command);
     std::vector<std::string> names;
-    for (const Argument* each : known) {
+    for (const Argument* each : optionsOf(line.command)) {
         names.push_back(each->name);
-        if (each->name == unfinished) line.taking = each;
+        if (line.taking == nullptr && each->name == unfinished) line.taking = each;
     }
     if (!unknown.empty()) {
         // May be why a word makes no sense: it is the option's value.
@@ -321,7 +320,7 @@ void Program::takeOption(const Argument& option, const std::string& value, Line*
         // Also of a line with a mistake in it.
         option.read("", false);
     }
-    line->given.emplace_back(&option, value);
+    line->given.emplace_back(&option, option.isFlag() ? "" : value);
 }
 
 void Program::takeWord(const std::string& word, Line* line) const {
