@@ -190,9 +190,8 @@ class Program {
 
     /** Reads a command line, and those flags that are in it. */
     Line parse(const std::vector<std::string>& words) const;
-    void parseWord(const std::string& word, Line* line) const;
-    void parseOption(const std::string& word, Line* line) const;
-    void parseCommand(const std::string& word, Line* line) const;
+    static void takeOption(const Argument& option, const std::string& value, Line* line);
+    void takeWord(const std::string& word, Line* line) const;
     /** @return the options that a command may have, its own first: effect has a --version, too. */
     std::vector<const Argument*> optionsOf(const Command* command) const;
     /** @return the argument that the next word is for, if it is no option; nullptr for none. */
