@@ -145,8 +145,9 @@ TEST_F(PublicationTest, FileSystemThatTakesNothingIsSaid) {
                                              std::pair("nr_inodes=1", "No space left on device")}) {
         ChildProcess daemon;
         daemon.startProgram(mounted(options, SERVICE), logFile(), {});
-        EXPECT_TRUE(eventually([&] { return log().find(complaint) != std::string::npos; }))
-                << log();
+        EXPECT_TRUE(eventually([&, wanted = complaint] {
+            return log().find(wanted) != std::string::npos;
+        })) << log();
     }
 }
 
