@@ -264,12 +264,11 @@ std::string Node::leaf() const {
 }
 
 bool findNode(const std::string& directory, const char* path, Node* node) {
-    for (const std::string_view place : kDirectories) {
-        if (strncmp(path, place.data(), place.size()) != 0) continue;
-        *node = {path, directory, directory + path};
-        return true;
-    }
-    return false;
+    const bool isBelow = std::any_of(
+            std::begin(kDirectories), std::end(kDirectories),
+            [&](std::string_view each) { return strncmp(path, each.data(), each.size()) == 0; });
+    if (isBelow) *node = {path, directory, directory + path};
+    return isBelow;
 }
 
 std::vector<Node> listNodes(const std::string& directory) {

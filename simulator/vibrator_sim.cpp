@@ -130,7 +130,7 @@ class Simulator {
     std::string directory() const {
         const char* inherited = getenv("VIBRATOR_SIM_DIR");
         const bool isInherited = mDirectory->empty() && inherited != nullptr;
-        const std::string name = isInherited ? inherited : *mDirectory;
+        std::string name = isInherited ? inherited : *mDirectory;
         if (!name.empty()) return name;
         throw UsageError("no directory of a driver; name one with --dir or VIBRATOR_SIM_DIR");
     }

@@ -190,56 +190,88 @@ std::optional<NodeAccess> AccessReader::readTrace(std::string_view line) {
     return mOpen.extract(node).mapped();
 }
 
+void AccessReader::begin(std::string_view path, NodeAccess::Kind kind, const std::string& bytes) {
+    mNumber = {nodeName(path), kind, bytes, "", 0, ""};
+    mDirectory = mNumber->node.substr(0, mNumber->node.find('/'));
+}
+
+std::optional<NodeAccess> AccessReader::beginWrite(const std::string& text) {
+    constexpr std::string_view kValue = " val:";
+    const size_t value = std::min(text.rfind(kValue), text.size());
+    const std::string path = text.substr(0, value);
+    // The success of these texts shows by the motor's start.
+    const bool isStart = !mNumber && path.find("/cp_trigger_index") == std::string::npos;
+    std::optional<NodeAccess> done;
+    if (isStart && mText && mText->leaf() != "event_cmd") done.swap(mText);
+    if (value < text.size()) {
+        begin(path, NodeAccess::kWrite, text.substr(value + kValue.size()) + "\n");
+    }
+    return done;
+}
+
+void AccessReader::beginText(const std::string& leaf, const std::string& text) {
+    std::string bytes = text.substr(0, text.rfind(" , "));
+    // The log escapes the newline at the end.
+    if (const size_t newline = bytes.find("\\n"); newline != std::string::npos)
+        bytes.replace(newline, 2, "\n");
+    if (leaf == "event_cmd") bytes.insert(0, "FOLDER_");
+    mText = {mDirectory + '/' + leaf, NodeAccess::kWrite, bytes, "", 0, ""};
+}
+
 std::optional<NodeAccess> AccessReader::readLog(std::string_view line) {
+    const size_t tag = std::min(line.find("QorVibrator"), line.size());
+    std::optional<NodeAccess> done = readStep(line);
+    if (!done) return done;
+    if (done->kind == NodeAccess::kRefusal) {
+        done->bytes = after(line.substr(tag), ": ").value_or(line);
+        done->node = done->bytes.substr(0, done->bytes.find(' '));
+        if (done->node == "Pemission") done->node.clear();
+    }
+    if (tag < line.size()) done->time = readClock(std::string(line.substr(0, tag)), &done->clock);
+    return done;
+}
+
+std::optional<NodeAccess> AccessReader::readStep(std::string_view line) {
     std::optional<std::string_view> rest;
     const auto* row = std::find_if(std::begin(kLogLines), std::end(kLogLines),
                                    [&](const auto& each) { return rest = after(line, each.mark); });
     if (!rest) return std::nullopt;
     const std::string text(*rest);
-    const size_t tag = std::min(line.find("QorVibrator"), line.size());
     std::optional<NodeAccess> done;
-    const auto begin = [&](std::string_view path, NodeAccess::Kind kind, const std::string& bytes) {
-        mNumber = {nodeName(path), kind, bytes, "", 0, ""};
-        mDirectory = mNumber->node.substr(0, mNumber->node.find('/'));
-    };
     const auto end = [&](std::optional<NodeAccess>* access) {
         done.swap(*access);
         if (done) done->error = row->detail != nullptr ? row->detail : errorName(text);
     };
-    if (row->step == kRefusal) {
-        const std::string message(after(line.substr(tag), ": ").value_or(line));
-        const std::string word = message.substr(0, message.find(' '));
-        done = {word == "Pemission" ? "" : word, NodeAccess::kRefusal, message, row->detail, 0, ""};
-    } else if (row->step == kProbe) {
-        begin(text, NodeAccess::kProbe, "");
-    } else if (row->step == kRead) {
-        begin(text, NodeAccess::kRead, "");
-    } else if (row->step == kWrite) {
-        constexpr std::string_view kValue = " val:";
-        const size_t value = std::min(text.rfind(kValue), text.size());
-        const std::string path = text.substr(0, value);
-        // The success of these texts shows by the motor's start.
-        const bool isStart = !mNumber && path.find("/cp_trigger_index") == std::string::npos;
-        if (isStart && mText && mText->leaf() != "event_cmd") done.swap(mText);
-        if (value < text.size()) {
-            begin(path, NodeAccess::kWrite, text.substr(value + kValue.size()) + "\n");
-        }
-    } else if (row->step == kEnd ||
-               (row->step == kProbeEnd && mNumber && mNumber->kind == NodeAccess::kProbe)) {
-        end(&mNumber);
-    } else if (row->step == kTextRead) {
-        done = {mDirectory + '/' + row->detail, NodeAccess::kRead, text, "", 0, ""};
-    } else if (row->step == kText) {
-        std::string bytes = text.substr(0, text.rfind(" , "));
-        // The log escapes the newline at the end.
-        if (const size_t newline = bytes.find("\\n"); newline != std::string::npos)
-            bytes.replace(newline, 2, "\n");
-        mText = {mDirectory + '/' + row->detail, NodeAccess::kWrite, bytes, "", 0, ""};
-        if (mText->leaf() == "event_cmd") mText->bytes.insert(0, "FOLDER_");
-    } else if (row->step == kTextEnd) {
-        end(&mText);
+    switch (row->step) {
+        case kNothing:
+            break;
+        case kRefusal:
+            done = {"", NodeAccess::kRefusal, "", row->detail, 0, ""};
+            break;
+        case kProbe:
+            begin(text, NodeAccess::kProbe, "");
+            break;
+        case kRead:
+            begin(text, NodeAccess::kRead, "");
+            break;
+        case kWrite:
+            done = beginWrite(text);
+            break;
+        case kProbeEnd:
+            if (!mNumber || mNumber->kind != NodeAccess::kProbe) break;
+            [[fallthrough]];
+        case kEnd:
+            end(&mNumber);
+            break;
+        case kTextRead:
+            done = {mDirectory + '/' + row->detail, NodeAccess::kRead, text, "", 0, ""};
+            break;
+        case kText:
+            beginText(row->detail, text);
+            break;
+        case kTextEnd:
+            end(&mText);
+            break;
     }
-    if (done && tag < line.size())
-        done->time = readClock(std::string(line.substr(0, tag)), &done->clock);
     return done;
 }

@@ -42,6 +42,11 @@ class AccessReader {
   private:
     std::optional<NodeAccess> readTrace(std::string_view line);
     std::optional<NodeAccess> readLog(std::string_view line);
+    std::optional<NodeAccess> readStep(std::string_view line);
+    void begin(std::string_view path, NodeAccess::Kind kind, const std::string& bytes);
+    /** @return the text whose success the write shows, if it does. */
+    std::optional<NodeAccess> beginWrite(const std::string& text);
+    void beginText(const std::string& leaf, const std::string& text);
 
     bool mIsLog;
     /** For a trace: the accesses that have begun, by node. */

@@ -111,10 +111,10 @@ TEST_F(ToolsTest, WatchShowsTheSameByTraceAndByLog) {
             << byLog;
     EXPECT_EQ(byLog.substr(0, byLog.find("leds/multi_freq")), byTrace) << byLog;
 
-    const std::string onTerminal = "script -qec '\"$0\" watch --all --once' /dev/null";
+    // On a terminal; script loses what comes after the end of its input.
     const auto colours = [&](const std::string& setting) {
         return runShell("export W=\"$0\"; " + setting +
-                        " script -qec '\"$W\" watch --all --once' /dev/null")
+                        " script -qec '\"$W\" watch --all --once' /dev/null < <(sleep 5)")
                        .output.find("\033[32m") != std::string::npos;
     };
     EXPECT_TRUE(colours(""));

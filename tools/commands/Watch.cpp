@@ -15,7 +15,9 @@
 #include <iomanip>
 #include <iostream>
 #include <sstream>
+#include <string>
 #include <thread>
+#include <utility>
 
 namespace {
 
@@ -54,12 +56,22 @@ class Printer {
   public:
     explicit Printer(const Traffic& traffic) : mTraffic(traffic), mReader(traffic.isLog()) {}
 
-    void take(const std::string& line) {
-        constexpr size_t kMany = 100;
-        const auto access = mReader.read(line);
-        mIsKnown = mIsKnown || access;
-        if (++mLines == kMany) end();
-        if (access) print(*access, mIsColoured);
+    /** Takes what has come; an incomplete line is kept until the rest comes. */
+    void take(const std::string& part) {
+        constexpr size_t kLongest = 1 << 20;
+        size_t start = 0;
+        for (size_t end; (end = part.find('\n', start)) != std::string::npos; start = end + 1) {
+            mLine.append(part, start, end - start);
+            takeLine();
+        }
+        mLine.append(part, start);
+        if (mLine.size() > kLongest) {
+            throw cli::UsageError(mTraffic.file() + ": a line of more than 1 MiB");
+        }
+    }
+    void forgetIncomplete() { mLine.clear(); }
+    void takeIncomplete() {
+        if (!mLine.empty()) takeLine();
     }
 
     /** Called when all that there is has been read. */
@@ -73,8 +85,18 @@ class Printer {
     }
 
   private:
+    void takeLine() {
+        constexpr size_t kMany = 100;
+        const std::string line = std::exchange(mLine, {});
+        const auto access = mReader.read(line);
+        mIsKnown = mIsKnown || access;
+        if (++mLines == kMany) end();
+        if (access) print(*access, mIsColoured);
+    }
+
     const Traffic& mTraffic;
     AccessReader mReader;
+    std::string mLine;
     bool mIsColoured = wantsColour();
     size_t mLines = 0;
     bool mIsKnown = false;
@@ -83,7 +105,7 @@ class Printer {
 /** A file that others append to or replace; or standard input, "-". */
 class GrowingFile {
   public:
-    explicit GrowingFile(const std::string& name) : mName(name) { open(); }
+    explicit GrowingFile(std::string name) : mName(std::move(name)) { open(); }
     GrowingFile(const GrowingFile&) = delete;
     GrowingFile& operator=(const GrowingFile&) = delete;
     ~GrowingFile() { close(mFile); }
@@ -122,6 +144,32 @@ class GrowingFile {
     int mFile = -1;
 };
 
+/** Shows accesses as they come, or only those that are there. @return the exit code. */
+int watch(const Traffic& traffic, bool fromStart, bool once) {
+    const std::string name = traffic.file();
+    const bool isInput = name == "-";
+    GrowingFile file(name);
+    if (!isInput && !fromStart) file.skip();
+    if (!once) {
+        std::cerr << "Waiting for " << (traffic.isLog() ? "lines of the daemon's log" : "accesses")
+                  << " in " << (isInput ? "standard input" : cli::printable(name))
+                  << "; Ctrl-C ends it." << std::endl;
+    }
+    Printer printer(traffic);
+    while (std::cout) {
+        const std::string part = file.read();
+        printer.take(part);
+        if (!part.empty()) continue;
+        if (once || isInput) break;
+        printer.end();
+        if (file.openIfNew()) printer.forgetIncomplete();
+        std::this_thread::sleep_for(std::chrono::milliseconds(50));
+    }
+    printer.takeIncomplete();
+    printer.end();
+    return kSuccess;
+}
+
 }  // namespace
 
 void addWatch(Client& client) {
@@ -133,40 +181,5 @@ void addWatch(Client& client) {
     command.note(
             "A trace does not show the calls that the service refused; the daemon's log, read with "
             "--log, does.");
-    command.withoutJson().run([=] {
-        constexpr size_t kLongest = 1 << 20;
-        const std::string name = traffic.file();
-        const bool isInput = name == "-";
-        GrowingFile file(name);
-        if (!isInput && !*fromStart) file.skip();
-        if (!*once) {
-            std::cerr << "Waiting for "
-                      << (traffic.isLog() ? "lines of the daemon's log" : "accesses") << " in "
-                      << (isInput ? "standard input" : cli::printable(name)) << "; Ctrl-C ends it."
-                      << std::endl;
-        }
-        Printer printer(traffic);
-        std::string line;
-        while (std::cout) {
-            const std::string part = file.read();
-            for (const char c : part) {
-                if (c != '\n') {
-                    line += c;
-                    continue;
-                }
-                printer.take(line);
-                line.clear();
-            }
-            if (line.size() > kLongest) throw cli::UsageError(name + ": a line of more than 1 MiB");
-            if (!part.empty()) continue;
-            if (*once || isInput) break;
-            printer.end();
-            // An incomplete line is kept until the rest comes.
-            if (file.openIfNew()) line.clear();
-            std::this_thread::sleep_for(std::chrono::milliseconds(50));
-        }
-        if (!line.empty()) printer.take(line);
-        printer.end();
-        return kSuccess;
-    });
+    command.withoutJson().run([=] { return watch(traffic, *fromStart, *once); });
 }
