@@ -91,8 +91,9 @@ class TimelineMaker {
             choosePattern(value);
         } else if (leaf == "cp_trigger_queue") {
             // "PATTERN.PERCENT, REPEATS, DELAY~"
-            const size_t dot = std::min(bytes.find('.'), bytes.size() - 1);
-            const long long percent = strtoll(bytes.c_str() + dot + 1, nullptr, 10);
+            const size_t dot = bytes.find('.');
+            const long long percent =
+                    dot == std::string::npos ? 0 : strtoll(bytes.c_str() + dot + 1, nullptr, 10);
             mQueueStrength = static_cast<double>(std::max(0LL, percent)) / 100;
             mark("pattern " + number + " repeat", kPattern);
         } else if (leaf == "event_cmd") {
