@@ -72,7 +72,7 @@ class TimelineMaker {
 
   private:
     /** What a call that has begun may still become. */
-    enum Begun { kNothing, kOn, kIntensity, kPattern, kEngine };
+    enum Begun { kNoCall, kOn, kIntensity, kPattern, kEngine };
 
     void write(const std::string& leaf, const std::string& bytes) {
         const long long value = strtoll(bytes.c_str(), nullptr, 10);
@@ -113,7 +113,7 @@ class TimelineMaker {
     }
 
     /** Adds a call; without times it comes after the motor has stopped, or after some s. */
-    void mark(const std::string& label, Begun begun = kNothing, double latest = 1) {
+    void mark(const std::string& label, Begun begun = kNoCall, double latest = 1) {
         if (!mTimeline.isTimed && !mTimeline.marks.empty()) {
             mNow = std::clamp(mStop + kGap, mNow + kGap, mNow + latest);
         }
@@ -121,7 +121,7 @@ class TimelineMaker {
         mBegun = begun;
     }
     /** Adds a call that does not wait for the motor. */
-    void set(const std::string& label, Begun begun = kNothing) { mark(label, begun, kGap); }
+    void set(const std::string& label, Begun begun = kNoCall) { mark(label, begun, kGap); }
 
     void setIntensity(long long value) {
         const double strength = std::max(0.0, static_cast<double>(value) / kFull);
@@ -132,7 +132,7 @@ class TimelineMaker {
             // The click starts the motor before it sets the strength; it is drawn as one.
             mTimeline.marks.back().label = std::string("click ") + clickOf(amplitude);
             mSegments.back().strength = strength;
-            mBegun = kNothing;
+            mBegun = kNoCall;
             return;
         }
         set(amplitude > 0 ? "amplitude " + std::to_string(amplitude)
@@ -170,7 +170,7 @@ class TimelineMaker {
         } else {
             mark(label);
         }
-        mBegun = value == 0 ? kNothing : kPattern;
+        mBegun = value == 0 ? kNoCall : kPattern;
     }
 
     void activate(bool isOn) {
@@ -189,7 +189,7 @@ class TimelineMaker {
         const bool isUsual =
                 (begun == kEngine && ms == kEngineMs) || (begun == kPattern && ms == kPatternMs);
         if (!isUsual) mark(ms > 0 ? "on " + std::to_string(ms) : "off");
-        mBegun = begun < kPattern && ms == kClickMs ? kOn : kNothing;
+        mBegun = begun < kPattern && ms == kClickMs ? kOn : kNoCall;
         stop();
         mStop = mNow;
         if (begun == kEngine && ms > 0) {
@@ -224,7 +224,7 @@ class TimelineMaker {
     double mStop = -1;
     double mStrength = 1;
     long long mDuration = 0;
-    Begun mBegun = kNothing;
+    Begun mBegun = kNoCall;
     /** Whether the last access found the node of the strength. */
     bool mProbed = false;
     /** Strength of the pattern in the driver's queue; below 0 if it has the motor's. */

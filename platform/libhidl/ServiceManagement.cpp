@@ -20,7 +20,6 @@ using std::chrono::milliseconds;
 using std::chrono::steady_clock;
 using Manager = ::android::hidl::manager::V1_2::IServiceManager;
 
-constexpr char kTag[] = "hwbinder";
 constexpr milliseconds kPatience(5000);
 constexpr milliseconds kForEver = milliseconds::max();
 
@@ -42,7 +41,7 @@ auto waitFor(milliseconds patience, const std::string& what, Find find) {
         lookupError() = what + " is not there: " + whyNot;
         if (patience != kForEver && steady_clock::now() - start >= patience) return found;
         if (pause == milliseconds(1)) {
-            __android_log_print(ANDROID_LOG_INFO, kTag, "waiting; %s", lookupError().c_str());
+            __android_log_print(ANDROID_LOG_INFO, kLogTag, "waiting; %s", lookupError().c_str());
         }
         std::this_thread::sleep_for(pause);
         pause = std::min(2 * pause, milliseconds(128));
@@ -88,11 +87,12 @@ sp<IBase> getRawServiceInternal(const std::string& interface, const std::string&
 }
 
 status_t registerAsServiceInternal(const sp<IBase>& service, const std::string& instance) {
-    __android_log_print(ANDROID_LOG_INFO, kTag, "calls go over %s",
+    __android_log_print(ANDROID_LOG_INFO, kLogTag, "calls go over %s",
                         host::transportDescription().c_str());
     const sp<Manager> manager = findManager(kForEver);
     if (manager == nullptr) {
-        __android_log_print(ANDROID_LOG_ERROR, kTag, "not registered: %s", lookupError().c_str());
+        __android_log_print(ANDROID_LOG_ERROR, kLogTag, "not registered: %s",
+                            lookupError().c_str());
         return NO_INIT;
     }
     bool isKnown = false;
@@ -100,7 +100,7 @@ status_t registerAsServiceInternal(const sp<IBase>& service, const std::string& 
         const Return<bool> added = manager->addWithChain(instance, service, chain);
         isKnown = added.withDefault(false);
         if (!added.isOk()) {
-            __android_log_print(ANDROID_LOG_ERROR, kTag, "not registered: %s",
+            __android_log_print(ANDROID_LOG_ERROR, kLogTag, "not registered: %s",
                                 added.description().c_str());
         }
     });

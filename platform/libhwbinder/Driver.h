@@ -59,6 +59,12 @@ class Driver {
     virtual std::string name() const = 0;
 };
 
+/** The tag of the runtime's log lines. */
+inline constexpr char kLogTag[] = "hwbinder";
+
+/** @return an environment variable; empty where it is not set. */
+std::string environment(const char* name);
+
 /** @return how long a call may take, in ms; 0 without a limit. */
 int callTimeout();
 

@@ -15,8 +15,6 @@
 namespace android::hardware {
 namespace {
 
-constexpr char kTag[] = "hwbinder";
-
 /**
  * BR_TRANSACTION_PENDING_FROZEN, which the headers lack before Linux 6.4: what stands in place of
  * BR_TRANSACTION_COMPLETE when a oneway call is kept for a process that is frozen.
@@ -290,7 +288,7 @@ void KernelThread::serve() {
     memcpy(mOut + mOutSize, &enter, sizeof(enter));
     mOutSize += sizeof(enter);
     const status_t status = waitFor(Until::kForEver, nullptr);
-    __android_log_print(ANDROID_LOG_ERROR, kTag, "%s serves no more: %s", mDriver.name().c_str(),
+    __android_log_print(ANDROID_LOG_ERROR, kLogTag, "%s serves no more: %s", mDriver.name().c_str(),
                         strerror(-status));
 }
 

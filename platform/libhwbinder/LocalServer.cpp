@@ -21,8 +21,6 @@
 namespace android::hardware {
 namespace {
 
-constexpr char kTag[] = "hwbinder";
-
 /** Descriptors that clients never get, so that the objects can always open their files. */
 constexpr size_t kReservedDescriptors = 32;
 /** Connections that only root and the system user get. */
@@ -95,7 +93,7 @@ bool LocalServer::publish(const sp<BHwBinder>& object, const std::vector<std::st
         return listen(socket, object);
     }
     const bool isTaken = errno == EWOULDBLOCK;
-    __android_log_print(ANDROID_LOG_ERROR, kTag, "%s is not registered%s: %s",
+    __android_log_print(ANDROID_LOG_ERROR, kLogTag, "%s is not registered%s: %s",
                         socketName(chain.front(), instance).c_str(), isTaken ? " yet" : "",
                         whyNot.c_str());
     const std::lock_guard<std::mutex> lock(mMutex);
@@ -122,7 +120,7 @@ int LocalServer::retryPending() {
         std::string whyNot;
         const int socket = ::android::hardware::publish(each.chain, each.instance, &whyNot);
         if (socket < 0) return false;
-        __android_log_print(ANDROID_LOG_INFO, kTag, "%s is registered now",
+        __android_log_print(ANDROID_LOG_INFO, kLogTag, "%s is registered now",
                             socketName(each.chain.front(), each.instance).c_str());
         return listen(socket, each.object);
     };
@@ -146,7 +144,7 @@ void LocalServer::unwatch(int connection) const {
 
 void LocalServer::serve() {
     if (mEpoll < 0 || mWake < 0 || mSpare < 0 || descriptorLimit() < kLeastDescriptors) {
-        __android_log_print(ANDROID_LOG_ERROR, kTag,
+        __android_log_print(ANDROID_LOG_ERROR, kLogTag,
                             "too few descriptors to serve: the limit is %zu, at least %zu are "
                             "needed (ulimit -n)",
                             descriptorLimit(), kLeastDescriptors);
@@ -303,7 +301,7 @@ void LocalServer::acceptAll(Endpoint* listener) {
         event.events = EPOLLIN;
         event.data.ptr = &client;
         if (!makeRoom(&client) || epoll_ctl(mEpoll, EPOLL_CTL_ADD, socket, &event) != 0) {
-            __android_log_print(ANDROID_LOG_WARN, kTag, "uid %u gets no further connection",
+            __android_log_print(ANDROID_LOG_WARN, kLogTag, "uid %u gets no further connection",
                                 owner.uid);
             drop(&client);
         }

@@ -17,11 +17,6 @@ namespace {
 
 constexpr char kDevice[] = "/dev/hwbinder";
 
-std::string environment(const char* name) {
-    const char* value = getenv(name);
-    return value == nullptr ? "" : value;
-}
-
 /** Chooses the driver. @param description takes which one it is, and why. */
 std::unique_ptr<Driver> chooseDriver(std::string* description) {
     const std::string device = environment("HWBINDER_DEVICE");
@@ -50,6 +45,11 @@ std::atomic<int>& timeout() {
 }
 
 }  // namespace
+
+std::string environment(const char* name) {
+    const char* value = getenv(name);
+    return value == nullptr ? "" : value;
+}
 
 ProcessState::ProcessState() : mDriver(chooseDriver(&mDescription)) {}
 

@@ -10,7 +10,6 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <cstdlib>
 #include <cstring>
 #include <mutex>
 #include <string_view>
@@ -27,11 +26,6 @@ constexpr char kLock[] = ".lock";
 
 bool endsWith(std::string_view text, std::string_view end) {
     return text.size() >= end.size() && text.substr(text.size() - end.size()) == end;
-}
-
-std::string environment(const char* name) {
-    const char* value = getenv(name);
-    return value == nullptr ? "" : value;
 }
 
 std::string inWords(const std::string& what) {
@@ -146,6 +140,10 @@ int listenAt(const std::string& directory, const std::string& name, std::string*
 bool linkTo(const std::string& target, const std::string& directory, const std::string& name,
             std::string* whyNot) {
     const std::string path = directory + "/" + name;
+    char before[sizeof(sockaddr_un::sun_path)];
+    const ssize_t length = readlink(path.c_str(), before, sizeof(before));
+    // As in each start but the first.
+    if (length >= 0 && target == std::string_view(before, static_cast<size_t>(length))) return true;
     const std::string temporary = path + kTemporary;
     unlink(temporary.c_str());
     if (symlink(target.c_str(), temporary.c_str()) == 0 &&
