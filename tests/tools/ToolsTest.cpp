@@ -269,9 +269,9 @@ TEST(TimelineTest, ShowsWhatTheDriverWasTold) {
             // Not a click: without the probe, another strength, another time, too late.
             {"0 enable 20; 2 intensity 10000; 100 enable 20; 101 ?intensity; 102 intensity 5040; "
              "200 enable 30; 201 ?intensity; 202 intensity 10000; 300 enable 20; 351 ?intensity; "
-             "351 intensity 1",
+             "351 intensity 10000",
              "on 20 at 0; intensity 10000 at 2; on 20 at 100; amplitude 129 at 102; on 30 at 200; "
-             "amplitude 255 at 202; on 20 at 300; amplitude 1 at 351; 0-2 100 run; 2-20 100 run; "
+             "amplitude 255 at 202; on 20 at 300; amplitude 255 at 351; 0-2 100 run; 2-20 100 run; "
              "100-102 100 run; 102-120 50.4 run; 200-202 50.4 run; 202-230 100 run; 300-320 100 "
              "run"},
             {"0 intensity 5000; 0 enable 500; 250 ?intensity; 250 intensity 2500",
