@@ -141,8 +141,8 @@ bool linkTo(const std::string& target, const std::string& directory, const std::
             std::string* whyNot) {
     const std::string path = directory + "/" + name;
     char before[sizeof(sockaddr_un::sun_path)];
+    // In each start but the first the link is right.
     const ssize_t length = readlink(path.c_str(), before, sizeof(before));
-    // As in each start but the first.
     if (length >= 0 && target == std::string_view(before, static_cast<size_t>(length))) return true;
     const std::string temporary = path + kTemporary;
     unlink(temporary.c_str());

@@ -56,7 +56,12 @@ TEST_F(PublicationTest, SearchSaysEveryPlaceThatItHasLookedAt) {
 }
 
 TEST_F(PublicationTest, NameGoesToTheNextWhenItsHolderHasGone) {
+    // An inherited interface's name that another service had.
+    const std::string inherited =
+            mDirectory.path() + "/vendor.velmora.hardware.vibrator@2.0::IDaxVibrator.default";
+    fs::create_symlink("another", inherited);
     serve();
+    EXPECT_EQ(fs::read_symlink(inherited), kName);
     ChildProcess second;
     second.startProgram({SERVICE}, mDirectory.path() + "/second", {});
     const auto secondsLog = [&] { return readFile(mDirectory.path() + "/second"); };
@@ -69,6 +74,7 @@ TEST_F(PublicationTest, NameGoesToTheNextWhenItsHolderHasGone) {
     mServer.kill();
     EXPECT_TRUE(eventually(answers));
     EXPECT_NE(secondsLog().find("is registered now"), std::string::npos);
+    EXPECT_EQ(fs::read_symlink(inherited), kName);
 }
 
 TEST_F(PublicationTest, OfManyStartsOneHasTheName) {
