@@ -1,13 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
 
-/** The real daemon, from exec to its first answer. */
+/** The real daemon, from exec to its first answer, beside the same by bare system calls. */
 #include "Child.h"
 #include "support/TemporaryDirectory.h"
 
 #include <benchmark/benchmark.h>
+#include <sys/socket.h>
+#include <sys/un.h>
 #include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
 
 #include <chrono>
+#include <cstdio>
 #include <cstdlib>
 #include <string>
 
@@ -15,37 +18,50 @@ namespace {
 
 using ::vendor::velmora::hardware::vibrator::V2_1::IDaxVibrator;
 
-void startUp(benchmark::State& state) {
-    const TemporaryDirectory directory;
-    setenv("HWBINDER_DIR", directory.path().c_str(), 1);
-    const std::string socket = directory.path() + "/" + IDaxVibrator::descriptor + ".default";
+/** Starts a program, again and again, and waits each time until it answers at the socket. */
+template <typename Answers>
+void start(benchmark::State& state, const char* program, const std::string& socket,
+           Answers answers) {
     for (auto _ : state) {
         unlink(socket.c_str());
         const auto start = std::chrono::steady_clock::now();
-        const Child daemon([] { execl(SERVICE, SERVICE, nullptr); });
+        const Child child([&] { execl(program, program, socket.c_str(), nullptr); });
         // A cheap check, since both processes share the processor.
         while (access(socket.c_str(), F_OK) != 0)
             usleep(20);
-        for (android::sp<IDaxVibrator> vibrator; vibrator == nullptr || !vibrator->off().isOk();)
-            vibrator = IDaxVibrator::tryGetService();
-        // Not counting the daemon's end, at the end of the scope.
+        if (!answers()) state.SkipWithError("no answer");
+        // Not counting the program's end, at the end of the scope.
         const std::chrono::duration<double> time = std::chrono::steady_clock::now() - start;
         state.SetIterationTime(time.count());
     }
 }
+
+void startUp(benchmark::State& state) {
+    const TemporaryDirectory directory;
+    setenv("HWBINDER_DIR", directory.path().c_str(), 1);
+    start(state, SERVICE, directory.path() + "/" + IDaxVibrator::descriptor + ".default", [] {
+        const android::sp<IDaxVibrator> vibrator = IDaxVibrator::tryGetService();
+        return vibrator != nullptr && vibrator->off().isOk();
+    });
+}
 BENCHMARK(startUp)->UseManualTime();
 
-/** A program that does nothing, from exec to its end. */
 void startUpFloor(benchmark::State& state) {
-    for (auto _ : state) {
-        const pid_t pid = fork();
-        if (pid == 0) {
-            execl("/bin/true", "/bin/true", nullptr);
-            _exit(1);
-        }
-        waitpid(pid, nullptr, 0);
-    }
+    const TemporaryDirectory directory;
+    sockaddr_un address{};
+    address.sun_family = AF_UNIX;
+    snprintf(address.sun_path, sizeof(address.sun_path), "%s/socket", directory.path().c_str());
+    start(state, STARTUP_FLOOR, address.sun_path, [&] {
+        const int client = socket(AF_UNIX, SOCK_SEQPACKET | SOCK_CLOEXEC, 0);
+        char message[64] = {};
+        const bool answered = connect(client, reinterpret_cast<const sockaddr*>(&address),
+                                      sizeof(address)) == 0 &&
+                              send(client, message, sizeof(message), 0) > 0 &&
+                              recv(client, message, sizeof(message), 0) > 0;
+        close(client);
+        return answered;
+    });
 }
-BENCHMARK(startUpFloor)->Name("startUp/floor")->UseRealTime();
+BENCHMARK(startUpFloor)->Name("startUp/floor")->UseManualTime();
 
 }  // namespace

@@ -30,6 +30,9 @@ struct Packet {
         uint32_t offsetsSize;
     };
 
+    // NOLINTNEXTLINE(modernize-use-equals-default): with that, make_unique would clear the bytes.
+    Packet() {}
+
     /** @return OK; FAILED_TRANSACTION if it is too large, or has other objects than buffers. */
     status_t pack(uint32_t code, uint32_t flags, const Parcel& parcel);
     /** Packs an error in place of a reply. */
