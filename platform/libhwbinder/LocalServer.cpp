@@ -23,7 +23,7 @@ namespace {
 
 /** Descriptors that clients never get, so that the objects can always open their files. */
 constexpr size_t kReservedDescriptors = 32;
-/** Connections that only root and the system user get. */
+/** Connections that only root and the system user get, or half of all if that is less. */
 constexpr size_t kReservedConnections = 16;
 constexpr size_t kMostConnectionsPerUid = 128;
 /** New connections between two rounds of calls, so that a flood of them does not delay calls. */
@@ -52,8 +52,20 @@ size_t descriptorLimit() {
     return static_cast<size_t>(std::min<rlim_t>(limit.rlim_cur, 65536));
 }
 
+size_t reserved(size_t mostConnections) {
+    return std::min(mostConnections / 2, kReservedConnections);
+}
+
 int openSpare() {
     return open("/dev/null", O_RDONLY | O_CLOEXEC);
+}
+
+/** @return 1 if a call waits, 0 if none has come, -1 if the client has closed and left none. */
+int peek(int socket) {
+    char byte = 0;
+    const ssize_t size = recv(socket, &byte, 1, MSG_PEEK | MSG_DONTWAIT);
+    if (size < 0 && errno == EAGAIN) return 0;
+    return size > 0 ? 1 : -1;
 }
 
 /** Releases a packet of the server's own, which is used again. */
@@ -167,10 +179,12 @@ bool LocalServer::collect(int timeout) {
     int others = 0;
     for (int i = 0; i < count; ++i) {
         auto* endpoint = static_cast<Endpoint*>(events[i].data.ptr);
-        if ((events[i].data.u64 & kWatched) == 0 && endpoint->share != nullptr) {
-            enqueue(endpoint);
-        } else {
+        if ((events[i].data.u64 & kWatched) != 0 || endpoint->share == nullptr) {
             events[others++] = events[i];
+        } else if ((events[i].events & EPOLLRDHUP) != 0 && peek(endpoint->socket) < 0) {
+            drop(endpoint);
+        } else {
+            enqueue(endpoint);
         }
     }
     for (int i = 0; i < others; ++i) {
@@ -287,30 +301,35 @@ void LocalServer::acceptAll(Endpoint* listener) {
         }
         ucred owner{};
         socklen_t size = sizeof(owner);
-        if (getsockopt(socket, SOL_SOCKET, SO_PEERCRED, &owner, &size) != 0) {
+        if (peek(socket) < 0 || getsockopt(socket, SOL_SOCKET, SO_PEERCRED, &owner, &size) != 0) {
             close(socket);
-            continue;
-        }
-        Share& share = mShares[owner.uid];
-        share.uid = owner.uid;
-        ++share.connections;
-        ++mConnections;
-        Endpoint& client =
-                mClients[socket] = {socket, listener->object, &share, nullptr, false, ++mClock};
-        epoll_event event{};
-        event.events = EPOLLIN;
-        event.data.ptr = &client;
-        if (!makeRoom(&client) || epoll_ctl(mEpoll, EPOLL_CTL_ADD, socket, &event) != 0) {
-            __android_log_print(ANDROID_LOG_WARN, kLogTag, "uid %u gets no further connection",
-                                owner.uid);
-            drop(&client);
+        } else if (!admit(socket, owner.uid, listener->object)) {
+            return;
         }
     }
 }
 
+bool LocalServer::admit(int socket, uid_t uid, const sp<BHwBinder>& object) {
+    Share& share = mShares[uid];
+    share.uid = uid;
+    ++share.connections;
+    ++mConnections;
+    const bool isRoomLeft =
+            share.connections < mMostPerUid && mConnections < mMost - reserved(mMost);
+    Endpoint& client = mClients[socket] = {socket, object, &share, nullptr, false, ++mClock};
+    epoll_event event{};
+    event.events = EPOLLIN | EPOLLRDHUP;
+    event.data.ptr = &client;
+    if (!makeRoom(&client) || epoll_ctl(mEpoll, EPOLL_CTL_ADD, socket, &event) != 0) {
+        __android_log_print(ANDROID_LOG_WARN, kLogTag, "uid %u gets no further connection", uid);
+        drop(&client);
+    }
+    return isRoomLeft;
+}
+
 bool LocalServer::makeRoom(const Endpoint* newcomer) {
     const Share* share = newcomer->share;
-    const size_t kept = isPrivileged(share->uid) ? 0 : std::min(mMost / 2, kReservedConnections);
+    const size_t kept = isPrivileged(share->uid) ? 0 : reserved(mMost);
     if (share->connections <= mMostPerUid) {
         if (mConnections <= mMost - kept) return true;
         // The uid that has most gives way; that may be the newcomer's own.
@@ -324,7 +343,6 @@ bool LocalServer::makeRoom(const Endpoint* newcomer) {
         oldest = oldestClient(share, newcomer, false);
     }
     if (oldest == nullptr) return false;
-    unqueue(oldest);
     drop(oldest);
     return true;
 }
@@ -332,9 +350,7 @@ bool LocalServer::makeRoom(const Endpoint* newcomer) {
 LocalServer::Endpoint* LocalServer::oldestClient(const Share* share, const Endpoint* newcomer,
                                                  bool onlyIdle) {
     const auto isIdle = [](const Endpoint& client) {
-        char byte = 0;
-        return !client.isQueued && recv(client.socket, &byte, 1, MSG_PEEK | MSG_DONTWAIT) < 0 &&
-               errno == EAGAIN;
+        return !client.isQueued && peek(client.socket) == 0;
     };
     Endpoint* oldest = nullptr;
     for (auto& [socket, client] : mClients) {
@@ -356,6 +372,7 @@ void LocalServer::refuseOne(int listener) {
 }
 
 void LocalServer::drop(Endpoint* client) {
+    unqueue(client);
     Share* share = client->share;
     const int socket = client->socket;
     mClients.erase(socket);

@@ -25,7 +25,8 @@ namespace android::hardware {
  * Every uid gets the same: in each round every uid that has calls waiting gets one of them served,
  * the one that has waited longest, however many connections it has. The server never waits for a
  * client: one that does not read its replies loses its connection. If there are too many
- * connections, an idle one is closed, or a busy one in favour of a uid that has fewer.
+ * connections, an idle one is closed, or a busy one in favour of a uid that has fewer. What a
+ * client has closed itself is gone before, and takes no turn.
  */
 class LocalServer {
   public:
@@ -118,6 +119,11 @@ class LocalServer {
     bool reply(int socket);
 
     void acceptAll(Endpoint* listener);
+    /**
+     * @return whether the next one needs nobody's place. Else it must wait until what clients have
+     *     closed meanwhile has been noticed.
+     */
+    bool admit(int socket, uid_t uid, const sp<BHwBinder>& object);
     bool makeRoom(const Endpoint* newcomer);
     Endpoint* oldestClient(const Share* share, const Endpoint* newcomer, bool onlyIdle);
     void refuseOne(int listener);

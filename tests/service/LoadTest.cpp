@@ -43,15 +43,6 @@ bool makeCall(IDaxVibrator& vibrator, bool permitted, uint32_t client, uint32_t 
 
 class LoadTest : public ServiceTest {
   protected:
-    /** @return the memory that the daemon has, in KiB. */
-    size_t residentKiB() const {
-        std::ifstream sizes("/proc/" + std::to_string(mService.pid()) + "/statm");
-        size_t all = 0;
-        size_t resident = 0;
-        sizes >> all >> resident;
-        return resident * static_cast<size_t>(getpagesize()) / 1024;
-    }
-
     /** Starts a process, as one of several users, that makes calls; 0 is for ever. */
     static pid_t spawn(uint32_t client, uint32_t calls) {
         const uid_t uids[] = {0, 1000, 2000, 10123};
@@ -92,7 +83,7 @@ TEST_F(LoadTest, ManyClientsGetTheirOwnAnswersInTheirOwnOrder) {
     const pid_t first = spawn(0, 1000);
     waitpid(first, nullptr, 0);
     const size_t descriptors = mService.descriptors();
-    const size_t memory = residentKiB();
+    const size_t memory = mService.residentKiB();
     std::ofstream(mDirectory.path() + "/trace", std::ios::trunc).flush();
 
     const auto begin = Clock::now();
@@ -120,9 +111,10 @@ TEST_F(LoadTest, ManyClientsGetTheirOwnAnswersInTheirOwnOrder) {
               << time.count() << " s, beside " << kKilled << " killed ones\n";
 
     EXPECT_TRUE(eventually([&] { return mService.descriptors() <= descriptors; }));
-    std::cout << "memory before: " << memory << " KiB, after: " << residentKiB() << " KiB\n";
+    std::cout << "memory before: " << memory << " KiB, after: " << mService.residentKiB()
+              << " KiB\n";
 #ifndef SANITIZED  // a sanitizer keeps what has been freed
-    EXPECT_LE(residentKiB(), memory + 256);
+    EXPECT_LE(mService.residentKiB(), memory + 256);
 #endif
     expectAllCallsInTheTrace();
 }

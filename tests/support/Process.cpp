@@ -132,6 +132,14 @@ size_t ChildProcess::descriptors() const {
     return static_cast<size_t>(std::distance(begin(files), end(files)));
 }
 
+size_t ChildProcess::residentKiB() const {
+    std::ifstream sizes("/proc/" + std::to_string(mPid) + "/statm");
+    size_t all = 0;
+    size_t resident = 0;
+    sizes >> all >> resident;
+    return resident * static_cast<size_t>(getpagesize()) / 1024;
+}
+
 bool eventually(const std::function<bool()>& condition) {
     for (int attempt = 0; attempt < 2000; ++attempt) {
         if (condition()) return true;

@@ -45,6 +45,8 @@ class ChildProcess {
     pid_t pid() const { return mPid; }
     /** @return how many descriptors the process has open. */
     size_t descriptors() const;
+    /** @return the memory that the process has, in KiB. */
+    size_t residentKiB() const;
 
   private:
     pid_t mPid = -1;

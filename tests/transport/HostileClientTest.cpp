@@ -8,11 +8,14 @@
 #include <utils/Errors.h>
 
 #include <algorithm>
+#include <atomic>
 #include <cerrno>
+#include <chrono>
 #include <csignal>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <thread>
 
 // What clients may do with their connections to the daemon.
 
@@ -26,6 +29,18 @@ constexpr size_t kChainLength = 7;
 class HostileClientTest : public TransportTest {
   protected:
     RawClient rawClient() const { return RawClient(mDirectory.path()); }
+    std::vector<RawClient> connected(int count) const {
+        std::vector<RawClient> clients;
+        for (int i = 0; i < count; ++i) {
+            clients.push_back(rawClient());
+            EXPECT_TRUE(clients.back().answersPing());
+        }
+        return clients;
+    }
+    static void expectAllAnswer(const std::vector<RawClient>& clients) {
+        EXPECT_TRUE(std::all_of(clients.begin(), clients.end(),
+                                [](const RawClient& client) { return client.answersPing(); }));
+    }
     void needRoot() const {
         if (geteuid() != 0) GTEST_SKIP() << "only root can become somebody else";
     }
@@ -150,17 +165,75 @@ TEST_F(HostileClientTest, IdleConnectionsGiveWayAndRootIsNeverLockedOut) {
 
 TEST_F(HostileClientTest, OldestIdleConnectionOfAUserGivesWay) {
     serve();
-    std::vector<RawClient> clients;
-    for (int i = 0; i < 128; ++i) {
-        clients.push_back(rawClient());
-        ASSERT_TRUE(clients.back().answersPing());
-    }
+    std::vector<RawClient> clients = connected(128);
     ASSERT_TRUE(clients[0].answersPing()) << "it is not the oldest any more";
     clients.push_back(rawClient());
     EXPECT_TRUE(clients.back().answersPing());
     EXPECT_TRUE(clients[0].answersPing());
     EXPECT_FALSE(clients[1].answersPing());
     EXPECT_TRUE(clients[2].answersPing());
+}
+
+TEST_F(HostileClientTest, ConnectionsThatTheirClientsHaveClosedGiveWayFirst) {
+    serve();
+    const bool isRoot = geteuid() == 0;
+    const RawClient other = rawClient();
+    EXPECT_TRUE(other.answersPing());
+    ASSERT_TRUE(!isRoot || seteuid(2000) == 0);
+    const std::vector<RawClient> living = connected(80);
+    std::vector<RawClient> closed = connected(40);
+    stopServer();
+    closed.clear();
+    for (int i = 0; i < 200; ++i)
+        rawClient();
+    std::vector<RawClient> newcomers;
+    for (int i = 0; i < 40; ++i)
+        newcomers.push_back(rawClient());
+    for (uint32_t i = 0; i < 3; ++i)
+        EXPECT_TRUE(other.send(request(kV10, kOn, {1001 + i})));
+    EXPECT_TRUE(living[0].send(request(kV10, kOn, {1000})));
+    ::kill(mServer.pid(), SIGCONT);
+    ASSERT_TRUE(!isRoot || seteuid(0) == 0);
+    EXPECT_FALSE(living[0].receive().isClosed);
+    expectAllAnswer(living);
+    expectAllAnswer(newcomers);
+    for (int i = 0; i < 3; ++i)
+        EXPECT_FALSE(other.receive().isClosed);
+    // In the first round, as its user's only call.
+    EXPECT_TRUE(!isRoot || log().find(" val:1000") < log().find(" val:1002")) << log();
+}
+
+TEST_F(HostileClientTest, FloodOfConnectionsCostsNobodyACall) {
+    using Clock = std::chrono::steady_clock;
+    serve();
+    const std::vector<RawClient> idle = connected(100);
+    const RawClient polite = rawClient();
+    EXPECT_TRUE(polite.answersPing());
+    const size_t descriptors = mServer.descriptors();
+    const size_t memory = mServer.residentKiB();
+    std::atomic<int> flooders = 4;
+    std::vector<std::thread> threads;
+    for (int i = flooders; i > 0; --i) {
+        threads.emplace_back([&] {
+            for (int connection = 0; connection < 1000; ++connection)
+                rawClient();
+            --flooders;
+        });
+    }
+    Clock::duration longest{};
+    while (flooders > 0) {
+        const Clock::time_point begin = Clock::now();
+        EXPECT_TRUE(polite.answersPing());
+        longest = std::max(longest, Clock::now() - begin);
+    }
+    for (std::thread& thread : threads)
+        thread.join();
+    EXPECT_LT(longest, std::chrono::seconds(1));
+    expectAllAnswer(idle);
+    EXPECT_TRUE(eventually([&] { return mServer.descriptors() <= descriptors; }));
+#ifndef SANITIZED  // a sanitizer keeps what has been freed
+    EXPECT_LE(mServer.residentKiB(), memory + 256);
+#endif
 }
 
 TEST_F(HostileClientTest, DescriptorsAreKeptForTheObjects) {
