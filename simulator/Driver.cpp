@@ -2,7 +2,6 @@
 #include "Driver.h"
 
 #include "Faults.h"
-#include "Folder.h"
 
 #include <fcntl.h>
 
@@ -15,7 +14,6 @@
 #include <cstring>
 #include <ctime>
 #include <filesystem>
-#include <string_view>
 
 namespace simulator {
 namespace {

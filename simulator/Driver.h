@@ -7,8 +7,6 @@
 
 #include <cstddef>
 #include <set>
-#include <string>
-#include <vector>
 
 /**
  * The model of the kernel vibrator driver. Its state is a directory of plain files, one for each

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Faults.h"
 
-#include "Folder.h"
 #include "Trace.h"
 
 #include <fcntl.h>
@@ -10,6 +9,7 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 
 namespace simulator {
@@ -60,15 +60,11 @@ std::optional<Fault> countDown(int file) {
 }  // namespace
 
 std::optional<Fault> parseFault(const std::string& text) {
-    constexpr char kShort[] = "short=";
     Fault fault;
-    if (text.compare(0, strlen(kShort), kShort) == 0) {
-        const std::string number = text.substr(strlen(kShort));
-        if (number.empty() || number.size() > 6 ||
-            number.find_first_not_of("0123456789") != std::string::npos) {
-            return std::nullopt;
-        }
-        fault.bytes = std::stoul(number);
+    char digits[7];
+    int end = 0;
+    if (sscanf(text.c_str(), "short=%6[0-9]%n", digits, &end) == 1 && text[end] == '\0') {
+        fault.bytes = strtoul(digits, nullptr, 10);
         return fault;
     }
     constexpr int kLargestErrno = 133;

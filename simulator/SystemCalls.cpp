@@ -24,6 +24,7 @@
 #include <map>
 #include <memory>
 #include <mutex>
+#include <utility>
 
 namespace {
 
@@ -52,49 +53,33 @@ struct OpenNode {
     size_t offset = 0;
 };
 
-/** The nodes that are open in this process. */
-class OpenNodes {
-  public:
-    static OpenNodes& instance() {
-        // Never destroyed: other threads and destructors may use files until the very end.
-        static auto* nodes = new OpenNodes;
-        return *nodes;
-    }
+std::mutex sMutex;
+/** How many nodes are open, known without the lock. */
+std::atomic<size_t> sOpenCount{0};
 
-    /** @return whether any node is open, without a lock. */
-    static bool any() { return sCount.load(std::memory_order_acquire) > 0; }
+/** @return the nodes that are open in this process, by descriptor. */
+std::map<int, OpenNode>& openNodes() {
+    // Never destroyed: other threads and destructors may use files until the very end.
+    static auto* const nodes = new std::map<int, OpenNode>;
+    return *nodes;
+}
 
-    // Nodes are destroyed without the lock: that closes a folder, and close takes the lock.
-    void add(int file, OpenNode node) {
-        const std::lock_guard<std::mutex> lock(mMutex);
-        std::swap(mNodes[file], node);
-        sCount = static_cast<int>(mNodes.size());
-    }
-    void remove(int file) {
-        OpenNode gone;
-        const std::lock_guard<std::mutex> lock(mMutex);
-        std::swap(mNodes[file], gone);
-        mNodes.erase(file);
-        sCount = static_cast<int>(mNodes.size());
-    }
-    /** @return the node behind a descriptor, nullptr where it is something else. */
-    OpenNode* find(int file) {
-        const std::lock_guard<std::mutex> lock(mMutex);
-        const auto entry = mNodes.find(file);
-        return entry == mNodes.end() ? nullptr : &entry->second;
-    }
+/** Sets the node of a descriptor; an empty one removes it. */
+void setOpenNode(int file, std::optional<OpenNode> node) {
+    // What was there is destroyed without the lock: that closes a folder, and close takes the lock.
+    std::map<int, OpenNode>::node_type before;
+    const std::lock_guard<std::mutex> lock(sMutex);
+    before = openNodes().extract(file);
+    if (node) openNodes().emplace(file, std::move(*node));
+    sOpenCount = openNodes().size();
+}
 
-  private:
-    static std::atomic<int> sCount;
-
-    std::mutex mMutex;
-    std::map<int, OpenNode> mNodes;
-};
-
-std::atomic<int> OpenNodes::sCount{0};
-
+/** @return the node behind a descriptor, nullptr where it is something else. */
 OpenNode* findOpenNode(int file) {
-    return OpenNodes::any() ? OpenNodes::instance().find(file) : nullptr;
+    if (sOpenCount == 0) return nullptr;
+    const std::lock_guard<std::mutex> lock(sMutex);
+    const auto entry = openNodes().find(file);
+    return entry == openNodes().end() ? nullptr : &entry->second;
 }
 
 /** Turns a result or negative errno into a system call's; success leaves errno unchanged. */
@@ -135,7 +120,7 @@ int simulateOpen(const Node& node, int flags) {
         return std::min(file, 0);
     });
     if (result < 0) return static_cast<int>(result);
-    OpenNodes::instance().add(file, open);
+    setOpenNode(file, open);
     return file;
 }
 
@@ -161,7 +146,7 @@ ssize_t simulateWrite(const OpenNode& open, const void* buffer, size_t size) {
 
 int simulateClose(int file, const OpenNode& open) {
     const ssize_t result = simulate(open, "close", "", [](size_t) { return 0; });
-    OpenNodes::instance().remove(file);
+    setOpenNode(file, std::nullopt);
     kernelClose(file);
     return static_cast<int>(result);
 }
