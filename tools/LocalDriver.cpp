@@ -19,7 +19,7 @@
 
 using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
-LocalDriver::LocalDriver() : mSimulation(simulationDirectory()) {
+LocalDriver::LocalDriver() {
     simulator::onlyLook();
     // Only the daemon logs.
     setenv("ANDROID_LOG_TAGS", (std::string(kLogTag) + ":S").c_str(), 1);
@@ -33,8 +33,9 @@ LocalDriver::LocalDriver() : mSimulation(simulationDirectory()) {
 
 LocalDriver::Node LocalDriver::look(const std::string& path) const {
     simulator::Node simulated;
+    const std::string simulation = simulationDirectory();
     const bool isSimulated =
-            !mSimulation.empty() && simulator::findNode(mSimulation, path.c_str(), &simulated);
+            !simulation.empty() && simulator::findNode(simulation, path.c_str(), &simulated);
     struct stat info {};
     Node node;
     if (stat(isSimulated ? simulated.file.c_str() : path.c_str(), &info) != 0) return node;

@@ -3,11 +3,10 @@
 
 #include "Text.h"
 
-#include <CLI/CLI.hpp>
-
 #include <algorithm>
+#include <cerrno>
+#include <cstring>
 #include <iostream>
-#include <map>
 
 namespace cli {
 namespace {
@@ -25,22 +24,9 @@ std::string afterBlank(const std::string& text) {
     return text.empty() ? "" : text + " ";
 }
 
-using Options = std::map<const CLI::Option*, const Argument*>;
-
-/** Tells the parser of options; it leaves the other words in their order. */
-void define(CLI::App* app, const std::deque<Argument>& arguments, Options* options) {
-    constexpr auto kAll = CLI::MultiOptionPolicy::TakeAll;
-    // A list without a limit would take "[a,b]" for two words.
-    constexpr int kAnyNumber = CLI::detail::expected_max_vector_size - 1;
-    app->add_option("WORDS")->expected(kAnyNumber)->multi_option_policy(kAll);
-    for (const Argument& each : arguments) {
-        // No options behind the first word.
-        if (each.takesOptions) app->positionals_at_end();
-        if (!each.isOption()) continue;
-        const std::string names = (each.letter.empty() ? "" : each.letter + ",") + each.name;
-        CLI::Option* option = each.isFlag() ? app->add_flag(names) : app->add_option(names);
-        options->emplace(option->multi_option_policy(kAll), &each);
-    }
+/** @return whether a word looks like an option; a negative number does not. */
+bool isOption(const std::string& word) {
+    return word.size() > 1 && word[0] == '-' && (word[1] < '0' || word[1] > '9');
 }
 
 }  // namespace
@@ -156,14 +142,14 @@ void Command::read(const Given& given, bool isStep) const {
             argument->read(word, isStep);
         } catch (const UsageError& error) {
             const bool isNamed = argument->isOption() && !isStep;
-            throw WordError(i, (isNamed ? argument->name + ": " : "") + error.what());
+            throw UsageError((isNamed ? argument->name + ": " : "") + error.what(), i);
         }
     }
     for (const Argument& argument : mArguments) {
         const bool isGiven = std::any_of(given.begin(), given.end(),
                                          [&](const auto& each) { return each.first == &argument; });
         if (!isGiven && (argument.isRequired || (isStep && argument.isMany))) {
-            throw WordError(given.size(), argument.name + " is missing: " + argument.help);
+            throw UsageError(argument.name + " is missing: " + argument.help, given.size());
         }
     }
 }
@@ -179,9 +165,7 @@ void Command::readStep(const std::vector<std::string>& words) const {
         next = std::find_if(next, mArguments.end(), [&](const Argument& each) {
             return isFlag ? isItsFlag(each) : !each.isFlag() && !each.isFile;
         });
-        if (next == mArguments.end()) {
-            throw WordError(given.size(), inQuotes(word) + kTooMany);
-        }
+        if (next == mArguments.end()) throw UsageError(inQuotes(word) + kTooMany, given.size());
         given.emplace_back(&*next, word);
         if (!next->isMany) ++next;
     }
@@ -259,76 +243,59 @@ void Program::Line::complain(const std::string& what) {
 }
 
 Program::Line Program::parse(const std::vector<std::string>& words) const {
-    Options options;
-    CLI::App root;
-    root.set_help_flag();
-    root.allow_extras()->fallthrough()->require_subcommand(0, 1);
-    define(&root, mRoot.mArguments, &options);
-    std::map<std::string, CLI::App*> groups = {{"", &root}};
-    for (const Command& each : mCommands) {
-        // In a name of one word there is no blank, and npos + 1 is 0.
-        const size_t start = each.mName.find(' ') + 1;
-        const std::string group = each.mName.substr(0, start == 0 ? 0 : start - 1);
-        CLI::App*& parent = groups[group];
-        if (parent == nullptr) define(parent = root.add_subcommand(group), {}, &options);
-        define(parent->add_subcommand(each.mName.substr(start)), each.mArguments, &options);
-    }
-    std::string unfinished;
-    try {
-        root.parse(std::vector<std::string>(words.rbegin(), words.rend()));
-    } catch (const CLI::ParseError& error) {
-        // The line has been read but for its last option's value: "--option: what is missing".
-        const std::string what = error.what();
-        unfinished = what.substr(0, what.find(':'));
-    }
-
     Line line;
-    std::vector<std::string> unknown = root.remaining(true);
-    const auto marks = std::remove(unknown.begin(), unknown.end(), "--");
-    line.hasOptionsEnded = marks != unknown.end();
-    unknown.erase(marks, unknown.end());
-    std::vector<CLI::App*> next = {&root};
-    for (; !next.empty(); next = next[0]->get_subcommands()) {
-        line.typed = afterBlank(line.typed) + next[0]->get_name();
-        line.command = find(line.typed);
-        std::map<const CLI::Option*, size_t> counts;
-        for (const CLI::Option* each : next[0]->parse_order()) {
-            const std::string& word = each->results()[counts[each]++];
-            if (const Argument* option = options[each]) {
-                takeOption(*option, word, &line);
-            } else {
-                takeWord(word, &line);
-            }
+    for (const std::string& word : words) {
+        if (line.taking != nullptr) {
+            line.given.emplace_back(line.taking, word);
+            if (!line.taking->takesOptions) line.taking = nullptr;
+        } else if (!line.hasOptionsEnded && word == "--") {
+            line.hasOptionsEnded = true;
+        } else if (!line.hasOptionsEnded && isOption(word)) {
+            takeOption(word, &line);
+        } else {
+            takeWord(word, &line);
         }
-    }
-    std::vector<std::string> names;
-    for (const Argument* each : optionsOf(line.command)) {
-        names.push_back(each->name);
-        if (line.taking == nullptr && each->name == unfinished) line.taking = each;
-    }
-    if (!unknown.empty()) {
-        // May be why a word makes no sense: it is the option's value.
-        const std::string name = unknown[0].substr(0, unknown[0].find('='));
-        line.problem = "no option " + inQuotes(name) + suggestion(name, names);
     }
     return line;
 }
 
-void Program::takeOption(const Argument& option, const std::string& value, Line* line) {
-    if (option.isFlag()) {
-        if (value != "true") return line->complain(option.name + ": takes no value");
-        // Also of a line with a mistake in it.
-        option.read("", false);
+void Program::takeOption(const std::string& word, Line* line) const {
+    // "--wait=5", "-oFILE", "-hv"
+    const bool isLetter = word[1] != '-';
+    const size_t end = isLetter ? 2 : std::min(word.find('='), word.size());
+    const std::string name = word.substr(0, end);
+    const Argument* option = nullptr;
+    std::vector<std::string> names;
+    for (const Argument* each : optionsOf(line->command)) {
+        names.push_back(each->name);
+        if (option == nullptr && (isLetter ? each->letter : each->name) == name) option = each;
     }
-    line->given.emplace_back(&option, option.isFlag() ? "" : value);
+    const bool hasMore = end < word.size();
+    if (option == nullptr) {
+        line->complain("no option " + inQuotes(name) + suggestion(name, names));
+    } else if (option->isFlag() && hasMore && !isLetter) {
+        line->complain(name + ": takes no value");
+    } else if (option->isFlag()) {
+        // Also of a line with a mistake in it.
+        option->read("", false);
+        line->given.emplace_back(option, "");
+        if (hasMore) takeOption("-" + word.substr(end), line);
+    } else if (hasMore) {
+        line->given.emplace_back(option, word.substr(isLetter ? end : end + 1));
+    } else {
+        line->taking = option;
+    }
 }
 
 void Program::takeWord(const std::string& word, Line* line) const {
     if (line->command == nullptr) {
-        if (line->hasOptionsEnded) return line->complain("\"--\" stands behind the command");
         const std::string name = afterBlank(line->typed) + word;
-        line->complain("no command " + inQuotes(name) +
-                       suggestion(word, valuesOf(commandsAfter(line->typed))));
+        const std::vector<std::string> known = valuesOf(commandsAfter(line->typed));
+        if (std::find(known.begin(), known.end(), word) == known.end()) {
+            return line->complain("no command " + inQuotes(name) + suggestion(word, known));
+        }
+        line->typed = name;
+        line->command = find(name);
     } else if (const Argument* argument = nextArgument(*line)) {
         line->given.emplace_back(argument, word);
         if (argument->takesOptions) line->taking = argument;
@@ -337,21 +304,20 @@ void Program::takeWord(const std::string& word, Line* line) const {
     }
 }
 
-int Program::run(int argc, char** argv, const std::function<bool()>& isJson) {
-    const std::vector<std::string> words(argv + std::min(argc, 1), argv + argc);
+int Program::obey(const std::vector<std::string>& words) {
     if (words.size() > 1 && words[0] == "--complete") {
         complete({words.begin() + 1, words.end()});
-        return 0;
+        return kSuccess;
     }
     Line line = parse(words);
     mCurrent = line.command;
     if (*mWantsHelp) {
         help(line.typed);
-        return 0;
+        return kSuccess;
     }
     if (*mWantsVersion) {
         std::cout << mName << ' ' << mVersion << '\n';
-        return 0;
+        return kSuccess;
     }
     if (line.taking != nullptr && line.taking->isOption()) {
         line.complain(line.taking->name + ": the value is missing");
@@ -365,7 +331,33 @@ int Program::run(int argc, char** argv, const std::function<bool()>& isJson) {
     if (!line.problem.empty()) throw UsageError(line.problem);
     mCurrent->read(line.given, false);
     if (isJson() && !mCurrent->mHasJson) throw UsageError("has no JSON answer; leave out --json");
-    return mCurrent->perform();
+    return perform(*mCurrent);
+}
+
+int Program::run(int argc, char** argv) {
+    int code = kFailed;
+    try {
+        code = obey({argv + std::min(argc, 1), argv + argc});
+    } catch (const UsageError& error) {
+        complain("USAGE", error.what());
+        code = kUsage;
+    } catch (const std::exception& error) {
+        complain("FAILED", error.what());
+    }
+    errno = 0;
+    if (std::cout.flush()) return code;
+    std::cerr << mName
+              << ": standard output cannot be written: " << strerror(errno != 0 ? errno : EIO)
+              << '\n';
+    return kFailed;
+}
+
+void Program::warn(const std::string& text) const {
+    if (!isJson()) std::cerr << mName << ": " << printable(text) << '\n';
+}
+
+void Program::complain(const std::string& /* status */, const std::string& reason) const {
+    warn((current().empty() ? "" : current() + ": ") + reason);
 }
 
 }  // namespace cli

@@ -230,7 +230,6 @@ void addDoctor(Client& client) {
                                            "say what is wrong with the driver or the service", "");
     command.run([&client] {
         const Examination examination(client);
-        return client.report().found("doctor", examination.inWords(), examination.asJson(),
-                                     examination.isHealthy());
+        return client.found(examination.inWords(), examination.asJson(), examination.isHealthy());
     });
 }

@@ -4,8 +4,6 @@
 #include "Client.h"
 #include "Trace.h"
 
-#include <string>
-
 /** The arguments of a command that reads node traffic. */
 class Traffic {
   public:

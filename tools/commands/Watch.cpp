@@ -5,7 +5,6 @@
 #include "cli/Text.h"
 
 #include <fcntl.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -15,9 +14,7 @@
 #include <iomanip>
 #include <iostream>
 #include <sstream>
-#include <string>
 #include <thread>
-#include <utility>
 
 namespace {
 
@@ -167,13 +164,13 @@ int watch(const Traffic& traffic, bool fromStart, bool once) {
     }
     printer.takeIncomplete();
     printer.end();
-    return kSuccess;
+    return cli::kSuccess;
 }
 
 }  // namespace
 
 void addWatch(Client& client) {
-    cli::Command& command = client.program().command(
+    cli::Command& command = client.command(
             kTools, "watch", "show the service's node traffic as it comes", "--all --once");
     const Traffic traffic(&command);
     const auto fromStart = command.flag("--all", "also show what is there already");
