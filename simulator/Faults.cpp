@@ -7,7 +7,6 @@
 #include <sys/file.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -22,10 +21,10 @@ std::string fileName(const std::string& leaf, const std::string& operation) {
 }
 
 std::vector<std::string> faultFiles(const Folder& folder) {
-    std::vector<std::string> names = folder.names();
-    names.erase(std::remove_if(names.begin(), names.end(),
-                               [](const auto& name) { return name.find(kPrefix) != 0; }),
-                names.end());
+    std::vector<std::string> names;
+    for (const std::string& name : folder.names()) {
+        if (name.find(kPrefix) == 0) names.push_back(name);
+    }
     return names;
 }
 

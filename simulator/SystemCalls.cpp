@@ -31,15 +31,6 @@ namespace {
 using simulator::Folder;
 using simulator::Node;
 
-int kernelOpen(const char* path, int flags, mode_t mode) {
-    return static_cast<int>(syscall(SYS_openat, AT_FDCWD, path, flags | O_LARGEFILE, mode));
-}
-ssize_t kernelRead(int file, void* buffer, size_t size) {
-    return syscall(SYS_read, file, buffer, size);
-}
-ssize_t kernelWrite(int file, const void* buffer, size_t size) {
-    return syscall(SYS_write, file, buffer, size);
-}
 int kernelClose(int file) {
     return static_cast<int>(syscall(SYS_close, file));
 }
@@ -151,10 +142,6 @@ int simulateClose(int file, const OpenNode& open) {
     return static_cast<int>(result);
 }
 
-bool takesMode(int flags) {
-    return (flags & O_CREAT) != 0 || (flags & O_TMPFILE) == O_TMPFILE;
-}
-
 int openAnything(const char* path, int flags, mode_t mode) {
     const char* directory = getenv("VIBRATOR_SIM_DIR");
     Node node;
@@ -162,7 +149,7 @@ int openAnything(const char* path, int flags, mode_t mode) {
         simulator::findNode(directory, path, &node)) {
         return answer([&] { return simulateOpen(node, flags); });
     }
-    return kernelOpen(path, flags, mode);
+    return static_cast<int>(syscall(SYS_openat, AT_FDCWD, path, flags | O_LARGEFILE, mode));
 }
 
 }  // namespace
@@ -174,7 +161,7 @@ extern "C" {
 
 int open(const char* path, int flags, ...) {
     mode_t mode = 0;
-    if (takesMode(flags)) {
+    if ((flags & O_CREAT) != 0 || (flags & O_TMPFILE) == O_TMPFILE) {
         va_list arguments;
         va_start(arguments, flags);
         mode = va_arg(arguments, mode_t);  // NOLINT(clang-analyzer-valist.Uninitialized): it is not
@@ -193,7 +180,7 @@ int __open64_2(const char* path, int flags) __attribute__((alias("__open_2")));
 
 ssize_t read(int file, void* buffer, size_t size) {
     OpenNode* node = findOpenNode(file);
-    return node == nullptr ? kernelRead(file, buffer, size)
+    return node == nullptr ? syscall(SYS_read, file, buffer, size)
                            : answer([&] { return simulateRead(*node, buffer, size); });
 }
 
@@ -205,7 +192,7 @@ ssize_t __read_chk(int file, void* buffer, size_t size, size_t room) {
 
 ssize_t write(int file, const void* buffer, size_t size) {
     const OpenNode* node = findOpenNode(file);
-    return node == nullptr ? kernelWrite(file, buffer, size)
+    return node == nullptr ? syscall(SYS_write, file, buffer, size)
                            : answer([&] { return simulateWrite(*node, buffer, size); });
 }
 

@@ -151,6 +151,14 @@ constexpr struct {
         {": false", kProbeEnd, "cannot be opened"},
 };
 
+/** @return the text that was written, whose final newline the log escapes. */
+std::string writtenText(const std::string& logged) {
+    std::string text = logged.substr(0, logged.rfind(" , "));
+    if (const size_t newline = text.find("\\n"); newline != std::string::npos)
+        text.replace(newline, 2, "\n");
+    return text;
+}
+
 }  // namespace
 
 std::optional<NodeAccess> AccessReader::read(std::string_view line) {
@@ -209,15 +217,6 @@ std::optional<NodeAccess> AccessReader::beginWrite(const std::string& text) {
     return done;
 }
 
-void AccessReader::beginText(const std::string& leaf, const std::string& text) {
-    std::string bytes = text.substr(0, text.rfind(" , "));
-    // The log escapes the newline at the end.
-    if (const size_t newline = bytes.find("\\n"); newline != std::string::npos)
-        bytes.replace(newline, 2, "\n");
-    if (leaf == "event_cmd") bytes.insert(0, "FOLDER_");
-    mText = {mDirectory + '/' + leaf, NodeAccess::kWrite, bytes, "", 0, ""};
-}
-
 std::optional<NodeAccess> AccessReader::readLog(std::string_view line) {
     const size_t tag = std::min(line.find("QorVibrator"), line.size());
     std::optional<NodeAccess> done = readStep(line);
@@ -249,10 +248,8 @@ std::optional<NodeAccess> AccessReader::readStep(std::string_view line) {
             done = {"", NodeAccess::kRefusal, "", row->detail, 0, ""};
             break;
         case kProbe:
-            begin(text, NodeAccess::kProbe, "");
-            break;
         case kRead:
-            begin(text, NodeAccess::kRead, "");
+            begin(text, row->step == kRead ? NodeAccess::kRead : NodeAccess::kProbe, "");
             break;
         case kWrite:
             done = beginWrite(text);
@@ -267,7 +264,13 @@ std::optional<NodeAccess> AccessReader::readStep(std::string_view line) {
             done = {mDirectory + '/' + row->detail, NodeAccess::kRead, text, "", 0, ""};
             break;
         case kText:
-            beginText(row->detail, text);
+            mText = {mDirectory + '/' + row->detail,
+                     NodeAccess::kWrite,
+                     writtenText(text),
+                     "",
+                     0,
+                     ""};
+            if (mText->leaf() == "event_cmd") mText->bytes.insert(0, "FOLDER_");
             break;
         case kTextEnd:
             end(&mText);

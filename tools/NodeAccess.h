@@ -46,7 +46,6 @@ class AccessReader {
     void begin(std::string_view path, NodeAccess::Kind kind, const std::string& bytes);
     /** @return the text whose success the write shows, if it does. */
     std::optional<NodeAccess> beginWrite(const std::string& text);
-    void beginText(const std::string& leaf, const std::string& text);
 
     bool mIsLog;
     /** For a trace: the accesses that have begun, by node. */

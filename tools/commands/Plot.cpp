@@ -86,7 +86,7 @@ PictureFormat formatOf(const std::string& name, size_t format) {
 void addPlot(Client& client) {
     cli::Command& command = client.command(kTools, "plot", "draw what the driver was told",
                                            "--last 10s -o plot.svg");
-    const Traffic traffic(&command);
+    const Traffic traffic(command);
     const auto output = command.file("-o,--output FILE",
                                      "picture to draw, .svg or .png, by gnuplot; - for standard "
                                      "output; without it, text",
