@@ -14,6 +14,7 @@
 #include <cstring>
 #include <ctime>
 #include <filesystem>
+#include <sstream>
 
 namespace simulator {
 namespace {
@@ -128,20 +129,14 @@ int storeDuration(const Node& node, std::string_view text) {
 
 /** "COUNT v v v v ...\n": COUNT values follow, four a packet. */
 int storeHapticEngine(const Node& node, std::string_view text) {
-    const char* next = text.data();
-    const char* const end = next + text.size();
+    std::istringstream words{std::string(text)};
     std::vector<int> numbers;
-    for (char separator = ' '; separator == ' '; ++next) {
-        int number = 0;
-        const auto [rest, error] = std::from_chars(next, end, number);
-        if (error != std::errc() || rest == end) return -EINVAL;
-        numbers.push_back(number);
-        next = rest;
-        separator = *next;
-    }
-    const size_t count = numbers.size() - 1;
-    const bool isWhole = next == end && end[-1] == '\n' && count % 4 == 0;
-    return isWhole && numbers[0] == static_cast<int>(count) ? storeText(node, text) : -EINVAL;
+    std::string same;
+    for (int number = 0; words >> number; numbers.push_back(number))
+        same += (same.empty() ? "" : " ") + std::to_string(number);
+    const bool isWhole = text == same + "\n" && numbers.size() % 4 == 1 &&
+                         numbers[0] == static_cast<int>(numbers.size() - 1);
+    return isWhole ? storeText(node, text) : -EINVAL;
 }
 
 /** "PATTERN.PERCENT, REPEATS, DELAY~" and a zero byte. */
@@ -196,6 +191,11 @@ const Attribute* findAttribute(const std::string& leaf) {
 }
 
 }  // namespace
+
+std::string inheritedDirectory() {
+    const char* directory = getenv("VIBRATOR_SIM_DIR");
+    return directory == nullptr ? "" : directory;
+}
 
 std::string sysfsDirectory(Layout layout) {
     return std::string(kDirectories[static_cast<size_t>(layout)]);

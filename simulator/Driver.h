@@ -16,6 +16,9 @@ namespace simulator {
 
 enum class Layout { kTimedOutput, kLedTrigger };
 
+/** @return the driver's directory that the environment names; empty where it names none. */
+std::string inheritedDirectory();
+
 /** @return where the kernel has the nodes of a layout; ends in a slash. */
 std::string sysfsDirectory(Layout layout);
 

@@ -7,7 +7,6 @@
 #include "cli/Text.h"
 
 #include <algorithm>
-#include <cstdlib>
 #include <cstring>
 #include <exception>
 #include <fstream>
@@ -98,9 +97,7 @@ class Simulator : public cli::Program {
 
   private:
     std::string directory() const {
-        const char* inherited = getenv("VIBRATOR_SIM_DIR");
-        const bool isInherited = mDirectory->empty() && inherited != nullptr;
-        std::string name = isInherited ? inherited : *mDirectory;
+        std::string name = mDirectory->empty() ? simulator::inheritedDirectory() : *mDirectory;
         if (!name.empty()) return name;
         throw UsageError("no directory of a driver; name one with --dir or VIBRATOR_SIM_DIR");
     }

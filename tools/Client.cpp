@@ -4,7 +4,6 @@
 #include "cli/Text.h"
 
 #include <cerrno>
-#include <cstdlib>
 #include <cstring>
 #include <fstream>
 #include <iostream>
@@ -102,11 +101,6 @@ int Client::print(std::ostream& stream, const std::string& words,
         stream << cli::printable(words, true);
     }
     return object["ok"] ? cli::kSuccess : cli::kFailed;
-}
-
-std::string simulationDirectory() {
-    const char* directory = getenv("VIBRATOR_SIM_DIR");
-    return directory == nullptr ? "" : directory;
 }
 
 std::string readInput(const std::string& name) {

@@ -96,8 +96,5 @@ class Client : public cli::Program {
     const ScoreStep* mStep = nullptr;
 };
 
-/** @return the simulated driver's directory from the environment; empty for the kernel's driver. */
-std::string simulationDirectory();
-
 /** @return what a file holds, or standard input for "-". @throw cli::UsageError */
 std::string readInput(const std::string& name);

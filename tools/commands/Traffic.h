@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Client.h"
+#include "Driver.h"
 #include "Trace.h"
 
 /** The arguments of a command that reads node traffic. */
@@ -17,8 +18,8 @@ struct Traffic {
     /** @return the file to read: the one that was named, or the simulated driver's. */
     std::string file() const {
         if (!named->empty()) return *named;
-        if (!isLog() && !simulationDirectory().empty()) {
-            return simulator::traceFile(simulationDirectory());
+        if (!isLog() && !simulator::inheritedDirectory().empty()) {
+            return simulator::traceFile(simulator::inheritedDirectory());
         }
         throw cli::UsageError("no FILE: name a trace, or a log with --log");
     }
