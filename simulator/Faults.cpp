@@ -62,7 +62,8 @@ std::optional<Fault> parseFault(const std::string& text) {
     Fault fault;
     char digits[7];
     int end = 0;
-    if (sscanf(text.c_str(), "short=%6[0-9]%n", digits, &end) == 1 && text[end] == '\0') {
+    if (sscanf(text.c_str(), "short=%6[0-9]%n", digits, &end) == 1 &&
+        static_cast<size_t>(end) == text.size()) {
         fault.bytes = strtoul(digits, nullptr, 10);
         return fault;
     }
