@@ -127,14 +127,15 @@ int storeDuration(const Node& node, std::string_view text) {
     return error != 0 ? error : storeText(node, std::to_string(milliseconds) + "\n");
 }
 
-/** "COUNT v v v v ...\n": COUNT values follow, four a packet. */
+/** "COUNT v v v v ...\n": COUNT values follow, four a packet, one blank before each. */
 int storeHapticEngine(const Node& node, std::string_view text) {
     std::istringstream words{std::string(text)};
+    words >> std::noskipws;
     std::vector<int> numbers;
-    std::string same;
-    for (int number = 0; words >> number; numbers.push_back(number))
-        same += (same.empty() ? "" : " ") + std::to_string(number);
-    const bool isWhole = text == same + "\n" && numbers.size() % 4 == 1 &&
+    char end = ' ';
+    for (int number = 0; end == ' ' && words.peek() != '+' && words >> number; words >> end)
+        numbers.push_back(number);
+    const bool isWhole = end == '\n' && words.peek() == EOF && numbers.size() % 4 == 1 &&
                          numbers[0] == static_cast<int>(numbers.size() - 1);
     return isWhole ? storeText(node, text) : -EINVAL;
 }

@@ -3,10 +3,13 @@
 
 #include "Text.h"
 
+#include <CLI/CLI.hpp>
+
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <iostream>
+#include <map>
 
 namespace cli {
 namespace {
@@ -24,9 +27,22 @@ std::string afterBlank(const std::string& text) {
     return text.empty() ? "" : text + " ";
 }
 
-/** @return whether a word looks like an option; a negative number does not. */
-bool isOption(const std::string& word) {
-    return word.size() > 1 && word[0] == '-' && (word[1] < '0' || word[1] > '9');
+using Options = std::map<const CLI::Option*, const Argument*>;
+
+/** Tells the parser of options; it leaves the other words in their order. */
+void define(CLI::App* app, const std::deque<Argument>& arguments, Options* options) {
+    constexpr auto kAll = CLI::MultiOptionPolicy::TakeAll;
+    // A list without a limit would take "[a,b]" for two words.
+    constexpr int kAnyNumber = CLI::detail::expected_max_vector_size - 1;
+    app->add_option("WORDS")->expected(kAnyNumber)->multi_option_policy(kAll);
+    for (const Argument& each : arguments) {
+        // No options behind the first word.
+        if (each.takesOptions) app->positionals_at_end();
+        if (!each.isOption()) continue;
+        const std::string names = (each.letter.empty() ? "" : each.letter + ",") + each.name;
+        CLI::Option* option = each.isFlag() ? app->add_flag(names) : app->add_option(names);
+        options->emplace(option->multi_option_policy(kAll), &each);
+    }
 }
 
 }  // namespace
@@ -243,59 +259,76 @@ void Program::Line::complain(const std::string& what) {
 }
 
 Program::Line Program::parse(const std::vector<std::string>& words) const {
+    Options options;
+    CLI::App root;
+    root.set_help_flag();
+    root.allow_extras()->fallthrough()->require_subcommand(0, 1);
+    define(&root, mRoot.mArguments, &options);
+    std::map<std::string, CLI::App*> groups = {{"", &root}};
+    for (const Command& each : mCommands) {
+        // In a name of one word there is no blank, and npos + 1 is 0.
+        const size_t start = each.mName.find(' ') + 1;
+        const std::string group = each.mName.substr(0, start == 0 ? 0 : start - 1);
+        CLI::App*& parent = groups[group];
+        if (parent == nullptr) define(parent = root.add_subcommand(group), {}, &options);
+        define(parent->add_subcommand(each.mName.substr(start)), each.mArguments, &options);
+    }
+    std::string unfinished;
+    try {
+        root.parse(std::vector<std::string>(words.rbegin(), words.rend()));
+    } catch (const CLI::ParseError& error) {
+        // The line has been read but for its last option's value: "--option: what is missing".
+        const std::string what = error.what();
+        unfinished = what.substr(0, what.find(':'));
+    }
+
     Line line;
-    for (const std::string& word : words) {
-        if (line.taking != nullptr) {
-            line.given.emplace_back(line.taking, word);
-            if (!line.taking->takesOptions) line.taking = nullptr;
-        } else if (!line.hasOptionsEnded && word == "--") {
-            line.hasOptionsEnded = true;
-        } else if (!line.hasOptionsEnded && isOption(word)) {
-            takeOption(word, &line);
-        } else {
-            takeWord(word, &line);
+    std::vector<std::string> unknown = root.remaining(true);
+    const auto marks = std::remove(unknown.begin(), unknown.end(), "--");
+    line.hasOptionsEnded = marks != unknown.end();
+    unknown.erase(marks, unknown.end());
+    std::vector<CLI::App*> next = {&root};
+    for (; !next.empty(); next = next[0]->get_subcommands()) {
+        line.typed = afterBlank(line.typed) + next[0]->get_name();
+        line.command = find(line.typed);
+        std::map<const CLI::Option*, size_t> counts;
+        for (const CLI::Option* each : next[0]->parse_order()) {
+            const std::string& word = each->results()[counts[each]++];
+            if (const Argument* option = options[each]) {
+                takeOption(*option, word, &line);
+            } else {
+                takeWord(word, &line);
+            }
         }
+    }
+    std::vector<std::string> names;
+    for (const Argument* each : optionsOf(line.command)) {
+        names.push_back(each->name);
+        if (line.taking == nullptr && each->name == unfinished) line.taking = each;
+    }
+    if (!unknown.empty()) {
+        // May be why a word makes no sense: it is the option's value.
+        const std::string name = unknown[0].substr(0, unknown[0].find('='));
+        line.problem = "no option " + inQuotes(name) + suggestion(name, names);
     }
     return line;
 }
 
-void Program::takeOption(const std::string& word, Line* line) const {
-    // "--wait=5", "-oFILE", "-hv"
-    const bool isLetter = word[1] != '-';
-    const size_t end = isLetter ? 2 : std::min(word.find('='), word.size());
-    const std::string name = word.substr(0, end);
-    const Argument* option = nullptr;
-    std::vector<std::string> names;
-    for (const Argument* each : optionsOf(line->command)) {
-        names.push_back(each->name);
-        if (option == nullptr && (isLetter ? each->letter : each->name) == name) option = each;
-    }
-    const bool hasMore = end < word.size();
-    if (option == nullptr) {
-        line->complain("no option " + inQuotes(name) + suggestion(name, names));
-    } else if (option->isFlag() && hasMore && !isLetter) {
-        line->complain(name + ": takes no value");
-    } else if (option->isFlag()) {
+void Program::takeOption(const Argument& option, const std::string& value, Line* line) {
+    if (option.isFlag()) {
+        if (value != "true") return line->complain(option.name + ": takes no value");
         // Also of a line with a mistake in it.
-        option->read("", false);
-        line->given.emplace_back(option, "");
-        if (hasMore) takeOption("-" + word.substr(end), line);
-    } else if (hasMore) {
-        line->given.emplace_back(option, word.substr(isLetter ? end : end + 1));
-    } else {
-        line->taking = option;
+        option.read("", false);
     }
+    line->given.emplace_back(&option, option.isFlag() ? "" : value);
 }
 
 void Program::takeWord(const std::string& word, Line* line) const {
     if (line->command == nullptr) {
+        if (line->hasOptionsEnded) return line->complain("\"--\" stands behind the command");
         const std::string name = afterBlank(line->typed) + word;
-        const std::vector<std::string> known = valuesOf(commandsAfter(line->typed));
-        if (std::find(known.begin(), known.end(), word) == known.end()) {
-            return line->complain("no command " + inQuotes(name) + suggestion(word, known));
-        }
-        line->typed = name;
-        line->command = find(name);
+        line->complain("no command " + inQuotes(name) +
+                       suggestion(word, valuesOf(commandsAfter(line->typed))));
     } else if (const Argument* argument = nextArgument(*line)) {
         line->given.emplace_back(argument, word);
         if (argument->takesOptions) line->taking = argument;

@@ -202,7 +202,7 @@ class Program {
     int obey(const std::vector<std::string>& words);
     /** Reads a command line, and those flags that are in it. */
     Line parse(const std::vector<std::string>& words) const;
-    void takeOption(const std::string& word, Line* line) const;
+    static void takeOption(const Argument& option, const std::string& value, Line* line);
     void takeWord(const std::string& word, Line* line) const;
     /** @return the options that a command may have, its own first: effect has a --version, too. */
     std::vector<const Argument*> optionsOf(const Command* command) const;
