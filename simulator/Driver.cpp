@@ -2,7 +2,6 @@
 #include "Driver.h"
 
 #include "Faults.h"
-#include "Folder.h"
 
 #include <fcntl.h>
 
@@ -15,7 +14,7 @@
 #include <cstring>
 #include <ctime>
 #include <filesystem>
-#include <string_view>
+#include <sstream>
 
 namespace simulator {
 namespace {
@@ -128,22 +127,17 @@ int storeDuration(const Node& node, std::string_view text) {
     return error != 0 ? error : storeText(node, std::to_string(milliseconds) + "\n");
 }
 
-/** "COUNT v v v v ...\n": COUNT values follow, four a packet. */
+/** "COUNT v v v v ...\n": COUNT values follow, four a packet, one blank before each. */
 int storeHapticEngine(const Node& node, std::string_view text) {
-    const char* next = text.data();
-    const char* const end = next + text.size();
+    std::istringstream words{std::string(text)};
+    words >> std::noskipws;
     std::vector<int> numbers;
-    for (char separator = ' '; separator == ' '; ++next) {
-        int number = 0;
-        const auto [rest, error] = std::from_chars(next, end, number);
-        if (error != std::errc() || rest == end) return -EINVAL;
+    char end = ' ';
+    for (int number = 0; end == ' ' && words.peek() != '+' && words >> number; words >> end)
         numbers.push_back(number);
-        next = rest;
-        separator = *next;
-    }
-    const size_t count = numbers.size() - 1;
-    const bool isWhole = next == end && end[-1] == '\n' && count % 4 == 0;
-    return isWhole && numbers[0] == static_cast<int>(count) ? storeText(node, text) : -EINVAL;
+    const bool isWhole = end == '\n' && words.peek() == EOF && numbers.size() % 4 == 1 &&
+                         numbers[0] == static_cast<int>(numbers.size() - 1);
+    return isWhole ? storeText(node, text) : -EINVAL;
 }
 
 /** "PATTERN.PERCENT, REPEATS, DELAY~" and a zero byte. */
@@ -198,6 +192,11 @@ const Attribute* findAttribute(const std::string& leaf) {
 }
 
 }  // namespace
+
+std::string inheritedDirectory() {
+    const char* directory = getenv("VIBRATOR_SIM_DIR");
+    return directory == nullptr ? "" : directory;
+}
 
 std::string sysfsDirectory(Layout layout) {
     return std::string(kDirectories[static_cast<size_t>(layout)]);

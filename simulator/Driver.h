@@ -7,8 +7,6 @@
 
 #include <cstddef>
 #include <set>
-#include <string>
-#include <vector>
 
 /**
  * The model of the kernel vibrator driver. Its state is a directory of plain files, one for each
@@ -17,6 +15,9 @@
 namespace simulator {
 
 enum class Layout { kTimedOutput, kLedTrigger };
+
+/** @return the driver's directory that the environment names; empty where it names none. */
+std::string inheritedDirectory();
 
 /** @return where the kernel has the nodes of a layout; ends in a slash. */
 std::string sysfsDirectory(Layout layout);

@@ -1,15 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Faults.h"
 
-#include "Folder.h"
 #include "Trace.h"
 
 #include <fcntl.h>
 #include <sys/file.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 
 namespace simulator {
@@ -22,10 +21,10 @@ std::string fileName(const std::string& leaf, const std::string& operation) {
 }
 
 std::vector<std::string> faultFiles(const Folder& folder) {
-    std::vector<std::string> names = folder.names();
-    names.erase(std::remove_if(names.begin(), names.end(),
-                               [](const auto& name) { return name.find(kPrefix) != 0; }),
-                names.end());
+    std::vector<std::string> names;
+    for (const std::string& name : folder.names()) {
+        if (name.find(kPrefix) == 0) names.push_back(name);
+    }
     return names;
 }
 
@@ -60,15 +59,12 @@ std::optional<Fault> countDown(int file) {
 }  // namespace
 
 std::optional<Fault> parseFault(const std::string& text) {
-    constexpr char kShort[] = "short=";
     Fault fault;
-    if (text.compare(0, strlen(kShort), kShort) == 0) {
-        const std::string number = text.substr(strlen(kShort));
-        if (number.empty() || number.size() > 6 ||
-            number.find_first_not_of("0123456789") != std::string::npos) {
-            return std::nullopt;
-        }
-        fault.bytes = std::stoul(number);
+    char digits[7];
+    int end = 0;
+    if (sscanf(text.c_str(), "short=%6[0-9]%n", digits, &end) == 1 &&
+        static_cast<size_t>(end) == text.size()) {
+        fault.bytes = strtoul(digits, nullptr, 10);
         return fault;
     }
     constexpr int kLargestErrno = 133;

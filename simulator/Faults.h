@@ -5,8 +5,6 @@
 
 #include <cstddef>
 #include <optional>
-#include <string>
-#include <vector>
 
 namespace simulator {
 

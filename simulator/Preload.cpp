@@ -5,14 +5,13 @@
 #include <unistd.h>
 
 #include <cstdio>
-#include <cstdlib>
 
 namespace {
 
 /** Warns at the start of settings that would look like a kernel without a driver. */
 __attribute__((constructor)) void checkDirectory() {
-    const char* directory = getenv("VIBRATOR_SIM_DIR");
-    if (directory == nullptr || *directory == '\0') {
+    const std::string directory = simulator::inheritedDirectory();
+    if (directory.empty()) {
         dprintf(STDERR_FILENO,
                 "libvibrator_sim: VIBRATOR_SIM_DIR is not set, nothing is simulated\n");
     } else if (!simulator::isMarked(simulator::Folder(directory))) {

@@ -118,25 +118,21 @@ class PrivateDirectory {
     std::FILE* mRemover;
 };
 
-/** The signals that end this program or report a child's end. They are blocked until taken. */
-class Signals {
-  public:
-    Signals() {
-        sigemptyset(&mSet);
-        for (const int number : {SIGINT, SIGQUIT, SIGTERM, SIGHUP, SIGCHLD})
-            sigaddset(&mSet, number);
-        sigprocmask(SIG_BLOCK, &mSet, nullptr);
-    }
-    /** @return the next signal; 0 if none comes for 20 ms. */
-    int take(siginfo_t* info) const {
-        const timespec time{0, 20'000'000};
-        const int number = sigtimedwait(&mSet, info, &time);
-        return std::max(number, 0);
-    }
+/** Blocks the signals that end this program or report a child's end. @return them. */
+sigset_t blockSignals() {
+    sigset_t signals;
+    sigemptyset(&signals);
+    for (const int number : {SIGINT, SIGQUIT, SIGTERM, SIGHUP, SIGCHLD})
+        sigaddset(&signals, number);
+    sigprocmask(SIG_BLOCK, &signals, nullptr);
+    return signals;
+}
 
-  private:
-    sigset_t mSet;
-};
+/** @return the next blocked signal; 0 if none comes for 20 ms. */
+int takeSignal(const sigset_t& signals, siginfo_t* info) {
+    const timespec time{0, 20'000'000};
+    return std::max(sigtimedwait(&signals, info, &time), 0);
+}
 
 /** Prepares the daemon's process: its log, no signals of the terminal, the preloaded library. */
 void becomeDaemon(const std::string& directory, const std::string& preload, pid_t parent) {
@@ -159,24 +155,21 @@ std::string lastLine(std::string text) {
 
 /** Waits until the daemon answers, and checks that it has probed the simulated driver. */
 void awaitDaemon(Child& daemon, const std::string& client, const std::string& directory,
-                 const Signals& signals) {
-    constexpr int kAttempts = 500;
-    const auto silence = [] {
+                 const sigset_t& signals) {
+    Child status({client, "status", "--wait", "10"}, [] {
         dup2(open("/dev/null", O_WRONLY | O_CLOEXEC), STDOUT_FILENO);
         dup2(STDOUT_FILENO, STDERR_FILENO);
-    };
-    for (int attempt = 0; Child({client, "status"}, silence).wait() != 0; ++attempt) {
+    });
+    while (!status.hasEnded() && !daemon.hasEnded()) {
         siginfo_t info{};
-        const int number = signals.take(&info);
-        if (number != 0 && number != SIGCHLD) {
-            throw std::runtime_error(std::string("ended by ") + strsignal(number));
-        }
-        const bool hasEnded = daemon.hasEnded();
-        if (hasEnded || attempt == kAttempts) {
-            throw std::runtime_error(
-                    std::string("the daemon ") + (hasEnded ? "has ended" : "does not answer") +
-                    "; the end of its log: " + lastLine(Folder(directory).read("log")));
-        }
+        const int number = takeSignal(signals, &info);
+        if (number == 0 || number == SIGCHLD) continue;
+        throw std::runtime_error(std::string("ended by ") + strsignal(number));
+    }
+    if (daemon.hasEnded() || status.wait() != 0) {
+        throw std::runtime_error(
+                std::string("the daemon ") + (daemon.hasEnded() ? "has ended" : "does not answer") +
+                "; the end of its log: " + lastLine(Folder(directory).read("log")));
     }
     struct stat trace;
     if (stat(traceFile(directory).c_str(), &trace) != 0 || trace.st_size == 0) {
@@ -185,13 +178,13 @@ void awaitDaemon(Child& daemon, const std::string& client, const std::string& di
 }
 
 /** Passes signals on to a command until it ends. @return its exit code. */
-int awaitCommand(Child& command, const Signals& signals) {
+int awaitCommand(Child& command, const sigset_t& signals) {
     // A command that was told to end is killed after so many waits without a signal, two seconds.
     int patience = 100;
     bool isEnding = false;
     while (!command.hasEnded()) {
         siginfo_t info{};
-        const int number = signals.take(&info);
+        const int number = takeSignal(signals, &info);
         if (number == 0 && isEnding && --patience == 0) command.signal(SIGKILL);
         // The terminal has sent its signals to the command, too.
         if (number == 0 || number == SIGCHLD || info.si_code == SI_KERNEL) continue;
@@ -212,43 +205,43 @@ void makeDriver(const std::string& directory, Layout layout, const Features& fea
     if (error != 0) throw std::runtime_error("\"" + directory + "\": " + strerror(error));
 }
 
-int runSession(const SessionOptions& options) {
+int runSession(const std::string& directory, Layout layout, const Features& features,
+               std::vector<std::string> command) {
     const fs::path daemonFile = findProgram(kDaemon, {"../service", "../sbin"});
     const fs::path preload = findProgram(kPreload, {".", "../" LIBRARY_DIRECTORY});
     const fs::path client = findProgram("vibratorctl", {"../tools", "."});
 
     // In this order: the process that removes the directory must not get the signals either.
-    const Signals signals;
+    const sigset_t signals = blockSignals();
     const PrivateDirectory place;
-    const std::string directory =
-            options.directory.empty() ? place / "driver" : fs::absolute(options.directory).string();
-    makeDriver(directory, options.layout, options.features);
-    const Folder driver(directory);
-    driver.remove("trace");
-    if (driver.replace("log", "", 0644) != 0) throw std::runtime_error(failure(directory + "/log"));
+    const std::string driver =
+            directory.empty() ? place / "driver" : fs::absolute(directory).string();
+    makeDriver(driver, layout, features);
+    const Folder folder(driver);
+    folder.remove("trace");
+    if (folder.replace("log", "", 0644) != 0) throw std::runtime_error(failure(driver + "/log"));
     // Links, since a path in LD_PRELOAD or PATH may have no blanks or colons.
     fs::create_symlink(preload, place / kPreload);
     fs::create_directory(place / "bin");
     fs::create_symlink(client, place / "bin/vibratorctl");
     fs::create_symlink(fs::read_symlink("/proc/self/exe"), place / "bin/vibrator-sim");
-    setenv("VIBRATOR_SIM_DIR", directory.c_str(), 1);
+    setenv("VIBRATOR_SIM_DIR", driver.c_str(), 1);
     setenv("HWBINDER_DIR", (place / "sockets").c_str(), 1);
 
     const pid_t self = getpid();
-    Child daemon({daemonFile}, [&] { becomeDaemon(directory, place / kPreload, self); });
-    awaitDaemon(daemon, client, directory, signals);
+    Child daemon({daemonFile}, [&] { becomeDaemon(driver, place / kPreload, self); });
+    awaitDaemon(daemon, client, driver, signals);
 
     const char* path = getenv("PATH");
     setenv("PATH", (place / "bin:" + (path == nullptr ? "/usr/bin:/bin" : path)).c_str(), 1);
-    std::vector<std::string> words = options.command;
-    if (words.empty()) {
+    if (command.empty()) {
         const char* shell = getenv("SHELL");
-        words = {shell == nullptr || *shell == '\0' ? "/bin/sh" : shell};
-        std::cerr << "vibrator-sim: the driver is in " << cli::inQuotes(directory)
+        command = {shell == nullptr || *shell == '\0' ? "/bin/sh" : shell};
+        std::cerr << "vibrator-sim: the driver is in " << cli::inQuotes(driver)
                   << ", and so is the daemon's log; \"exit\" ends the daemon\n";
     }
-    Child command(words, [] { prctl(PR_SET_PDEATHSIG, SIGHUP); });
-    return awaitCommand(command, signals);
+    Child child(command, [] { prctl(PR_SET_PDEATHSIG, SIGHUP); });
+    return awaitCommand(child, signals);
 }
 
 }  // namespace simulator

@@ -24,21 +24,13 @@
 #include <map>
 #include <memory>
 #include <mutex>
+#include <utility>
 
 namespace {
 
 using simulator::Folder;
 using simulator::Node;
 
-int kernelOpen(const char* path, int flags, mode_t mode) {
-    return static_cast<int>(syscall(SYS_openat, AT_FDCWD, path, flags | O_LARGEFILE, mode));
-}
-ssize_t kernelRead(int file, void* buffer, size_t size) {
-    return syscall(SYS_read, file, buffer, size);
-}
-ssize_t kernelWrite(int file, const void* buffer, size_t size) {
-    return syscall(SYS_write, file, buffer, size);
-}
 int kernelClose(int file) {
     return static_cast<int>(syscall(SYS_close, file));
 }
@@ -52,49 +44,33 @@ struct OpenNode {
     size_t offset = 0;
 };
 
-/** The nodes that are open in this process. */
-class OpenNodes {
-  public:
-    static OpenNodes& instance() {
-        // Never destroyed: other threads and destructors may use files until the very end.
-        static auto* nodes = new OpenNodes;
-        return *nodes;
-    }
+std::mutex sMutex;
+/** How many nodes are open, known without the lock. */
+std::atomic<size_t> sOpenCount{0};
 
-    /** @return whether any node is open, without a lock. */
-    static bool any() { return sCount.load(std::memory_order_acquire) > 0; }
+/** @return the nodes that are open in this process, by descriptor. */
+std::map<int, OpenNode>& openNodes() {
+    // Never destroyed: other threads and destructors may use files until the very end.
+    static auto* const nodes = new std::map<int, OpenNode>;
+    return *nodes;
+}
 
-    // Nodes are destroyed without the lock: that closes a folder, and close takes the lock.
-    void add(int file, OpenNode node) {
-        const std::lock_guard<std::mutex> lock(mMutex);
-        std::swap(mNodes[file], node);
-        sCount = static_cast<int>(mNodes.size());
-    }
-    void remove(int file) {
-        OpenNode gone;
-        const std::lock_guard<std::mutex> lock(mMutex);
-        std::swap(mNodes[file], gone);
-        mNodes.erase(file);
-        sCount = static_cast<int>(mNodes.size());
-    }
-    /** @return the node behind a descriptor, nullptr where it is something else. */
-    OpenNode* find(int file) {
-        const std::lock_guard<std::mutex> lock(mMutex);
-        const auto entry = mNodes.find(file);
-        return entry == mNodes.end() ? nullptr : &entry->second;
-    }
+/** Sets the node of a descriptor; an empty one removes it. */
+void setOpenNode(int file, std::optional<OpenNode> node) {
+    // What was there is destroyed without the lock: that closes a folder, and close takes the lock.
+    std::map<int, OpenNode>::node_type before;
+    const std::lock_guard<std::mutex> lock(sMutex);
+    before = openNodes().extract(file);
+    if (node) openNodes().emplace(file, std::move(*node));
+    sOpenCount = openNodes().size();
+}
 
-  private:
-    static std::atomic<int> sCount;
-
-    std::mutex mMutex;
-    std::map<int, OpenNode> mNodes;
-};
-
-std::atomic<int> OpenNodes::sCount{0};
-
+/** @return the node behind a descriptor, nullptr where it is something else. */
 OpenNode* findOpenNode(int file) {
-    return OpenNodes::any() ? OpenNodes::instance().find(file) : nullptr;
+    if (sOpenCount == 0) return nullptr;
+    const std::lock_guard<std::mutex> lock(sMutex);
+    const auto entry = openNodes().find(file);
+    return entry == openNodes().end() ? nullptr : &entry->second;
 }
 
 /** Turns a result or negative errno into a system call's; success leaves errno unchanged. */
@@ -135,7 +111,7 @@ int simulateOpen(const Node& node, int flags) {
         return std::min(file, 0);
     });
     if (result < 0) return static_cast<int>(result);
-    OpenNodes::instance().add(file, open);
+    setOpenNode(file, open);
     return file;
 }
 
@@ -161,13 +137,9 @@ ssize_t simulateWrite(const OpenNode& open, const void* buffer, size_t size) {
 
 int simulateClose(int file, const OpenNode& open) {
     const ssize_t result = simulate(open, "close", "", [](size_t) { return 0; });
-    OpenNodes::instance().remove(file);
+    setOpenNode(file, std::nullopt);
     kernelClose(file);
     return static_cast<int>(result);
-}
-
-bool takesMode(int flags) {
-    return (flags & O_CREAT) != 0 || (flags & O_TMPFILE) == O_TMPFILE;
 }
 
 int openAnything(const char* path, int flags, mode_t mode) {
@@ -177,7 +149,7 @@ int openAnything(const char* path, int flags, mode_t mode) {
         simulator::findNode(directory, path, &node)) {
         return answer([&] { return simulateOpen(node, flags); });
     }
-    return kernelOpen(path, flags, mode);
+    return static_cast<int>(syscall(SYS_openat, AT_FDCWD, path, flags | O_LARGEFILE, mode));
 }
 
 }  // namespace
@@ -189,7 +161,7 @@ extern "C" {
 
 int open(const char* path, int flags, ...) {
     mode_t mode = 0;
-    if (takesMode(flags)) {
+    if ((flags & O_CREAT) != 0 || (flags & O_TMPFILE) == O_TMPFILE) {
         va_list arguments;
         va_start(arguments, flags);
         mode = va_arg(arguments, mode_t);  // NOLINT(clang-analyzer-valist.Uninitialized): it is not
@@ -208,7 +180,7 @@ int __open64_2(const char* path, int flags) __attribute__((alias("__open_2")));
 
 ssize_t read(int file, void* buffer, size_t size) {
     OpenNode* node = findOpenNode(file);
-    return node == nullptr ? kernelRead(file, buffer, size)
+    return node == nullptr ? syscall(SYS_read, file, buffer, size)
                            : answer([&] { return simulateRead(*node, buffer, size); });
 }
 
@@ -220,7 +192,7 @@ ssize_t __read_chk(int file, void* buffer, size_t size, size_t room) {
 
 ssize_t write(int file, const void* buffer, size_t size) {
     const OpenNode* node = findOpenNode(file);
-    return node == nullptr ? kernelWrite(file, buffer, size)
+    return node == nullptr ? syscall(SYS_write, file, buffer, size)
                            : answer([&] { return simulateWrite(*node, buffer, size); });
 }
 

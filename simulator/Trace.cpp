@@ -2,10 +2,8 @@
 #include "Trace.h"
 
 #include "Driver.h"
-#include "Folder.h"
 
 #include <fcntl.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cstdio>

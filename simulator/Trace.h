@@ -5,9 +5,6 @@
 
 #include <sys/types.h>
 
-#include <string>
-#include <string_view>
-
 namespace simulator {
 
 /** Size at which a trace stops growing, in bytes: about a million accesses. */

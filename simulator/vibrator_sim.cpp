@@ -1,5 +1,4 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Driver.h"
 #include "Faults.h"
 #include "MotorType.h"
 #include "Session.h"
@@ -8,25 +7,19 @@
 #include "cli/Text.h"
 
 #include <algorithm>
-#include <cerrno>
-#include <cstdlib>
 #include <cstring>
 #include <exception>
 #include <fstream>
 #include <iostream>
 #include <sstream>
-#include <string>
-#include <vector>
 
 namespace {
 
 namespace product = ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
 using cli::UsageError;
+using simulator::Layout;
 using Names = std::vector<std::string>;
-
-constexpr int kFailed = 1;
-constexpr int kUsage = 2;
 
 /** Refuses a word that is not among the known ones. */
 void require(const std::string& word, const Names& known, const std::string& complaint) {
@@ -35,102 +28,76 @@ void require(const std::string& word, const Names& known, const std::string& com
     }
 }
 
-/** The options that say what driver to make. */
-class DriverOptions {
-  public:
-    explicit DriverOptions(cli::Command& command) {
-        mLayout = command.choice("--layout LAYOUT",
-                                 {{"led", "the nodes of the LED trigger"},
-                                  {"timed", "the nodes of the timed output"}},
-                                 "layout of the nodes", 0);
-        std::vector<cli::Choice> motors;
-        for (const std::string& name : product::MotorTypeNames)
-            motors.push_back({name, ""});
-        constexpr auto kUsual = static_cast<size_t>(product::kMotorLinear1040);
-        mMotor = command.choice("--motor NAME", motors, "name of the motor", kUsual);
-        mWaves = command.number("--waves N", {"a number of stored patterns", 0, 65535},
-                                "number of stored patterns", 12);
-        mFeatures = command.text("--features LIST",
-                                 "features of the driver, separated by commas; all, none, or of " +
-                                         cli::join(simulator::featureNames(), ", ", " and "),
-                                 "all");
+/** @return the features that a list names. */
+std::set<std::string> featuresOf(const std::string& list) {
+    const Names all = simulator::featureNames();
+    if (list == "all") return {all.begin(), all.end()};
+    if (list == "none") return {};
+    std::set<std::string> features;
+    std::istringstream words(list + ",");
+    for (std::string name; std::getline(words, name, ',');) {
+        require(name, all, "--features: no feature " + cli::inQuotes(name));
+        features.insert(name);
     }
+    return features;
+}
 
-    simulator::Layout layout() const {
-        return *mLayout == 0 ? simulator::Layout::kLedTrigger : simulator::Layout::kTimedOutput;
-    }
-    simulator::Features features() const {
-        const Names all = simulator::featureNames();
-        simulator::Features features{
-                {}, product::MotorTypeNames[*mMotor], static_cast<int>(*mWaves)};
-        if (*mFeatures == "all") features.names = {all.begin(), all.end()};
-        if (*mFeatures == "all" || *mFeatures == "none") return features;
-        std::istringstream words(*mFeatures + ",");
-        for (std::string name; std::getline(words, name, ',');) {
-            require(name, all, "--features: no feature " + cli::inQuotes(name));
-            features.names.insert(name);
-        }
-        return features;
-    }
-
-  private:
-    cli::Value<size_t> mLayout;
-    cli::Value<size_t> mMotor;
-    cli::Value<uint32_t> mWaves;
-    cli::Value<std::string> mFeatures;
+/** What driver to make. */
+struct DriverKind {
+    simulator::Layout layout;
+    simulator::Features features;
 };
 
-class Simulator {
+/** Adds the options that say what driver to make. @return what they say. */
+std::function<DriverKind()> addDriverOptions(cli::Command& command) {
+    const auto layout = command.choice(
+            "--layout LAYOUT",
+            {{"led", "the nodes of the LED trigger"}, {"timed", "the nodes of the timed output"}},
+            "layout of the nodes", 0);
+    std::vector<cli::Choice> motors;
+    for (const std::string& name : product::MotorTypeNames)
+        motors.push_back({name, ""});
+    constexpr auto kUsual = static_cast<size_t>(product::kMotorLinear1040);
+    const auto motor = command.choice("--motor NAME", motors, "name of the motor", kUsual);
+    const auto waves = command.number("--waves N", {"a number of stored patterns", 0, 65535},
+                                      "number of stored patterns", 12);
+    const auto features =
+            command.text("--features LIST",
+                         "features of the driver, separated by commas; all, none, or of " +
+                                 cli::join(simulator::featureNames(), ", ", " and "),
+                         "all");
+    return [=] {
+        return DriverKind{
+                *layout == 0 ? Layout::kLedTrigger : Layout::kTimedOutput,
+                {featuresOf(*features), product::MotorTypeNames[*motor], static_cast<int>(*waves)}};
+    };
+}
+
+class Simulator : public cli::Program {
   public:
-    Simulator() {
-        mDirectory = mProgram.shared().file("--dir DIRECTORY",
-                                            "directory of the driver, instead of the one in "
-                                            "VIBRATOR_SIM_DIR",
-                                            "");
-        mProgram.shared().note(
-                "Exit code: 0 done; 1 failed; 2 a mistake in the command "
-                "line; run: that of its command.");
+    Simulator()
+        : Program("vibrator-sim", VERSION,
+                  "Makes a simulated kernel vibrator driver, runs the service on it, and shows "
+                  "what "
+                  "the driver was told.") {
+        mDirectory = shared().file("--dir DIRECTORY",
+                                   "directory of the driver, instead of the one in "
+                                   "VIBRATOR_SIM_DIR",
+                                   "");
+        shared().note(
+                "Exit code: 0 done; 1 failed; 2 a mistake in the command line; run: that of "
+                "its command.");
         addRun();
         addCreate();
         addShow();
         addTrace();
         addFault();
-        mProgram.addCompletion("Help");
-    }
-
-    int run(int argc, char** argv) {
-        int code = runCommand(argc, argv);
-        errno = 0;
-        if (!std::cout.flush()) {
-            code = fail(std::string("standard output cannot be written: ") +
-                                strerror(errno != 0 ? errno : EIO),
-                        kFailed);
-        }
-        return code;
+        addCompletion("Help");
     }
 
   private:
-    int runCommand(int argc, char** argv) {
-        try {
-            return mProgram.run(argc, argv, [] { return false; });
-        } catch (const UsageError& error) {
-            return fail(error.what(), kUsage);
-        } catch (const std::exception& error) {
-            return fail(error.what(), kFailed);
-        }
-    }
-
-    int fail(const std::string& what, int code) const {
-        const cli::Command* command = mProgram.current();
-        std::cerr << "vibrator-sim: " << (command == nullptr ? "" : command->name() + ": ")
-                  << cli::printable(what) << '\n';
-        return code;
-    }
-
     std::string directory() const {
-        const char* inherited = getenv("VIBRATOR_SIM_DIR");
-        const bool isInherited = mDirectory->empty() && inherited != nullptr;
-        std::string name = isInherited ? inherited : *mDirectory;
+        std::string name = mDirectory->empty() ? simulator::inheritedDirectory() : *mDirectory;
         if (!name.empty()) return name;
         throw UsageError("no directory of a driver; name one with --dir or VIBRATOR_SIM_DIR");
     }
@@ -144,47 +111,48 @@ class Simulator {
     }
 
     void addRun() {
-        cli::Command& command = mProgram.command(
+        cli::Command& run = command(
                 "A driver with the service", "run",
                 "make a driver, start the service on it, and run a command or a shell beside it",
                 "--layout timed vibratorctl click");
-        const DriverOptions options(command);
-        const auto kept =
-                command.file("--dir DIRECTORY", "directory of the driver, which is kept", "");
+        const auto kind = addDriverOptions(run);
+        const auto kept = run.file("--dir DIRECTORY", "directory of the driver, which is kept", "");
         const auto words =
-                command.rest("COMMAND", "the command and its arguments; without one, your shell");
-        command.note(
+                run.rest("COMMAND", "the command and its arguments; without one, your shell");
+        run.note(
                 "VIBRATOR_SIM_DIR tells the command the driver's directory; in it are \"trace\", "
                 "all accesses of nodes, and \"log\", the log of the service. When the command "
                 "ends, the service is ended and the directory removed, unless --dir named it.");
-        command.run([=] {
-            return simulator::runSession({kept->empty() ? *mDirectory : *kept, options.layout(),
-                                          options.features(), *words});
+        run.run([=] {
+            const auto [layout, features] = kind();
+            return simulator::runSession(kept->empty() ? *mDirectory : *kept, layout, features,
+                                         *words);
         });
     }
 
     void addCreate() {
-        cli::Command& command =
-                mProgram.command(kAlone, "create", "make a driver, and replace what was there",
-                                 "--motor LINEAR_1030 --features intensity,prebaked");
-        const DriverOptions options(command);
-        command.note("The directory must be new, empty, or a driver's.");
-        command.run([=] {
-            simulator::makeDriver(directory(), options.layout(), options.features());
-            return 0;
+        cli::Command& create =
+                command(kAlone, "create", "make a driver, and replace what was there",
+                        "--motor LINEAR_1030 --features intensity,prebaked");
+        const auto kind = addDriverOptions(create);
+        create.note("The directory must be new, empty, or a driver's.");
+        create.run([=] {
+            const auto [layout, features] = kind();
+            simulator::makeDriver(directory(), layout, features);
+            return cli::kSuccess;
         });
     }
 
     void addShow() {
-        mProgram.command(kAlone, "show", "print what each node holds", "").run([this] {
+        command(kAlone, "show", "print what each node holds", "").run([this] {
             for (const simulator::Node& node : simulator::listNodes(driver()))
                 std::cout << node.path << ' ' << simulator::quote(simulator::show(node)) << '\n';
-            return 0;
+            return cli::kSuccess;
         });
     }
 
     void addTrace() {
-        mProgram.command(kAlone, "trace", "print every access of the nodes so far", "")
+        command(kAlone, "trace", "print every access of the nodes so far", "")
                 .note("Each line: time in seconds, node, access, result.")
                 .run([this] {
                     const std::string path = simulator::traceFile(driver());
@@ -193,37 +161,36 @@ class Simulator {
                         std::cout << cli::printable(line) << '\n';
                     file.clear();
                     if (file.tellg() >= simulator::kTraceLimit) {
-                        std::cerr << "vibrator-sim: trace: full; remove " << cli::inQuotes(path)
-                                  << " to begin a new one\n";
+                        warn("trace: full; remove \"" + path + "\" to begin a new one");
                     }
-                    return 0;
+                    return cli::kSuccess;
                 });
     }
 
     void addFault() {
-        cli::Command& command = mProgram.command(
+        cli::Command& fault = command(
                 kAlone, "fault", "make accesses of a node fail; without arguments, list the faults",
                 "intensity write EIO --times 1");
-        const auto leaf = command.text("NODE", "the node, like intensity", "");
-        const auto operation = command.text("OPERATION", "open, read, write or close", "");
-        const auto text = command.text("FAULT", "an errno like EINVAL; short=BYTES; none", "");
+        const auto leaf = fault.text("NODE", "the node, like intensity", "");
+        const auto operation = fault.text("OPERATION", "open, read, write or close", "");
+        const auto text = fault.text("FAULT", "an errno like EINVAL; short=BYTES; none", "");
         constexpr uint32_t kMost = 1'000'000;
-        const auto times = command.number(
+        const auto times = fault.number(
                 "--times N", {"a number of accesses", 1, kMost, 0},
                 "how many accesses fail; without it, all until the fault is set to none", 0);
-        const auto after = command.number("--after N", {"a number of accesses", 0, kMost},
-                                          "how many accesses succeed first", 0);
-        const auto clear = command.flag("--clear", "remove all faults");
-        command.run([=] {
+        const auto after = fault.number("--after N", {"a number of accesses", 0, kMost},
+                                        "how many accesses succeed first", 0);
+        const auto clear = fault.flag("--clear", "remove all faults");
+        fault.run([=] {
             if (*clear && !leaf->empty()) throw UsageError("--clear takes no NODE");
-            if (*clear) return simulator::clearFaults(driver()) == 0 ? 0 : kFailed;
+            if (*clear) return simulator::clearFaults(driver()) == 0 ? cli::kSuccess : cli::kFailed;
             if (!leaf->empty()) {
                 setFault(*leaf, *operation, *text, *times, *after);
-                return 0;
+            } else {
+                for (const std::string& line : simulator::listFaults(driver()))
+                    std::cout << line << '\n';
             }
-            for (const std::string& line : simulator::listFaults(driver()))
-                std::cout << line << '\n';
-            return 0;
+            return cli::kSuccess;
         });
     }
 
@@ -249,19 +216,11 @@ class Simulator {
 
     static constexpr char kAlone[] = "A driver alone";
 
-    cli::Program mProgram{"vibrator-sim", VERSION,
-                          "Makes a simulated kernel vibrator driver, runs the service on it, and "
-                          "shows what the driver was told."};
     cli::Value<std::string> mDirectory;
 };
 
 }  // namespace
 
 int main(int argc, char** argv) {
-    try {
-        return Simulator().run(argc, argv);
-    } catch (const std::exception& error) {
-        std::cerr << "vibrator-sim: " << error.what() << '\n';
-        return kFailed;
-    }
+    return Simulator().run(argc, argv);
 }

@@ -1,79 +1,106 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Client.h"
 
+#include "cli/Text.h"
+
 #include <cerrno>
-#include <cstdlib>
 #include <cstring>
 #include <fstream>
 #include <iostream>
 
+using nlohmann::ordered_json;
+
+namespace {
+
+/** The service cannot be reached. */
+constexpr int kUnreachable = 3;
+
+/** @return the name of a status, like "BAD_VALUE". */
+std::string statusName(VibratorStatus status) {
+    constexpr const char* kNames[] = {"OK", "UNKNOWN_ERROR", "BAD_VALUE", "UNSUPPORTED_OPERATION"};
+    const auto number = static_cast<uint32_t>(status);
+    return number < std::size(kNames) ? kNames[number] : std::to_string(number);
+}
+
+}  // namespace
+
 Client::Client()
-    : mProgram("vibratorctl", VERSION,
-               "Calls the vibrator service, and shows what the driver was told.") {
+    : Program("vibratorctl", VERSION,
+              "Calls the vibrator service, and shows what the driver was told.") {
     constexpr cli::Numbers kTimeouts = {"a time in s", 0, 3600};
-    cli::Command& shared = mProgram.shared();
-    mInstance = shared.text("--instance NAME", "name of the service's instance", "default");
-    mTimeout = shared.number("--timeout SECONDS", kTimeouts,
-                             "the longest that a call may take; 0: no limit", 10);
-    mJson = shared.flag("--json", "print each answer as a line of JSON");
-    mVerbose = shared.flag("-v,--verbose", "also print the interface's operation and its status");
-    shared.note("Exit code: 0 done; 1 the service refused, doctor found a problem, or the output "
-                "could not be written; 2 a mistake in the command line or in a file; 3 the "
-                "service cannot be reached.")
+    mInstance = shared().text("--instance NAME", "name of the service's instance", "default");
+    mTimeout = shared().number("--timeout SECONDS", kTimeouts,
+                               "the longest that a call may take; 0: no limit", 10);
+    mJson = shared().flag("--json", "print each answer as a line of JSON");
+    mVerbose = shared().flag("-v,--verbose", "also print the interface's operation and its status");
+    shared().note("Exit code: 0 done; 1 the service refused, doctor found a problem, or the output "
+                  "could not be written; 2 a mistake in the command line or in a file; 3 the "
+                  "service cannot be reached.")
             .note("Only root and uid 1000 (system) may make the calls under \"For root and "
                   "system\".")
             .note("\"vibratorctl help COMMAND\" shows a command's options and an example.");
 }
 
-int Client::run(int argc, char** argv) {
-    int code = runCommand(argc, argv);
-    errno = 0;
-    if (!std::cout.flush()) {
-        std::cerr << "vibratorctl: standard output cannot be written: "
-                  << strerror(errno != 0 ? errno : EIO) << '\n';
-        code = kRefused;
-    }
-    return code;
-}
-
-int Client::runCommand(int argc, char** argv) {
-    const auto fail = [this](const char* status, const std::string& reason, int code) {
-        // A command line with a mistake in it is still to be answered in JSON.
-        mReport.isJson = *mJson;
-        const cli::Command* command = mProgram.current();
-        mReport.failure(command == nullptr ? "" : command->name(), status, reason);
-        return code;
-    };
+int Client::perform(const cli::Command& command) {
+    service::setCallTimeout(*mTimeout);
     try {
-        return mProgram.run(argc, argv, [this] {
-            service::setCallTimeout(*mTimeout);
-            mReport = {*mJson, *mVerbose};
-            return *mJson;
-        });
-    } catch (const cli::UsageError& error) {
-        return fail("USAGE", error.what(), kUsage);
+        return Program::perform(command);
     } catch (const service::Unreachable& error) {
-        return fail("UNREACHABLE",
-                    std::string("the service cannot be reached: ") + error.what() +
-                            "; \"vibratorctl doctor\" says what to do",
-                    kUnreachable);
-    } catch (const std::exception& error) {
-        return fail("FAILED", error.what(), kRefused);
+        complain("UNREACHABLE", std::string("the service cannot be reached: ") + error.what() +
+                                        "; \"vibratorctl doctor\" says what to do");
+        return kUnreachable;
     }
 }
 
 int Client::answer(const Operation& operation, VibratorStatus status, Answer answer) const {
-    if (mStep == nullptr) {
-        return mReport.answer(mProgram.current()->name(), operation, status, answer);
+    const bool ok = status == VibratorStatus::OK;
+    if (mStep != nullptr) {
+        answer.argument = mStep->argument();
+        answer.members.update(mStep->place());
     }
-    answer.argument = mStep->argument();
-    answer.members.update(mStep->place());
-    return mReport.answer(mStep->name, operation, status, answer);
+    ordered_json members;
+    std::string words = performed();
+    if (!answer.argument.empty()) {
+        members["argument"] = answer.argument;
+        words += " " + answer.argument;
+    }
+    members.update({{"operation", operation.name}, {"ok", ok}, {"status", statusName(status)}});
+    words += ": ";
+    if (ok) {
+        words += "OK" + (answer.words.empty() ? "" : ", " + answer.words);
+    } else {
+        members["reason"] = answer.reason.empty() ? reasonOf(operation, status) : answer.reason;
+        words += members["reason"].get<std::string>();
+    }
+    if (isVerbose()) words += " [" + operation.name + ": " + statusName(status) + "]";
+    members.update(answer.members);
+    return print(ok ? std::cout : std::cerr, words + "\n", members);
 }
 
-std::string simulationDirectory() {
-    const char* directory = getenv("VIBRATOR_SIM_DIR");
-    return directory == nullptr ? "" : directory;
+int Client::found(const std::string& words, const ordered_json& members, bool ok) const {
+    ordered_json all = {{"ok", ok}};
+    all.update(members);
+    return print(std::cout, words, all);
+}
+
+void Client::complain(const std::string& status, const std::string& reason) const {
+    Program::complain(status, reason);
+    if (isJson()) print(std::cout, "", {{"ok", false}, {"status", status}, {"reason", reason}});
+}
+
+int Client::print(std::ostream& stream, const std::string& words,
+                  const ordered_json& members) const {
+    ordered_json object = {{"command", nullptr}};
+    if (!performed().empty()) object["command"] = performed();
+    object.update(members);
+    // One line of ASCII, which is safe for terminals.
+    constexpr auto kReplace = ordered_json::error_handler_t::replace;
+    if (isJson()) {
+        std::cout << object.dump(-1, ' ', true, kReplace) << '\n';
+    } else {
+        stream << cli::printable(words, true);
+    }
+    return object["ok"] ? cli::kSuccess : cli::kFailed;
 }
 
 std::string readInput(const std::string& name) {

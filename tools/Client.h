@@ -1,23 +1,53 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Report.h"
 #include "Score.h"
 #include "Service.h"
-#include "cli/CommandLine.h"
 
-#include <optional>
-#include <string>
-#include <utility>
-#include <vector>
+#include <iosfwd>
+#include <nlohmann/json.hpp>
 
-/** What the commands share: the options of every command, the service, the report. */
-class Client {
+using VibratorStatus = ::android::hardware::vibrator::V1_0::Status;
+
+/** An operation of the interface, and what a call of it needs. */
+struct Operation {
+    std::string name;
+    /** Whether only root and the system user may call it. */
+    bool isRestricted = false;
+    /** The nodes that it needs besides those that run the motor. */
+    std::vector<std::string> nodes = {};
+    /** What its arguments may be: "an amplitude is 1 to 255". */
+    std::string range = {};
+};
+
+/** The answer to a call, besides its status. */
+struct Answer {
+    /** What the command was given: "5". */
+    std::string argument = {};
+    /** For a person: "20 ms". */
+    std::string words = {};
+    /** The same, as members of the JSON. */
+    nlohmann::ordered_json members = nlohmann::ordered_json::object();
+    /** Why it was refused, if that is known; otherwise reasonOf() finds the reason. */
+    std::string reason = {};
+};
+
+/** @return whether this process's user may make the restricted calls. */
+bool mayCallRestricted();
+
+/** @return why a call was refused to this process's user. */
+std::string notPermitted();
+
+/** @return why the service refused a call, judged by the driver, and what to do. */
+std::string reasonOf(const Operation& operation, VibratorStatus status);
+
+/**
+ * What the commands share: the options of every command, the service, and the report, which is in
+ * words or as JSON, one line or one object for each call.
+ */
+class Client : public cli::Program {
   public:
     Client();
-
-    /** Runs a command line. @return the exit code. */
-    int run(int argc, char** argv);
 
     /** Reports the answer to a call. @return the exit code. */
     int answer(const Operation& operation, VibratorStatus status, Answer answer = {}) const;
@@ -27,17 +57,21 @@ class Client {
                Answer answer = {}) const {
         return this->answer(operation, service::reached(status), std::move(answer));
     }
+    /**
+     * Reports the result of what is not a single call.
+     *
+     * @param words lines for a person.
+     * @param ok whether nothing is wrong.
+     * @return the exit code.
+     */
+    int found(const std::string& words, const nlohmann::ordered_json& members,
+              bool ok = true) const;
+    void complain(const std::string& status, const std::string& reason) const override;
 
     /** @return the service. @throw service::Unreachable */
     ::android::sp<service::IDaxVibrator> service() const { return service::connect(*mInstance); }
     const std::string& instance() const { return *mInstance; }
-    const Report& report() const { return mReport; }
-    cli::Program& program() { return mProgram; }
-    /** Adds a command; see cli::Program. */
-    cli::Command& command(const std::string& group, const std::string& name,
-                          const std::string& help, const std::string& example) {
-        return mProgram.command(group, name, help, example);
-    }
+    bool isVerbose() const { return *mVerbose; }
 
     /** Makes a command a step of scores, under a name of its own. */
     void addStep(StepKind kind) { mStepKinds.push_back(std::move(kind)); }
@@ -46,21 +80,21 @@ class Client {
     void setStep(const ScoreStep* step) { mStep = step; }
 
   private:
-    /** @return the exit code of the command, or of the error that stopped it. */
-    int runCommand(int argc, char** argv);
+    bool isJson() const override { return *mJson; }
+    int perform(const cli::Command& command) override;
+    /** Prints the words or, on standard output, the members. @return the exit code. */
+    int print(std::ostream& stream, const std::string& words,
+              const nlohmann::ordered_json& members) const;
+    /** @return the name of the step or the command that is performed. */
+    std::string performed() const { return mStep == nullptr ? current() : mStep->name; }
 
-    cli::Program mProgram;
     cli::Value<std::string> mInstance;
     cli::Value<uint32_t> mTimeout;
     cli::Value<bool> mJson;
     cli::Value<bool> mVerbose;
-    Report mReport;
     std::vector<StepKind> mStepKinds;
     const ScoreStep* mStep = nullptr;
 };
-
-/** @return the simulated driver's directory from the environment; empty for the kernel's driver. */
-std::string simulationDirectory();
 
 /** @return what a file holds, or standard input for "-". @throw cli::UsageError */
 std::string readInput(const std::string& name);

@@ -1,17 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "LocalDriver.h"
 
-#include "Client.h"
 #include "Driver.h"
 #include "Log.h"
 #include "MotorType.h"
+#include "NodeFile.h"
 #include "NodePathTable.h"
 #include "Trace.h"
 
-#include <fcntl.h>
 #include <pwd.h>
 #include <sys/stat.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <cstdio>
@@ -19,7 +17,7 @@
 
 using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
-LocalDriver::LocalDriver() : mSimulation(simulationDirectory()) {
+LocalDriver::LocalDriver() {
     simulator::onlyLook();
     // Only the daemon logs.
     setenv("ANDROID_LOG_TAGS", (std::string(kLogTag) + ":S").c_str(), 1);
@@ -33,26 +31,22 @@ LocalDriver::LocalDriver() : mSimulation(simulationDirectory()) {
 
 LocalDriver::Node LocalDriver::look(const std::string& path) const {
     simulator::Node simulated;
+    const std::string simulation = simulator::inheritedDirectory();
     const bool isSimulated =
-            !mSimulation.empty() && simulator::findNode(mSimulation, path.c_str(), &simulated);
+            !simulation.empty() && simulator::findNode(simulation, path.c_str(), &simulated);
     struct stat info {};
     Node node;
     if (stat(isSimulated ? simulated.file.c_str() : path.c_str(), &info) != 0) return node;
     node.exists = true;
-    const auto tryToOpen = [&](int mode, mode_t bits) {
-        // Root may open any file, but the mode of a driver's attribute binds it, too.
-        return (info.st_mode & bits) == 0 ? -1 : open(path.c_str(), mode | O_CLOEXEC | O_NONBLOCK);
-    };
-    const int writable = tryToOpen(O_WRONLY, 0222);
-    node.writes = writable >= 0;
-    if (node.writes) close(writable);
-    const int readable = tryToOpen(O_RDONLY, 0444);
-    node.reads = readable >= 0;
+    const NodeFile readable(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
+    const NodeFile writable(path.c_str(), O_WRONLY | O_CLOEXEC | O_NONBLOCK);
+    // Root may open any file, but the mode of a driver's attribute binds it, too.
+    node.reads = (info.st_mode & 0444) != 0 && readable.isOpen();
+    node.writes = (info.st_mode & 0222) != 0 && writable.isOpen();
     if (node.reads) {
         char text[512];
-        const ssize_t size = read(readable, text, sizeof(text));
+        const ssize_t size = readable.receive(text, sizeof(text));
         node.value.assign(text, static_cast<size_t>(std::max<ssize_t>(size, 0)));
-        close(readable);
     }
     char mode[8];
     snprintf(mode, sizeof(mode), "%04o", info.st_mode & 07777);

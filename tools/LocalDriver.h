@@ -56,7 +56,6 @@ class LocalDriver {
     const ::android::sp<Vibrator>& vibrator() const { return mVibrator; }
 
   private:
-    std::string mSimulation;
     ::android::sp<Vibrator> mVibrator;
     bool mIsUsable = false;
     bool mIsThere = false;

@@ -6,6 +6,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <ctime>
+#include <utility>
 
 namespace {
 
@@ -151,6 +152,14 @@ constexpr struct {
         {": false", kProbeEnd, "cannot be opened"},
 };
 
+/** @return the text that was written, whose final newline the log escapes. */
+std::string writtenText(const std::string& logged) {
+    std::string text = logged.substr(0, logged.rfind(" , "));
+    if (const size_t newline = text.find("\\n"); newline != std::string::npos)
+        text.replace(newline, 2, "\n");
+    return text;
+}
+
 }  // namespace
 
 std::optional<NodeAccess> AccessReader::read(std::string_view line) {
@@ -174,7 +183,7 @@ std::optional<NodeAccess> AccessReader::readTrace(std::string_view line) {
     // An interrupted access is repeated.
     if (error == "EINTR" && call != "close") return std::nullopt;
     NodeAccess& access = mOpen[node];
-    if (call == "open") access = {node, NodeAccess::kProbe, "", "", 0, ""};
+    if (call == "open") access = {node, NodeAccess::kProbe};
     if (call != "close") access.error = error;
     if (isTransfer) {
         access.kind = call == "read" ? NodeAccess::kRead : NodeAccess::kWrite;
@@ -191,7 +200,7 @@ std::optional<NodeAccess> AccessReader::readTrace(std::string_view line) {
 }
 
 void AccessReader::begin(std::string_view path, NodeAccess::Kind kind, const std::string& bytes) {
-    mNumber = {nodeName(path), kind, bytes, "", 0, ""};
+    mNumber = {nodeName(path), kind, bytes};
     mDirectory = mNumber->node.substr(0, mNumber->node.find('/'));
 }
 
@@ -202,20 +211,11 @@ std::optional<NodeAccess> AccessReader::beginWrite(const std::string& text) {
     // The success of these texts shows by the motor's start.
     const bool isStart = !mNumber && path.find("/cp_trigger_index") == std::string::npos;
     std::optional<NodeAccess> done;
-    if (isStart && mText && mText->leaf() != "event_cmd") done.swap(mText);
+    if (isStart && mText && mText->leaf() != "event_cmd") done = std::exchange(mText, std::nullopt);
     if (value < text.size()) {
         begin(path, NodeAccess::kWrite, text.substr(value + kValue.size()) + "\n");
     }
     return done;
-}
-
-void AccessReader::beginText(const std::string& leaf, const std::string& text) {
-    std::string bytes = text.substr(0, text.rfind(" , "));
-    // The log escapes the newline at the end.
-    if (const size_t newline = bytes.find("\\n"); newline != std::string::npos)
-        bytes.replace(newline, 2, "\n");
-    if (leaf == "event_cmd") bytes.insert(0, "FOLDER_");
-    mText = {mDirectory + '/' + leaf, NodeAccess::kWrite, bytes, "", 0, ""};
 }
 
 std::optional<NodeAccess> AccessReader::readLog(std::string_view line) {
@@ -237,41 +237,34 @@ std::optional<NodeAccess> AccessReader::readStep(std::string_view line) {
                                    [&](const auto& each) { return rest = after(line, each.mark); });
     if (!rest) return std::nullopt;
     const std::string text(*rest);
-    std::optional<NodeAccess> done;
     const auto end = [&](std::optional<NodeAccess>* access) {
-        done.swap(*access);
-        if (done) done->error = row->detail != nullptr ? row->detail : errorName(text);
+        if (*access) (*access)->error = row->detail != nullptr ? row->detail : errorName(text);
+        return std::exchange(*access, std::nullopt);
     };
     switch (row->step) {
         case kNothing:
             break;
         case kRefusal:
-            done = {"", NodeAccess::kRefusal, "", row->detail, 0, ""};
-            break;
+            return NodeAccess{"", NodeAccess::kRefusal, "", row->detail};
         case kProbe:
-            begin(text, NodeAccess::kProbe, "");
-            break;
         case kRead:
-            begin(text, NodeAccess::kRead, "");
+            begin(text, row->step == kRead ? NodeAccess::kRead : NodeAccess::kProbe, "");
             break;
         case kWrite:
-            done = beginWrite(text);
-            break;
+            return beginWrite(text);
         case kProbeEnd:
-            if (!mNumber || mNumber->kind != NodeAccess::kProbe) break;
-            [[fallthrough]];
+            if (mNumber && mNumber->kind == NodeAccess::kProbe) return end(&mNumber);
+            break;
         case kEnd:
-            end(&mNumber);
-            break;
+            return end(&mNumber);
         case kTextRead:
-            done = {mDirectory + '/' + row->detail, NodeAccess::kRead, text, "", 0, ""};
-            break;
+            return NodeAccess{mDirectory + '/' + row->detail, NodeAccess::kRead, text};
         case kText:
-            beginText(row->detail, text);
+            mText = {mDirectory + '/' + row->detail, NodeAccess::kWrite, writtenText(text)};
+            if (mText->leaf() == "event_cmd") mText->bytes.insert(0, "FOLDER_");
             break;
         case kTextEnd:
-            end(&mText);
-            break;
+            return end(&mText);
     }
-    return done;
+    return std::nullopt;
 }

@@ -15,13 +15,13 @@ struct NodeAccess {
     std::string node;
     Kind kind = kProbe;
     /** The bytes that were read or written; for a refusal what the service logged. */
-    std::string bytes;
+    std::string bytes = {};
     /** Why it failed, like "ENOENT"; empty if it succeeded. */
-    std::string error;
+    std::string error = {};
     /** When it ended, in s; 0 if the source has no times. */
     double time = 0;
     /** The time as the source writes it, like "11-24 22:18:03.123"; empty without times. */
-    std::string clock;
+    std::string clock = {};
 
     /** @return the last part of the node's name, like "state". */
     std::string leaf() const { return node.substr(node.rfind('/') + 1); }
@@ -46,7 +46,6 @@ class AccessReader {
     void begin(std::string_view path, NodeAccess::Kind kind, const std::string& bytes);
     /** @return the text whose success the write shows, if it does. */
     std::optional<NodeAccess> beginWrite(const std::string& text);
-    void beginText(const std::string& leaf, const std::string& text);
 
     bool mIsLog;
     /** For a trace: the accesses that have begun, by node. */

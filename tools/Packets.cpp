@@ -5,11 +5,8 @@
 
 #include <algorithm>
 #include <charconv>
-#include <cstdint>
 #include <nlohmann/json.hpp>
-#include <optional>
 #include <sstream>
-#include <string_view>
 
 namespace {
 

@@ -3,8 +3,6 @@
 
 #include "Timeline.h"
 
-#include <string>
-
 enum class PictureFormat { kSvg, kPng };
 
 /** @return a gnuplot script that draws a timeline and writes the picture to standard output. */

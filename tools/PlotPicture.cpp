@@ -1,5 +1,4 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Duration.h"
 #include "Plot.h"
 #include "PlotScript.h"
 #include "cli/Text.h"
@@ -18,7 +17,6 @@
 #include <regex>
 #include <sstream>
 #include <stdexcept>
-#include <vector>
 
 namespace {
 
@@ -122,7 +120,7 @@ std::string described(const Timeline& timeline, const std::string& svg) {
     std::string calls;
     for (size_t i = 0; i < timeline.marks.size() && i < kMostCalls; ++i) {
         calls += (i == 0 ? ": " : "; ") + timeline.marks[i].label + " at " +
-                 durationInWords(timeline.marks[i].time);
+                 cli::durationInWords(timeline.marks[i].time);
     }
     calls += timeline.marks.size() > kMostCalls ? "; and more." : ".";
     const std::string note = plotNote(timeline);
@@ -143,7 +141,7 @@ std::string plotTitle(const Timeline& timeline) {
     const size_t calls = timeline.marks.size();
     return "What the driver was told: " + std::to_string(calls) +
            (calls == 1 ? " call" : " calls") + " in " +
-           durationInWords(timeline.end - timeline.start);
+           cli::durationInWords(timeline.end - timeline.start);
 }
 
 std::string plotNote(const Timeline& timeline) {

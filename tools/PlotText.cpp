@@ -1,11 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Duration.h"
 #include "Plot.h"
+#include "cli/Text.h"
 
 #include <algorithm>
 #include <cmath>
 #include <cstdio>
-#include <cstring>
 
 namespace {
 
@@ -61,8 +60,8 @@ std::string plotText(const Timeline& timeline, size_t columns) {
         axis[std::min(width - 1, column)] = '|';
     }
     if (timeline.goesOn) axis.back() = '>';
-    const std::string from = durationInWords(timeline.start);
-    const std::string to = durationInWords(timeline.end);
+    const std::string from = cli::durationInWords(timeline.start);
+    const std::string to = cli::durationInWords(timeline.end);
     const size_t between = width - std::min(width, from.size() + to.size());
     const std::string indent(kMargin, ' ');
     text += indent + axis + '\n' + indent + from + std::string(between, ' ') + to + '\n';
@@ -71,7 +70,8 @@ std::string plotText(const Timeline& timeline, size_t columns) {
     if (!plotNote(timeline).empty()) text += indent + plotNote(timeline) + '\n';
     text += '\n';
     for (size_t i = 0; i < timeline.marks.size() && i < kMostCalls; ++i) {
-        snprintf(line, sizeof(line), "%12s  ", durationInWords(timeline.marks[i].time).c_str());
+        snprintf(line, sizeof(line), "%12s  ",
+                 cli::durationInWords(timeline.marks[i].time).c_str());
         text += line + timeline.marks[i].label + '\n';
     }
     if (timeline.marks.size() > kMostCalls) {

@@ -1,7 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "Client.h"
 #include "LocalDriver.h"
 #include "NodePathTable.h"
-#include "Report.h"
+
+#include <unistd.h>
 
 using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
@@ -17,6 +19,15 @@ std::string runningReason(const LocalDriver& driver) {
 }
 
 }  // namespace
+
+bool mayCallRestricted() {
+    return getuid() == 0 || getuid() == 1000;
+}
+
+std::string notPermitted() {
+    return "not permitted: only root and uid 1000 (system) may do this, not uid " +
+           std::to_string(getuid());
+}
 
 std::string reasonOf(const Operation& operation, VibratorStatus status) {
     if (operation.isRestricted && !mayCallRestricted()) return notPermitted();

@@ -37,10 +37,9 @@ class ScoreParser {
         columns.push_back(line.size() + 1);
         try {
             parseStep(std::move(step));
-        } catch (const cli::WordError& error) {
-            complain(columns[error.index + 1], error.what());
         } catch (const cli::UsageError& error) {
-            complain(columns.front(), error.what());
+            const size_t column = error.index ? columns[*error.index + 1] : columns.front();
+            mErrors.push_back({mLine, column, error.what()});
         }
     }
 
@@ -114,10 +113,6 @@ class ScoreParser {
         }
         for (size_t i = size; i < size * block.times; ++i)
             order.push_back(order[order.size() - size]);
-    }
-
-    void complain(size_t column, const std::string& what) {
-        mErrors.push_back({mLine, column, what});
     }
 
     const std::vector<StepKind>& mKinds;

@@ -3,12 +3,7 @@
 
 #include "cli/CommandLine.h"
 
-#include <cstdint>
-#include <functional>
 #include <nlohmann/json_fwd.hpp>
-#include <optional>
-#include <string>
-#include <vector>
 
 /** A command as a step of a score. */
 struct StepKind {

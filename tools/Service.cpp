@@ -23,12 +23,10 @@ void setCallTimeout(uint32_t seconds) {
 Description describe(const ::android::sp<IDaxVibrator>& vibrator) {
     Description description{host::transportDescription(), host::serviceManagerDescription(), ""};
     if (vibrator == nullptr) return description;
+    description.server = "a process that is not known";
     int32_t pid = 0;
     const auto result = vibrator->getDebugInfo([&](const auto& info) { pid = info.pid; });
-    if (!result.isOk() || pid <= 0) {
-        description.server = "a process that is not known";
-        return description;
-    }
+    if (!result.isOk() || pid <= 0) return description;
     std::string program;
     std::getline(std::ifstream("/proc/" + std::to_string(pid) + "/cmdline"), program, '\0');
     description.server = "process " + std::to_string(pid) + (program.empty() ? "" : ", " + program);

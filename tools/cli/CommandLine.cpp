@@ -6,6 +6,8 @@
 #include <CLI/CLI.hpp>
 
 #include <algorithm>
+#include <cerrno>
+#include <cstring>
 #include <iostream>
 #include <map>
 
@@ -156,14 +158,14 @@ void Command::read(const Given& given, bool isStep) const {
             argument->read(word, isStep);
         } catch (const UsageError& error) {
             const bool isNamed = argument->isOption() && !isStep;
-            throw WordError(i, (isNamed ? argument->name + ": " : "") + error.what());
+            throw UsageError((isNamed ? argument->name + ": " : "") + error.what(), i);
         }
     }
     for (const Argument& argument : mArguments) {
         const bool isGiven = std::any_of(given.begin(), given.end(),
                                          [&](const auto& each) { return each.first == &argument; });
         if (!isGiven && (argument.isRequired || (isStep && argument.isMany))) {
-            throw WordError(given.size(), argument.name + " is missing: " + argument.help);
+            throw UsageError(argument.name + " is missing: " + argument.help, given.size());
         }
     }
 }
@@ -179,9 +181,7 @@ void Command::readStep(const std::vector<std::string>& words) const {
         next = std::find_if(next, mArguments.end(), [&](const Argument& each) {
             return isFlag ? isItsFlag(each) : !each.isFlag() && !each.isFile;
         });
-        if (next == mArguments.end()) {
-            throw WordError(given.size(), inQuotes(word) + kTooMany);
-        }
+        if (next == mArguments.end()) throw UsageError(inQuotes(word) + kTooMany, given.size());
         given.emplace_back(&*next, word);
         if (!next->isMany) ++next;
     }
@@ -337,21 +337,20 @@ void Program::takeWord(const std::string& word, Line* line) const {
     }
 }
 
-int Program::run(int argc, char** argv, const std::function<bool()>& isJson) {
-    const std::vector<std::string> words(argv + std::min(argc, 1), argv + argc);
+int Program::obey(const std::vector<std::string>& words) {
     if (words.size() > 1 && words[0] == "--complete") {
         complete({words.begin() + 1, words.end()});
-        return 0;
+        return kSuccess;
     }
     Line line = parse(words);
     mCurrent = line.command;
     if (*mWantsHelp) {
         help(line.typed);
-        return 0;
+        return kSuccess;
     }
     if (*mWantsVersion) {
         std::cout << mName << ' ' << mVersion << '\n';
-        return 0;
+        return kSuccess;
     }
     if (line.taking != nullptr && line.taking->isOption()) {
         line.complain(line.taking->name + ": the value is missing");
@@ -365,7 +364,33 @@ int Program::run(int argc, char** argv, const std::function<bool()>& isJson) {
     if (!line.problem.empty()) throw UsageError(line.problem);
     mCurrent->read(line.given, false);
     if (isJson() && !mCurrent->mHasJson) throw UsageError("has no JSON answer; leave out --json");
-    return mCurrent->perform();
+    return perform(*mCurrent);
+}
+
+int Program::run(int argc, char** argv) {
+    int code = kFailed;
+    try {
+        code = obey({argv + std::min(argc, 1), argv + argc});
+    } catch (const UsageError& error) {
+        complain("USAGE", error.what());
+        code = kUsage;
+    } catch (const std::exception& error) {
+        complain("FAILED", error.what());
+    }
+    errno = 0;
+    if (std::cout.flush()) return code;
+    std::cerr << mName
+              << ": standard output cannot be written: " << strerror(errno != 0 ? errno : EIO)
+              << '\n';
+    return kFailed;
+}
+
+void Program::warn(const std::string& text) const {
+    if (!isJson()) std::cerr << mName << ": " << printable(text) << '\n';
+}
+
+void Program::complain(const std::string& /* status */, const std::string& reason) const {
+    warn((current().empty() ? "" : current() + ": ") + reason);
 }
 
 }  // namespace cli

@@ -13,18 +13,22 @@
 
 namespace cli {
 
+enum ExitCode {
+    kSuccess = 0,
+    /** The command has failed, or the output could not be written. */
+    kFailed = 1,
+    /** The command line, or a file that it names, has a mistake. */
+    kUsage = 2,
+};
+
 /** A mistake in the command line, or in a file that it names; what() says it in one line. */
 class UsageError : public std::runtime_error {
   public:
-    using runtime_error::runtime_error;
-};
-
-/** A mistake in one of several words. */
-class WordError : public UsageError {
-  public:
-    WordError(size_t word, const std::string& what) : UsageError(what), index(word) {}
-    /** Index of the word; how many there are, where one is missing. */
-    const size_t index;
+    explicit UsageError(const std::string& what, std::optional<size_t> word = {})
+        : runtime_error(what), index(word) {}
+    /** Of a mistake in one of several words: its index; how many there are, where one is missing.
+     */
+    const std::optional<size_t> index;
 };
 
 /** The whole decimal numbers that an argument may be. */
@@ -114,7 +118,7 @@ class Command {
      * Reads a step of a script: the values in the order in which they were added, options as well
      * and without their names; a flag as its name without the dashes. There are no files in it.
      *
-     * @throw WordError
+     * @throw UsageError with the index of the word
      */
     void readStep(const std::vector<std::string>& words) const;
     /** Does what the command does, with what was read last. */
@@ -126,7 +130,7 @@ class Command {
     /** Words, and what each was given for; of flags nothing but that they were given. */
     using Given = std::vector<std::pair<const Argument*, std::string>>;
 
-    /** Reads what was given. @throw WordError */
+    /** Reads what was given. @throw UsageError with the index of the word */
     void read(const Given& given, bool isStep) const;
     template <typename T, typename Read>
     Value<T> add(const std::string& name, const std::string& help, const std::optional<T>& initial,
@@ -148,6 +152,7 @@ class Program {
     Program(std::string name, std::string version, const std::string& about);
     Program(const Program&) = delete;
     Program& operator=(const Program&) = delete;
+    virtual ~Program() = default;
 
     /** What stands before all commands: the options that they share, and the help's notes. */
     Command& shared() { return mRoot; }
@@ -162,15 +167,20 @@ class Program {
     /** Adds the command that prints the scripts of shells. */
     void addCompletion(const std::string& group);
 
-    /**
-     * Runs the command that a command line asks for.
-     *
-     * @param isJson whether the answer must be JSON; asked when the command line has been read.
-     * @return the exit code of the command.
-     */
-    int run(int argc, char** argv, const std::function<bool()>& isJson);
-    /** @return the command that was recognised, for messages; nullptr where none was. */
-    const Command* current() const { return mCurrent; }
+    /** Runs the command that a command line asks for. @return the program's exit code. */
+    int run(int argc, char** argv);
+    /** Says something on standard error, unless answers are JSON. */
+    void warn(const std::string& text) const;
+
+  protected:
+    /** @return the words of the command that was recognised; empty where none was. */
+    std::string current() const { return mCurrent == nullptr ? "" : mCurrent->name(); }
+    /** @return whether answers must be JSON; also of a line with a mistake in it. */
+    virtual bool isJson() const { return false; }
+    /** Runs a command whose arguments have been read. @return the exit code. */
+    virtual int perform(const Command& command) { return command.perform(); }
+    /** Says why the command was not done. @param status like "USAGE". */
+    virtual void complain(const std::string& status, const std::string& reason) const;
 
   private:
     /** What a command line says, as far as it makes sense. */
@@ -188,6 +198,8 @@ class Program {
         void complain(const std::string& what);
     };
 
+    /** Does what a command line asks for. */
+    int obey(const std::vector<std::string>& words);
     /** Reads a command line, and those flags that are in it. */
     Line parse(const std::vector<std::string>& words) const;
     static void takeOption(const Argument& option, const std::string& value, Line* line);

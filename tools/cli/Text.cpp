@@ -4,7 +4,10 @@
 #include <algorithm>
 #include <charconv>
 #include <clocale>
+#include <cmath>
 #include <cstdio>
+#include <cstdlib>
+#include <cstring>
 #include <cwchar>
 #include <cwctype>
 #include <numeric>
@@ -30,7 +33,7 @@ size_t distance(std::string_view a, std::string_view b) {
 
 }  // namespace
 
-std::string printable(std::string_view text) {
+std::string printable(std::string_view text, bool hasLines) {
     // Which characters are controls is known of any language; without the locale, of ASCII.
     static const char* const locale = setlocale(LC_CTYPE, "C.UTF-8");
     static_cast<void>(locale);
@@ -40,26 +43,17 @@ std::string printable(std::string_view text) {
         wchar_t character = 0;
         const size_t size = mbrtowc(&character, text.data(), text.size(), &state);
         const bool isCharacter = size >= 1 && size <= text.size();
+        const bool isSafe = isCharacter && (iswprint(static_cast<wint_t>(character)) != 0 ||
+                                            (hasLines && character == L'\n'));
         const std::string_view bytes = text.substr(0, isCharacter ? size : 1);
         for (const char byte : bytes) {
             char hex[8];
             snprintf(hex, sizeof(hex), "\\x%02x", static_cast<unsigned char>(byte));
-            safe += isCharacter && iswprint(static_cast<wint_t>(character)) != 0
-                            ? std::string(1, byte)
-                            : hex;
+            safe += isSafe ? std::string(1, byte) : hex;
         }
         text.remove_prefix(bytes.size());
     }
     return safe;
-}
-
-std::string printableLines(std::string_view text) {
-    std::string safe;
-    for (size_t end = 0; (end = text.find('\n')) != std::string_view::npos;) {
-        safe += printable(text.substr(0, end)) + '\n';
-        text.remove_prefix(end + 1);
-    }
-    return safe + printable(text);
 }
 
 std::string inQuotes(std::string_view text) {
@@ -113,6 +107,38 @@ std::string wrap(const std::string& text, size_t indent) {
         column += word.size();
     }
     return lines + '\n';
+}
+
+std::string durationInWords(double seconds) {
+    char text[48];
+    const long long whole = std::llround(seconds);
+    if (std::llround(seconds * 1000) < 1000) {
+        snprintf(text, sizeof(text), "%.4g ms", std::round(seconds * 1e4) / 10);
+    } else if (whole < 60) {
+        snprintf(text, sizeof(text), "%.4g s", std::round(seconds * 1000) / 1000);
+    } else if (whole < 3600) {
+        snprintf(text, sizeof(text), "%lld:%02lld min", whole / 60, whole % 60);
+    } else {
+        snprintf(text, sizeof(text), "%lld:%02lld:%02lld h", whole / 3600, whole / 60 % 60,
+                 whole % 60);
+    }
+    return text;
+}
+
+std::optional<double> parseDuration(const std::string& text) {
+    constexpr struct {
+        const char* unit;
+        double seconds;
+    } kUnits[] = {{"ms", 0.001}, {"s", 1}, {"m", 60}, {"h", 3600}};
+    const size_t digits = strspn(text.c_str(), "0123456789.");
+    char* end = nullptr;
+    const std::string written = text.substr(0, digits);
+    const double number = strtod(written.c_str(), &end);
+    if (digits == 0 || *end != '\0' || !(number < 1e9)) return std::nullopt;
+    for (const auto& [unit, seconds] : kUnits) {
+        if (text.substr(digits) == unit) return number * seconds;
+    }
+    return std::nullopt;
 }
 
 }  // namespace cli

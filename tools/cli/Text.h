@@ -11,13 +11,11 @@
 namespace cli {
 
 /**
+ * @param hasLines whether the ends of lines stay.
  * @return the text without anything that a terminal would obey: control characters, C1 ones too,
  *     and bytes that are no UTF-8 stand as \xNN.
  */
-std::string printable(std::string_view text);
-
-/** @return the same for a text of several lines, of which the ends stay. */
-std::string printableLines(std::string_view text);
+std::string printable(std::string_view text, bool hasLines = false);
 
 /** @return the text between quotation marks, printable. */
 std::string inQuotes(std::string_view text);
@@ -37,5 +35,11 @@ constexpr size_t kColumns = 80;
 
 /** @return the text in lines of at most kColumns, all but the first of them indented. */
 std::string wrap(const std::string& text, size_t indent);
+
+/** @return seconds for people: "20 ms", "3.4 s", "2:05 min", "1:02:03 h". */
+std::string durationInWords(double seconds);
+
+/** @return the seconds that a text like "500ms", "1.5s", "2m" or "1h" stands for. */
+std::optional<double> parseDuration(const std::string& text);
 
 }  // namespace cli

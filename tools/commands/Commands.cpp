@@ -6,7 +6,7 @@ void addCommands(Client& client) {
                            addWatch, addPlot}) {
         add(client);
     }
-    client.program().addCompletion(kTools);
+    client.addCompletion(kTools);
 }
 
 void addCall(Client& client, cli::Command& command, const OneArgument& argument,

@@ -3,10 +3,6 @@
 
 #include "Client.h"
 
-#include <functional>
-#include <string>
-#include <vector>
-
 /** Adds all commands, in the order of the help. */
 void addCommands(Client& client);
 

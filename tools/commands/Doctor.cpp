@@ -42,7 +42,7 @@ std::vector<NodeUse> nodeUses() {
 /** Examines all that the service needs. The result is JSON; the words are made from it. */
 class Examination {
   public:
-    explicit Examination(const Client& client) {
+    explicit Examination(const Client& client) : mClient(client) {
         ::android::sp<service::IDaxVibrator> vibrator;
         std::string answer = "answers";
         try {
@@ -68,9 +68,8 @@ class Examination {
         mReport.update({{"findings", mFindings}, {"notes", mNotes}});
     }
 
-    bool isHealthy() const { return mFindings.empty(); }
-    const ordered_json& asJson() const { return mReport; }
-    std::string inWords() const;
+    /** @return the exit code. */
+    int report() const { return mClient.found(inWords(), mReport, mFindings.empty()); }
 
   private:
     void find(const std::string& problem, const std::string& advice) {
@@ -80,7 +79,9 @@ class Examination {
     void examineNodes();
     void examineMotor();
     std::string nodeTable() const;
+    std::string inWords() const;
 
+    const Client& mClient;
     bool mAnswers = false;
     LocalDriver mDriver;
     const std::string mUser = "uid " + std::to_string(getuid());
@@ -226,11 +227,6 @@ std::string Examination::inWords() const {
 }  // namespace
 
 void addDoctor(Client& client) {
-    cli::Command& command = client.command(kTools, "doctor",
-                                           "say what is wrong with the driver or the service", "");
-    command.run([&client] {
-        const Examination examination(client);
-        return client.report().found("doctor", examination.inWords(), examination.asJson(),
-                                     examination.isHealthy());
-    });
+    client.command(kTools, "doctor", "say what is wrong with the driver or the service", "")
+            .run([&client] { return Examination(client).report(); });
 }

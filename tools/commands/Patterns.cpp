@@ -43,7 +43,7 @@ int playPattern(const Client& client, uint32_t pattern, uint32_t amplitude, bool
     if (countPatterns(client, &count) == VibratorStatus::OK && pattern > count) {
         const std::string warning = "the driver counts only " + std::to_string(count) +
                                     " stored patterns; it may play nothing";
-        client.report().warn("prebaked play " + answer.argument + ": " + warning);
+        client.warn("prebaked play " + answer.argument + ": " + warning);
         answer.members["warning"] = warning;
     }
     return client.answer(

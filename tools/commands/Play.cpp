@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
-#include "Duration.h"
+#include "cli/Text.h"
 
 #include <chrono>
 #include <csignal>
@@ -40,14 +40,11 @@ int playStep(Client& client, const ScoreStep& step) {
         wait(step.pause);
         nlohmann::ordered_json members = {{"argument", step.argument()}};
         members.update(step.place());
-        return client.report().found(step.name, "", members);
+        return client.found("", members);
     }
     // Other steps may have set the command's arguments.
     step.command->readStep(step.words);
-    client.setStep(&step);
-    const int code = step.command->perform();
-    client.setStep(nullptr);
-    return code;
+    return step.command->perform();
 }
 
 /** Stops the motor, and says why. @return the exit code. */
@@ -58,10 +55,9 @@ int stop(const Client& client, const char* status, const std::string& why) {
     } catch (const service::Unreachable&) {
         // The same as a refusal.
     }
-    client.report().failure(
-            "play", status,
-            why + (isStopped ? "; the motor is stopped" : "; the motor could not be stopped"));
-    return kRefused;
+    client.complain(status, why + (isStopped ? "; the motor is stopped"
+                                             : "; the motor could not be stopped"));
+    return cli::kFailed;
 }
 
 /** Plays the steps of a score, and reports each with its place in the file. */
@@ -71,13 +67,16 @@ int playScore(Client& client, const std::string& file, const Score& score) {
         const ScoreStep& step = score.lines[index];
         const std::string place =
                 file + ":" + std::to_string(step.line) + ":" + std::to_string(step.column);
+        int code = cli::kSuccess;
+        client.setStep(&step);
         try {
-            if (playStep(client, step) != kSuccess) {
-                return stop(client, "FAILED", place + ": the step failed");
-            }
+            code = playStep(client, step);
         } catch (const service::Unreachable& error) {
+            client.setStep(nullptr);
             throw service::Unreachable(std::string(error.what()) + ", at " + place);
         }
+        client.setStep(nullptr);
+        if (code != cli::kSuccess) return stop(client, "FAILED", place + ": the step failed");
         std::cout.flush();
         if (interruption != 0) {
             stop(client, "INTERRUPTED", "interrupted at " + place);
@@ -85,28 +84,25 @@ int playScore(Client& client, const std::string& file, const Score& score) {
             return raise(interruption);
         }
     }
-    return kSuccess;
+    return cli::kSuccess;
 }
 
 int play(Client& client, const std::string& file, bool isCheck) {
     Score score;
     const auto errors = parseScore(readInput(file), client.stepKinds(), &score);
     for (const ScoreError& error : errors) {
-        client.report().failure("play", "USAGE",
-                                file + ":" + std::to_string(error.line) + ":" +
-                                        std::to_string(error.column) + ": " + error.what);
+        client.complain("USAGE", file + ":" + std::to_string(error.line) + ":" +
+                                         std::to_string(error.column) + ": " + error.what);
     }
     if (errors.size() == kMostScoreErrors) {
-        client.report().warn("play: " + file + ": only the first 20 mistakes are shown");
+        client.warn("play: " + file + ": only the first 20 mistakes are shown");
     }
-    if (!errors.empty()) return kUsage;
+    if (!errors.empty()) return cli::kUsage;
     if (!isCheck) return playScore(client, file, score);
     const size_t steps = score.order.size();
-    return client.report().found("play",
-                                 "OK, " + std::to_string(steps) +
-                                         (steps == 1 ? " step, " : " steps, ") +
-                                         durationInWords(score.seconds()) + "\n",
-                                 {{"steps", steps}, {"seconds", score.seconds()}});
+    return client.found("OK, " + std::to_string(steps) + (steps == 1 ? " step, " : " steps, ") +
+                                cli::durationInWords(score.seconds()) + "\n",
+                        {{"steps", steps}, {"seconds", score.seconds()}});
 }
 
 }  // namespace

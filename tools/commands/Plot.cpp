@@ -2,7 +2,6 @@
 #include "Plot.h"
 
 #include "Commands.h"
-#include "Duration.h"
 #include "Traffic.h"
 #include "cli/Text.h"
 
@@ -67,7 +66,7 @@ Timeline readTimeline(const Traffic& traffic) {
 /** @return the time that an option gives, in s, or what holds without it. */
 double timeOf(const char* option, const std::string& text, double without) {
     if (text.empty()) return without;
-    if (const auto time = parseDuration(text)) return *time;
+    if (const auto time = cli::parseDuration(text)) return *time;
     throw cli::UsageError(option + (": " + cli::inQuotes(text)) +
                           " is not a time like 10s, 500ms, 2m or 1h");
 }
@@ -85,9 +84,9 @@ PictureFormat formatOf(const std::string& name, size_t format) {
 }  // namespace
 
 void addPlot(Client& client) {
-    cli::Command& command = client.program().command(
-            kTools, "plot", "draw what the driver was told", "--last 10s -o plot.svg");
-    const Traffic traffic(&command);
+    cli::Command& command = client.command(kTools, "plot", "draw what the driver was told",
+                                           "--last 10s -o plot.svg");
+    const Traffic traffic(command);
     const auto output = command.file("-o,--output FILE",
                                      "picture to draw, .svg or .png, by gnuplot; - for standard "
                                      "output; without it, text",
@@ -115,7 +114,7 @@ void addPlot(Client& client) {
             timeOf("--to", *to, std::numeric_limits<double>::max()));
         if (timeline.marks.empty() && timeline.segments.empty()) {
             throw cli::UsageError("nothing in that time; all of it lies within " +
-                                  durationInWords(length) + " from the first call on");
+                                  cli::durationInWords(length) + " from the first call on");
         }
         if (isText) {
             winsize window{};
@@ -126,6 +125,6 @@ void addPlot(Client& client) {
         } else {
             writeWhole(*output, drawPicture(timeline, kind));
         }
-        return kSuccess;
+        return cli::kSuccess;
     });
 }

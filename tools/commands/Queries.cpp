@@ -63,15 +63,15 @@ int supports(const Client& client) {
         answers[query.operation] = answer;
         const bool mayAsk = permitted || query.ask == &IDaxVibrator::supportsExternalControl;
         words += std::string(query.words) + ": " + (answer ? "yes" : mayAsk ? "no" : "may not ask");
-        if (client.report().isVerbose) words += std::string(" [") + query.operation + "]";
+        if (client.isVerbose()) words += std::string(" [") + query.operation + "]";
         words += "\n";
     }
     ordered_json members = {{"permitted", permitted}, {"supports", answers}};
     if (!permitted) {
         members["reason"] = notPermitted();
-        client.report().warn("supports: " + notPermitted());
+        client.warn("supports: " + notPermitted());
     }
-    return client.report().found("supports", words, members);
+    return client.found(words, members);
 }
 
 /** @return the service, waited for up to some seconds. @throw service::Unreachable */
@@ -97,18 +97,16 @@ int status(const Client& client, uint32_t seconds) {
             interfaces.emplace_back(descriptor.c_str());
     }));
     const std::string indent = "\n            ";
-    return client.report().found(
-            "status",
-            "service:    " + client.instance() + ", answers\nserved by:  " + description.server +
-                    "\ntransport:  " + description.transport +
-                    "\nmanager:    " + description.manager +
-                    "\ninterfaces: " + cli::join(interfaces, indent, indent) + "\n",
-            {{"instance", client.instance()},
-             {"answers", true},
-             {"server", description.server},
-             {"transport", description.transport},
-             {"manager", description.manager},
-             {"interfaces", interfaces}});
+    return client.found("service:    " + client.instance() + ", answers\nserved by:  " +
+                                description.server + "\ntransport:  " + description.transport +
+                                "\nmanager:    " + description.manager +
+                                "\ninterfaces: " + cli::join(interfaces, indent, indent) + "\n",
+                        {{"instance", client.instance()},
+                         {"answers", true},
+                         {"server", description.server},
+                         {"transport", description.transport},
+                         {"manager", description.manager},
+                         {"interfaces", interfaces}});
 }
 
 int ladder(const Client& client, uint32_t type) {
@@ -144,12 +142,10 @@ int motor(const Client& client) {
     }
     members["ladders"] = {{"0", ladder0}, {"1", ladder1}};
     members["enhancedPatterns"] = isEnhanced;
-    return client.report().found("motor",
-                                 "motor:    " + words + "\nladder 0: " + ladderInWords(ladder0) +
-                                         "\nladder 1: " + ladderInWords(ladder1) +
-                                         "\nenhanced patterns: " + (isEnhanced ? "yes" : "no") +
-                                         "\n",
-                                 members);
+    return client.found("motor:    " + words + "\nladder 0: " + ladderInWords(ladder0) +
+                                "\nladder 1: " + ladderInWords(ladder1) +
+                                "\nenhanced patterns: " + (isEnhanced ? "yes" : "no") + "\n",
+                        members);
 }
 
 }  // namespace

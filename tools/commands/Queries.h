@@ -3,8 +3,6 @@
 
 #include "Service.h"
 
-#include <cstdint>
-#include <string>
 #include <vector>
 
 /** A query that the service answers with yes or no. */

@@ -2,31 +2,28 @@
 #pragma once
 
 #include "Client.h"
+#include "Driver.h"
 #include "Trace.h"
 
-#include <string>
-
 /** The arguments of a command that reads node traffic. */
-class Traffic {
-  public:
-    explicit Traffic(cli::Command* command)
-        : mFile(command->file("FILE",
-                              "trace of the simulated driver (default: the one in "
-                              "VIBRATOR_SIM_DIR), - for standard input",
-                              "")),
-          mIsLog(command->flag("--log", "FILE is the daemon's log, not a trace")) {}
+struct Traffic {
+    explicit Traffic(cli::Command& command)
+        : named(command.file("FILE",
+                             "trace of the simulated driver (default: the one in "
+                             "VIBRATOR_SIM_DIR), - for standard input",
+                             "")),
+          log(command.flag("--log", "FILE is the daemon's log, not a trace")) {}
 
-    bool isLog() const { return *mIsLog; }
+    bool isLog() const { return *log; }
     /** @return the file to read: the one that was named, or the simulated driver's. */
     std::string file() const {
-        if (!mFile->empty()) return *mFile;
-        if (isLog() || simulationDirectory().empty()) {
-            throw cli::UsageError("no FILE: name a trace, or a log with --log");
+        if (!named->empty()) return *named;
+        if (!isLog() && !simulator::inheritedDirectory().empty()) {
+            return simulator::traceFile(simulator::inheritedDirectory());
         }
-        return simulator::traceFile(simulationDirectory());
+        throw cli::UsageError("no FILE: name a trace, or a log with --log");
     }
 
-  private:
-    cli::Value<std::string> mFile;
-    cli::Value<bool> mIsLog;
+    cli::Value<std::string> named;
+    cli::Value<bool> log;
 };

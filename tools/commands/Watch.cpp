@@ -5,7 +5,6 @@
 #include "cli/Text.h"
 
 #include <fcntl.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -15,20 +14,17 @@
 #include <iomanip>
 #include <iostream>
 #include <sstream>
-#include <string>
 #include <thread>
-#include <utility>
 
 namespace {
 
-constexpr const char* kKinds[] = {"probe", "read", "write", "refused"};
-constexpr const char* kFaint = "\033[2m";
-constexpr const char* kCyan = "\033[36m";
-constexpr const char* kGreen = "\033[32m";
 constexpr const char* kRed = "\033[31m";
 constexpr const char* kPlain = "\033[0m";
-/** The colours of accesses that succeeded, by kind. */
-constexpr const char* kColours[] = {kFaint, kCyan, kGreen, kRed};
+/** The kinds of accesses, and the colours of those that succeeded. */
+constexpr struct {
+    const char* name;
+    const char* colour;
+} kKinds[] = {{"probe", "\033[2m"}, {"read", "\033[36m"}, {"write", "\033[32m"}, {"refused", kRed}};
 
 /** @return whether to use colours: on a terminal, unless NO_COLOR is set (no-color.org). */
 bool wantsColour() {
@@ -42,11 +38,11 @@ void print(const NodeAccess& access, bool isColoured) {
     if (!access.clock.empty()) line << std::setw(12) << cli::printable(access.clock) << "  ";
     line << std::left << std::setw(30)
          << (access.node.empty() ? "a call" : cli::printable(access.node)) << "  " << std::setw(7)
-         << kKinds[access.kind] << "  ";
+         << kKinds[access.kind].name << "  ";
     if (access.kind != NodeAccess::kProbe) line << simulator::quote(access.bytes) << "  ";
     line << (isGood ? "ok" : cli::printable(access.error));
     std::cout << (!isColoured ? ""
-                  : isGood    ? kColours[access.kind]
+                  : isGood    ? kKinds[access.kind].colour
                               : kRed)
               << line.str() << (isColoured ? kPlain : "") << std::endl;
 }
@@ -54,7 +50,8 @@ void print(const NodeAccess& access, bool isColoured) {
 /** Prints the access that each line ends; warns once if no line does. */
 class Printer {
   public:
-    explicit Printer(const Traffic& traffic) : mTraffic(traffic), mReader(traffic.isLog()) {}
+    Printer(const Client& client, const Traffic& traffic)
+        : mClient(client), mTraffic(traffic), mReader(traffic.isLog()) {}
 
     /** Takes what has come; an incomplete line is kept until the rest comes. */
     void take(const std::string& part) {
@@ -78,10 +75,9 @@ class Printer {
     void end() {
         if (mIsKnown || mLines == 0) return;
         mIsKnown = true;
-        std::cerr << "vibratorctl: watch: " << cli::printable(mTraffic.file()) << ": "
-                  << (mTraffic.isLog() ? "no log of the daemon"
-                                       : "no trace of the driver; for a log give --log, too")
-                  << std::endl;
+        mClient.warn("watch: " + mTraffic.file() +
+                     (mTraffic.isLog() ? ": no log of the daemon"
+                                       : ": no trace of the driver; for a log give --log, too"));
     }
 
   private:
@@ -94,6 +90,7 @@ class Printer {
         if (access) print(*access, mIsColoured);
     }
 
+    const Client& mClient;
     const Traffic& mTraffic;
     AccessReader mReader;
     std::string mLine;
@@ -145,7 +142,7 @@ class GrowingFile {
 };
 
 /** Shows accesses as they come, or only those that are there. @return the exit code. */
-int watch(const Traffic& traffic, bool fromStart, bool once) {
+int watch(const Client& client, const Traffic& traffic, bool fromStart, bool once) {
     const std::string name = traffic.file();
     const bool isInput = name == "-";
     GrowingFile file(name);
@@ -155,7 +152,7 @@ int watch(const Traffic& traffic, bool fromStart, bool once) {
                   << " in " << (isInput ? "standard input" : cli::printable(name))
                   << "; Ctrl-C ends it." << std::endl;
     }
-    Printer printer(traffic);
+    Printer printer(client, traffic);
     while (std::cout) {
         const std::string part = file.read();
         printer.take(part);
@@ -167,19 +164,19 @@ int watch(const Traffic& traffic, bool fromStart, bool once) {
     }
     printer.takeIncomplete();
     printer.end();
-    return kSuccess;
+    return cli::kSuccess;
 }
 
 }  // namespace
 
 void addWatch(Client& client) {
-    cli::Command& command = client.program().command(
+    cli::Command& command = client.command(
             kTools, "watch", "show the service's node traffic as it comes", "--all --once");
-    const Traffic traffic(&command);
+    const Traffic traffic(command);
     const auto fromStart = command.flag("--all", "also show what is there already");
     const auto once = command.flag("--once", "end instead of waiting for more");
     command.note(
             "A trace does not show the calls that the service refused; the daemon's log, read with "
             "--log, does.");
-    command.withoutJson().run([=] { return watch(traffic, *fromStart, *once); });
+    command.withoutJson().run([=, &client] { return watch(client, traffic, *fromStart, *once); });
 }
