@@ -23,7 +23,7 @@ namespace {
 
 /** Descriptors that clients never get, so that the objects can always open their files. */
 constexpr size_t kReservedDescriptors = 32;
-/** Connections that only root and the system user get, or half of all if that is less. */
+/** Connections that only root and the system user get. */
 constexpr size_t kReservedConnections = 16;
 constexpr size_t kMostConnectionsPerUid = 128;
 /** New connections between two rounds of calls, so that a flood of them does not delay calls. */
@@ -50,10 +50,6 @@ size_t descriptorLimit() {
     rlimit limit{};
     getrlimit(RLIMIT_NOFILE, &limit);
     return static_cast<size_t>(std::min<rlim_t>(limit.rlim_cur, 65536));
-}
-
-size_t reserved(size_t mostConnections) {
-    return std::min(mostConnections / 2, kReservedConnections);
 }
 
 int openSpare() {
@@ -303,33 +299,28 @@ void LocalServer::acceptAll(Endpoint* listener) {
         socklen_t size = sizeof(owner);
         if (peek(socket) < 0 || getsockopt(socket, SOL_SOCKET, SO_PEERCRED, &owner, &size) != 0) {
             close(socket);
-        } else if (!admit(socket, owner.uid, listener->object)) {
-            return;
+            continue;
+        }
+        Share& share = mShares[owner.uid];
+        share.uid = owner.uid;
+        ++share.connections;
+        ++mConnections;
+        Endpoint& client =
+                mClients[socket] = {socket, listener->object, &share, nullptr, false, ++mClock};
+        epoll_event event{};
+        event.events = EPOLLIN | EPOLLRDHUP;
+        event.data.ptr = &client;
+        if (!makeRoom(&client) || epoll_ctl(mEpoll, EPOLL_CTL_ADD, socket, &event) != 0) {
+            __android_log_print(ANDROID_LOG_WARN, kLogTag, "uid %u gets no further connection",
+                                owner.uid);
+            drop(&client);
         }
     }
 }
 
-bool LocalServer::admit(int socket, uid_t uid, const sp<BHwBinder>& object) {
-    Share& share = mShares[uid];
-    share.uid = uid;
-    ++share.connections;
-    ++mConnections;
-    const bool isRoomLeft =
-            share.connections < mMostPerUid && mConnections < mMost - reserved(mMost);
-    Endpoint& client = mClients[socket] = {socket, object, &share, nullptr, false, ++mClock};
-    epoll_event event{};
-    event.events = EPOLLIN | EPOLLRDHUP;
-    event.data.ptr = &client;
-    if (!makeRoom(&client) || epoll_ctl(mEpoll, EPOLL_CTL_ADD, socket, &event) != 0) {
-        __android_log_print(ANDROID_LOG_WARN, kLogTag, "uid %u gets no further connection", uid);
-        drop(&client);
-    }
-    return isRoomLeft;
-}
-
 bool LocalServer::makeRoom(const Endpoint* newcomer) {
     const Share* share = newcomer->share;
-    const size_t kept = isPrivileged(share->uid) ? 0 : reserved(mMost);
+    const size_t kept = isPrivileged(share->uid) ? 0 : std::min(mMost / 2, kReservedConnections);
     if (share->connections <= mMostPerUid) {
         if (mConnections <= mMost - kept) return true;
         // The uid that has most gives way; that may be the newcomer's own.

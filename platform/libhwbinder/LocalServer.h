@@ -119,11 +119,6 @@ class LocalServer {
     bool reply(int socket);
 
     void acceptAll(Endpoint* listener);
-    /**
-     * @return whether the next one needs nobody's place. Else it must wait until what clients have
-     *     closed meanwhile has been noticed.
-     */
-    bool admit(int socket, uid_t uid, const sp<BHwBinder>& object);
     bool makeRoom(const Endpoint* newcomer);
     Endpoint* oldestClient(const Share* share, const Endpoint* newcomer, bool onlyIdle);
     void refuseOne(int listener);

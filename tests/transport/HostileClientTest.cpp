@@ -25,6 +25,8 @@ using namespace raw;
 using ::android::hardware::Packet;
 
 constexpr size_t kChainLength = 7;
+/** Of one user. */
+constexpr int kMostConnections = 128;
 
 class HostileClientTest : public TransportTest {
   protected:
@@ -165,7 +167,7 @@ TEST_F(HostileClientTest, IdleConnectionsGiveWayAndRootIsNeverLockedOut) {
 
 TEST_F(HostileClientTest, OldestIdleConnectionOfAUserGivesWay) {
     serve();
-    std::vector<RawClient> clients = connected(128);
+    std::vector<RawClient> clients = connected(kMostConnections);
     ASSERT_TRUE(clients[0].answersPing()) << "it is not the oldest any more";
     clients.push_back(rawClient());
     EXPECT_TRUE(clients.back().answersPing());
@@ -180,15 +182,15 @@ TEST_F(HostileClientTest, ConnectionsThatTheirClientsHaveClosedGiveWayFirst) {
     const RawClient other = rawClient();
     EXPECT_TRUE(other.answersPing());
     ASSERT_TRUE(!isRoot || seteuid(2000) == 0);
-    const std::vector<RawClient> living = connected(80);
+    const std::vector<RawClient> living = connected(kMostConnections - (isRoot ? 40 : 41));
     std::vector<RawClient> closed = connected(40);
     stopServer();
     closed.clear();
-    for (int i = 0; i < 200; ++i)
-        rawClient();
     std::vector<RawClient> newcomers;
     for (int i = 0; i < 40; ++i)
         newcomers.push_back(rawClient());
+    for (int i = 0; i < 200; ++i)
+        rawClient();
     for (uint32_t i = 0; i < 3; ++i)
         EXPECT_TRUE(other.send(request(kV10, kOn, {1001 + i})));
     EXPECT_TRUE(living[0].send(request(kV10, kOn, {1000})));
@@ -206,7 +208,7 @@ TEST_F(HostileClientTest, ConnectionsThatTheirClientsHaveClosedGiveWayFirst) {
 TEST_F(HostileClientTest, FloodOfConnectionsCostsNobodyACall) {
     using Clock = std::chrono::steady_clock;
     serve();
-    const std::vector<RawClient> idle = connected(100);
+    const std::vector<RawClient> idle = connected(kMostConnections / 2);
     const RawClient polite = rawClient();
     EXPECT_TRUE(polite.answersPing());
     const size_t descriptors = mServer.descriptors();
