@@ -14,7 +14,6 @@
 #include <fstream>
 #include <iomanip>
 #include <iterator>
-#include <regex>
 #include <sstream>
 #include <stdexcept>
 
@@ -114,8 +113,18 @@ std::string runGnuplot(const std::string& script) {
     throw std::runtime_error("gnuplot failed: " + cli::printable(complaint.c_str()));
 }
 
+/** Replaces the first part of a text that begins and ends so. @return whether there was one. */
+bool replacePart(std::string* text, const std::string& begin, const std::string& end,
+                 const std::string& with) {
+    const size_t from = text->find(begin);
+    const size_t to = text->find(end, from);
+    if (to == std::string::npos) return false;
+    text->replace(from, to + end.size() - from, with);
+    return true;
+}
+
 /** Gives an SVG a title, a description, and dark colours for readers who prefer them. */
-std::string described(const Timeline& timeline, const std::string& svg) {
+std::string described(const Timeline& timeline, std::string svg) {
     constexpr size_t kMostCalls = 20;
     std::string calls;
     for (size_t i = 0; i < timeline.marks.size() && i < kMostCalls; ++i) {
@@ -129,10 +138,11 @@ std::string described(const Timeline& timeline, const std::string& svg) {
                              (note.empty() ? "" : " ") + note +
                              "</desc>\n<style>@media (prefers-color-scheme: dark) "
                              "{ svg { filter: invert(1) hue-rotate(180deg) } }</style>";
-    const std::string text =
-            std::regex_replace(svg, std::regex("<title>.*</title>\\s*<desc>.*</desc>"), head);
+    replacePart(&svg, "<title>", "</desc>", head);
     // Names without a meaning, which screen readers would read out.
-    return std::regex_replace(text, std::regex("<title>gnuplot_plot_[0-9]+</title>"), "");
+    while (replacePart(&svg, "<title>gnuplot_plot_", "</title>", "")) {
+    }
+    return svg;
 }
 
 }  // namespace
