@@ -134,10 +134,10 @@ size_t ChildProcess::descriptors() const {
 
 size_t ChildProcess::residentKiB() const {
     std::ifstream sizes("/proc/" + std::to_string(mPid) + "/statm");
-    size_t all = 0;
-    size_t resident = 0;
-    sizes >> all >> resident;
-    return resident * static_cast<size_t>(getpagesize()) / 1024;
+    size_t pages = 0;
+    // The second number, after the size of all.
+    sizes >> pages >> pages;
+    return pages * static_cast<size_t>(getpagesize()) / 1024;
 }
 
 bool eventually(const std::function<bool()>& condition) {
