@@ -479,20 +479,40 @@ TEST(PlotTest, TextFitsTheColumns) {
 }
 
 TEST_F(ToolsTest, PicturesShowTheCallsInTheirPlaces) {
-    createDriver();
-    start();
-    run({"play", "-"},
-        "on 200\nwait 300\nclick light\nengine 10000 100,20000,0,0\nwait 200\npattern 3");
+    // Without a text it is probed.
+    const std::tuple<const char*, const char*, std::string> accesses[] = {
+            {"8.000", "duration", "200"},
+            {"8.000", "activate", "1"},
+            {"8.300", "duration", "20"},
+            {"8.300", "activate", "1"},
+            {"8.300", "intensity", ""},
+            {"8.300", "intensity", "1379"},
+            {"8.305", "haptic_engine", "4 100 20000 0 0"},
+            {"8.305", "duration", "1"},
+            {"8.305", "activate", "1"},
+            {"8.505", "intensity", "10000"},
+            {"8.505", "cp_trigger_index", "3"},
+            {"8.505", "duration", "1000"},
+            {"8.505", "activate", "1"},
+    };
+    std::string trace;
+    for (const auto& [time, node, text] : accesses) {
+        const std::string begin = std::string(time) + " leds/" + node;
+        trace += begin + " open O_RDWR = 0\n";
+        if (!text.empty()) {
+            trace += begin + " write \"" + text + "\\n\" = " + std::to_string(text.size() + 1) +
+                     '\n';
+        }
+        trace += begin + " close = 0\n";
+    }
     pugi::xml_document svg;
-    ASSERT_TRUE(svg.load_string(run({"plot", "-o", "-"}).output.c_str()));
+    ASSERT_TRUE(svg.load_string(run({"plot", "-", "-o", "-"}, trace).output.c_str()));
     const pugi::xml_node root = svg.child("svg");
-    EXPECT_EQ(
-            std::string(root.child_value("title")).find("What the driver was told: 4 calls in 1."),
-            0U);
-    EXPECT_EQ(std::string(root.child_value("desc"))
-                      .find("Strength over time: on 200 at 0 ms; click light at 3"),
-              0U)
-            << root.child_value("desc");
+    EXPECT_EQ(root.child_value("title"),
+              std::string("What the driver was told: 4 calls in 1.505 s"));
+    EXPECT_EQ(root.child_value("desc"),
+              std::string("Strength over time: on 200 at 0 ms; click light at 300 ms; engine, 1 "
+                          "packet at 305 ms; pattern 3 at 505 ms."));
     EXPECT_NE(std::string(root.child_value("style")).find("dark"), std::string::npos);
     const auto texts = textsOf(svg);
     for (const char* text :
