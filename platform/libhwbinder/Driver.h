@@ -75,7 +75,6 @@ std::string& lookupError();
 class CallerIdentity {
   public:
     CallerIdentity(uid_t uid, pid_t pid)
-        // Without clearCallingIdentity, which makes system calls for this process's own identity.
         : mBefore(IPCThreadState::identityToken(IPCThreadState::self()->getCallingUid(),
                                                 IPCThreadState::self()->getCallingPid())) {
         IPCThreadState::self()->restoreCallingIdentity(IPCThreadState::identityToken(uid, pid));

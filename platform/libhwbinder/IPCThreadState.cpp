@@ -11,13 +11,6 @@ IPCThreadState* IPCThreadState::self() {
     return &state;
 }
 
-int64_t IPCThreadState::clearCallingIdentity() {
-    const int64_t token = identityToken(mCallingUid, mCallingPid);
-    mCallingUid = getuid();
-    mCallingPid = getpid();
-    return token;
-}
-
 void IPCThreadState::restoreCallingIdentity(int64_t token) {
     mCallingUid = static_cast<uid_t>(static_cast<uint64_t>(token) >> 32);
     mCallingPid = static_cast<pid_t>(token & 0xffffffff);

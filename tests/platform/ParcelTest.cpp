@@ -12,7 +12,7 @@ using ::android::hardware::Parcel;
 TEST(ParcelTest, WhatIsReadIsWhatWasWritten) {
     Parcel parcel;
     parcel.writeUint8(2);
-    parcel.writeString16("text", 4);
+    parcel.writeString16("t\x80xt", 4);
     parcel.writeInt64(-5);
     parcel.setDataPosition(0);
     bool flag = false;
@@ -20,7 +20,7 @@ TEST(ParcelTest, WhatIsReadIsWhatWasWritten) {
     EXPECT_TRUE(flag) << "any byte but 0";
     std::string text;
     EXPECT_EQ(parcel.readString16(&text), android::OK);
-    EXPECT_EQ(text, "text");
+    EXPECT_EQ(text, "t?xt");
     uint64_t number = 0;
     EXPECT_EQ(parcel.readUint64(&number), android::OK);
     EXPECT_EQ(static_cast<int64_t>(number), -5);

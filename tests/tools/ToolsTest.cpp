@@ -62,21 +62,27 @@ class ToolsTest : public ServiceTest {
 TEST_F(ToolsTest, InterruptedScoresStopTheMotor) {
     createDriver();
     start();
-    std::ofstream(mDirectory.path() + "/long") << "on 60000\nwait 60000";
-    for (const int signal : {SIGINT, SIGTERM}) {
-        const std::string errors = mDirectory.path() + "/errors" + std::to_string(signal);
+    const std::string file = mDirectory.path() + "/long";
+    std::ofstream(file) << "on 60000\nwait 60000";
+    for (const auto& [signal, isTwice] :
+         {std::pair(SIGINT, false), std::pair(SIGTERM, false), std::pair(SIGINT, true)}) {
+        const std::string errors = file + std::to_string(signal) + (isTwice ? "twice" : "");
         // A shell starts what runs in its background with some of these ignored.
         ::signal(signal, SIG_DFL);
         ChildProcess player;
-        player.startProgram({"/bin/bash", "-c", "exec \"$0\" play \"$1\" >/dev/null", VIBRATORCTL,
-                             mDirectory.path() + "/long"},
+        player.startProgram({"/bin/bash", "-c", "exec \"$0\" play \"$1\" --timeout 60 >\"$2\"",
+                             VIBRATORCTL, file, errors + ".output"},
                             errors, {});
-        ASSERT_TRUE(eventually([&] { return wasTold("1"); }));
+        ASSERT_TRUE(eventually([&] { return readFile(errors + ".output") == "on 60000: OK\n"; }));
+        if (isTwice) ::kill(mService.pid(), SIGSTOP);
         ::kill(player.pid(), signal);
-        ASSERT_TRUE(eventually([&] { return !player.isAlive(); }));
+        ASSERT_TRUE(eventually([&, number = signal, again = isTwice] {
+            if (again) ::kill(player.pid(), number);
+            return !player.isAlive();
+        }));
+        if (isTwice) break;
         // In the first or the second line.
         const std::string said = readFile(errors);
-        const std::string file = mDirectory.path() + "/long";
         EXPECT_EQ(said.find("vibratorctl: play: interrupted at " + file + ":"), 0U) << said;
         EXPECT_NE(said.find(":1; the motor is stopped\n"), std::string::npos) << said;
         EXPECT_TRUE(wasTold("0"));
@@ -122,7 +128,8 @@ TEST_F(ToolsTest, WatchShowsTheSameByTraceAndByLog) {
 
     const std::string green = "\033[32m";
     const std::string watch = "watch --all --once";
-    EXPECT_NE(onTerminal("", watch).find(green), std::string::npos);
+    for (const char* unset : {"", "NO_COLOR="})
+        EXPECT_NE(onTerminal(unset, watch).find(green), std::string::npos) << unset;
     EXPECT_EQ(onTerminal("NO_COLOR=1", watch).find(green), std::string::npos);
     EXPECT_EQ(run({"watch", "--all", "--once"}).output.find('\033'), std::string::npos);
 }
@@ -141,7 +148,7 @@ TEST_F(ToolsTest, WatchFollowsAFileThatGrowsAndBeginsAnew) {
     };
     const std::string line = "  leds/state                      probe    ENOENT\n";
     EXPECT_TRUE(shows("         1.5" + line)) << readFile(shown);
-    std::ofstream(traceFile(), std::ios::app) << "en O_RDWR = -1 ENOENT\n";
+    std::ofstream(traceFile(), std::ios::app) << "en O_RDWR = -1 ENOENT\n3.5 le";
     EXPECT_TRUE(shows("         2.5" + line)) << readFile(shown);
     std::ofstream(traceFile()) << access("0.5");
     EXPECT_TRUE(shows("         0.5" + line)) << readFile(shown);
@@ -484,30 +491,20 @@ TEST(PlotTest, TextFitsTheColumns) {
 }
 
 TEST_F(ToolsTest, PicturesShowTheCallsInTheirPlaces) {
-    // Without a text it is probed.
-    const std::tuple<const char*, const char*, std::string> accesses[] = {
-            {"8.000", "duration", "200"},
-            {"8.000", "activate", "1"},
-            {"8.300", "duration", "20"},
-            {"8.300", "activate", "1"},
-            {"8.300", "intensity", ""},
-            {"8.300", "intensity", "1379"},
-            {"8.305", "haptic_engine", "4 100 20000 0 0"},
-            {"8.305", "duration", "1"},
-            {"8.305", "activate", "1"},
-            {"8.505", "intensity", "10000"},
-            {"8.505", "cp_trigger_index", "3"},
-            {"8.505", "duration", "1000"},
-            {"8.505", "activate", "1"},
-    };
+    // Times, nodes and what they are told; a question mark is a probe.
+    std::istringstream accesses(
+            "8 duration 200,8 activate 1,"
+            "8.3 duration 20,8.3 activate 1,8.3 intensity ?,8.3 intensity 1379,"
+            "8.305 haptic_engine 4 100 20000 0 0,8.305 duration 1,8.305 activate 1,"
+            "8.505 intensity 10000,8.505 cp_trigger_index 3,8.505 duration 1000,8.505 activate 1");
     std::string trace;
-    for (const auto& [time, node, text] : accesses) {
-        const std::string begin = std::string(time) + " leds/" + node;
+    for (std::string time, node, text; accesses >> time >> node >> std::ws;) {
+        std::getline(accesses, text, ',');
+        const std::string begin = time + " leds/" + node;
         trace += begin + " open O_RDWR = 0\n";
-        if (!text.empty()) {
+        if (text != "?")
             trace += begin + " write \"" + text + "\\n\" = " + std::to_string(text.size() + 1) +
                      '\n';
-        }
         trace += begin + " close = 0\n";
     }
     pugi::xml_document svg;
@@ -575,6 +572,9 @@ TEST_F(ToolsTest, PlotsGoToFilesAndToTheTerminal) {
     const std::string text = run({"plot", traceFile()}).output;
     EXPECT_NE(text.find("  off\n"), std::string::npos) << text;
     EXPECT_EQ(run({"plot", "-"}, readFile(traceFile())).output, text);
+    std::string shown = onTerminal("", "plot");
+    shown.erase(std::remove(shown.begin(), shown.end(), '\r'), shown.end());
+    EXPECT_EQ(shown, text) << "80 columns there, too";
     EXPECT_NE(run({"plot", "--log", logFile()}).output.find("The log has no times"),
               std::string::npos);
     EXPECT_EQ(run({"plot", "--from", "1ms"}).output.find("What the driver was told: 1 call in "),

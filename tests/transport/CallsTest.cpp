@@ -10,6 +10,7 @@
 #include <chrono>
 #include <csignal>
 #include <ctime>
+#include <filesystem>
 #include <thread>
 
 // Runs on sockets everywhere, and on the kernel's binder in a virtual machine.
@@ -94,6 +95,8 @@ TEST_F(CallsTest, BaseOperationsAnswerForTheObject) {
     EXPECT_TRUE(mClient->debug(nullptr, {"one", "", "three"}).isOk());
     EXPECT_EQ(mClient->perform_1_1({}, {}, nullptr).description(),
               "Null synchronous callback passed.");
+    EXPECT_EQ(android::hardware::Status::fromStatusT(-EPERM).description(),
+              "Operation not permitted");
 }
 
 TEST_F(CallsTest, ObjectIsFoundUnderEveryInterfaceOfItsChain) {
@@ -113,6 +116,9 @@ TEST_F(CallsTest, ObjectIsFoundUnderEveryInterfaceOfItsChain) {
     ASSERT_NE(manager, nullptr);
     EXPECT_EQ(sp<IDaxVibrator>(IDaxVibrator::castFrom(sp<IBase>(manager))), nullptr);
 
+    // What a daemon that died in its start has left.
+    std::filesystem::create_symlink(kChain[0] + ".default",
+                                    mDirectory.path() + "/" + kChain[5] + ".default~");
     std::vector<std::string> instances;
     manager->listByInterface(kChain[5], [&](const auto& list) {
         for (const auto& each : list)
@@ -158,8 +164,9 @@ TEST_F(CallsTest, ClientsMayDieInACall) {
         EXPECT_TRUE(eventually([&] { return readFile(state).find(") S ") != std::string::npos; }));
     }
     ::kill(mServer.pid(), SIGCONT);
-    EXPECT_TRUE(eventually([&] { return mServer.descriptors() <= before; }));
     EXPECT_TRUE(answers());
+    // The connections of the dead have gone, and that of the client that has just asked.
+    EXPECT_TRUE(eventually([&] { return mServer.descriptors() <= before; }));
 }
 
 /** Remembers the news of a death. */
@@ -175,6 +182,8 @@ struct Recipient : hidl_death_recipient {
 TEST_F(CallsTest, DeathIsToldToThoseWhoAskedAndTheSuccessorIsFound) {
     const sp<Recipient> told = new Recipient;
     const sp<Recipient> untold = new Recipient;
+    const std::vector<DaxHapticEnginePacket> tooMany(100'000);
+    EXPECT_FALSE(mClient->daxPerformHapticEngine(tooMany, 1).isOk()) << "which is no death";
     EXPECT_TRUE(mClient->linkToDeath(untold, 7));
     EXPECT_TRUE(mClient->linkToDeath(told, 42));
     EXPECT_TRUE(mClient->unlinkToDeath(untold));
@@ -224,6 +233,8 @@ TEST_F(CallsTest, RegistrationIsToldToThoseWhoAsked) {
     const auto manager = android::hardware::defaultServiceManager1_2();
     EXPECT_TRUE(manager->unregisterForNotifications(kChain[0], "default", notification));
     EXPECT_FALSE(manager->unregisterForNotifications(kChain[0], "default", notification));
+    EXPECT_TRUE(manager->registerForNotifications(kChain[0], "", notification));
+    EXPECT_TRUE(manager->unregisterForNotifications("", "", notification));
 }
 
 TEST_F(CallsTest, SearchWaitsForAServiceThatIsToCome) {

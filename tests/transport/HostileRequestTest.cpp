@@ -279,6 +279,13 @@ TEST_P(HostileRequestTest, BufferIsReadAsNothingElse) {
     RawMessage debug = RawMessage::to(raw::kBase);
     debug.add("a number");
     EXPECT_EQ(call(debug, raw::kDebug), kNoData);
+    for (const char end : {'\0', 'x'}) {
+        RawMessage text = RawMessage::to(raw::kBase);
+        text.head += bytesOf(uint64_t{0});
+        text.addList(1, bytesOf(uint64_t{0}) + bytesOf(uint64_t{4}));
+        text.add(std::string("text") + end, true, 1);
+        EXPECT_EQ(call(text, raw::kDebug), end == '\0' ? android::OK : kBadValue);
+    }
     if (!isManager()) return;
     RawMessage add = RawMessage::to(raw::kManager);
     add.addString("name");

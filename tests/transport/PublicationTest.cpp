@@ -62,6 +62,7 @@ TEST_F(PublicationTest, NameGoesToTheNextWhenItsHolderHasGone) {
     fs::create_symlink("another", inherited);
     serve();
     EXPECT_EQ(fs::read_symlink(inherited), kName);
+    EXPECT_FALSE(fs::is_symlink(mDirectory.path() + "/android.hidl.base@1.0::IBase.default"));
     ChildProcess second;
     second.startProgram({SERVICE}, mDirectory.path() + "/second", {});
     const auto secondsLog = [&] { return readFile(mDirectory.path() + "/second"); };
@@ -182,6 +183,11 @@ TEST_F(PublicationTest, ServerOfAStrangerIsNotCalled) {
     EXPECT_NE(whyNot().find(": served by uid 2000, to whom the directory does not belong"),
               std::string::npos)
             << whyNot();
+    ASSERT_EQ(chmod(mDirectory.path().c_str(), 0755), 0);
+    host::setCallTimeout(std::chrono::milliseconds(20));
+    const auto isServed = [] { return whyNot().find("served by") == std::string::npos ? 0 : 1; };
+    EXPECT_EQ(runAs(2000, isServed), 0) << "it is his own";
+    host::setCallTimeout(std::chrono::milliseconds(0));
     close(listener);
 }
 

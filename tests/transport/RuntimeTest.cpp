@@ -23,7 +23,9 @@ namespace {
 using ::android::sp;
 using ::android::wp;
 using ::android::hardware::BpHwBinder;
+using ::android::hardware::hidl_handle;
 using ::android::hardware::hidl_string;
+using ::android::hardware::hidl_vec;
 using ::android::hardware::IBinder;
 using ::android::hardware::ProcessState;
 using ::android::hardware::Return;
@@ -39,6 +41,9 @@ struct Slow : IServiceNotification {
         ++calls;
         return ::android::hardware::Void();
     }
+    /** Ends the process in the call. */
+    Return<void> debug(const hidl_handle&, const hidl_vec<hidl_string>&) override { _exit(0); }
+
     std::atomic<int> now = 0;
     std::atomic<int> most = 0;
     std::atomic<int> calls = 0;
@@ -59,6 +64,18 @@ TEST_F(RuntimeTest, DeviceThatCannotBeOpenedServesNothingHoweverOften) {
         for (int i = 0; i < 300; ++i)
             driver.serve();
     }).join();
+}
+
+TEST_F(RuntimeTest, ObjectThatHasGoneIsNotGivenAgain) {
+    sp<Slow> object = new Slow;
+    const wp<Slow> kept = object;
+    EXPECT_EQ(kept.promote(), object);
+    object = nullptr;
+    EXPECT_EQ(kept.promote(), nullptr);
+    const sp<IBinder> proxy = ProcessState::self()->getStrongProxyForHandle(4'000'000'001);
+    static_cast<void>(sp<IBinder>(new BpHwBinder(4'000'000'001)));
+    EXPECT_EQ(ProcessState::self()->getStrongProxyForHandle(4'000'000'001), proxy)
+            << "the end of another changes nothing";
 }
 
 struct Untold : IBinder::DeathRecipient {
@@ -95,12 +112,15 @@ TEST_F(RuntimeTest, NameThatIsTakenIsWaitedForByAServerThatIsIdle) {
         if (holder->registerAsService("taken") == android::OK) ready();
         android::hardware::joinRpcThreadpool();
     });
+    android::hardware::configureRpcThreadpool(1, false);
     ProcessState::self()->startThreadPool();
     // Now it waits, with nothing to do.
     std::this_thread::sleep_for(milliseconds(50));
     const sp<Slow> second = new Slow;
     EXPECT_NE(second->registerAsService("taken"), android::OK);
-    first.kill();
+    const auto victim = IServiceNotification::tryGetService("taken");
+    ASSERT_NE(victim, nullptr);
+    EXPECT_TRUE(victim->debug(nullptr, {}).isDeadObject());
     EXPECT_TRUE(eventually([&] {
         const auto client = IServiceNotification::tryGetService("taken");
         return client != nullptr && client->ping().isOk();

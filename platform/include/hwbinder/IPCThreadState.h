@@ -18,14 +18,9 @@ class IPCThreadState {
     /** @return uid of the caller; this process's own outside a call. */
     uid_t getCallingUid() const { return mCallingUid; }
 
-    /**
-     * Makes this process its own caller until the identity is restored.
-     *
-     * @return token for restoreCallingIdentity: the uid in the upper, the pid in the lower 32 bits.
-     */
-    int64_t clearCallingIdentity();
-    /** Takes the identity of a token that clearCallingIdentity or identityToken gave. */
+    /** Takes the identity of a token. */
     void restoreCallingIdentity(int64_t token);
+    /** @return a token: the uid in the upper, the pid in the lower 32 bits. */
     static int64_t identityToken(uid_t uid, pid_t pid) {
         return static_cast<int64_t>(uint64_t{uid} << 32 | static_cast<uint32_t>(pid));
     }
