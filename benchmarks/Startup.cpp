@@ -24,14 +24,17 @@ void start(benchmark::State& state, const char* program, const std::string& sock
            Answers answers) {
     for (auto _ : state) {
         unlink(socket.c_str());
-        const auto start = std::chrono::steady_clock::now();
+        const auto begin = std::chrono::steady_clock::now();
         const Child child([&] { execl(program, program, socket.c_str(), nullptr); });
         // A cheap check, since both processes share the processor.
         while (access(socket.c_str(), F_OK) != 0)
             usleep(20);
-        if (!answers()) state.SkipWithError("no answer");
+        if (!answers()) {
+            state.SkipWithError("no answer");
+            break;
+        }
         // Not counting the program's end, at the end of the scope.
-        const std::chrono::duration<double> time = std::chrono::steady_clock::now() - start;
+        const std::chrono::duration<double> time = std::chrono::steady_clock::now() - begin;
         state.SetIterationTime(time.count());
     }
 }

@@ -44,7 +44,7 @@ std::set<std::string> featuresOf(const std::string& list) {
 
 /** What driver to make. */
 struct DriverKind {
-    simulator::Layout layout;
+    Layout layout;
     simulator::Features features;
 };
 
@@ -78,15 +78,14 @@ class Simulator : public cli::Program {
     Simulator()
         : Program("vibrator-sim", VERSION,
                   "Makes a simulated kernel vibrator driver, runs the service on it, and shows "
-                  "what "
-                  "the driver was told.") {
+                  "what the driver was told.") {
         mDirectory = shared().file("--dir DIRECTORY",
                                    "directory of the driver, instead of the one in "
                                    "VIBRATOR_SIM_DIR",
                                    "");
         shared().note(
-                "Exit code: 0 done; 1 failed; 2 a mistake in the command line; run: that of "
-                "its command.");
+                "Exit code: 0 done; 1 failed; 2 a mistake in the command line; run: that of its "
+                "command.");
         addRun();
         addCreate();
         addShow();

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "libhwbinder/KernelDriver.h"
+#include "libhwbinder/LocalConnection.h"
 #include "transport/TransportTest.h"
 
 #include <android/hidl/manager/1.0/IServiceNotification.h>
@@ -7,7 +8,9 @@
 #include <hidl/HidlTransportSupport.h>
 #include <hidl/ServiceManagement.h>
 #include <hwbinder/BpHwBinder.h>
+#include <hwbinder/Parcel.h>
 #include <hwbinder/ProcessState.h>
+#include <sys/socket.h>
 
 #include <algorithm>
 #include <atomic>
@@ -23,9 +26,7 @@ namespace {
 using ::android::sp;
 using ::android::wp;
 using ::android::hardware::BpHwBinder;
-using ::android::hardware::hidl_handle;
 using ::android::hardware::hidl_string;
-using ::android::hardware::hidl_vec;
 using ::android::hardware::IBinder;
 using ::android::hardware::ProcessState;
 using ::android::hardware::Return;
@@ -41,9 +42,6 @@ struct Slow : IServiceNotification {
         ++calls;
         return ::android::hardware::Void();
     }
-    /** Ends the process in the call. */
-    Return<void> debug(const hidl_handle&, const hidl_vec<hidl_string>&) override { _exit(0); }
-
     std::atomic<int> now = 0;
     std::atomic<int> most = 0;
     std::atomic<int> calls = 0;
@@ -76,6 +74,16 @@ TEST_F(RuntimeTest, ObjectThatHasGoneIsNotGivenAgain) {
     static_cast<void>(sp<IBinder>(new BpHwBinder(4'000'000'001)));
     EXPECT_EQ(ProcessState::self()->getStrongProxyForHandle(4'000'000'001), proxy)
             << "the end of another changes nothing";
+}
+
+TEST(LocalConnectionTest, EndInPlaceOfAReplyIsADeath) {
+    int sockets[2];
+    ASSERT_EQ(socketpair(AF_UNIX, SOCK_SEQPACKET, 0, sockets), 0);
+    android::hardware::LocalConnection connection(sockets[0]);
+    // Not closed: the request that nobody has read would be an error of its own.
+    shutdown(sockets[1], SHUT_WR);
+    EXPECT_EQ(connection.transact(1, {}, nullptr, 0), android::DEAD_OBJECT);
+    close(sockets[1]);
 }
 
 struct Untold : IBinder::DeathRecipient {
@@ -118,9 +126,7 @@ TEST_F(RuntimeTest, NameThatIsTakenIsWaitedForByAServerThatIsIdle) {
     std::this_thread::sleep_for(milliseconds(50));
     const sp<Slow> second = new Slow;
     EXPECT_NE(second->registerAsService("taken"), android::OK);
-    const auto victim = IServiceNotification::tryGetService("taken");
-    ASSERT_NE(victim, nullptr);
-    EXPECT_TRUE(victim->debug(nullptr, {}).isDeadObject());
+    first.kill();
     EXPECT_TRUE(eventually([&] {
         const auto client = IServiceNotification::tryGetService("taken");
         return client != nullptr && client->ping().isOk();

@@ -26,8 +26,7 @@ class UsageError : public std::runtime_error {
   public:
     explicit UsageError(const std::string& what, std::optional<size_t> word = {})
         : runtime_error(what), index(word) {}
-    /** Of a mistake in one of several words: its index; how many there are, where one is missing.
-     */
+    /** Index of the word with the mistake; how many words there are, where one is missing. */
     const std::optional<size_t> index;
 };
 
