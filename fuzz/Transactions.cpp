@@ -15,8 +15,6 @@ using ::vendor::velmora::hardware::vibrator::V2_1::implementation::Vibrator;
 
 namespace {
 
-void keep(const uint8_t* /* bytes */, void* /* packet */) {}
-
 /** The input as a packet from a socket. */
 std::unique_ptr<Packet> packetOf(const uint8_t* data, size_t size) {
     auto packet = std::unique_ptr<Packet>(new Packet);
@@ -33,7 +31,7 @@ class Answering : public IBinder {
                       uint32_t /* flags */, TransactCallback /* callback */) override {
         mPacket = packetOf(mData, mSize);
         Packet::Header header;
-        return mPacket->unpack(&header, reply, keep, nullptr);
+        return mPacket->unpack(&header, reply);
     }
     status_t linkToDeath(const ::android::sp<DeathRecipient>&) override { return ::android::OK; }
     status_t unlinkToDeath(const ::android::sp<DeathRecipient>&) override { return ::android::OK; }
@@ -51,7 +49,7 @@ void request(const uint8_t* data, size_t size) {
     const auto packet = packetOf(data, size);
     Packet::Header header;
     Parcel arguments;
-    if (packet->unpack(&header, &arguments, keep, nullptr) != ::android::OK) return;
+    if (packet->unpack(&header, &arguments) != ::android::OK) return;
     const auto answer = std::unique_ptr<Packet>(new Packet);
     bool isSent = false;
     const auto send = [&](Parcel& results) {

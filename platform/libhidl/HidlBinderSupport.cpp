@@ -27,26 +27,21 @@ status_t readEmbeddedFromParcel(const hidl_string& text, const Parcel& parcel, s
     return static_cast<const char*>(buffer)[text.size()] == '\0' ? OK : BAD_VALUE;
 }
 
-status_t writeToParcel(const Status& status, Parcel* parcel) {
+namespace details {
+
+status_t writeException(const Status& status, Parcel* parcel) {
     const status_t written = parcel->writeInt32(status.exceptionCode());
-    if (written != OK || status.isOk()) return written;
-    const std::string& message = status.exceptionMessage();
+    if (written != OK) return written;
+    const std::string message = status.exceptionMessage();
     return parcel->writeString16(message.data(), message.size());
 }
 
-status_t readFromParcel(Status* status, const Parcel& parcel) {
-    // The stub of setHALInstrumentation sends a reply with nothing in it.
-    if (parcel.dataSize() == 0) return OK;
-    int32_t exception = Status::EX_NONE;
-    status_t read = parcel.readInt32(&exception);
-    if (read != OK || exception == Status::EX_NONE) return read;
+status_t readException(int32_t code, Status* status, const Parcel& parcel) {
     std::string message;
-    read = parcel.readString16(&message);
-    if (read == OK) *status = Status::fromExceptionCode(exception, message);
+    const status_t read = parcel.readString16(&message);
+    if (read == OK) *status = Status::fromExceptionCode(code, message);
     return read;
 }
-
-namespace details {
 
 sp<IBase> localObject(const sp<IBinder>& binder) {
     return static_cast<BnHwBase*>(binder->localBinder())->getImpl();

@@ -7,10 +7,10 @@
 
 namespace android::hardware {
 
-Status Status::fromExceptionCode(int32_t code, std::string message) {
+Status Status::fromExceptionCode(int32_t code, const std::string& message) {
     Status status;
     status.mException = code;
-    status.mMessage = std::move(message);
+    status.mMessage = std::make_shared<const std::string>(message);
     return status;
 }
 
@@ -20,15 +20,10 @@ Status Status::fromStatusT(status_t error) {
     return status;
 }
 
-void Status::setFromStatusT(status_t error) {
-    mException = error == OK ? EX_NONE : EX_TRANSACTION_FAILED;
-    mError = error;
-    mMessage.clear();
-}
-
 std::string Status::description() const {
     if (mException != EX_NONE && mException != EX_TRANSACTION_FAILED) {
-        return mMessage.empty() ? "exception " + std::to_string(mException) : mMessage;
+        const std::string message = exceptionMessage();
+        return message.empty() ? "exception " + std::to_string(mException) : message;
     }
     switch (mError) {
         case OK:

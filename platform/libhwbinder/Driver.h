@@ -75,15 +75,15 @@ std::string& lookupError();
 class CallerIdentity {
   public:
     CallerIdentity(uid_t uid, pid_t pid)
-        : mBefore(IPCThreadState::identityToken(IPCThreadState::self()->getCallingUid(),
-                                                IPCThreadState::self()->getCallingPid())) {
-        IPCThreadState::self()->restoreCallingIdentity(IPCThreadState::identityToken(uid, pid));
+        : mThread(IPCThreadState::self()), mBefore(mThread->callingIdentity()) {
+        mThread->restoreCallingIdentity(IPCThreadState::identityToken(uid, pid));
     }
-    ~CallerIdentity() { IPCThreadState::self()->restoreCallingIdentity(mBefore); }
+    ~CallerIdentity() { mThread->restoreCallingIdentity(mBefore); }
     CallerIdentity(const CallerIdentity&) = delete;
     CallerIdentity& operator=(const CallerIdentity&) = delete;
 
   private:
+    IPCThreadState* const mThread;
     const int64_t mBefore;
 };
 

@@ -9,7 +9,6 @@
 #include <cerrno>
 #include <csignal>
 #include <ctime>
-#include <functional>
 #include <utility>
 
 namespace android::hardware {
@@ -275,9 +274,8 @@ void KernelThread::serveCall(const binder_transaction_data& received) {
         if (!oneway && !replied) sendReply(results, nullptr);
         replied = true;
     };
-    // By reference, which is copied without memory from the heap.
-    const status_t status = object->transact(received.code, data, &reply,
-                                             received.flags & TF_ONE_WAY, std::ref(send));
+    const status_t status = object->BHwBinder::transact(received.code, data, &reply,
+                                                        received.flags & TF_ONE_WAY, send);
     if (oneway || replied) return;
     sendReply(reply, status == OK ? nullptr : &status);
 }

@@ -53,12 +53,14 @@ void giveBack(const uint8_t* /* bytes */, void* owner) {
 status_t take(SparePacket* packet, Parcel* reply) {
     Packet::Header header;
     status_t status = packet->unpack(&header, reply, giveBack, packet);
-    if (status == OK && (header.flags & TF_STATUS_CODE) != 0) {
-        const status_t read = reply->readInt32(&status);
-        reply->clear();
-        if (read != OK || status == OK) return FAILED_TRANSACTION;
+    if (status != OK) {
+        giveBack(nullptr, packet);
+        return status;
     }
-    return status;
+    if ((header.flags & TF_STATUS_CODE) == 0) return OK;
+    const status_t read = reply->readInt32(&status);
+    reply->clear();
+    return read == OK && status != OK ? status : FAILED_TRANSACTION;
 }
 
 template <typename Call>
@@ -75,22 +77,7 @@ LocalConnection::~LocalConnection() {
     close(mSocket);
 }
 
-status_t LocalConnection::transact(uint32_t code, const Parcel& data, Parcel* reply,
-                                   uint32_t flags) {
-    SparePacket* packet = takePacket();
-    const bool oneway = (flags & IBinder::FLAG_ONEWAY) != 0;
-    status_t status = packet->pack(code, flags, data);
-    if (status == OK) status = exchange(packet, oneway);
-    if (status != OK || oneway) {
-        giveBack(nullptr, packet);
-        return status;
-    }
-    if (reply != nullptr) return take(packet, reply);
-    Parcel unwanted;
-    return take(packet, &unwanted);
-}
-
-status_t LocalConnection::exchange(Packet* packet, bool oneway) {
+inline status_t LocalConnection::exchange(Packet* packet, bool oneway) {
     const std::lock_guard<std::mutex> lock(mMutex);
     if (mDead) return DEAD_OBJECT;
     // Until the exchange has succeeded: a late reply must not be taken for that of the next call.
@@ -107,6 +94,19 @@ status_t LocalConnection::exchange(Packet* packet, bool oneway) {
     }
     mDead = false;
     return OK;
+}
+
+status_t LocalConnection::transact(uint32_t code, const Parcel& data, Parcel* reply,
+                                   uint32_t flags) {
+    SparePacket* packet = takePacket();
+    const bool oneway = (flags & IBinder::FLAG_ONEWAY) != 0;
+    status_t status = packet->pack(code, flags, data);
+    if (status == OK) status = exchange(packet, oneway);
+    if (status != OK || oneway) {
+        giveBack(nullptr, packet);
+        return status;
+    }
+    return take(packet, reply);
 }
 
 }  // namespace android::hardware

@@ -16,7 +16,6 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
-#include <functional>
 
 namespace android::hardware {
 namespace {
@@ -64,8 +63,27 @@ int peek(int socket) {
     return size > 0 ? 1 : -1;
 }
 
-/** Releases a packet of the server's own, which is used again. */
-void keep(const uint8_t* /* bytes */, void* /* packet */) {}
+/** Receives a call and who makes it. @return whether there is one, whole. */
+bool receive(int socket, Packet* request, ucred* caller) {
+    iovec place{request->bytes, Packet::kMaxSize};
+    alignas(cmsghdr) char control[CMSG_SPACE(sizeof(ucred))];
+    msghdr message{};
+    message.msg_iov = &place;
+    message.msg_iovlen = 1;
+    message.msg_control = control;
+    message.msg_controllen = sizeof(control);
+    const ssize_t size = recvmsg(socket, &message, MSG_DONTWAIT | MSG_CMSG_CLOEXEC);
+    if (size <= 0 || (message.msg_flags & MSG_TRUNC) != 0) return false;
+    request->size = static_cast<size_t>(size);
+    const cmsghdr* credentials = CMSG_FIRSTHDR(&message);
+    if (credentials == nullptr || credentials->cmsg_level != SOL_SOCKET ||
+        credentials->cmsg_type != SCM_CREDENTIALS) {
+        // The caller is unknown.
+        return false;
+    }
+    memcpy(caller, CMSG_DATA(credentials), sizeof(*caller));
+    return true;
+}
 
 }  // namespace
 
@@ -226,35 +244,14 @@ void LocalServer::serveOneOfEach() {
     }
 }
 
-bool LocalServer::receive(int socket, ucred* caller) {
-    iovec place{mRequest->bytes, Packet::kMaxSize};
-    alignas(cmsghdr) char control[CMSG_SPACE(sizeof(ucred))];
-    msghdr message{};
-    message.msg_iov = &place;
-    message.msg_iovlen = 1;
-    message.msg_control = control;
-    message.msg_controllen = sizeof(control);
-    const ssize_t size = recvmsg(socket, &message, MSG_DONTWAIT | MSG_CMSG_CLOEXEC);
-    if (size <= 0 || (message.msg_flags & MSG_TRUNC) != 0) return false;
-    mRequest->size = static_cast<size_t>(size);
-    const cmsghdr* credentials = CMSG_FIRSTHDR(&message);
-    if (credentials == nullptr || credentials->cmsg_level != SOL_SOCKET ||
-        credentials->cmsg_type != SCM_CREDENTIALS) {
-        // The caller is unknown.
-        return false;
-    }
-    memcpy(caller, CMSG_DATA(credentials), sizeof(*caller));
-    return true;
-}
-
 bool LocalServer::serveCall(Endpoint* client) {
     client->lastUsed = ++mClock;
     const int socket = client->socket;
     ucred caller{};
-    if (!receive(socket, &caller)) return false;
+    if (!receive(socket, mRequest.get(), &caller)) return false;
 
     Packet::Header header;
-    status_t status = mRequest->unpack(&header, &mArguments, keep, nullptr);
+    status_t status = mRequest->unpack(&header, &mArguments);
     // The header of a malformed packet cannot be trusted, nor its oneway flag: it gets an answer.
     const bool oneway = status == OK && (header.flags & TF_ONE_WAY) != 0;
     bool isAlive = true;
@@ -268,9 +265,8 @@ bool LocalServer::serveCall(Endpoint* client) {
     };
     if (status == OK) {
         const CallerIdentity identity(caller.uid, caller.pid);
-        // By reference, which is copied without memory from the heap.
-        status = client->object->transact(header.code, mArguments, &mResults,
-                                          header.flags & TF_ONE_WAY, std::ref(send));
+        status = client->object->BHwBinder::transact(header.code, mArguments, &mResults,
+                                                     header.flags & TF_ONE_WAY, send);
     }
     if (!replied && status == OK) send(mResults);
     if (!replied) {

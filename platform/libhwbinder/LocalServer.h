@@ -4,7 +4,6 @@
 #include "Packet.h"
 
 #include <hwbinder/Binder.h>
-#include <sys/socket.h>
 
 #include <atomic>
 #include <cstddef>
@@ -115,7 +114,6 @@ class LocalServer {
     void unqueue(Endpoint* client);
     void serveOneOfEach();
     bool serveCall(Endpoint* client);
-    bool receive(int socket, ucred* caller);
     bool reply(int socket);
 
     void acceptAll(Endpoint* listener);

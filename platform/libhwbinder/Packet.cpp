@@ -6,10 +6,6 @@
 namespace android::hardware {
 namespace {
 
-constexpr size_t roundUp(size_t size) {
-    return (size + 7) & ~size_t{7};
-}
-
 /** @return whether the place of an object's address is in its parent's buffer. */
 bool isWithin(const binder_buffer_object& parent, const binder_buffer_object& object) {
     return object.parent_offset <= parent.length &&
@@ -28,32 +24,12 @@ bool setAddress(const uint8_t* parentObject, const binder_buffer_object& object)
 
 }  // namespace
 
-bool Packet::append(const void* source, size_t length) {
-    if (length > kMaxSize || roundUp(length) > kMaxSize - size) return false;
-    if (length == 0) return true;
-    size += roundUp(length);
-    // The padding of the last 8 bytes is zero.
-    memset(bytes + size - 8, 0, 8);
-    memcpy(bytes + size - roundUp(length), source, length);
-    return true;
-}
-
 bool Packet::clearAddress(size_t parentObject, const binder_buffer_object& object) {
     binder_buffer_object parent;
     memcpy(&parent, bytes + sizeof(Header) + parentObject, sizeof(parent));
     if (!isWithin(parent, object)) return false;
     memset(bytes + parent.buffer + object.parent_offset, 0, sizeof(object.buffer));
     return true;
-}
-
-status_t Packet::pack(uint32_t code, uint32_t flags, const Parcel& parcel) {
-    const size_t offsetsSize = parcel.offsetCount() * sizeof(binder_size_t);
-    const Header header{code, flags, static_cast<uint32_t>(parcel.dataSize()),
-                        static_cast<uint32_t>(offsetsSize)};
-    memcpy(bytes, &header, sizeof(header));
-    size = sizeof(header);
-    if (!append(parcel.data(), parcel.dataSize())) return FAILED_TRANSACTION;
-    return offsetsSize == 0 ? OK : packObjects(parcel);
 }
 
 status_t Packet::packObjects(const Parcel& parcel) {
@@ -88,33 +64,13 @@ void Packet::packStatus(status_t status) {
     pack(0, TF_STATUS_CODE, parcel);
 }
 
-status_t Packet::unpack(Header* header, Parcel* parcel, Parcel::ReleaseBuffer release,
-                        void* owner) {
-    status_t status = FAILED_TRANSACTION;
-    size_t offsetsAt = 0;
-    if (size >= sizeof(*header)) {
-        memcpy(header, bytes, sizeof(*header));
-        offsetsAt = sizeof(*header) + roundUp(header->dataSize);
-        const size_t buffersAt = offsetsAt + roundUp(header->offsetsSize);
-        if (header->dataSize % 4 == 0 && header->offsetsSize % sizeof(binder_size_t) == 0) {
-            const bool isAll = header->offsetsSize == 0 && buffersAt == size;
-            status = isAll ? OK : relocate(*header, buffersAt);
-        }
-    }
-    if (status != OK) {
-        release(bytes, owner);
-        return status;
-    }
-    parcel->ipcSetDataReference(bytes + sizeof(*header), header->dataSize,
-                                reinterpret_cast<const binder_size_t*>(bytes + offsetsAt),
-                                header->offsetsSize / sizeof(binder_size_t), release, owner);
-    return OK;
-}
-
-status_t Packet::relocate(const Header& header, size_t buffersAt) {
-    if (buffersAt > size) return FAILED_TRANSACTION;
+bool Packet::relocate(const Header& header) {
+    if (header.dataSize % 4 != 0 || header.offsetsSize % sizeof(binder_size_t) != 0) return false;
+    const size_t offsetsAt = sizeof(header) + roundUp(header.dataSize);
+    size_t buffersAt = offsetsAt + roundUp(header.offsetsSize);
+    if (buffersAt > size) return false;
     uint8_t* data = bytes + sizeof(header);
-    const auto* offsets = reinterpret_cast<const binder_size_t*>(data + roundUp(header.dataSize));
+    const auto* offsets = reinterpret_cast<const binder_size_t*>(bytes + offsetsAt);
     const size_t count = header.offsetsSize / sizeof(binder_size_t);
     size_t least = 0;
     for (size_t i = 0; i < count; ++i) {
@@ -123,23 +79,23 @@ status_t Packet::relocate(const Header& header, size_t buffersAt) {
         // Objects follow one another, and lie within the data at multiples of 4.
         if (offset < least || offset % 4 != 0 || offset > header.dataSize ||
             sizeof(object) > header.dataSize - offset) {
-            return FAILED_TRANSACTION;
+            return false;
         }
         least = offset + sizeof(object);
         memcpy(&object, data + offset, sizeof(object));
         if (object.hdr.type != BINDER_TYPE_PTR || object.length > size - buffersAt) {
-            return FAILED_TRANSACTION;
+            return false;
         }
         object.buffer = reinterpret_cast<binder_uintptr_t>(bytes + buffersAt);
         buffersAt += roundUp(object.length);
-        if (buffersAt > size) return FAILED_TRANSACTION;
+        if (buffersAt > size) return false;
         memcpy(data + offset, &object, sizeof(object));
         if ((object.flags & BINDER_BUFFER_FLAG_HAS_PARENT) == 0) continue;
         if (object.parent >= i || !setAddress(data + offsets[object.parent], object)) {
-            return FAILED_TRANSACTION;
+            return false;
         }
     }
-    return buffersAt == size ? OK : FAILED_TRANSACTION;
+    return buffersAt == size;
 }
 
 }  // namespace android::hardware

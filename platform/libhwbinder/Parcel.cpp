@@ -23,31 +23,24 @@ T* moveToHeap(T* array, const T* inlined, size_t count, size_t capacity) {
 
 }  // namespace
 
-void Parcel::freeMemory() {
+void Parcel::releaseMore() {
+    if (mRelease != nullptr) {
+        mRelease(mData, mOwner);
+        return;
+    }
     if (mData != mInlineData) free(mData);
     if (mOffsets != mInlineOffsets) free(mOffsets);
-}
-
-void Parcel::clear() {
-    releaseMemory();
-    mRelease = nullptr;
-    mData = mInlineData;
-    mSize = 0;
-    mCapacity = sizeof(mInlineData);
-    mOffsets = mInlineOffsets;
-    mOffsetCount = 0;
-    mOffsetCapacity = std::size(mInlineOffsets);
-    mPosition = 0;
-    mNextObject = 0;
-    mBinders.clear();
+    delete mBinders;
 }
 
 bool Parcel::reserve(size_t size) {
-    if (mRelease != nullptr || size < mSize) return false;
+    // What was received is not written to.
+    if (mCapacity == 0 || size < mSize) return false;
     const size_t capacity = std::max(size, 2 * mCapacity);
     uint8_t* larger = moveToHeap(mData, mInlineData, mSize, capacity);
     if (larger == nullptr) return false;
     mData = larger;
+    mHasMore = true;
     mCapacity = capacity;
     return true;
 }
@@ -74,6 +67,7 @@ bool Parcel::addOffset(size_t offset) {
         binder_size_t* larger = moveToHeap(mOffsets, mInlineOffsets, mOffsetCount, capacity);
         if (larger == nullptr) return false;
         mOffsets = larger;
+        mHasMore = true;
         mOffsetCapacity = capacity;
     }
     mOffsets[mOffsetCount++] = offset;
@@ -126,7 +120,9 @@ status_t Parcel::writeStrongBinder(const sp<IBinder>& binder) {
         object.binder = reinterpret_cast<binder_uintptr_t>(local->getWeakRefs());
         object.cookie = reinterpret_cast<binder_uintptr_t>(local);
     }
-    mBinders.push_back(binder);
+    if (mBinders == nullptr) mBinders = new std::vector<sp<IBinder>>;
+    mHasMore = true;
+    mBinders->push_back(binder);
     return writeObject(&object, sizeof(object));
 }
 

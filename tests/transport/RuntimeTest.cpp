@@ -82,7 +82,8 @@ TEST(LocalConnectionTest, EndInPlaceOfAReplyIsADeath) {
     android::hardware::LocalConnection connection(sockets[0]);
     // Not closed: the request that nobody has read would be an error of its own.
     shutdown(sockets[1], SHUT_WR);
-    EXPECT_EQ(connection.transact(1, {}, nullptr, 0), android::DEAD_OBJECT);
+    android::hardware::Parcel reply;
+    EXPECT_EQ(connection.transact(1, {}, &reply, 0), android::DEAD_OBJECT);
     close(sockets[1]);
 }
 

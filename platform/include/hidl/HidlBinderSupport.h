@@ -61,9 +61,24 @@ status_t readEmbeddedFromParcel(const hidl_vec<T>& list, const Parcel& parcel, s
                                      parentOffset + hidl_vec<T>::kOffsetOfBuffer, &buffer);
 }
 
+namespace details {
+status_t writeException(const Status& status, Parcel* parcel);
+status_t readException(int32_t code, Status* status, const Parcel& parcel);
+}  // namespace details
+
 /** Writes the exception code, and its text if it has one, with which a reply begins. */
-status_t writeToParcel(const Status& status, Parcel* parcel);
-status_t readFromParcel(Status* status, const Parcel& parcel);
+inline status_t writeToParcel(const Status& status, Parcel* parcel) {
+    if (!status.isOk()) return details::writeException(status, parcel);
+    return parcel->writeInt32(Status::EX_NONE);
+}
+inline status_t readFromParcel(Status* status, const Parcel& parcel) {
+    // The stub of setHALInstrumentation sends a reply with nothing in it.
+    if (parcel.dataSize() == 0) return OK;
+    int32_t code = Status::EX_NONE;
+    const status_t read = parcel.readInt32(&code);
+    if (read != OK || code == Status::EX_NONE) return read;
+    return details::readException(code, status, parcel);
+}
 
 /** @return the binder of an object: its proxy's, or its only stub. */
 sp<IBinder> getOrCreateCachedBinder(::android::hidl::base::V1_0::IBase* object);

@@ -6,6 +6,7 @@
 #include <utils/StrongPointer.h>
 
 #include <cstdint>
+#include <memory>
 #include <string>
 #include <utility>
 
@@ -24,15 +25,19 @@ class Status {
 
     Status() = default;
     static Status ok() { return {}; }
-    static Status fromExceptionCode(int32_t code, std::string message = {});
+    static Status fromExceptionCode(int32_t code, const std::string& message = {});
     static Status fromStatusT(status_t error);
 
     /** Sets the outcome that an error of the transport means. */
-    void setFromStatusT(status_t error);
+    void setFromStatusT(status_t error) {
+        mException = error == OK ? EX_NONE : EX_TRANSACTION_FAILED;
+        mError = error;
+        mMessage = nullptr;
+    }
 
     bool isOk() const { return mException == EX_NONE; }
     int32_t exceptionCode() const { return mException; }
-    const std::string& exceptionMessage() const { return mMessage; }
+    std::string exceptionMessage() const { return mMessage == nullptr ? "" : *mMessage; }
     status_t transactionError() const { return mError; }
     /** @return the outcome in words, "No error" for success. */
     std::string description() const;
@@ -40,7 +45,8 @@ class Status {
   private:
     int32_t mException = EX_NONE;
     status_t mError = OK;
-    std::string mMessage;
+    /** Only exceptions have one, and most calls succeed. */
+    std::shared_ptr<const std::string> mMessage;
 };
 
 namespace details {

@@ -9,7 +9,9 @@ namespace android::hardware {
 class BHwBinder : public IBinder {
   public:
     status_t transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags = 0,
-                      TransactCallback callback = nullptr) final;
+                      TransactCallback callback = nullptr) final {
+        return onTransact(code, data, reply, flags, callback);
+    }
     status_t linkToDeath(const sp<DeathRecipient>& recipient) final;
     status_t unlinkToDeath(const sp<DeathRecipient>& recipient) final;
     BHwBinder* localBinder() final { return this; }

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <sys/types.h>
+#include <unistd.h>
 
 #include <cstdint>
 
@@ -14,22 +15,29 @@ class IPCThreadState {
     static IPCThreadState* self();
 
     /** @return process id of the caller, 0 where it is unknown; this process's outside a call. */
-    pid_t getCallingPid() const { return mCallingPid; }
+    pid_t getCallingPid() const {
+        return mCaller == kNobody ? getpid() : static_cast<pid_t>(mCaller & 0xffffffff);
+    }
     /** @return uid of the caller; this process's own outside a call. */
-    uid_t getCallingUid() const { return mCallingUid; }
+    uid_t getCallingUid() const {
+        return mCaller == kNobody ? getuid()
+                                  : static_cast<uid_t>(static_cast<uint64_t>(mCaller) >> 32);
+    }
 
+    /** @return a token of the present identity. */
+    int64_t callingIdentity() const { return mCaller; }
     /** Takes the identity of a token. */
-    void restoreCallingIdentity(int64_t token);
+    void restoreCallingIdentity(int64_t token) { mCaller = token; }
     /** @return a token: the uid in the upper, the pid in the lower 32 bits. */
     static int64_t identityToken(uid_t uid, pid_t pid) {
         return static_cast<int64_t>(uint64_t{uid} << 32 | static_cast<uint32_t>(pid));
     }
 
   private:
-    IPCThreadState();
+    /** Outside a call; no user and no process have the number -1. */
+    static constexpr int64_t kNobody = -1;
 
-    pid_t mCallingPid;
-    uid_t mCallingUid;
+    int64_t mCaller = kNobody;
 };
 
 }  // namespace android::hardware

@@ -10,6 +10,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
+#include <iterator>
 #include <string>
 #include <vector>
 
@@ -30,7 +31,9 @@ class Parcel {
     using ReleaseBuffer = void (*)(const uint8_t* data, void* owner);
 
     Parcel() = default;
-    ~Parcel() { releaseMemory(); }
+    ~Parcel() {
+        if (mHasMore) releaseMore();
+    }
     Parcel(const Parcel&) = delete;
     Parcel& operator=(const Parcel&) = delete;
 
@@ -88,11 +91,16 @@ class Parcel {
     /** @return the room that its buffers need, each rounded up to 8, in bytes. */
     size_t buffersSize() const;
     void setDataPosition(size_t position) const { mPosition = position; }
-    /** Takes over data that the driver has received. */
+    /**
+     * Refers to data that the driver has received.
+     *
+     * @param release gets the data when the parcel no longer needs it; nullptr if nobody waits for
+     *     it back.
+     */
     void ipcSetDataReference(const uint8_t* data, size_t size, const binder_size_t* offsets,
                              size_t offsetCount, ReleaseBuffer release, void* owner) {
-        if (mRelease != nullptr || mSize > 0) clear();
-        // Never written to: a parcel that has an owner refuses it.
+        if (mHasMore || mSize > 0) clear();
+        // Never written to: there is no capacity for it.
         mData = const_cast<uint8_t*>(data);
         mSize = size;
         mCapacity = 0;
@@ -101,22 +109,30 @@ class Parcel {
         mOffsetCapacity = 0;
         mRelease = release;
         mOwner = owner;
+        mHasMore = release != nullptr;
     }
     /** Empties the parcel. */
-    void clear();
+    void clear() {
+        if (mHasMore) releaseMore();
+        mData = mInlineData;
+        mSize = 0;
+        mCapacity = sizeof(mInlineData);
+        mOffsets = mInlineOffsets;
+        mOffsetCount = 0;
+        mOffsetCapacity = std::size(mInlineOffsets);
+        mPosition = 0;
+        mNextObject = 0;
+        mRelease = nullptr;
+        mBinders = nullptr;
+        mHasMore = false;
+    }
 
   private:
     /** Values begin at multiples of 4; objects, too. */
     static constexpr size_t padded(size_t size) { return (size + 3) & ~size_t{3}; }
 
-    void releaseMemory() {
-        if (mRelease != nullptr) {
-            mRelease(mData, mOwner);
-        } else if (mData != mInlineData || mOffsets != mInlineOffsets) {
-            freeMemory();
-        }
-    }
-    void freeMemory();
+    /** Gives back what the parcel has outside itself. */
+    void releaseMore();
     template <typename T>
     status_t writePadded(T value) {
         return write(&value, sizeof(value));
@@ -166,18 +182,21 @@ class Parcel {
     binder_size_t mInlineOffsets[8];
 
     uint8_t* mData = mInlineData;
-    size_t mSize = 0;
-    size_t mCapacity = sizeof(mInlineData);
-    mutable size_t mPosition = 0;
     binder_size_t* mOffsets = mInlineOffsets;
+    size_t mCapacity = sizeof(mInlineData);
+    size_t mOffsetCapacity = std::size(mInlineOffsets);
+    // Side by side, since these are cleared at once.
+    size_t mSize = 0;
     size_t mOffsetCount = 0;
-    size_t mOffsetCapacity = sizeof(mInlineOffsets) / sizeof(mInlineOffsets[0]);
+    mutable size_t mPosition = 0;
     /** Index of the next offset to read. */
     mutable size_t mNextObject = 0;
     ReleaseBuffer mRelease = nullptr;
     void* mOwner = nullptr;
-    /** Keeps what was written alive until the driver has taken it over. */
-    std::vector<sp<IBinder>> mBinders;
+    /** Keeps what was written alive until the driver has taken it over; nullptr without any. */
+    std::vector<sp<IBinder>>* mBinders = nullptr;
+    /** Whether there is anything to give back: memory, or binders. Most parcels have nothing. */
+    bool mHasMore = false;
 };
 
 }  // namespace android::hardware
