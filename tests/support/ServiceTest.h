@@ -18,6 +18,8 @@ class ServiceTest : public ::testing::Test {
     ServiceTest() {
         setenv("HWBINDER_DIR", socketDirectory().c_str(), 1);
         setenv("VIBRATOR_SIM_DIR", mDirectory.path().c_str(), 1);
+        // A sanitizer's own library does not come first in a process with a preloaded one.
+        setenv("ASAN_OPTIONS", "verify_asan_link_order=0", 1);
         simulator::claimDirectory(mDirectory.path());
     }
     ~ServiceTest() override {
@@ -47,9 +49,7 @@ class ServiceTest : public ::testing::Test {
 
     /** Starts a daemon, with its standard error redirected as a shell does. */
     void startDaemon(ChildProcess& daemon, const std::string& redirection = {},
-                     std::vector<std::string> environment = {}) const {
-        // A sanitizer's own library does not come first in a process with a preloaded one.
-        environment.emplace_back("ASAN_OPTIONS=verify_asan_link_order=0");
+                     const std::vector<std::string>& environment = {}) const {
         daemon.startProgram(
                 {"/bin/bash", "-c", "LD_PRELOAD=$1 exec \"$0\" " + redirection, SERVICE, PRELOAD},
                 logFile(), environment);
