@@ -140,6 +140,7 @@ TEST(PlotTest, BarsStandInTheirPlaces) {
             "505 cp_trigger_index 3; 505 enable 1000");
     pugi::xml_document svg;
     ASSERT_TRUE(svg.load_string(drawPicture(timeline, PictureFormat::kSvg).c_str()));
+    EXPECT_EQ(svg.child("svg").child_value("title"), plotTitle(timeline));
     std::map<std::string, std::pair<double, double>> bars;
     for (const auto& each : svg.select_nodes("//polygon")) {
         double left = 0;
