@@ -45,22 +45,18 @@ TEST(LogFilterTest, RulesDecideByTagAndPriority) {
 
 TEST(LogTest, PriorityIsALetter) {
     LogCapture log;
-    const std::pair<int, char> cases[] = {{ANDROID_LOG_VERBOSE, 'V'},
-                                          {ANDROID_LOG_DEBUG, 'D'},
-                                          {ANDROID_LOG_INFO, 'I'},
-                                          {ANDROID_LOG_WARN, 'W'},
-                                          {ANDROID_LOG_ERROR, 'E'},
-                                          {ANDROID_LOG_FATAL, 'F'},
-                                          // What is no priority of a line counts as debug.
-                                          {ANDROID_LOG_UNKNOWN, 'D'},
-                                          {ANDROID_LOG_DEFAULT, 'D'},
-                                          {ANDROID_LOG_SILENT, 'D'},
-                                          {-1, 'D'},
-                                          {99, 'D'}};
-    for (const auto& [priority, letter] : cases) {
+    const auto letterOf = [&](int priority) {
         EXPECT_EQ(__android_log_print(priority, "T", "text"), 1);
-        EXPECT_EQ(log.takeText()[0], letter) << priority;
-    }
+        return log.takeText()[0];
+    };
+    std::string letters;
+    for (int priority = ANDROID_LOG_VERBOSE; priority <= ANDROID_LOG_FATAL; ++priority)
+        letters += letterOf(priority);
+    EXPECT_EQ(letters, "VDIWEF");
+    // What is no priority of a line counts as debug.
+    const int others[] = {ANDROID_LOG_UNKNOWN, ANDROID_LOG_DEFAULT, ANDROID_LOG_SILENT, -1, 99};
+    for (const int priority : others)
+        EXPECT_EQ(letterOf(priority), 'D') << priority;
 }
 
 TEST(LogTest, LineHasTheBriefForm) {

@@ -45,11 +45,8 @@ class ServiceManagerTest : public ::testing::Test {
 };
 
 TEST_F(ServiceManagerTest, OnlySomeMayAdd) {
-    const struct {
-        uid_t uid;
-        bool isAllowed;
-    } cases[] = {{0, true}, {1000, true}, {getuid(), true}, {kNobody, false}};
-    for (const auto& [uid, isAllowed] : cases) {
+    for (const uid_t uid : {0U, 1000U, getuid(), kNobody}) {
+        const bool isAllowed = uid != kNobody;
         const std::string name = "of" + std::to_string(uid);
         const Caller caller(uid, 7);
         EXPECT_EQ(mManager->add(name, mObject).withDefault(false), isAllowed) << uid;

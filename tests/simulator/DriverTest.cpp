@@ -12,6 +12,7 @@
 
 #include <cerrno>
 #include <chrono>
+#include <fstream>
 #include <thread>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
@@ -82,14 +83,14 @@ TEST_F(SimulatedDriverTest, ValuesAreCheckedAsTheKernelDoes) {
             EXPECT_EQ(get(leaf), before);
         }
     }
-    setMode("intensity", 0200);
+    ASSERT_EQ(chmod((mDirectory.path() + path("intensity")).c_str(), 0200), 0);
     EXPECT_EQ(::open(path("intensity").c_str(), O_RDONLY), -1);
     EXPECT_EQ(errno, EACCES);
 }
 
 TEST_F(SimulatedDriverTest, AtMostAPageIsTakenAtOnce) {
     start(Layout::kLedTrigger);
-    setNode("scratch", "");
+    std::ofstream(mDirectory.path() + path("scratch"));
     const int file = ::open(path("scratch").c_str(), O_RDWR);
     const std::string text(5000, 'x');
     EXPECT_EQ(::write(file, text.data(), text.size()), 4096);

@@ -85,20 +85,11 @@ int runAs(uid_t uid, const std::function<int()>& function) {
     return exitCodeOf(pid);
 }
 
-void ChildProcess::start(const std::function<void(const std::function<void()>& ready)>& function) {
-    int channel[2];
-    if (pipe(channel) != 0) abort();
+void ChildProcess::start(const std::function<void()>& function) {
     mPid = fork();
-    if (mPid == 0) {
-        close(channel[0]);
-        function([&] { close(channel[1]); });
-        _exit(0);
-    }
-    close(channel[1]);
-    char nothing = 0;
-    // Ends with the child's end of the pipe, be it closed or the child dead.
-    if (read(channel[0], &nothing, 1) != 0) abort();
-    close(channel[0]);
+    if (mPid != 0) return;
+    function();
+    _exit(0);
 }
 
 void ChildProcess::startProgram(const std::vector<std::string>& command, const std::string& logFile,

@@ -26,8 +26,8 @@ int runAs(uid_t uid, const std::function<int()>& function);
 /** A process that goes on until it is killed, in the destructor at the latest. */
 class ChildProcess {
   public:
-    /** Runs a function in a child; it must call ready() before start returns. */
-    void start(const std::function<void(const std::function<void()>& ready)>& function);
+    /** Runs a function. */
+    void start(const std::function<void()>& function);
     /**
      * Runs a program with standard error in a file, and more environment, as NAME=VALUE; as another
      * user where asked for.

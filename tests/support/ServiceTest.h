@@ -16,8 +16,10 @@
 class ServiceTest : public ::testing::Test {
   protected:
     ServiceTest() {
-        setenv("HWBINDER_DIR", socketDirectory().c_str(), 1);
+        setenv("HWBINDER_DIR", (mDirectory.path() + "/sockets").c_str(), 1);
         setenv("VIBRATOR_SIM_DIR", mDirectory.path().c_str(), 1);
+        // A sanitizer's own library does not come first in a process with a preloaded one.
+        setenv("ASAN_OPTIONS", "verify_asan_link_order=0", 1);
         simulator::claimDirectory(mDirectory.path());
     }
     ~ServiceTest() override {
@@ -40,31 +42,18 @@ class ServiceTest : public ::testing::Test {
     }
 
     /** Starts the daemon, and waits until it answers. */
-    void start(const std::vector<std::string>& environment = {}) {
-        startDaemon(mService, "", environment);
+    void start(std::vector<std::string> environment = {}) {
+        environment.emplace_back("LD_PRELOAD=" PRELOAD);
+        mService.startProgram({SERVICE}, logFile(), environment);
+        const auto isThere = [] {
+            const auto vibrator = IDaxVibrator::tryGetService();
+            return vibrator != nullptr && vibrator->ping().isOk();
+        };
         ASSERT_TRUE(eventually(isThere)) << log();
     }
 
-    /** Starts a daemon, with its standard error redirected as a shell does. */
-    void startDaemon(ChildProcess& daemon, const std::string& redirection = {},
-                     std::vector<std::string> environment = {}) const {
-        // A sanitizer's own library does not come first in a process with a preloaded one.
-        environment.emplace_back("ASAN_OPTIONS=verify_asan_link_order=0");
-        daemon.startProgram(
-                {"/bin/bash", "-c", "LD_PRELOAD=$1 exec \"$0\" " + redirection, SERVICE, PRELOAD},
-                logFile(), environment);
-    }
-
-    static bool isThere() {
-        const auto vibrator = IDaxVibrator::tryGetService();
-        return vibrator != nullptr && vibrator->ping().isOk();
-    }
-    std::string socketDirectory() const { return mDirectory.path() + "/sockets"; }
     std::string logFile() const { return mDirectory.path() + "/log"; }
     std::string log() const { return readFile(logFile()); }
-    std::string node(const std::string& leaf) const {
-        return readFile(mDirectory.path() + "/sys/class/leds/vibrator/" + leaf);
-    }
 
     TemporaryDirectory mDirectory;
     ChildProcess mService;

@@ -3,8 +3,6 @@
 
 #include "Trace.h"
 
-#include <sys/stat.h>
-
 #include <cerrno>
 #include <cstdlib>
 #include <fstream>
@@ -53,14 +51,6 @@ void VibratorTest::start(Layout layout) {
     construct();
     trace();
     log();
-}
-
-void VibratorTest::setNode(const std::string& leaf, const std::string& text) const {
-    std::ofstream(mDirectory.path() + path(leaf)) << text;
-}
-
-void VibratorTest::setMode(const std::string& leaf, unsigned mode) const {
-    ASSERT_EQ(chmod((mDirectory.path() + path(leaf)).c_str(), mode), 0);
 }
 
 Lines VibratorTest::trace() {

@@ -32,10 +32,6 @@ class VibratorTest : public ::testing::Test {
     /** Makes the service object on what there is. */
     void construct() { mVibrator = new Vibrator(); }
 
-    /** Puts text into a node, or changes the mode of its file. */
-    void setNode(const std::string& leaf, const std::string& text) const;
-    void setMode(const std::string& leaf, unsigned mode) const;
-
     /** @return where the node is on a device. */
     std::string path(const std::string& leaf) const { return sysfsDirectory(mLayout) + leaf; }
     /** @return the accesses of nodes since the last call, without their times. */

@@ -6,6 +6,7 @@
 #include <hwbinder/Host.h>
 #include <utils/Errors.h>
 
+#include <algorithm>
 #include <atomic>
 #include <chrono>
 #include <csignal>
@@ -70,11 +71,8 @@ TEST_F(CallsTest, ListsGetThereWhole) {
 TEST_F(CallsTest, BaseOperationsAnswerForTheObject) {
     EXPECT_TRUE(mClient->isRemote());
     std::vector<std::string> chain;
-    EXPECT_TRUE(mClient->interfaceChain([&](const auto& descriptors) {
-                           for (const auto& each : descriptors)
-                               chain.emplace_back(each);
-                       })
-                        .isOk());
+    const auto take = [&](const auto& names) { chain.assign(names.begin(), names.end()); };
+    EXPECT_TRUE(mClient->interfaceChain(take).isOk());
     EXPECT_EQ(chain, kChain);
     std::string descriptor;
     EXPECT_TRUE(mClient->interfaceDescriptor([&](const auto& each) { descriptor = each; }).isOk());
@@ -119,18 +117,12 @@ TEST_F(CallsTest, ObjectIsFoundUnderEveryInterfaceOfItsChain) {
     // What a daemon that died in its start has left.
     std::filesystem::create_symlink(kChain[0] + ".default",
                                     mDirectory.path() + "/" + kChain[5] + ".default~");
-    std::vector<std::string> instances;
-    manager->listByInterface(kChain[5], [&](const auto& list) {
-        for (const auto& each : list)
-            instances.emplace_back(each);
-    });
-    EXPECT_EQ(instances, std::vector<std::string>{"default"});
-    bool isListed = false;
-    manager->list([&](const auto& list) {
-        for (const auto& each : list)
-            isListed = isListed || each == hidl_string(kChain[0] + "/default");
-    });
-    EXPECT_TRUE(isListed);
+    std::vector<std::string> names;
+    const auto take = [&](const auto& list) { names.assign(list.begin(), list.end()); };
+    manager->listByInterface(kChain[5], take);
+    EXPECT_EQ(names, std::vector<std::string>{"default"});
+    manager->list(take);
+    EXPECT_NE(std::find(names.begin(), names.end(), kChain[0] + "/default"), names.end());
 }
 
 TEST_F(CallsTest, ThreadsMayShareAnObject) {

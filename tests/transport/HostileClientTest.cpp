@@ -27,17 +27,27 @@ constexpr size_t kChainLength = 7;
 class HostileClientTest : public TransportTest {
   protected:
     RawClient rawClient() const { return RawClient(mDirectory.path()); }
-    std::vector<RawClient> connected(int count) const {
+    /** @return clients that have begun to connect, as another user where root runs the tests. */
+    std::vector<RawClient> connecting(size_t count, uid_t uid = geteuid()) const {
+        const bool isRoot = geteuid() == 0;
+        EXPECT_TRUE(!isRoot || seteuid(uid) == 0);
         std::vector<RawClient> clients;
-        for (int i = 0; i < count; ++i) {
+        while (clients.size() < count)
             clients.push_back(rawClient());
-            EXPECT_TRUE(clients.back().answersPing());
-        }
+        EXPECT_TRUE(!isRoot || seteuid(0) == 0);
         return clients;
     }
+    std::vector<RawClient> connected(size_t count, uid_t uid = geteuid()) const {
+        std::vector<RawClient> clients = connecting(count, uid);
+        expectAllAnswer(clients);
+        return clients;
+    }
+    static size_t countAnswering(const std::vector<RawClient>& clients) {
+        const auto answers = [](const RawClient& client) { return client.answersPing(); };
+        return static_cast<size_t>(std::count_if(clients.begin(), clients.end(), answers));
+    }
     static void expectAllAnswer(const std::vector<RawClient>& clients) {
-        EXPECT_TRUE(std::all_of(clients.begin(), clients.end(),
-                                [](const RawClient& client) { return client.answersPing(); }));
+        EXPECT_EQ(countAnswering(clients), clients.size());
     }
     void needRoot() const {
         if (geteuid() != 0) GTEST_SKIP() << "only root can become somebody else";
@@ -130,20 +140,15 @@ TEST_F(HostileClientTest, ClientThatNeverReadsIsDropped) {
 TEST_F(HostileClientTest, IdleConnectionsGiveWayAndRootIsNeverLockedOut) {
     needRoot();
     serve("ulimit -n 1024");
-    const std::string directory = mDirectory.path();
-    int alive = 0;
     std::vector<RawClient> clients;
     // Of eight users each has as many as it can get; all of them stay open.
     for (uid_t uid = 2000; uid < 2008; ++uid) {
-        ASSERT_EQ(seteuid(uid), 0);
-        for (int i = 0; i < 140; ++i)
-            clients.emplace_back(directory);
-        ASSERT_EQ(seteuid(0), 0);
+        for (RawClient& client : connecting(140, uid))
+            clients.push_back(std::move(client));
     }
-    for (const RawClient& client : clients)
-        alive += client.answersPing() ? 1 : 0;
-    EXPECT_GE(alive, 900);
-    EXPECT_LE(alive, 1024 - 32 - 16) << "some are kept for root, and some for no client";
+    const size_t alive = countAnswering(clients);
+    EXPECT_GE(alive, 900U);
+    EXPECT_LE(alive, 1024U - 32 - 16) << "some are kept for root, and some for no client";
     EXPECT_TRUE(answers());
     EXPECT_EQ(runAs(1000, [] { return answers() ? 0 : 1; }), 0);
     EXPECT_EQ(runAs(3000, [] { return answers() ? 0 : 1; }), 0) << "one more user";
@@ -152,12 +157,10 @@ TEST_F(HostileClientTest, IdleConnectionsGiveWayAndRootIsNeverLockedOut) {
     stopServer();
     for (const RawClient& client : clients)
         static_cast<void>(client.send(request(kBase, kPing)));
-    ASSERT_EQ(seteuid(3001), 0);
-    const RawClient newcomer = rawClient();
-    ASSERT_EQ(seteuid(0), 0);
-    EXPECT_TRUE(newcomer.send(request(kBase, kPing)));
+    const std::vector<RawClient> newcomer = connecting(1, 3001);
+    EXPECT_TRUE(newcomer[0].send(request(kBase, kPing)));
     ::kill(mServer.pid(), SIGCONT);
-    EXPECT_FALSE(newcomer.receive().isClosed);
+    EXPECT_FALSE(newcomer[0].receive().isClosed);
     EXPECT_TRUE(answers());
 }
 
@@ -176,22 +179,18 @@ TEST_F(HostileClientTest, ConnectionsThatTheirClientsHaveClosedGiveWayFirst) {
     serve();
     const bool isRoot = geteuid() == 0;
     const RawClient other = rawClient();
-    ASSERT_TRUE(!isRoot || seteuid(2000) == 0);
-    const std::vector<RawClient> living = connected(isRoot ? 88 : 87);
-    std::vector<RawClient> closed = connected(40);
+    const std::vector<RawClient> living = connected(isRoot ? 88 : 87, 2000);
+    std::vector<RawClient> closed = connected(40, 2000);
     stopServer();
     closed.clear();
-    std::vector<RawClient> newcomers;
     // Then there are 128, as many as a user may have.
-    for (int i = 0; i < 40; ++i)
-        newcomers.push_back(rawClient());
+    const std::vector<RawClient> newcomers = connecting(40, 2000);
     for (int i = 0; i < 200; ++i)
-        rawClient();
+        connecting(1, 2000);
     EXPECT_TRUE(other.send(request(kV10, kOn, {1001})));
     EXPECT_TRUE(other.send(request(kV10, kOn, {1002})));
     EXPECT_TRUE(living[0].send(request(kV10, kOn, {1000})));
     ::kill(mServer.pid(), SIGCONT);
-    ASSERT_TRUE(!isRoot || seteuid(0) == 0);
     expectAllAnswer(living);
     expectAllAnswer(newcomers);
     // In the first round, as its user's only call.
@@ -220,15 +219,10 @@ TEST_F(HostileClientTest, FloodOfConnectionsCostsNobodyACall) {
 
 TEST_F(HostileClientTest, DescriptorsAreKeptForTheObjects) {
     serve("ulimit -n 64");
-    std::vector<RawClient> clients;
-    for (int i = 0; i < 100; ++i)
-        clients.push_back(rawClient());
-    int alive = 0;
-    for (const RawClient& client : clients)
-        alive += client.answersPing() ? 1 : 0;
+    const size_t alive = countAnswering(connecting(100));
     // The client that has seen whether the daemon is there may still count.
-    EXPECT_GE(alive, 7);
-    EXPECT_LE(alive, 8);
+    EXPECT_GE(alive, 7U);
+    EXPECT_LE(alive, 8U);
     EXPECT_LE(mServer.descriptors(), 32U);
 }
 
@@ -303,14 +297,8 @@ TEST_F(HostileClientTest, CallerIsWhoSendsTheMessage) {
 TEST_F(HostileClientTest, EveryUserHasItsTurnAndItsCallsKeepTheirOrder) {
     serve();
     const bool isRoot = geteuid() == 0;
-    std::vector<RawClient> clients;
-    for (int i = 0; i < 41; ++i) {
-        const bool isDone = !isRoot || seteuid(i < 40 ? 2000 : 2001) == 0;
-        clients.push_back(rawClient());
-        ASSERT_TRUE(isDone && (!isRoot || seteuid(0) == 0));
-    }
-    for (const RawClient& client : clients)
-        EXPECT_TRUE(client.answersPing());
+    std::vector<RawClient> clients = connected(40, 2000);
+    clients.push_back(std::move(connected(1, 2001)[0]));
     stopServer();
     for (uint32_t i = 0; i < clients.size(); ++i)
         EXPECT_TRUE(clients[i].send(request(kV10, kOn, {1000 + i})));

@@ -9,6 +9,7 @@
 #include <hwbinder/ProcessState.h>
 
 #include <functional>
+#include <optional>
 
 // What the daemon, and on the kernel's binder the service manager, do with requests that no proxy
 // sends. Runs on sockets everywhere, and on the kernel's binder in a virtual machine.
@@ -78,55 +79,49 @@ const struct {
     void (*change)(RawMessage&);
     status_t status;
     /** What it is on the kernel's binder, which copies objects but does not judge all of them. */
-    status_t onKernel;
+    std::optional<status_t> onKernel = std::nullopt;
 } kAttacks[] = {
-        {"none", [](auto&) {}, android::OK, android::OK},
-        {"no arguments", [](auto& m) { m.keep(0); }, kNoData, kNoData},
-        {"last argument missing", [](auto& m) { m.keep(2); }, kNoData, kNoData},
+        {"none", [](auto&) {}, android::OK},
+        {"no arguments", [](auto& m) { m.keep(0); }, kNoData},
+        {"last argument missing", [](auto& m) { m.keep(2); }, kNoData},
         {"half an object",
          [](auto& m) {
              m.keep(1);
              m.tail = std::string(20, '\0');
          },
-         kNoData, kNoData},
+         kNoData},
         {"numbers for objects",
          [](auto& m) {
              m.keep(0);
              m.tail = std::string(256, 'A');
          },
-         kBadType, kBadType},
-        {"count beyond the buffer", [](auto& m) { m.setCount(60); }, kBadValue, kBadValue},
+         kBadType},
+        {"count beyond the buffer", [](auto& m) { m.setCount(60); }, kBadValue},
         // Its size in bytes is that of the buffer, in 32 bits.
-        {"count that overflows", [](auto& m) { m.setCount(0x10000001); }, kBadValue, kBadValue},
-        {"largest count", [](auto& m) { m.setCount(UINT32_MAX); }, kBadValue, kBadValue},
-        {"no elements", [](auto& m) { m.set(1, ""); }, kBadValue, kBadValue},
-        {"short header", [](auto& m) { m.set(0, "12345678"); }, kBadValue, kBadValue},
-        {"length beyond the memory", [](auto& m) { m.objects[1].length = UINT64_MAX; }, kFailed,
-         kFailed},
-        {"length that overflows", [](auto& m) { m.objects[1].length = UINT64_MAX - 6; }, kFailed,
-         kFailed},
+        {"count that overflows", [](auto& m) { m.setCount(0x10000001); }, kBadValue},
+        {"largest count", [](auto& m) { m.setCount(UINT32_MAX); }, kBadValue},
+        {"no elements", [](auto& m) { m.set(1, ""); }, kBadValue},
+        {"short header", [](auto& m) { m.set(0, "12345678"); }, kBadValue},
+        {"length beyond the memory", [](auto& m) { m.objects[1].length = UINT64_MAX; }, kFailed},
+        {"length that overflows", [](auto& m) { m.objects[1].length = UINT64_MAX - 6; }, kFailed},
         {"short length", [](auto& m) { m.objects[1].length = 8; }, kFailed, kBadValue},
-        {"elements without parent", [](auto& m) { m.objects[1].flags = 0; }, kBadValue, kBadValue},
-        {"parent of the first", [](auto& m) { m.objects[0].flags = 1; }, kFailed, kFailed},
-        {"parent is itself", [](auto& m) { m.objects[1].parent = 1; }, kFailed, kFailed},
-        {"parent that does not exist", [](auto& m) { m.objects[1].parent = UINT64_MAX; }, kFailed,
-         kFailed},
+        {"elements without parent", [](auto& m) { m.objects[1].flags = 0; }, kBadValue},
+        {"parent of the first", [](auto& m) { m.objects[0].flags = 1; }, kFailed},
+        {"parent is itself", [](auto& m) { m.objects[1].parent = 1; }, kFailed},
+        {"parent that does not exist", [](auto& m) { m.objects[1].parent = UINT64_MAX; }, kFailed},
         // The address is written over the count then.
-        {"wrong place in parent", [](auto& m) { m.objects[1].parent_offset = 8; }, kBadValue,
-         kBadValue},
-        {"place beyond the parent", [](auto& m) { m.objects[1].parent_offset = 9; }, kFailed,
-         kFailed},
+        {"wrong place in parent", [](auto& m) { m.objects[1].parent_offset = 8; }, kBadValue},
+        {"place beyond the parent", [](auto& m) { m.objects[1].parent_offset = 9; }, kFailed},
         {"place that overflows", [](auto& m) { m.objects[1].parent_offset = UINT64_MAX - 7; },
-         kFailed, kFailed},
+         kFailed},
         // As objects that overlap could do it.
         {"address written over", [](auto& m) { m.add("short", true); }, kBadValue, kFailed},
-        {"odd offset", [](auto& m) { m.offsets[0] += 1; }, kFailed, kFailed},
+        {"odd offset", [](auto& m) { m.offsets[0] += 1; }, kFailed},
         {"offset that overflows", [](auto& m) { m.offsets[0] = UINT64_MAX - 3 - m.head.size(); },
-         kFailed, kFailed},
-        {"offset of no object", [](auto& m) { m.offsets[1] += 8; }, kFailed, kFailed},
-        {"offsets in disorder", [](auto& m) { std::swap(m.offsets[0], m.offsets[1]); }, kFailed,
          kFailed},
-        {"offset twice", [](auto& m) { m.offsets[1] = m.offsets[0]; }, kFailed, kFailed},
+        {"offset of no object", [](auto& m) { m.offsets[1] += 8; }, kFailed},
+        {"offsets in disorder", [](auto& m) { std::swap(m.offsets[0], m.offsets[1]); }, kFailed},
+        {"offset twice", [](auto& m) { m.offsets[1] = m.offsets[0]; }, kFailed},
         // Addresses of the sender's choice, if anybody takes them for objects.
         {"objects not listed", [](auto& m) { m.offsets.clear(); }, kFailed, kBadType},
         {"elements not listed", [](auto& m) { m.offsets.resize(1); }, kFailed, kBadType},
@@ -141,18 +136,17 @@ const struct {
          },
          kFailed, kBadType},
         {"handle of nothing",
-         [](auto& m) { m.replace(0, BINDER_TYPE_HANDLE, flat_binder_object{}); }, kFailed, kFailed},
-        {"descriptor", [](auto& m) { m.replace(1, BINDER_TYPE_FD, binder_fd_object{}); }, kFailed,
-         kFailed},
+         [](auto& m) { m.replace(0, BINDER_TYPE_HANDLE, flat_binder_object{}); }, kFailed},
+        {"descriptor", [](auto& m) { m.replace(1, BINDER_TYPE_FD, binder_fd_object{}); }, kFailed},
         {"descriptors",
          [](auto& m) {
              binder_fd_array_object descriptors{};
              descriptors.num_fds = 2;
              m.replace(1, BINDER_TYPE_FDA, descriptors);
          },
-         kFailed, kFailed},
+         kFailed},
         {"object of no type", [](auto& m) { m.replace(1, 0x12345678, binder_buffer_object{}); },
-         kFailed, kFailed},
+         kFailed},
 };
 
 class HostileRequestTest : public TransportTest, public ::testing::WithParamInterface<Target> {
@@ -204,7 +198,7 @@ TEST_P(HostileRequestTest, WrongArgumentsAreRefused) {
         SCOPED_TRACE(name);
         RawMessage message = right();
         change(message);
-        EXPECT_EQ(call(message, GetParam().code), isKernel() ? onKernel : status);
+        EXPECT_EQ(call(message, GetParam().code), isKernel() ? onKernel.value_or(status) : status);
         expectService();
     }
 }

@@ -8,7 +8,6 @@
 
 #include <cstring>
 #include <filesystem>
-#include <fstream>
 
 namespace {
 
@@ -26,12 +25,13 @@ class PublicationTest : public TransportTest {
     static std::string whyNot() {
         return IDaxVibrator::tryGetService() == nullptr ? host::lookupError() : "found";
     }
-    /** @return the log of a daemon that is started as somebody, once it has a text in it. */
-    std::string logWith(const std::string& text, uid_t uid = geteuid()) {
+    /** Expects that a daemon that is started, as somebody, has a text in its log. */
+    void expectLog(const std::string& text, const std::vector<std::string>& command = {SERVICE},
+                   uid_t uid = geteuid()) const {
+        std::filesystem::remove(logFile());
         ChildProcess daemon;
-        daemon.startProgram({SERVICE}, logFile(), {}, uid);
-        eventually([&] { return log().find(text) != std::string::npos; });
-        return log();
+        daemon.startProgram(command, logFile(), {}, uid);
+        EXPECT_TRUE(eventually([&] { return log().find(text) != std::string::npos; })) << log();
     }
 };
 
@@ -131,9 +131,8 @@ TEST_F(PublicationTest, SurroundingsThatCannotBeTrustedAreRefusedByBothSides) {
         if (complaint.empty()) continue;
         SCOPED_TRACE(directory);
         setenv("HWBINDER_DIR", directory.c_str(), 1);
-        const std::string text = logWith(complaint);
-        EXPECT_NE(text.find("E/hwbinder"), std::string::npos) << text;
-        EXPECT_NE(text.find(complaint), std::string::npos) << text;
+        expectLog(complaint);
+        EXPECT_NE(log().find("E/hwbinder"), std::string::npos) << log();
         EXPECT_NE(whyNot().find(complaint), std::string::npos) << whyNot();
     }
 }
@@ -149,23 +148,17 @@ TEST_F(PublicationTest, FileSystemThatTakesNothingIsSaid) {
     if (runProgram(mounted("ro", "true")).exitCode != 0) GTEST_SKIP() << "no mount is allowed";
     setenv("HWBINDER_DIR", directory.c_str(), 1);
     for (const auto& [options, complaint] : {std::pair("ro", "Read-only file system"),
-                                             std::pair("nr_inodes=1", "No space left on device")}) {
-        ChildProcess daemon;
-        daemon.startProgram(mounted(options, SERVICE), logFile(), {});
-        EXPECT_TRUE(eventually([&, wanted = complaint] {
-            return log().find(wanted) != std::string::npos;
-        })) << log();
-    }
+                                             std::pair("nr_inodes=1", "No space left on device")})
+        expectLog(complaint, mounted(options, SERVICE));
 }
 
 TEST_F(PublicationTest, DirectoryOfAnotherUserIsNotUsed) {
     if (geteuid() != 0) GTEST_SKIP() << "only root can give a directory away";
     ASSERT_EQ(chown(mDirectory.path().c_str(), 2000, 2000), 0);
-    EXPECT_NE(logWith("belongs to").find("belongs to uid 2000"), std::string::npos);
+    expectLog("belongs to uid 2000");
     ASSERT_EQ(chown(mDirectory.path().c_str(), 0, 0), 0);
     ASSERT_EQ(chmod(mDirectory.path().c_str(), 0755), 0);
-    std::ofstream(logFile()) << std::flush;
-    EXPECT_NE(logWith("Permission denied", 2000).find("Permission denied"), std::string::npos);
+    expectLog("Permission denied", {SERVICE}, 2000);
 }
 
 TEST_F(PublicationTest, ServerOfAStrangerIsNotCalled) {
@@ -192,12 +185,9 @@ TEST_F(PublicationTest, ServerOfAStrangerIsNotCalled) {
 }
 
 TEST_F(PublicationTest, LogSaysWhatTheCallsGoOver) {
-    EXPECT_NE(logWith("calls go over")
-                      .find("calls go over sockets in " + mDirectory.path() +
-                            ", as HWBINDER_DIR says"),
-              std::string::npos);
+    expectLog("calls go over sockets in " + mDirectory.path() + ", as HWBINDER_DIR says");
     setenv("HWBINDER_DEVICE", "/dev/null", 1);
-    EXPECT_NE(logWith("not registered").find("/dev/null: not a binder device"), std::string::npos);
+    expectLog("/dev/null: not a binder device");
     unsetenv("HWBINDER_DEVICE");
 }
 

@@ -116,11 +116,16 @@ TEST_F(RuntimeTest, OneThreadServesHoweverManyJoin) {
 
 TEST_F(RuntimeTest, NameThatIsTakenIsWaitedForByAServerThatIsIdle) {
     ChildProcess first;
-    first.start([](const auto& ready) {
+    first.start([] {
         const sp<Slow> holder = new Slow;
-        if (holder->registerAsService("taken") == android::OK) ready();
-        android::hardware::joinRpcThreadpool();
+        if (holder->registerAsService("taken") == android::OK)
+            android::hardware::joinRpcThreadpool();
     });
+    const auto isServed = [] {
+        const auto client = IServiceNotification::tryGetService("taken");
+        return client != nullptr && client->ping().isOk();
+    };
+    ASSERT_TRUE(eventually(isServed));
     android::hardware::configureRpcThreadpool(1, false);
     ProcessState::self()->startThreadPool();
     // Now it waits, with nothing to do.
@@ -128,10 +133,7 @@ TEST_F(RuntimeTest, NameThatIsTakenIsWaitedForByAServerThatIsIdle) {
     const sp<Slow> second = new Slow;
     EXPECT_NE(second->registerAsService("taken"), android::OK);
     first.kill();
-    EXPECT_TRUE(eventually([&] {
-        const auto client = IServiceNotification::tryGetService("taken");
-        return client != nullptr && client->ping().isOk();
-    }));
+    EXPECT_TRUE(eventually(isServed));
 }
 
 TEST_F(RuntimeTest, NamesOfFilesBesideTheSocketsAreRefused) {

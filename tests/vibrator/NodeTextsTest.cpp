@@ -12,7 +12,13 @@ class NodeTextsTest : public BothLayoutsTest {};
 INSTANTIATE_FOR_BOTH_LAYOUTS(NodeTextsTest);
 
 TEST_P(NodeTextsTest, LeadingNumberOfSevenBytesIsTheCount) {
-    const std::pair<const char*, const char*> cases[] = {
+    const auto expectCount = [&](const std::string& text, const std::string& answer,
+                                 const std::string& value) {
+        row(call(&I::daxGetNumberOfPrebakedHapticPattern), answer,
+            "num_waves?r; num_waves:7=\"" + text +
+                    "\"; D daxGetNumberOfPrebakedHapticPattern value : " + value);
+    };
+    const std::pair<const char*, std::string> numbers[] = {
             {R"(  42\n)", "42"},
             {R"(7\n)", "7"},
             {"-5", "4294967291"},
@@ -27,25 +33,11 @@ TEST_P(NodeTextsTest, LeadingNumberOfSevenBytesIsTheCount) {
             {"5.7", "5"},
             {R"(0\n)", "0"},
             {R"(-1\n)", "4294967295"},
-            // No number at all.
-            {"", ""},
-            {R"(\n)", ""},
-            {R"(word\n)", ""},
-            {"-", ""},
-            {"+", ""},
-            {"+-5", ""},
-            {"- 5", ""},
-            {"       ", ""},
-            {R"(\05)", ""},
     };
-    for (const auto& [text, number] : cases) {
-        const std::string count = number;
-        row(call(&I::daxGetNumberOfPrebakedHapticPattern),
-            count.empty() ? "(UNKNOWN_ERROR, 0)" : "(OK, " + count + ")",
-            std::string("num_waves?r; num_waves:7=\"") + text +
-                    "\"; D daxGetNumberOfPrebakedHapticPattern value : " +
-                    (count.empty() ? "4294967295" : count));
-    }
+    for (const auto& [text, number] : numbers)
+        expectCount(text, "(OK, " + number + ")", number);
+    for (const char* text : {"", R"(\n)", R"(word\n)", "-", "+", "+-5", "- 5", "       ", R"(\05)"})
+        expectCount(text, "(UNKNOWN_ERROR, 0)", "4294967295");
 }
 
 TEST_P(NodeTextsTest, OneOfFourLettersMeansFoldEvents) {
