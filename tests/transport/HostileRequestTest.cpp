@@ -96,6 +96,7 @@ const struct {
              m.tail = std::string(256, 'A');
          },
          kBadType},
+        {"numbers like the object", [](auto& m) { m.head += bytesOf(m.objects[0]); }, kBadType},
         {"count beyond the buffer", [](auto& m) { m.setCount(60); }, kBadValue},
         // Its size in bytes is that of the buffer, in 32 bits.
         {"count that overflows", [](auto& m) { m.setCount(0x10000001); }, kBadValue},

@@ -26,6 +26,7 @@ constexpr uint32_t kPing = 0x0f504e47;
 constexpr uint32_t kInterfaceChain = 0x0f43484e;
 constexpr uint32_t kDebug = 0x0f444247;
 constexpr uint32_t kOn = 1;
+constexpr uint32_t kSupportsAmplitudeControl = 3;
 constexpr uint32_t kDaxSetAmplitude = 18;
 constexpr uint32_t kDaxPerformHapticEngine = 23;
 constexpr uint32_t kManagersGet = 1;
