@@ -23,6 +23,7 @@ using ::android::wp;
 using ::android::hardware::hidl_death_recipient;
 using ::android::hardware::hidl_string;
 using ::android::hardware::Return;
+using ::android::hardware::Status;
 using ::android::hidl::base::V1_0::IBase;
 namespace vibrator = ::android::hardware::vibrator;
 namespace host = ::android::hardware::host;
@@ -93,8 +94,10 @@ TEST_F(CallsTest, BaseOperationsAnswerForTheObject) {
     EXPECT_TRUE(mClient->debug(nullptr, {"one", "", "three"}).isOk());
     EXPECT_EQ(mClient->perform_1_1({}, {}, nullptr).description(),
               "Null synchronous callback passed.");
-    EXPECT_EQ(android::hardware::Status::fromStatusT(-EPERM).description(),
-              "Operation not permitted");
+    EXPECT_EQ(Status::fromStatusT(-EPERM).description(), "Operation not permitted");
+    for (const auto error : {android::BAD_TYPE, android::NOT_ENOUGH_DATA})
+        EXPECT_EQ(Status::fromStatusT(error).description(),
+                  "the message does not hold what the operation takes");
 }
 
 TEST_F(CallsTest, ObjectIsFoundUnderEveryInterfaceOfItsChain) {
@@ -146,6 +149,8 @@ TEST_F(CallsTest, ThreadsMayShareAnObject) {
 }
 
 TEST_F(CallsTest, ClientsMayDieInACall) {
+    // Until it answers, it may not have accepted the connection.
+    EXPECT_TRUE(mClient->ping().isOk());
     const size_t before = mServer.descriptors();
     stopServer();
     for (int i = 0; i < 50; ++i) {
@@ -222,6 +227,8 @@ TEST_F(CallsTest, RegistrationIsToldToThoseWhoAsked) {
     mServer.kill();
     serve();
     EXPECT_TRUE(eventually([&] { return notification->after == 1; }));
+    std::this_thread::sleep_for(milliseconds(250));
+    EXPECT_EQ(notification->after, 1) << "it is told once";
     const auto manager = android::hardware::defaultServiceManager1_2();
     EXPECT_TRUE(manager->unregisterForNotifications(kChain[0], "default", notification));
     EXPECT_FALSE(manager->unregisterForNotifications(kChain[0], "default", notification));

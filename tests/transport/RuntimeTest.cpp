@@ -1,10 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "libhwbinder/KernelDriver.h"
 #include "libhwbinder/LocalConnection.h"
+#include "libhwbinder/Packet.h"
 #include "transport/TransportTest.h"
 
 #include <android/hidl/manager/1.0/IServiceNotification.h>
 #include <android/hidl/manager/1.2/IServiceManager.h>
+#include <hidl/HidlBinderSupport.h>
 #include <hidl/HidlTransportSupport.h>
 #include <hidl/ServiceManagement.h>
 #include <hwbinder/BpHwBinder.h>
@@ -74,15 +76,23 @@ TEST_F(RuntimeTest, ObjectThatHasGoneIsNotGivenAgain) {
     static_cast<void>(sp<IBinder>(new BpHwBinder(4'000'000'001)));
     EXPECT_EQ(ProcessState::self()->getStrongProxyForHandle(4'000'000'001), proxy)
             << "the end of another changes nothing";
+    const sp<Slow> served = new Slow;
+    const sp<IBinder> stub = android::hardware::getOrCreateCachedBinder(served.get());
+    android::hardware::details::gBnMap->eraseIfEqual(served.get(), nullptr);
+    EXPECT_EQ(android::hardware::getOrCreateCachedBinder(served.get()), stub);
 }
 
-TEST(LocalConnectionTest, EndInPlaceOfAReplyIsADeath) {
+TEST(LocalConnectionTest, SuccessInPlaceOfAReplyIsAFailureAndAnEndADeath) {
     int sockets[2];
     ASSERT_EQ(socketpair(AF_UNIX, SOCK_SEQPACKET, 0, sockets), 0);
     android::hardware::LocalConnection connection(sockets[0]);
+    android::hardware::Parcel reply;
+    android::hardware::Packet packet;
+    packet.packStatus(android::OK);
+    ASSERT_GT(send(sockets[1], packet.bytes, packet.size, 0), 0);
+    EXPECT_EQ(connection.transact(1, {}, &reply, 0), android::FAILED_TRANSACTION);
     // Not closed: the request that nobody has read would be an error of its own.
     shutdown(sockets[1], SHUT_WR);
-    android::hardware::Parcel reply;
     EXPECT_EQ(connection.transact(1, {}, &reply, 0), android::DEAD_OBJECT);
     close(sockets[1]);
 }
@@ -97,6 +107,7 @@ TEST_F(RuntimeTest, DeathNoticeThatCannotBeHadIsRefusedEveryTime) {
     EXPECT_EQ(unknown->linkToDeath(recipient), android::DEAD_OBJECT);
     EXPECT_EQ(unknown->linkToDeath(recipient), android::DEAD_OBJECT);
     EXPECT_EQ(unknown->unlinkToDeath(recipient), android::NAME_NOT_FOUND);
+    EXPECT_EQ(unknown->transact(1, {}, nullptr, 0), android::DEAD_OBJECT);
 }
 
 TEST_F(RuntimeTest, OneThreadServesHoweverManyJoin) {
@@ -109,12 +120,13 @@ TEST_F(RuntimeTest, OneThreadServesHoweverManyJoin) {
         const auto client = IServiceNotification::tryGetService("slow");
         ASSERT_NE(client, nullptr);
         EXPECT_TRUE(client->onRegistration("", "", false).isOk());
+        EXPECT_NE(client->registerAsService("another's"), android::OK);
     }
     EXPECT_TRUE(eventually([&] { return slow->calls == 6; }));
     EXPECT_EQ(slow->most, 1);
 }
 
-TEST_F(RuntimeTest, NameThatIsTakenIsWaitedForByAServerThatIsIdle) {
+TEST_F(RuntimeTest, WhatIsWaitedForLongIsFoundSoonByAServerThatIsIdle) {
     ChildProcess first;
     first.start([] {
         const sp<Slow> holder = new Slow;
@@ -132,8 +144,15 @@ TEST_F(RuntimeTest, NameThatIsTakenIsWaitedForByAServerThatIsIdle) {
     std::this_thread::sleep_for(milliseconds(50));
     const sp<Slow> second = new Slow;
     EXPECT_NE(second->registerAsService("taken"), android::OK);
+    std::thread search([] { EXPECT_NE(IServiceNotification::getService("late"), nullptr); });
+    // Long enough to show whether the tries get ever rarer.
+    std::this_thread::sleep_for(milliseconds(950));
+    const auto start = std::chrono::steady_clock::now();
     first.kill();
     EXPECT_TRUE(eventually(isServed));
+    EXPECT_EQ(second->registerAsService("late"), android::OK);
+    search.join();
+    EXPECT_LT(std::chrono::steady_clock::now() - start, milliseconds(700));
 }
 
 TEST_F(RuntimeTest, NamesOfFilesBesideTheSocketsAreRefused) {
@@ -151,7 +170,12 @@ TEST_F(RuntimeTest, WatchForServicesTakesOneThread) {
         EXPECT_TRUE(manager->registerForNotifications("a@1.0::IA", "x", callback));
         EXPECT_TRUE(manager->unregisterForNotifications("a@1.0::IA", "x", callback));
     }
-    EXPECT_LE(threadCount(), before + 1);
+    // One more may be about to end.
+    EXPECT_LE(threadCount(), before + 2);
+    // Nor does one begin to serve where the caller is to do so.
+    android::hardware::configureRpcThreadpool(1, true);
+    ProcessState::self()->startThreadPool();
+    EXPECT_TRUE(eventually([&] { return threadCount() == before; }));
 }
 
 /** Makes a call when its thread ends. */
