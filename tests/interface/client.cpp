@@ -57,7 +57,8 @@ void useTypes() {
     assert(packet == packet && !(packet != packet));
     hidl_vec<DaxHapticEnginePacket> packets = {packet};
     packets.resize(2);
-    assert(packets[0] == packet && packets.size() == 2 && packets != hidl_vec{packet});
+    assert(packets[0] == packet && packets[1] == DaxHapticEnginePacket{} && packets.size() == 2 &&
+           packets != hidl_vec{packet});
 }
 
 /** What a client does with a service, whether it is there or not. */

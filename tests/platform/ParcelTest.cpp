@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <gtest/gtest.h>
-#include <hwbinder/Parcel.h>
+#include <hidl/HidlBinderSupport.h>
 
 #include <cstdint>
 #include <string>
@@ -8,12 +8,14 @@
 namespace {
 
 using ::android::hardware::Parcel;
+using ::android::hardware::Status;
 
 TEST(ParcelTest, WhatIsReadIsWhatWasWritten) {
     Parcel parcel;
     parcel.writeUint8(2);
     parcel.writeString16("t\x80xt", 4);
     parcel.writeInt64(-5);
+    writeToParcel(Status::fromExceptionCode(Status::EX_NULL_POINTER, "why"), &parcel);
     parcel.setDataPosition(0);
     bool flag = false;
     EXPECT_EQ(parcel.readBool(&flag), android::OK);
@@ -24,8 +26,13 @@ TEST(ParcelTest, WhatIsReadIsWhatWasWritten) {
     uint64_t number = 0;
     EXPECT_EQ(parcel.readUint64(&number), android::OK);
     EXPECT_EQ(static_cast<int64_t>(number), -5);
+    Status status;
+    EXPECT_EQ(readFromParcel(&status, parcel), android::OK);
+    EXPECT_EQ(status.description(), "why");
     uint8_t more = 0;
     EXPECT_EQ(parcel.readUint8(&more), android::NOT_ENOUGH_DATA);
+    parcel.writeInt32(-1);
+    EXPECT_EQ(parcel.readString16(&text), android::BAD_VALUE);
 }
 
 }  // namespace

@@ -2,6 +2,7 @@
 #include "hwservicemanager/ServiceManager.h"
 #include "libhwbinder/Driver.h"
 
+#include <android/hidl/base/1.0/BpHwBase.h>
 #include <gtest/gtest.h>
 
 #include <string>
@@ -58,6 +59,9 @@ TEST_F(ServiceManagerTest, OnlySomeMayAdd) {
     EXPECT_FALSE(mManager->add("none", nullptr).withDefault(true));
     EXPECT_FALSE(mManager->addWithChain("none", nullptr, {kInterface}).withDefault(true));
     EXPECT_FALSE(mManager->addWithChain("none", mObject, {}).withDefault(true));
+    const sp<ServiceManager::Interface> gone = new ::android::hidl::base::V1_0::BpHwBase(
+            new ::android::hardware::BpHwBinder(4'000'000'000));
+    EXPECT_FALSE(mManager->addWithChain("none", gone, {kInterface}).withDefault(true));
 }
 
 TEST_F(ServiceManagerTest, LastOneAddedHasTheNamesAndOnlyItsProcessTakesThemAway) {
