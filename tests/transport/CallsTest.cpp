@@ -23,7 +23,6 @@ using ::android::wp;
 using ::android::hardware::hidl_death_recipient;
 using ::android::hardware::hidl_string;
 using ::android::hardware::Return;
-using ::android::hardware::Status;
 using ::android::hidl::base::V1_0::IBase;
 namespace vibrator = ::android::hardware::vibrator;
 namespace host = ::android::hardware::host;
@@ -94,9 +93,10 @@ TEST_F(CallsTest, BaseOperationsAnswerForTheObject) {
     EXPECT_TRUE(mClient->debug(nullptr, {"one", "", "three"}).isOk());
     EXPECT_EQ(mClient->perform_1_1({}, {}, nullptr).description(),
               "Null synchronous callback passed.");
-    EXPECT_EQ(Status::fromStatusT(-EPERM).description(), "Operation not permitted");
+    EXPECT_EQ(::android::hardware::Status::fromStatusT(-EPERM).description(),
+              "Operation not permitted");
     for (const auto error : {android::BAD_TYPE, android::NOT_ENOUGH_DATA})
-        EXPECT_EQ(Status::fromStatusT(error).description(),
+        EXPECT_EQ(::android::hardware::Status::fromStatusT(error).description(),
                   "the message does not hold what the operation takes");
 }
 

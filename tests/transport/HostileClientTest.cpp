@@ -162,8 +162,10 @@ TEST_F(HostileClientTest, IdleConnectionsGiveWayAndRootIsNeverLockedOut) {
 
     // And while all of them are busy, the oldest of each user with the last of its calls.
     stopServer();
-    for (size_t i = 0; i < 2 * clients.size(); ++i)
-        static_cast<void>(clients.rbegin()[i % clients.size()].send(request(kBase, kPing)));
+    for (int round = 0; round < 2; ++round) {
+        for (auto client = clients.rbegin(); client != clients.rend(); ++client)
+            static_cast<void>(client->send(request(kBase, kPing)));
+    }
     const std::vector<RawClient> newcomers = connecting(3, 3001);
     ::kill(mServer.pid(), SIGCONT);
     expectAllAnswer(newcomers);
