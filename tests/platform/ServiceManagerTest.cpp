@@ -2,7 +2,6 @@
 #include "hwservicemanager/ServiceManager.h"
 #include "libhwbinder/Driver.h"
 
-#include <android/hidl/base/1.0/BpHwBase.h>
 #include <gtest/gtest.h>
 
 #include <string>
@@ -25,6 +24,15 @@ struct Object : Notification {
         return ::android::hardware::Void();
     }
     std::vector<std::string> news;
+};
+
+/** An object of a process that has ended. */
+struct Gone : Object {
+    bool isRemote() const override { return true; }
+    Return<bool> linkToDeath(const sp<::android::hardware::hidl_death_recipient>& /* recipient */,
+                             uint64_t /* cookie */) override {
+        return false;
+    }
 };
 
 constexpr char kInterface[] = "android.hidl.manager@1.0::IServiceNotification";
@@ -59,9 +67,7 @@ TEST_F(ServiceManagerTest, OnlySomeMayAdd) {
     EXPECT_FALSE(mManager->add("none", nullptr).withDefault(true));
     EXPECT_FALSE(mManager->addWithChain("none", nullptr, {kInterface}).withDefault(true));
     EXPECT_FALSE(mManager->addWithChain("none", mObject, {}).withDefault(true));
-    const sp<ServiceManager::Interface> gone = new ::android::hidl::base::V1_0::BpHwBase(
-            new ::android::hardware::BpHwBinder(4'000'000'000));
-    EXPECT_FALSE(mManager->addWithChain("none", gone, {kInterface}).withDefault(true));
+    EXPECT_FALSE(mManager->addWithChain("none", new Gone, {kInterface}).withDefault(true));
 }
 
 TEST_F(ServiceManagerTest, LastOneAddedHasTheNamesAndOnlyItsProcessTakesThemAway) {
