@@ -62,6 +62,7 @@ status_t readEmbeddedFromParcel(const hidl_vec<T>& list, const Parcel& parcel, s
 }
 
 namespace details {
+// The rest of the two functions below, for calls that have failed.
 status_t writeException(const Status& status, Parcel* parcel);
 status_t readException(int32_t code, Status* status, const Parcel& parcel);
 }  // namespace details

@@ -34,7 +34,7 @@ class IPCThreadState {
     }
 
   private:
-    /** Outside a call; no user and no process have the number -1. */
+    /** Outside a call; no process has the number -1. */
     static constexpr int64_t kNobody = -1;
 
     int64_t mCaller = kNobody;
