@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Packets.h"
 
+#include <cstdint>
 #include <cstdlib>
 
 /** The input is a packet file. It is refused with a reason, or its packets survive a round trip. */

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "commands/Commands.h"
 
+#include <cstdint>
 #include <cstdlib>
 
 /** The input is a score: mistakes are in its lines, and a score without mistakes can be played. */

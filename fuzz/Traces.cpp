@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Plot.h"
 
+#include <cstdint>
 #include <cstdlib>
 #include <sstream>
 

@@ -5,6 +5,7 @@
 #include <android/hidl/manager/1.2/BpHwServiceManager.h>
 #include <hidl/HidlBinderSupport.h>
 
+#include <cstdint>
 #include <cstdlib>
 #include <cstring>
 #include <memory>
