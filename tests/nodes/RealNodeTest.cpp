@@ -28,6 +28,11 @@ __attribute__((noinline)) void* operator new(size_t size) {
     if (memory == nullptr) abort();
     return memory;
 }
+/** Else that of AddressSanitizer, whose memory the operator delete below would not know. */
+__attribute__((noinline)) void* operator new(size_t size,
+                                             const std::nothrow_t& /* tag */) noexcept {
+    return operator new(size);
+}
 /** Changes errno, as nothing keeps the C library from doing. */
 __attribute__((noinline)) void operator delete(void* memory) noexcept {
     free(memory);
