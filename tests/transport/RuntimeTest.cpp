@@ -13,10 +13,12 @@
 #include <hwbinder/Parcel.h>
 #include <hwbinder/ProcessState.h>
 #include <sys/socket.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <atomic>
 #include <chrono>
+#include <cstdlib>
 #include <filesystem>
 #include <thread>
 #include <vector>
@@ -64,6 +66,19 @@ TEST_F(RuntimeTest, DeviceThatCannotBeOpenedServesNothingHoweverOften) {
         for (int i = 0; i < 300; ++i)
             driver.serve();
     }).join();
+}
+
+TEST(RuntimeDeathTest, ServiceIsNotWaitedForOnADeviceThatCannotBeUsed) {
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
+    // Else the process has chosen its transport before.
+    setenv("HWBINDER_DEVICE", "/dev/null", 1);
+    EXPECT_EXIT(
+            {
+                alarm(3);
+                _exit(IDaxVibrator::getService() == nullptr ? 0 : 1);
+            },
+            ::testing::ExitedWithCode(0), "");
+    unsetenv("HWBINDER_DEVICE");
 }
 
 TEST_F(RuntimeTest, ObjectThatHasGoneIsNotGivenAgain) {
