@@ -31,6 +31,8 @@ TEST(ParcelTest, WhatIsReadIsWhatWasWritten) {
     EXPECT_EQ(status.description(), "why");
     uint8_t more = 0;
     EXPECT_EQ(parcel.readUint8(&more), android::NOT_ENOUGH_DATA);
+    android::sp<android::hardware::IBinder> object;
+    EXPECT_EQ(parcel.readNullableStrongBinder(&object), android::NOT_ENOUGH_DATA);
     parcel.writeInt32(-1);
     EXPECT_EQ(parcel.readString16(&text), android::BAD_VALUE);
 }
