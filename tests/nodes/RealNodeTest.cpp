@@ -28,7 +28,7 @@ __attribute__((noinline)) void* operator new(size_t size) {
     if (memory == nullptr) abort();
     return memory;
 }
-/** Else that of AddressSanitizer, whose memory the operator delete below would not know. */
+/** Without this one AddressSanitizer's is called, whose memory must not go to the free() below. */
 __attribute__((noinline)) void* operator new(size_t size,
                                              const std::nothrow_t& /* tag */) noexcept {
     return operator new(size);

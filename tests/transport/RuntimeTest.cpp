@@ -69,12 +69,12 @@ TEST_F(RuntimeTest, DeviceThatCannotBeOpenedServesNothingHoweverOften) {
 }
 
 TEST(RuntimeDeathTest, ServiceIsNotWaitedForOnADeviceThatCannotBeUsed) {
+    // In a program that is started anew: this one may have chosen its transport already.
     GTEST_FLAG_SET(death_test_style, "threadsafe");
-    // Else the process has chosen its transport before.
     setenv("HWBINDER_DEVICE", "/dev/null", 1);
     EXPECT_EXIT(
             {
-                alarm(3);
+                alarm(3);  // Less than the patience with a device that can be used.
                 _exit(IDaxVibrator::getService() == nullptr ? 0 : 1);
             },
             ::testing::ExitedWithCode(0), "");
