@@ -42,10 +42,12 @@ TEST_F(ServiceTest, RegistersWithoutADriver) {
 TEST_F(ServiceTest, ServesEveryOperationToEveryCaller) {
     std::vector<uid_t> uids = {geteuid()};
     if (geteuid() == 0) uids = {0, 1000, 1001, 2000, 10123};
-    for (const auto& [name, layout] : {std::pair("led", simulator::Layout::kLedTrigger),
-                                       std::pair("timed", simulator::Layout::kTimedOutput)}) {
+    const std::vector<std::string> all = simulator::featureNames();
+    const simulator::Features features = {{all.begin(), all.end()}};
+    for (const simulator::Layout layout :
+         {simulator::Layout::kLedTrigger, simulator::Layout::kTimedOutput}) {
         std::filesystem::remove_all(mDirectory.path() + "/sys");
-        createDriver({"--layout", name});
+        ASSERT_EQ(simulator::createDriver(mDirectory.path(), layout, features), 0);
         start();
         const auto vibrator = IDaxVibrator::getService();
         std::ifstream trace(mDirectory.path() + "/trace");
@@ -54,7 +56,7 @@ TEST_F(ServiceTest, ServesEveryOperationToEveryCaller) {
             if (uid != 0 && uid != 1000) circumstances.refused = uid;
             for (const Operation& operation : allOperations()) {
                 SCOPED_TRACE(operation.name + " by " + std::to_string(uid));
-                createDriver({"--layout", name});
+                ASSERT_EQ(simulator::createDriver(mDirectory.path(), layout, features), 0);
                 const std::vector<Step> steps = parseSteps(layout, operation.steps);
                 prepareNodes(mDirectory.path(), layout, steps);
                 trace.clear();
