@@ -54,6 +54,7 @@ void useTypes() {
     assert(both == 1);
     const DaxHapticEnginePacket packet{1, 2, 3, 4};
     assert(toString(packet) == "{.param0 = 1, .intensity = 2, .param2 = 3, .param3 = 4}");
+    assert(toString(hidl_vec<hidl_string>{"a", ""}) == "[2]{\"a\", \"\"}");
     assert(packet == packet && !(packet != packet));
     hidl_vec<DaxHapticEnginePacket> packets = {packet};
     packets.resize(2);
