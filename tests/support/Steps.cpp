@@ -4,13 +4,16 @@
 #include "Faults.h"
 #include "Trace.h"
 
+#include <regex.h>
+
+#include <algorithm>
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <iostream>
+#include <iterator>
 #include <map>
-#include <regex>
 
 namespace {
 
@@ -25,17 +28,40 @@ std::string replaced(std::string text, const std::string& part, const std::strin
 /** What a step that depends on the layout stands for. */
 std::string expanded(Layout layout, const std::string& step) {
     const bool isTimed = layout == Layout::kTimedOutput;
-    static const std::regex on("on=(-?\\d+)(~?)");
-    std::smatch parts;
     if (step == "off")
         return isTimed ? "enable=0" : "activate=0; !E THE_DEVICE_ACTIVATE is impossible";
     if (step == "running?") return isTimed ? R"(enable:7="0\n"~)" : R"(duration:7="0\n"~)";
-    if (!std::regex_match(step, parts, on)) return step;
-    if (isTimed) return "enable=" + parts[1].str() + parts[2].str();
-    return "(; state=1; !E THE_DEVICE_STATE is impossible; duration=" + parts[1].str() +
+    if (step.compare(0, 3, "on=") != 0) return step;
+    if (isTimed) return "enable=" + step.substr(3);
+    const size_t end = std::min(step.find('~'), step.size());
+    return "(; state=1; !E THE_DEVICE_STATE is impossible; duration=" + step.substr(3, end - 3) +
            "; !E THE_DEVICE_DURATION is impossible; activate=1; "
            "!E THE_DEVICE_ACTIVATE is impossible; )" +
-           parts[2].str();
+           step.substr(end);
+}
+
+/** The parts of a step that accesses a node; none if the text is no such step. */
+std::map<std::string, std::string> partsOfAccess(const std::string& text) {
+    static const char* const kGroups[] = {"",     "leaf",  "",       "open fault", "access", "size",
+                                          "read", "value", "quoted", "",           "fault",  "end"};
+    // POSIX: each standard library takes seconds to compile its own regular expressions.
+    static const regex_t access = [] {
+        regex_t pattern;
+        if (regcomp(&pattern,
+                    R"re(^(\w+)(!(\w+))?(\?r?|=|:([0-9]+)(r?)=)(-?[0-9]+|"([^"]*)")?(!(\w+))?(~?)$)re",
+                    REG_EXTENDED) != 0)
+            abort();
+        return pattern;
+    }();
+    regmatch_t found[std::size(kGroups)];
+    std::map<std::string, std::string> parts;
+    if (regexec(&access, text.c_str(), std::size(found), found, 0) != 0) return parts;
+    for (size_t i = 1; i < std::size(found); ++i) {
+        if (found[i].rm_so < 0) continue;
+        parts[kGroups[i]] = text.substr(static_cast<size_t>(found[i].rm_so),
+                                        static_cast<size_t>(found[i].rm_eo - found[i].rm_so));
+    }
+    return parts;
 }
 
 Step parseStep(std::string text) {
@@ -44,11 +70,7 @@ Step parseStep(std::string text) {
         step.isAfterFailure = true;
         text.erase(0, 1);
     }
-    static const std::regex access(
-            R"re((\w+)(?:!(\w+))?(\?r?|=|:(\d+)(r?)=)(-?\d+|"([^"]*)")?(?:!(\w+))?(~?))re");
-    static const std::regex line("[DE] [^]*");
-    std::smatch parts;
-    if (std::regex_match(text, line)) {
+    if (text.compare(0, 2, "D ") == 0 || text.compare(0, 2, "E ") == 0) {
         step.text = text;
     } else if (text[0] == '=') {
         step.kind = Step::kAnswer;
@@ -60,22 +82,23 @@ Step parseStep(std::string text) {
     } else if (text == ")" || text == ")~") {
         step.kind = Step::kEnd;
         step.isOptional = text.size() > 1;
-    } else if (std::regex_match(text, parts, access)) {
-        const char kind = parts[3].str()[0];
+    } else if (std::map parts = partsOfAccess(text); !parts.empty()) {
+        const char kind = parts["access"][0];
+        const bool isQuoted = parts.count("quoted") > 0;
         step.kind = kind == '?' ? Step::kProbe : kind == '=' ? Step::kWrite : Step::kRead;
-        step.leaf = parts[1];
-        step.size = parts[4].matched ? std::stoul(parts[4]) : 0;
-        step.isPrimitive = kind == '?' || (kind == '=' ? !parts[7].matched : step.size == 7);
-        step.readsOnly = parts[3] == "?r" || parts[5] == "r" || (kind == ':' && step.size == 7);
-        step.text = parts[7].matched ? parts[7].str() : parts[6].str() + "\\n";
-        if (parts[2].matched) step.faults["open"] = parts[2];
-        if (parts[8].matched) {
-            const std::string fault = parts[8];
+        step.leaf = parts["leaf"];
+        step.size = kind == ':' ? std::stoul(parts["size"]) : 0;
+        step.isPrimitive = kind == '?' || (kind == '=' ? !isQuoted : step.size == 7);
+        step.readsOnly =
+                parts["access"] == "?r" || parts["read"] == "r" || (kind == ':' && step.size == 7);
+        step.text = isQuoted ? parts["quoted"] : parts["value"] + "\\n";
+        if (const std::string& fault = parts["open fault"]; !fault.empty())
+            step.faults["open"] = fault;
+        if (const std::string& fault = parts["fault"]; !fault.empty())
             step.faults[step.kind == Step::kProbe ? "open" : step.transfer()] =
                     fault[0] == 'E' ? fault : "short=" + fault;
-        }
         step.isFaultTold = !step.faults.empty();
-        step.isOptional = parts[9].length() > 0;
+        step.isOptional = !parts["end"].empty();
     } else {
         std::cerr << "\"" << text << "\" is no step\n";
         abort();
@@ -276,11 +299,11 @@ std::string Step::bytes() const {
 }
 
 std::vector<Step> parseSteps(Layout layout, const std::string& text) {
-    static const std::regex step("(?:; |\\n) *([^;\\n]*)");
     const auto each = [](const std::string& all, const auto& function) {
-        const std::string marked = "; " + all;
-        for (std::sregex_iterator i(marked.begin(), marked.end(), step), end; i != end; ++i) {
-            if (!(*i)[1].str().empty()) function((*i)[1].str());
+        for (size_t at = 0; (at = all.find_first_not_of(" ;\n", at)) != std::string::npos;) {
+            const size_t end = std::min(all.find_first_of(";\n", at), all.size());
+            function(all.substr(at, end - at));
+            at = end;
         }
     };
     std::vector<Step> steps;
