@@ -50,8 +50,9 @@ class CallsTest : public TransportTest {
 };
 
 TEST_F(CallsTest, MessageThatIsTooLargeCostsOnlyItself) {
-    const std::vector<DaxHapticEnginePacket> packets(100'000);
-    for (int i = 0; i < 3; ++i) {
+    // The packets of the last two fit; the message around them does not.
+    for (const size_t count : {100'000, 4096, 4095}) {
+        const std::vector<DaxHapticEnginePacket> packets(count);
         const Return<VibratorStatus> result = mClient->daxPerformHapticEngine(packets, 1);
         EXPECT_FALSE(result.isOk());
         EXPECT_FALSE(result.isDeadObject());
@@ -93,11 +94,14 @@ TEST_F(CallsTest, BaseOperationsAnswerForTheObject) {
     EXPECT_TRUE(mClient->debug(nullptr, {"one", "", "three"}).isOk());
     EXPECT_EQ(mClient->perform_1_1({}, {}, nullptr).description(),
               "Null synchronous callback passed.");
-    EXPECT_EQ(::android::hardware::Status::fromStatusT(-EPERM).description(),
-              "Operation not permitted");
-    for (const auto error : {android::BAD_TYPE, android::NOT_ENOUGH_DATA})
-        EXPECT_EQ(::android::hardware::Status::fromStatusT(error).description(),
-                  "the message does not hold what the operation takes");
+    const std::pair<android::status_t, const char*> descriptions[] = {
+            {-EPERM, "Operation not permitted"},
+            {android::UNKNOWN_ERROR, "unknown error"},
+            {android::BAD_TYPE, "the message does not hold what the operation takes"},
+            {android::NOT_ENOUGH_DATA, "the message does not hold what the operation takes"},
+    };
+    for (const auto& [error, description] : descriptions)
+        EXPECT_EQ(android::hardware::Status::fromStatusT(error).description(), description);
 }
 
 TEST_F(CallsTest, ObjectIsFoundUnderEveryInterfaceOfItsChain) {
