@@ -51,7 +51,7 @@ class CallsTest : public TransportTest {
 
 TEST_F(CallsTest, MessageThatIsTooLargeCostsOnlyItself) {
     // The packets of the last two fit; the message around them does not.
-    for (const size_t count : {100'000, 4096, 4095}) {
+    for (const size_t count : {100'000U, 4096U, 4095U}) {
         const std::vector<DaxHapticEnginePacket> packets(count);
         const Return<VibratorStatus> result = mClient->daxPerformHapticEngine(packets, 1);
         EXPECT_FALSE(result.isOk());
