@@ -44,7 +44,7 @@ std::string expanded(Layout layout, const std::string& step) {
 std::map<std::string, std::string> partsOfAccess(const std::string& text) {
     static const char* const kGroups[] = {"",     "leaf",  "",       "open fault", "access", "size",
                                           "read", "value", "quoted", "",           "fault",  "end"};
-    // POSIX: each standard library takes seconds to compile its own regular expressions.
+    // Not std::regex, which takes the compiler seconds.
     static const regex_t access = [] {
         regex_t pattern;
         if (regcomp(&pattern,
@@ -82,7 +82,7 @@ Step parseStep(std::string text) {
     } else if (text == ")" || text == ")~") {
         step.kind = Step::kEnd;
         step.isOptional = text.size() > 1;
-    } else if (std::map parts = partsOfAccess(text); !parts.empty()) {
+    } else if (auto parts = partsOfAccess(text); !parts.empty()) {
         const char kind = parts["access"][0];
         const bool isQuoted = parts.count("quoted") > 0;
         step.kind = kind == '?' ? Step::kProbe : kind == '=' ? Step::kWrite : Step::kRead;
