@@ -50,8 +50,10 @@ class CallsTest : public TransportTest {
 };
 
 TEST_F(CallsTest, MessageThatIsTooLargeCostsOnlyItself) {
-    // The packets of the last two fit; the message around them does not.
-    for (const size_t count : {100'000U, 4096U, 4095U}) {
+    std::vector<size_t> counts = {100'000};
+    // Over sockets these packets fit; the message around them does not. The kernel takes more.
+    if (!isKernel()) counts.insert(counts.end(), {4096, 4095});
+    for (const size_t count : counts) {
         const std::vector<DaxHapticEnginePacket> packets(count);
         const Return<VibratorStatus> result = mClient->daxPerformHapticEngine(packets, 1);
         EXPECT_FALSE(result.isOk());
