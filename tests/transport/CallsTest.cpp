@@ -279,7 +279,7 @@ TEST_F(CallsTest, ValueOfAFailedCallEndsTheProcess) {
     mServer.kill();
     const Return<VibratorStatus> failed = mClient->off();
     EXPECT_DEATH(static_cast<void>(static_cast<VibratorStatus>(failed)),
-                 "the value of a failed call was used: the service has gone");
+                 "F/hwbinder.*: the value of a failed call was used: the service has gone");
 }
 
 }  // namespace

@@ -15,6 +15,7 @@ namespace fs = std::filesystem;
 namespace host = ::android::hardware::host;
 
 constexpr char kName[] = "vendor.velmora.hardware.vibrator@2.1::IDaxVibrator.default";
+constexpr char kInheritedName[] = "vendor.velmora.hardware.vibrator@2.0::IDaxVibrator.default";
 
 class PublicationTest : public TransportTest {
   protected:
@@ -57,8 +58,7 @@ TEST_F(PublicationTest, SearchSaysEveryPlaceThatItHasLookedAt) {
 
 TEST_F(PublicationTest, NameGoesToTheNextWhenItsHolderHasGone) {
     // An inherited interface's name that another service had.
-    const std::string inherited =
-            mDirectory.path() + "/vendor.velmora.hardware.vibrator@2.0::IDaxVibrator.default";
+    const std::string inherited = mDirectory.path() + "/" + kInheritedName;
     fs::create_symlink("another", inherited);
     // What a daemon that died in its start has left.
     for (const std::string& each : {mDirectory.path() + "/" + kName, inherited})
@@ -77,8 +77,14 @@ TEST_F(PublicationTest, NameGoesToTheNextWhenItsHolderHasGone) {
     EXPECT_EQ(secondsLog().find("is registered now"), std::string::npos);
     mServer.kill();
     EXPECT_TRUE(eventually(answers));
-    EXPECT_NE(secondsLog().find("is registered now"), std::string::npos);
+    EXPECT_NE(secondsLog().find(std::string(kName) + " is registered now"), std::string::npos);
     EXPECT_EQ(fs::read_symlink(inherited), kName);
+}
+
+TEST_F(PublicationTest, NameOfAnInheritedInterfaceThatCannotBeHadIsSaid) {
+    const std::string path = mDirectory.path() + "/" + kInheritedName;
+    fs::create_directory(path + "~");
+    expectLog(kName + (" is not registered: " + path) + ": File exists");
 }
 
 TEST_F(PublicationTest, OfManyStartsOneHasTheName) {
@@ -192,7 +198,7 @@ TEST_F(PublicationTest, ServerOfAStrangerIsNotCalled) {
 TEST_F(PublicationTest, LogSaysWhatTheCallsGoOver) {
     expectLog("calls go over sockets in " + mDirectory.path() + ", as HWBINDER_DIR says");
     setenv("HWBINDER_DEVICE", "/dev/null", 1);
-    expectLog("/dev/null: not a binder device");
+    expectLog("not registered: the service manager is not there: /dev/null: not a binder device");
     unsetenv("HWBINDER_DEVICE");
 }
 
