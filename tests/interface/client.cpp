@@ -44,7 +44,7 @@ struct Notification : IServiceNotification {
 /** What the generated headers offer for types. */
 void useTypes() {
     assert(toString(Status::BAD_VALUE) == "BAD_VALUE");
-    assert(toString(static_cast<Effect>(99)) == "0x63");
+    assert(toString(static_cast<Effect>(0x9abcdef)) == "0x9abcdef");
     int effects = 0;
     for (const Effect effect : hidl_enum_range<Effect>())
         effects += static_cast<int>(effect);
@@ -60,6 +60,7 @@ void useTypes() {
     packets.resize(2);
     assert(packets[0] == packet && packets[1] == DaxHapticEnginePacket{} && packets.size() == 2 &&
            packets != hidl_vec{packet});
+    assert(hidl_string(static_cast<const char*>(nullptr)) < hidl_string("ab", 1));
 }
 
 /** What a client does with a service, whether it is there or not. */
@@ -84,6 +85,9 @@ int main() {
     use(IVibrator::tryGetService());
     use(IDaxVibrator::tryGetService("default"));
     assert(IDaxVibrator::registerForNotifications("default", new Notification));
-    assert(IDaxVibrator::castFrom(sp<IBase>(new Notification)).withDefault(nullptr) == nullptr);
+    const sp<IServiceNotification> local = new Notification;
+    assert(IDaxVibrator::castFrom(sp<IBase>(local)).withDefault(nullptr) == nullptr);
+    assert(IDaxVibrator::castFrom(sp<IBase>()).withDefault(nullptr) == nullptr);
+    assert(IServiceNotification::castFrom(sp<IBase>(local)).withDefault(nullptr) == local);
     return 0;
 }

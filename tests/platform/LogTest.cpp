@@ -33,6 +33,9 @@ TEST(LogFilterTest, RulesDecideByTagAndPriority) {
             {"*", ANDROID_LOG_DEBUG, "A", true},
             {"  A:S\t", ANDROID_LOG_FATAL, "A", false},
             {"A:F", ANDROID_LOG_ERROR, "A", false},
+            {"A:W *:I", ANDROID_LOG_INFO, "A", false},
+            {"A:W *:I", ANDROID_LOG_INFO, "B", true},
+            {"*:S\nA:V\tB:S", ANDROID_LOG_VERBOSE, "A", true},
     };
     for (const auto& [rules, priority, tag, shown] : cases) {
         EXPECT_EQ(LogFilter(rules).shows(priority, tag), shown) << rules << ' ' << tag;
@@ -77,6 +80,8 @@ TEST(LogTest, LineHasTheBriefForm) {
     __android_log_print(ANDROID_LOG_DEBUG, "T", "%s", std::string(5000, '\n').c_str());
     const std::string longest = log.takeText();
     EXPECT_EQ(longest.size() - longest.find("): ") - 3, 2 * 1023 + 1U) << longest;
+    __android_log_print(ANDROID_LOG_DEBUG, std::string(100, 'x').c_str(), "\1");
+    EXPECT_EQ(log.takeText(), "D/" + std::string(64, 'x') + "(" + shown + "): \\x01\n");
 }
 
 }  // namespace

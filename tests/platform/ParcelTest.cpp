@@ -35,6 +35,8 @@ TEST(ParcelTest, WhatIsReadIsWhatWasWritten) {
     EXPECT_EQ(parcel.readNullableStrongBinder(&object), android::NOT_ENOUGH_DATA);
     parcel.writeInt32(-1);
     EXPECT_EQ(parcel.readString16(&text), android::BAD_VALUE);
+    parcel.writeInt32(Status::EX_ILLEGAL_ARGUMENT);
+    EXPECT_EQ(readFromParcel(&status, parcel), android::NOT_ENOUGH_DATA) << "its text is missing";
 }
 
 }  // namespace

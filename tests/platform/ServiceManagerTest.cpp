@@ -1,9 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "hwservicemanager/ServiceManager.h"
 #include "libhwbinder/Driver.h"
+#include "support/LogCapture.h"
 
+#include <android/hidl/manager/1.0/BpHwServiceNotification.h>
 #include <gtest/gtest.h>
 
+#include <list>
 #include <string>
 #include <vector>
 
@@ -11,9 +14,12 @@ namespace {
 
 using ::android::sp;
 using Caller = ::android::hardware::CallerIdentity;
+using ::android::hardware::getOrCreateCachedBinder;
+using ::android::hardware::hidl_death_recipient;
 using ::android::hardware::hidl_string;
 using ::android::hardware::Return;
 using Notification = ::android::hidl::manager::V1_0::IServiceNotification;
+using ::android::hidl::manager::V1_0::BpHwServiceNotification;
 
 /** An object to register, and to be told of others. */
 struct Object : Notification {
@@ -26,13 +32,25 @@ struct Object : Notification {
     std::vector<std::string> news;
 };
 
-/** An object of a process that has ended. */
-struct Gone : Object {
-    bool isRemote() const override { return true; }
-    Return<bool> linkToDeath(const sp<::android::hardware::hidl_death_recipient>& /* recipient */,
-                             uint64_t /* cookie */) override {
-        return false;
+/** A proxy of an object as if that were of another process, whose end the test decides. */
+struct Remote : BpHwServiceNotification {
+    explicit Remote(const sp<Object>& object)
+        : BpHwServiceNotification(getOrCreateCachedBinder(object.get())) {}
+    Return<bool> linkToDeath(const sp<hidl_death_recipient>& recipient, uint64_t) override {
+        if (isAlive) recipients.push_back(recipient);
+        return isAlive;
     }
+    Return<bool> unlinkToDeath(const sp<hidl_death_recipient>& recipient) override {
+        recipients.remove(recipient);
+        return true;
+    }
+    void die() {
+        isAlive = false;
+        for (const auto& recipient : std::list(recipients))
+            recipient->serviceDied(0, nullptr);
+    }
+    bool isAlive = true;
+    std::list<sp<hidl_death_recipient>> recipients;
 };
 
 constexpr char kInterface[] = "android.hidl.manager@1.0::IServiceNotification";
@@ -54,6 +72,7 @@ class ServiceManagerTest : public ::testing::Test {
 };
 
 TEST_F(ServiceManagerTest, OnlySomeMayAdd) {
+    LogCapture log;
     for (const uid_t uid : {0U, 1000U, getuid(), kNobody}) {
         const bool isAllowed = uid != kNobody;
         const std::string name = "of" + std::to_string(uid);
@@ -62,12 +81,48 @@ TEST_F(ServiceManagerTest, OnlySomeMayAdd) {
         EXPECT_EQ(mManager->addWithChain(name, mObject, {kInterface}).withDefault(false),
                   isAllowed);
         EXPECT_EQ(knows(name.c_str()), isAllowed);
+        const std::string text = log.takeText();
+        const std::string said = isAllowed ? "/" + name + " of process 7"
+                                           : "uid 54321 may not add a service \"of54321\"";
+        EXPECT_NE(text.find(said + "\n"), std::string::npos) << text;
     }
     EXPECT_FALSE(mManager->add("", mObject).withDefault(true));
     EXPECT_FALSE(mManager->add("none", nullptr).withDefault(true));
     EXPECT_FALSE(mManager->addWithChain("none", nullptr, {kInterface}).withDefault(true));
     EXPECT_FALSE(mManager->addWithChain("none", mObject, {}).withDefault(true));
-    EXPECT_FALSE(mManager->addWithChain("none", new Gone, {kInterface}).withDefault(true));
+    const sp<Remote> gone = new Remote(mObject);
+    gone->die();
+    EXPECT_FALSE(mManager->addWithChain("none", gone, {kInterface}).withDefault(true));
+    EXPECT_FALSE(mManager->registerForNotifications(kInterface, "", gone).withDefault(true));
+}
+
+TEST_F(ServiceManagerTest, DeathTakesAwayAllThatAProcessHad) {
+    const Caller caller(0, 7);
+    const sp<Remote> remote = new Remote(mObject);
+    EXPECT_TRUE(mManager->addWithChain("one", remote, {kInterface}));
+    EXPECT_TRUE(mManager->addWithChain("two", remote, {kInterface}));
+    EXPECT_TRUE(mManager->registerForNotifications(kInterface, "", remote));
+    EXPECT_EQ(remote->recipients.size(), 3U);
+    // Each call comes with a proxy of its own.
+    EXPECT_TRUE(mManager->unregisterForNotifications(kInterface, "", new Remote(mObject)));
+    EXPECT_TRUE(mManager->tryUnregister(kInterface, "one", new Remote(mObject)));
+    EXPECT_TRUE(mManager->add("two", new Object));
+    EXPECT_TRUE(remote->recipients.empty()) << "the death is of no interest any more";
+
+    EXPECT_TRUE(mManager->addWithChain("three", remote, {kInterface, "a@1.0::IA"}));
+    EXPECT_TRUE(mManager->registerForNotifications("b@1.0::IB", "", remote));
+    remote->die();
+    EXPECT_EQ(names(), std::vector<std::string>{std::string(kInterface) + "/two"});
+    EXPECT_FALSE(mManager->unregisterForNotifications("", "", new Remote(mObject)));
+}
+
+TEST_F(ServiceManagerTest, BinderOfAnotherInterfaceIsNoListener) {
+    const auto listener = [](::android::hidl::base::V1_0::IBase* object) {
+        return ::android::hardware::fromBinder<Notification, BpHwServiceNotification, void>(
+                getOrCreateCachedBinder(object));
+    };
+    EXPECT_EQ(listener(mObject.get()), mObject);
+    EXPECT_EQ(listener(mManager.get()), nullptr);
 }
 
 TEST_F(ServiceManagerTest, LastOneAddedHasTheNamesAndOnlyItsProcessTakesThemAway) {

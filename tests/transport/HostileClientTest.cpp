@@ -354,6 +354,8 @@ TEST_F(HostileClientTest, LogThatNobodyReadsHoldsNobodyUp) {
             ASSERT_EQ(client.call(request(kV10, kOn, {1})).status, 0);
         mServer.kill();
     }
+    char shown = '\0';
+    EXPECT_EQ(read(terminal, &shown, 1), 1) << "as much as it takes";
     for (const int descriptor : {pipe[0], pipe[1], brokenPipe[1], terminal})
         close(descriptor);
 }

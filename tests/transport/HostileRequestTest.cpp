@@ -68,10 +68,12 @@ const Target kTargets[] = {
          }},
 };
 
-constexpr status_t kNoData = android::NOT_ENOUGH_DATA;
-constexpr status_t kBadType = android::BAD_TYPE;
-constexpr status_t kBadValue = android::BAD_VALUE;
-constexpr status_t kFailed = android::FAILED_TRANSACTION;
+// In numbers, as they travel: those of a device are the same.
+constexpr status_t kNoData = -61;
+constexpr status_t kBadType = INT32_MIN + 1;
+constexpr status_t kBadValue = -22;
+constexpr status_t kFailed = INT32_MIN + 2;
+constexpr status_t kUnknown = -74;
 
 const struct {
     const char* name;
@@ -215,7 +217,7 @@ TEST_P(HostileRequestTest, WrongTokensAndCodesAreRefused) {
     EXPECT_EQ(call(RawMessage(token.substr(0, token.size() / 4 * 4)), GetParam().code), kBadType);
     EXPECT_EQ(call(RawMessage(""), GetParam().code), kBadType);
     for (const uint32_t code : {0U, 26U, 0x0f000000U, 0x5f504e47U, UINT32_MAX})
-        EXPECT_EQ(call(right(), code), android::UNKNOWN_TRANSACTION) << code;
+        EXPECT_EQ(call(right(), code), kUnknown) << code;
     EXPECT_EQ(call(right(), raw::kPing), kBadType);
 }
 

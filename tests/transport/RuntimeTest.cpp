@@ -2,6 +2,7 @@
 #include "libhwbinder/KernelDriver.h"
 #include "libhwbinder/LocalConnection.h"
 #include "libhwbinder/Packet.h"
+#include "support/LogCapture.h"
 #include "transport/TransportTest.h"
 
 #include <android/hidl/manager/1.0/IServiceNotification.h>
@@ -75,7 +76,8 @@ TEST(RuntimeDeathTest, ServiceIsNotWaitedForOnADeviceThatCannotBeUsed) {
     EXPECT_EXIT(
             {
                 alarm(3);  // Less than the patience with a device that can be used.
-                _exit(IDaxVibrator::getService() == nullptr ? 0 : 1);
+                if (IDaxVibrator::getService() != nullptr) _exit(1);
+                _exit((new Slow)->registerAsService("x") == android::NO_INIT ? 0 : 2);
             },
             ::testing::ExitedWithCode(0), "");
     unsetenv("HWBINDER_DEVICE");
@@ -160,6 +162,7 @@ TEST_F(RuntimeTest, WhatIsWaitedForLongIsFoundSoonByAServerThatIsIdle) {
     std::this_thread::sleep_for(milliseconds(50));
     const sp<Slow> second = new Slow;
     EXPECT_NE(second->registerAsService("taken"), android::OK);
+    LogCapture ownLog;
     std::thread search([] { EXPECT_NE(IServiceNotification::getService("late"), nullptr); });
     // Long enough to show whether the tries get ever rarer.
     std::this_thread::sleep_for(milliseconds(950));
@@ -169,6 +172,10 @@ TEST_F(RuntimeTest, WhatIsWaitedForLongIsFoundSoonByAServerThatIsIdle) {
     EXPECT_EQ(second->registerAsService("late"), android::OK);
     search.join();
     EXPECT_LT(std::chrono::steady_clock::now() - start, milliseconds(700));
+    const std::string text = ownLog.takeText();
+    const std::string waiting = std::string("): waiting; ") + Slow::descriptor + "/late is not";
+    EXPECT_LT(text.find(waiting), text.size()) << text;
+    EXPECT_EQ(text.find(waiting), text.rfind(waiting)) << "it is said once";
 }
 
 TEST_F(RuntimeTest, NamesOfFilesBesideTheSocketsAreRefused) {
@@ -176,6 +183,22 @@ TEST_F(RuntimeTest, NamesOfFilesBesideTheSocketsAreRefused) {
         EXPECT_NE((new Slow)->registerAsService(name), android::OK) << name;
         EXPECT_EQ(IServiceNotification::tryGetService(name), nullptr);
     }
+}
+
+TEST_F(RuntimeTest, WhatIsNoServiceIsNotRegistered) {
+    auto& makers = android::hardware::details::getBnConstructorMap();
+    const auto make = makers.get(Slow::descriptor, nullptr);
+    makers.erase(Slow::descriptor);
+    LogCapture ownLog;
+    EXPECT_EQ((new Slow)->registerAsService("x"), android::UNKNOWN_ERROR);
+    makers.set(Slow::descriptor, make);
+    EXPECT_NE(ownLog.takeText().find("): no stub is known for android.hidl.manager@1.0::ISe"),
+              std::string::npos);
+    const auto manager = android::hardware::defaultServiceManager1_2();
+    EXPECT_FALSE(manager->addWithChain("x", new Slow, {}).withDefault(true));
+    EXPECT_FALSE(manager->addWithChain("x", nullptr, {"a@1.0::IA"}).withDefault(true));
+    setenv("HWBINDER_DIR", "/nowhere", 1);
+    EXPECT_TRUE(manager->list([](const auto& names) { EXPECT_EQ(names.size(), 0U); }).isOk());
 }
 
 TEST_F(RuntimeTest, WatchForServicesTakesOneThread) {
