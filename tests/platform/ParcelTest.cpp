@@ -1,13 +1,20 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "hwservicemanager/ServiceManager.h"
+
 #include <gtest/gtest.h>
 #include <hidl/HidlBinderSupport.h>
+#include <hwbinder/ProcessState.h>
 
 #include <cstdint>
 #include <string>
 
 namespace {
 
+using ::android::sp;
+using ::android::hardware::getOrCreateCachedBinder;
+using ::android::hardware::IBinder;
 using ::android::hardware::Parcel;
+using ::android::hardware::ProcessState;
 using ::android::hardware::Status;
 
 TEST(ParcelTest, WhatIsReadIsWhatWasWritten) {
@@ -20,7 +27,7 @@ TEST(ParcelTest, WhatIsReadIsWhatWasWritten) {
     bool flag = false;
     EXPECT_EQ(parcel.readBool(&flag), android::OK);
     EXPECT_TRUE(flag) << "any byte but 0";
-    std::string text;
+    std::string text = "older";
     EXPECT_EQ(parcel.readString16(&text), android::OK);
     EXPECT_EQ(text, "t?xt");
     uint64_t number = 0;
@@ -37,6 +44,55 @@ TEST(ParcelTest, WhatIsReadIsWhatWasWritten) {
     EXPECT_EQ(parcel.readString16(&text), android::BAD_VALUE);
     parcel.writeInt32(Status::EX_ILLEGAL_ARGUMENT);
     EXPECT_EQ(readFromParcel(&status, parcel), android::NOT_ENOUGH_DATA) << "its text is missing";
+}
+
+TEST(ParcelTest, ObjectsAreReadAsWhatTheyAre) {
+    const sp<IBinder> objects[] = {getOrCreateCachedBinder(new ServiceManager),
+                                   ProcessState::self()->getStrongProxyForHandle(4'000'000'002),
+                                   nullptr};
+    Parcel parcel;
+    // So many that the parcel grows more than once.
+    for (size_t i = 0; i < 60; ++i)
+        parcel.writeStrongBinder(objects[i % 3]);
+    EXPECT_EQ(parcel.offsetCount(), 40U) << "none for no object";
+    const native_handle_t descriptors{};
+    EXPECT_EQ(parcel.writeNativeHandleNoDup(&descriptors), android::INVALID_OPERATION);
+    const std::string text(20'000, 'x');
+    size_t parent = 0;
+    parcel.writeBuffer(text.data(), 24, &parent);
+    parcel.writeEmbeddedBuffer(text.data(), 8, nullptr, parent, 0);
+    parcel.writeString16(text.data(), text.size());
+    parcel.setDataPosition(0);
+    for (size_t i = 0; i < 60; ++i) {
+        sp<IBinder> object = objects[0];
+        EXPECT_EQ(parcel.readNullableStrongBinder(&object), android::OK);
+        EXPECT_EQ(object, objects[i % 3]);
+    }
+    const void* buffer = nullptr;
+    EXPECT_EQ(parcel.readBuffer(24, nullptr, &buffer), android::OK);
+    EXPECT_EQ(parcel.readBuffer(8, nullptr, &buffer), android::BAD_VALUE) << "it has a parent";
+    std::string read;
+    EXPECT_EQ(parcel.readString16(&read), android::OK);
+    EXPECT_EQ(read, text);
+}
+
+TEST(ParcelTest, WhatWasReceivedIsGivenBackAndNotWrittenTo) {
+    const uint8_t data[4] = {};
+    int givenBack = 0;
+    {
+        Parcel parcel;
+        for (int i = 0; i < 2; ++i) {
+            const auto count = [](const uint8_t*, void* owner) { ++*static_cast<int*>(owner); };
+            parcel.ipcSetDataReference(data, sizeof(data), nullptr, 0, count, &givenBack);
+            uint32_t number = 0;
+            EXPECT_EQ(parcel.readUint32(&number), android::OK) << "from the beginning";
+            EXPECT_EQ(parcel.writeUint32(1), android::NO_MEMORY);
+        }
+        parcel.clear();
+        for (uint32_t i = 0; i < 100; ++i)
+            EXPECT_EQ(parcel.writeUint32(i), android::OK);
+    }
+    EXPECT_EQ(givenBack, 2);
 }
 
 }  // namespace

@@ -3,6 +3,7 @@
 #include "transport/TransportTest.h"
 
 #include <android/hidl/manager/1.2/IServiceManager.h>
+#include <hidl/HidlBinderSupport.h>
 #include <hidl/ServiceManagement.h>
 #include <hwbinder/Host.h>
 #include <utils/Errors.h>
@@ -200,6 +201,11 @@ TEST_F(CallsTest, DeathIsToldToThoseWhoAskedAndTheSuccessorIsFound) {
     const std::vector<DaxHapticEnginePacket> tooMany(100'000);
     EXPECT_FALSE(mClient->daxPerformHapticEngine(tooMany, 1).isOk()) << "which is no death";
     EXPECT_TRUE(mClient->linkToDeath(untold, 7));
+    EXPECT_TRUE(mClient->unlinkToDeath(untold));
+    EXPECT_TRUE(mClient->linkToDeath(untold, 7)) << "whoever has given up the only link may";
+    const sp<Recipient> toldOnly = new Recipient;
+    const sp<IDaxVibrator> uncalled = IDaxVibrator::getService();
+    EXPECT_TRUE(uncalled->linkToDeath(toldOnly, 43));
     EXPECT_TRUE(mClient->linkToDeath(told, 42));
     EXPECT_TRUE(mClient->unlinkToDeath(untold));
     EXPECT_FALSE(mClient->unlinkToDeath(untold));
@@ -217,6 +223,8 @@ TEST_F(CallsTest, DeathIsToldToThoseWhoAskedAndTheSuccessorIsFound) {
     EXPECT_TRUE(mClient->ping().isDeadObject());
     EXPECT_FALSE(mClient->unlinkToDeath(told)) << "it has been told";
     EXPECT_FALSE(mClient->linkToDeath(told, 1)) << "it is too late";
+    EXPECT_TRUE(eventually([&] { return toldOnly->lastCookie == 43; }));
+    EXPECT_FALSE(uncalled->linkToDeath(toldOnly, 1)) << "the news says so, no call";
     const clock_t before = clock();
     std::this_thread::sleep_for(milliseconds(100));
     EXPECT_LT(clock() - before, CLOCKS_PER_SEC / 50) << "the death is news only once";
@@ -281,17 +289,27 @@ TEST_F(CallsTest, CallsCanHaveATimeLimit) {
     host::setCallTimeout(milliseconds(200));
     const sp<IDaxVibrator> impatient = IDaxVibrator::getService();
     EXPECT_TRUE(impatient->ping().isOk());
+    const auto full = android::hardware::getOrCreateCachedBinder(IDaxVibrator::getService().get());
     stopServer();
+    // A signal does not end the call.
+    std::signal(SIGALRM, [](int) {});
+    ualarm(50'000, 0);
     const auto start = std::chrono::steady_clock::now();
     const Return<void> result = impatient->ping();
+    // Calls that are not waited for, until they find no place.
+    android::status_t sent = isKernel() ? android::TIMED_OUT : android::OK;
+    while (sent == android::OK)
+        sent = full->transact(1, {}, nullptr, TF_ONE_WAY);
     host::setCallTimeout(milliseconds(0));
     EXPECT_GE(std::chrono::steady_clock::now() - start, milliseconds(200));
     EXPECT_EQ(result.description(), "the service did not answer in time");
+    EXPECT_EQ(sent, android::TIMED_OUT);
     ::kill(mServer.pid(), SIGCONT);
     EXPECT_TRUE(answers());
     // Else the late reply would be taken for that of the next call.
     if (!isKernel()) {
         EXPECT_TRUE(impatient->ping().isDeadObject());
+        EXPECT_FALSE(impatient->linkToDeath(new Recipient, 1));
     }
 }
 

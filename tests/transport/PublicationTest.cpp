@@ -67,6 +67,8 @@ TEST_F(PublicationTest, NameGoesToTheNextWhenItsHolderHasGone) {
     for (const std::string& each : {mDirectory.path() + "/" + kName, inherited})
         fs::create_symlink("another", each + "~");
     serve();
+    const fs::perms lock = fs::status(mDirectory.path() + "/" + kName + ".lock").permissions();
+    EXPECT_EQ(lock, fs::perms::owner_read | fs::perms::owner_write) << "nobody else can take it";
     EXPECT_EQ(fs::read_symlink(inherited), kName);
     EXPECT_FALSE(fs::is_symlink(mDirectory.path() + "/android.hidl.base@1.0::IBase.default"));
     ChildProcess second;
@@ -84,10 +86,14 @@ TEST_F(PublicationTest, NameGoesToTheNextWhenItsHolderHasGone) {
     EXPECT_EQ(fs::read_symlink(inherited), kName);
 }
 
-TEST_F(PublicationTest, NameOfAnInheritedInterfaceThatCannotBeHadIsSaid) {
-    const std::string path = mDirectory.path() + "/" + kInheritedName;
-    fs::create_directory(path + "~");
-    expectLog(kName + (" is not registered: " + path) + ": File exists");
+TEST_F(PublicationTest, NameThatCannotBeHadIsSaid) {
+    const std::string inherited = mDirectory.path() + "/" + kInheritedName;
+    fs::create_directory(inherited + "~");
+    expectLog(kName + (" is not registered: " + inherited) + ": File exists");
+    fs::remove(inherited + "~");
+    const std::string own = mDirectory.path() + "/" + kName;
+    fs::create_directory(own);
+    expectLog(kName + (" is not registered: " + own) + ": Is a directory");
 }
 
 TEST_F(PublicationTest, OfManyStartsOneHasTheName) {
@@ -112,8 +118,19 @@ TEST_F(PublicationTest, OfManyStartsOneHasTheName) {
 TEST_F(PublicationTest, EverybodyMayConnectWhateverTheUmask) {
     if (geteuid() != 0) GTEST_SKIP() << "only root can become somebody else";
     ASSERT_EQ(chmod(mDirectory.path().c_str(), 0755), 0);
-    setenv("HWBINDER_DIR", (mDirectory.path() + "/new").c_str(), 1);
+    const std::string directory = mDirectory.path() + "/new";
+    setenv("HWBINDER_DIR", directory.c_str(), 1);
     serve("umask 0077");
+    EXPECT_EQ(runAs(2000, [] { return answers() ? 0 : 1; }), 0);
+    // Over a link of root's or of his own, and where root serves in another user's directory.
+    const std::string link = mDirectory.path() + "/link";
+    fs::create_symlink(directory, link);
+    setenv("HWBINDER_DIR", link.c_str(), 1);
+    for (const uid_t uid : {0U, 2000U}) {
+        ASSERT_EQ(lchown(link.c_str(), uid, uid), 0);
+        EXPECT_EQ(runAs(2000, [] { return answers() ? 0 : 1; }), 0) << uid;
+    }
+    ASSERT_EQ(chown(directory.c_str(), 2001, 2001), 0);
     EXPECT_EQ(runAs(2000, [] { return answers() ? 0 : 1; }), 0);
 }
 
@@ -122,7 +139,7 @@ TEST_F(PublicationTest, SurroundingsThatCannotBeTrustedAreRefusedByBothSides) {
     fs::create_directory(base + "/open");
     ASSERT_EQ(chmod((base + "/open").c_str(), 0775), 0);
     fs::create_directory(base + "/anybodys");
-    ASSERT_EQ(chmod((base + "/anybodys").c_str(), 01777), 0);
+    ASSERT_EQ(chmod((base + "/anybodys").c_str(), 01757), 0);
     fs::create_directory(base + "/good");
     fs::create_symlink("good", base + "/link");
     if (geteuid() == 0) {
@@ -138,7 +155,8 @@ TEST_F(PublicationTest, SurroundingsThatCannotBeTrustedAreRefusedByBothSides) {
             {"/proc/version", "/proc/version: is not a directory"},
             {base + "/open", "others than its owner may write to it"},
             {base + "/anybodys", "others than its owner may write to it"},
-            {base + "/" + std::string(most - base.size(), 'x'), "characters of a socket's address"},
+            {base + "/" + std::string(most - base.size(), 'x'),
+             "longer than the 107 characters of a socket's address"},
             {base + "/link", geteuid() == 0 ? "is a link of uid 2000" : ""},
     };
     for (const auto& [directory, complaint] : cases) {
@@ -185,7 +203,7 @@ TEST_F(PublicationTest, ServerOfAStrangerIsNotCalled) {
     memcpy(address.sun_path, path.c_str(), path.size());
     ASSERT_EQ(bind(listener, reinterpret_cast<sockaddr*>(&address), sizeof(address)), 0);
     ASSERT_EQ(seteuid(2000), 0);
-    ASSERT_EQ(listen(listener, 1), 0);
+    ASSERT_EQ(listen(listener, 8), 0);
     ASSERT_EQ(seteuid(0), 0);
     EXPECT_NE(whyNot().find(": served by uid 2000, to whom the directory does not belong"),
               std::string::npos)
@@ -194,6 +212,8 @@ TEST_F(PublicationTest, ServerOfAStrangerIsNotCalled) {
     host::setCallTimeout(std::chrono::milliseconds(20));
     const auto isServed = [] { return whyNot().find("served by") == std::string::npos ? 0 : 1; };
     EXPECT_EQ(runAs(2000, isServed), 0) << "it is his own";
+    ASSERT_EQ(chown(mDirectory.path().c_str(), 2000, 2000), 0);
+    EXPECT_EQ(isServed(), 0) << "and now the directory, too";
     host::setCallTimeout(std::chrono::milliseconds(0));
     close(listener);
 }

@@ -14,6 +14,7 @@
 #include <hwbinder/Parcel.h>
 #include <hwbinder/ProcessState.h>
 #include <sys/socket.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -37,6 +38,7 @@ using ::android::hardware::ProcessState;
 using ::android::hardware::Return;
 using ::android::hidl::manager::V1_0::IServiceNotification;
 using std::chrono::milliseconds;
+using namespace std::string_literals;
 
 /** Notes how many of its calls there are at once. */
 struct Slow : IServiceNotification {
@@ -99,19 +101,27 @@ TEST_F(RuntimeTest, ObjectThatHasGoneIsNotGivenAgain) {
     EXPECT_EQ(android::hardware::getOrCreateCachedBinder(served.get()), stub);
 }
 
-TEST(LocalConnectionTest, SuccessInPlaceOfAReplyIsAFailureAndAnEndADeath) {
-    int sockets[2];
-    ASSERT_EQ(socketpair(AF_UNIX, SOCK_SEQPACKET, 0, sockets), 0);
-    android::hardware::LocalConnection connection(sockets[0]);
-    android::hardware::Parcel reply;
+TEST(LocalConnectionTest, WrongReplyIsAFailureAndAnEndOrOneThatIsTooLargeADeath) {
     android::hardware::Packet packet;
     packet.packStatus(android::OK);
-    ASSERT_GT(send(sockets[1], packet.bytes, packet.size, 0), 0);
-    EXPECT_EQ(connection.transact(1, {}, &reply, 0), android::FAILED_TRANSACTION);
-    // Not closed: the request that nobody has read would be an error of its own.
-    shutdown(sockets[1], SHUT_WR);
-    EXPECT_EQ(connection.transact(1, {}, &reply, 0), android::DEAD_OBJECT);
-    close(sockets[1]);
+    const std::string success(reinterpret_cast<const char*>(packet.bytes), packet.size);
+    for (const std::string& last : {std::string(), std::string(packet.kMaxSize + 1, '\0')}) {
+        int sockets[2];
+        ASSERT_EQ(socketpair(AF_UNIX, SOCK_SEQPACKET, 0, sockets), 0);
+        android::hardware::LocalConnection connection(sockets[0]);
+        android::hardware::Parcel reply;
+        for (const std::string& wrong : {success, std::string(17, '\0')}) {
+            ASSERT_GT(send(sockets[1], wrong.data(), wrong.size(), 0), 0);
+            EXPECT_EQ(connection.transact(1, {}, &reply, 0), android::FAILED_TRANSACTION);
+        }
+        android::hardware::Parcel objects;
+        objects.writeStrongBinder(new BpHwBinder(4'000'000'003));
+        EXPECT_EQ(connection.transact(1, objects, &reply, TF_ONE_WAY), android::FAILED_TRANSACTION);
+        // Not closed: the request that nobody has read would be an error of its own.
+        send(sockets[1], last.data(), last.size(), 0);
+        EXPECT_EQ(connection.transact(1, {}, &reply, 0), android::DEAD_OBJECT);
+        close(sockets[1]);
+    }
 }
 
 struct Untold : IBinder::DeathRecipient {
@@ -129,8 +139,13 @@ TEST_F(RuntimeTest, DeathNoticeThatCannotBeHadIsRefusedEveryTime) {
 
 TEST_F(RuntimeTest, OneThreadServesHoweverManyJoin) {
     const sp<Slow> slow = new Slow;
+    const mode_t before = umask(0027);
     ASSERT_EQ(slow->registerAsService("slow"), android::OK);
+    EXPECT_EQ(umask(before), 0027U) << "it is the process's own";
     ProcessState::self()->startThreadPool();
+    const size_t threads = threadCount();
+    ProcessState::self()->startThreadPool();
+    EXPECT_LE(threadCount(), threads);
     for (int i = 0; i < 2; ++i)
         std::thread(android::hardware::joinRpcThreadpool).detach();
     for (int i = 0; i < 6; ++i) {
@@ -179,7 +194,7 @@ TEST_F(RuntimeTest, WhatIsWaitedForLongIsFoundSoonByAServerThatIsIdle) {
 }
 
 TEST_F(RuntimeTest, NamesOfFilesBesideTheSocketsAreRefused) {
-    for (const char* name : {"x~", "x.lock", "a/b"}) {
+    for (const std::string& name : {"x~"s, "x.lock"s, "a/b"s, "x\0y"s}) {
         EXPECT_NE((new Slow)->registerAsService(name), android::OK) << name;
         EXPECT_EQ(IServiceNotification::tryGetService(name), nullptr);
     }
