@@ -105,9 +105,8 @@ LocalServer::~LocalServer() {
         close(listener.socket);
     for (const auto& [socket, client] : mClients)
         close(socket);
-    if (mSpare >= 0) close(mSpare);
-    if (mWake >= 0) close(mWake);
-    if (mEpoll >= 0) close(mEpoll);
+    for (const int descriptor : {mSpare, mWake, mEpoll})
+        close(descriptor);
 }
 
 bool LocalServer::publish(const sp<BHwBinder>& object, const std::vector<std::string>& chain,
@@ -225,7 +224,6 @@ void LocalServer::enqueue(Endpoint* client) {
 
 void LocalServer::unqueue(Endpoint* client) {
     if (!client->isQueued) return;
-    client->isQueued = false;
     Share* share = client->share;
     share->waiting.remove(client);
     if (share->waiting.isEmpty()) mTurns.remove(share);

