@@ -89,20 +89,19 @@ sp<IBase> getRawServiceInternal(const std::string& interface, const std::string&
 status_t registerAsServiceInternal(const sp<IBase>& service, const std::string& instance) {
     __android_log_print(ANDROID_LOG_INFO, kLogTag, "calls go over %s",
                         host::transportDescription().c_str());
+    const auto complain = [](const std::string& whyNot) {
+        __android_log_print(ANDROID_LOG_ERROR, kLogTag, "not registered: %s", whyNot.c_str());
+    };
     const sp<Manager> manager = findManager(kForEver);
     if (manager == nullptr) {
-        __android_log_print(ANDROID_LOG_ERROR, kLogTag, "not registered: %s",
-                            lookupError().c_str());
+        complain(lookupError());
         return NO_INIT;
     }
     bool isKnown = false;
     const Return<void> asked = service->interfaceChain([&](const auto& chain) {
         const Return<bool> added = manager->addWithChain(instance, service, chain);
         isKnown = added.withDefault(false);
-        if (!added.isOk()) {
-            __android_log_print(ANDROID_LOG_ERROR, kLogTag, "not registered: %s",
-                                added.description().c_str());
-        }
+        if (!added.isOk()) complain(added.description());
     });
     return asked.isOk() && isKnown ? OK : UNKNOWN_ERROR;
 }
