@@ -320,7 +320,9 @@ TEST_F(CallsTest, ValueOfAFailedCallEndsTheProcess) {
     LogCapture ownLog;
     const Return<sp<IDaxVibrator>> cast = IDaxVibrator::castFrom(sp<IBase>(mClient), true);
     EXPECT_TRUE(cast.isDeadObject());
-    EXPECT_NE(ownLog.takeText().find("): no cast to " + kChain[0] + ": the service has gone"),
+    const std::string said = ownLog.takeText();
+    EXPECT_EQ(said.find("E/hwbinder("), 0U) << said;
+    EXPECT_NE(said.find("): no cast to " + kChain[0] + ": the service has gone"),
               std::string::npos);
     EXPECT_DEATH(static_cast<void>(sp<IBase>(cast)), "the value of a failed call was used");
     EXPECT_DEATH(static_cast<void>(static_cast<VibratorStatus>(failed)),

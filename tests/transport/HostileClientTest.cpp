@@ -251,15 +251,21 @@ TEST_F(HostileClientTest, DescriptorsAreKeptForTheObjects) {
 
 TEST_F(HostileClientTest, WhoeverComesWhenDescriptorsAreUsedUpIsTurnedAway) {
     serve();
-    const std::vector<RawClient> clients = connected(2);
+    rlimit before{};
+    ASSERT_EQ(prlimit(mServer.pid(), RLIMIT_NOFILE, nullptr, &before), 0);
     const std::string files = "/proc/" + std::to_string(mServer.pid()) + "/fd/";
-    rlim_t used = 0;
-    while (std::filesystem::is_symlink(files + std::to_string(used)))
-        ++used;
-    const rlimit limit{used, used};
-    ASSERT_EQ(prlimit(mServer.pid(), RLIMIT_NOFILE, &limit, nullptr), 0);
-    EXPECT_EQ(countAnswering(connecting(2)), 0U);
-    expectAllAnswer(clients);
+    std::vector<RawClient> clients;
+    for (int round = 0; round < 2; ++round) {
+        clients.push_back(rawClient());
+        expectAllAnswer(clients);
+        rlimit limit{0, before.rlim_max};
+        while (std::filesystem::is_symlink(files + std::to_string(limit.rlim_cur)))
+            ++limit.rlim_cur;
+        ASSERT_EQ(prlimit(mServer.pid(), RLIMIT_NOFILE, &limit, nullptr), 0);
+        EXPECT_EQ(countAnswering(connecting(2)), 0U);
+        ASSERT_EQ(prlimit(mServer.pid(), RLIMIT_NOFILE, &before, nullptr), 0);
+        expectAllAnswer(clients);
+    }
 }
 
 TEST_F(HostileClientTest, DaemonWithoutDescriptorsSaysSoAndEnds) {
