@@ -27,7 +27,6 @@ LogFilter::LogFilter(std::string_view rules) {
                 rules.substr(start, rules.find_first_of(kSeparators, start) - start);
         add(rule);
         start += rule.size();
-        if (start >= rules.size()) break;
     }
 }
 

@@ -31,10 +31,9 @@ constexpr size_t kMaxTag = 64;
 void occupyStandardError() {
     if (fcntl(STDERR_FILENO, F_GETFD) != -1) return;
     const int null = open("/dev/null", O_WRONLY);
-    if (null >= 0 && null != STDERR_FILENO) {
-        dup2(null, STDERR_FILENO);
-        close(null);
-    }
+    if (null == STDERR_FILENO) return;
+    dup2(null, STDERR_FILENO);
+    close(null);
 }
 
 const LogFilter& filter() {

@@ -168,6 +168,15 @@ TEST_F(CallsTest, ThreadsMayShareAnObject) {
         thread.join();
 }
 
+TEST_F(CallsTest, ThreadsThatEndLeaveNoReplyBehind) {
+    // More replies than a process can have at once.
+    for (int i = 0; i < 2000 && !HasFailure(); ++i) {
+        std::thread([&] {
+            EXPECT_TRUE(mClient->interfaceChain([](const auto&) {}).isOk()) << i;
+        }).join();
+    }
+}
+
 TEST_F(CallsTest, ClientsMayDieInACall) {
     // Until it answers, it may not have accepted the connection.
     EXPECT_TRUE(mClient->ping().isOk());

@@ -3,6 +3,7 @@
 
 #include <cstdint>
 #include <string>
+#include <type_traits>
 #include <utility>
 #include <vector>
 
@@ -21,8 +22,7 @@ static_assert(sizeof(void*) == 8, "this platform is for 64-bit processes");
 template <typename T>
 std::string toHexString(T number) {
     constexpr char kDigits[] = "0123456789abcdef";
-    auto rest = static_cast<uint64_t>(number);
-    if constexpr (sizeof(T) < sizeof(rest)) rest &= (uint64_t{1} << 8 * sizeof(T)) - 1;
+    uint64_t rest = static_cast<std::make_unsigned_t<T>>(number);
     std::string digits;
     do {
         digits.insert(digits.begin(), kDigits[rest % 16]);
