@@ -222,13 +222,6 @@ void LocalServer::enqueue(Endpoint* client) {
     share->waiting.push(client);
 }
 
-void LocalServer::unqueue(Endpoint* client) {
-    if (!client->isQueued) return;
-    Share* share = client->share;
-    share->waiting.remove(client);
-    if (share->waiting.isEmpty()) mTurns.remove(share);
-}
-
 void LocalServer::serveOneOfEach() {
     const Share* const lastOfRound = mTurns.last();
     for (bool isLast = mTurns.isEmpty(); !isLast;) {
@@ -357,8 +350,11 @@ void LocalServer::refuseOne(int listener) {
 }
 
 void LocalServer::drop(Endpoint* client) {
-    unqueue(client);
     Share* share = client->share;
+    if (client->isQueued) {
+        share->waiting.remove(client);
+        if (share->waiting.isEmpty()) mTurns.remove(share);
+    }
     const int socket = client->socket;
     mClients.erase(socket);
     close(socket);

@@ -114,7 +114,6 @@ class LocalServer {
     int retryPending();
     bool collect(int timeout);
     void enqueue(Endpoint* client);
-    void unqueue(Endpoint* client);
     void serveOneOfEach();
     bool serveCall(Endpoint* client);
     bool reply(int socket);
