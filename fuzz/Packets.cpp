@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Packets.h"
+#include "scores/Packets.h"
 
 #include <cstdint>
 #include <cstdlib>
@@ -7,9 +7,9 @@
 /** The input is a packet file. It is refused with a reason, or its packets survive a round trip. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     const std::string text(reinterpret_cast<const char*>(data), size);
-    HapticEnginePackets packets;
+    vibratorctl::Packets packets;
     std::string error;
-    if (!parsePackets(text, &packets, &error)) {
+    if (!vibratorctl::parsePackets(text, &packets, &error)) {
         if (error.empty()) abort();
         return 0;
     }
@@ -18,7 +18,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
         again += std::to_string(packet.param0) + "," + std::to_string(packet.intensity) + "," +
                  std::to_string(packet.param2) + "," + std::to_string(packet.param3) + "\n";
     }
-    HapticEnginePackets same;
-    if (!parsePackets(again, &same, &error) || same != packets) abort();
+    vibratorctl::Packets same;
+    if (!vibratorctl::parsePackets(again, &same, &error) || same != packets) abort();
     return 0;
 }

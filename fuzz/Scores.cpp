@@ -4,6 +4,8 @@
 #include <cstdint>
 #include <cstdlib>
 
+using namespace vibratorctl;
+
 /** The input is a score: mistakes are in its lines, and a score without mistakes can be played. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     static Client client;

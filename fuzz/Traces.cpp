@@ -1,9 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Plot.h"
+#include "traffic/Picture.h"
+#include "traffic/TextPlot.h"
 
 #include <cstdint>
 #include <cstdlib>
 #include <sstream>
+
+using namespace vibratorctl;
 
 /** The input is a trace and a log, drawn in all ways, whole and in part. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {

@@ -2,7 +2,7 @@
 #include "commands/Commands.h"
 
 int main(int argc, char** argv) {
-    Client client;
-    addCommands(client);
+    vibratorctl::Client client;
+    vibratorctl::addCommands(client);
     return client.run(argc, argv);
 }

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Plot.h"
 #include "support/Process.h"
+#include "traffic/Picture.h"
+#include "traffic/TextPlot.h"
 
 #include <gtest/gtest.h>
 
@@ -12,6 +13,8 @@
 #include <sstream>
 
 namespace {
+
+using namespace vibratorctl;
 
 TEST(AccessReaderTest, TellsTimes) {
     const std::string tag = "QorVibrator-HAL2.1(  539): ";

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
 
+namespace vibratorctl {
+
 void addCommands(Client& client) {
     for (const auto add : {addVibration, addSettings, addPatterns, addQueries, addDoctor, addPlay,
                            addWatch, addPlot}) {
@@ -28,3 +30,5 @@ void addCall(Client& client, cli::Command& command, const OneArgument& argument,
     });
     client.addStep({command.name(), &command});
 }
+
+}  // namespace vibratorctl

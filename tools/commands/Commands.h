@@ -1,7 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Client.h"
+#include "service/Client.h"
+
+namespace vibratorctl {
 
 /** Adds all commands, in the order of the help. */
 void addCommands(Client& client);
@@ -33,13 +35,12 @@ struct OneArgument {
 };
 
 /** A call with a number, or the index of a choice. */
-using Call = std::function<::android::hardware::Return<VibratorStatus>(service::IDaxVibrator&,
-                                                                       uint32_t)>;
+using Call = std::function<::android::hardware::Return<VibratorStatus>(IDaxVibrator&, uint32_t)>;
 
 /** @return the call of an operation with one argument. */
 template <typename Interface, typename T>
 Call callOf(::android::hardware::Return<VibratorStatus> (Interface::*operation)(T)) {
-    return [operation](service::IDaxVibrator& vibrator, uint32_t number) {
+    return [operation](IDaxVibrator& vibrator, uint32_t number) {
         return (vibrator.*operation)(static_cast<T>(number));
     };
 }
@@ -47,3 +48,5 @@ Call callOf(::android::hardware::Return<VibratorStatus> (Interface::*operation)(
 /** Adds a command that makes one call with one argument, and that is also a step of scores. */
 void addCall(Client& client, cli::Command& command, const OneArgument& argument,
              Operation operation, const Call& call);
+
+}  // namespace vibratorctl

@@ -1,12 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
-#include "LocalDriver.h"
 #include "NodePathTable.h"
 #include "Queries.h"
 #include "Trace.h"
 #include "cli/Text.h"
+#include "service/LocalDriver.h"
 
 #include <unistd.h>
+
+namespace vibratorctl {
 
 namespace {
 
@@ -43,17 +45,17 @@ std::vector<NodeUse> nodeUses() {
 class Examination {
   public:
     explicit Examination(const Client& client) : mClient(client) {
-        ::android::sp<service::IDaxVibrator> vibrator;
+        ::android::sp<IDaxVibrator> vibrator;
         std::string answer = "answers";
         try {
             vibrator = client.service();
-        } catch (const service::Unreachable& error) {
+        } catch (const Unreachable& error) {
             answer = error.what();
             find("the service cannot be reached: " + answer,
                  "start the daemon, or give the client the daemon's HWBINDER_DIR");
         }
         mAnswers = vibrator != nullptr;
-        const service::Description description = service::describe(vibrator);
+        const Description description = describe(vibrator);
         mReport = {{"layout", mDriver.layout()},     {"service", answer},
                    {"server", description.server},   {"transport", description.transport},
                    {"manager", description.manager}, {"nodes", ordered_json::array()}};
@@ -155,7 +157,7 @@ void Examination::examineMotor() {
     LocalDriver::Vibrator& vibrator = *mDriver.vibrator();
     for (const Query& query : kQueries) {
         if (query.feature == nullptr) continue;
-        mReport["features"][query.feature] = service::reached((vibrator.*query.ask)());
+        mReport["features"][query.feature] = reached((vibrator.*query.ask)());
     }
     const LocalDriver::Motor motor = mDriver.motor();
     mReport["motor"] = {{"name", motor.name}, {"number", motor.number}, {"found", motor.found}};
@@ -230,3 +232,5 @@ void addDoctor(Client& client) {
     client.command(kTools, "doctor", "say what is wrong with the driver or the service", "")
             .run([&client] { return Examination(client).report(); });
 }
+
+}  // namespace vibratorctl

@@ -1,15 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
-#include "Packets.h"
+#include "scores/Packets.h"
 
 #include <algorithm>
+
+namespace vibratorctl {
 
 namespace {
 
 /** @return the status of the query for the number of stored patterns. */
 VibratorStatus countPatterns(const Client& client, uint32_t* count) {
     VibratorStatus status = VibratorStatus::UNKNOWN_ERROR;
-    service::reached(client.service()->daxGetNumberOfPrebakedHapticPattern(
+    reached(client.service()->daxGetNumberOfPrebakedHapticPattern(
             [&](VibratorStatus answered, uint32_t patterns) {
                 status = answered;
                 *count = patterns;
@@ -68,8 +70,8 @@ void addPattern(Client& client) {
                     }});
 }
 
-HapticEnginePackets readPackets(const std::vector<std::string>& words, const std::string& file) {
-    HapticEnginePackets packets;
+Packets readPackets(const std::vector<std::string>& words, const std::string& file) {
+    Packets packets;
     std::string error;
     for (const std::string& word : words) {
         if (!parsePacket(word, &packets, &error)) throw cli::UsageError(error);
@@ -89,7 +91,7 @@ HapticEnginePackets readPackets(const std::vector<std::string>& words, const std
  *
  * @throw cli::UsageError
  */
-void checkScaling(const HapticEnginePackets& packets, uint32_t amplitude) {
+void checkScaling(const Packets& packets, uint32_t amplitude) {
     const uint32_t most = UINT32_MAX / std::max(amplitude, 1U);
     for (const auto& packet : packets) {
         if (packet.intensity >= 0 && static_cast<uint32_t>(packet.intensity) <= most) continue;
@@ -100,7 +102,7 @@ void checkScaling(const HapticEnginePackets& packets, uint32_t amplitude) {
 }
 
 /** Refuses what the service would refuse. @return how long the packets last, in ms. */
-double judgePackets(const HapticEnginePackets& packets) {
+double judgePackets(const Packets& packets) {
     constexpr size_t kMost = 339;
     if (packets.size() > kMost) throw cli::UsageError("more than 339 packets");
     double length = 0;
@@ -125,12 +127,12 @@ void addEngine(Client& client) {
     const auto words = command.words("PACKET", "PARAM0,INTENSITY,PARAM2,PARAM3, whole numbers",
                                      [](const std::string& word) { readPackets({word}, ""); });
     const auto packets = [=] {
-        HapticEnginePackets read = readPackets(*words, *file);
+        Packets read = readPackets(*words, *file);
         checkScaling(read, *amplitude);
         return read;
     };
     command.run([=, &client] {
-        const HapticEnginePackets read = packets();
+        const Packets read = packets();
         const Operation operation = {
                 "daxPerformHapticEngine",
                 true,
@@ -152,3 +154,5 @@ void addPatterns(Client& client) {
     addPattern(client);
     addEngine(client);
 }
+
+}  // namespace vibratorctl

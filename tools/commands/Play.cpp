@@ -7,6 +7,8 @@
 #include <iostream>
 #include <thread>
 
+namespace vibratorctl {
+
 namespace {
 
 volatile std::sig_atomic_t interruption = 0;
@@ -51,8 +53,8 @@ int playStep(Client& client, const ScoreStep& step) {
 int stop(const Client& client, const char* status, const std::string& why) {
     bool isStopped = false;
     try {
-        isStopped = service::reached(client.service()->off()) == VibratorStatus::OK;
-    } catch (const service::Unreachable&) {
+        isStopped = reached(client.service()->off()) == VibratorStatus::OK;
+    } catch (const Unreachable&) {
         // The same as a refusal.
     }
     client.complain(status, why + (isStopped ? "; the motor is stopped"
@@ -71,9 +73,9 @@ int playScore(Client& client, const std::string& file, const Score& score) {
         client.setStep(&step);
         try {
             code = playStep(client, step);
-        } catch (const service::Unreachable& error) {
+        } catch (const Unreachable& error) {
             client.setStep(nullptr);
-            throw service::Unreachable(std::string(error.what()) + ", at " + place);
+            throw Unreachable(std::string(error.what()) + ", at " + place);
         }
         client.setStep(nullptr);
         if (code != cli::kSuccess) return stop(client, "FAILED", place + ": the step failed");
@@ -120,3 +122,5 @@ void addPlay(Client& client) {
             "The motor is stopped when a step fails or the play is interrupted.");
     command.run([=, &client] { return play(client, *file, *check); });
 }
+
+}  // namespace vibratorctl

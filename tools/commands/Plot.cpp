@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Plot.h"
-
 #include "Commands.h"
 #include "Traffic.h"
 #include "cli/Text.h"
+#include "traffic/Picture.h"
+#include "traffic/TextPlot.h"
 
 #include <sys/ioctl.h>
 #include <unistd.h>
@@ -15,6 +15,8 @@
 #include <iostream>
 #include <limits>
 #include <sstream>
+
+namespace vibratorctl {
 
 namespace {
 
@@ -128,3 +130,5 @@ void addPlot(Client& client) {
         return cli::kSuccess;
     });
 }
+
+}  // namespace vibratorctl

@@ -2,14 +2,15 @@
 #include "Queries.h"
 
 #include "Commands.h"
-#include "LocalDriver.h"
 #include "cli/Text.h"
+#include "service/LocalDriver.h"
 
 #include <chrono>
 #include <thread>
 
+namespace vibratorctl {
+
 using nlohmann::ordered_json;
-using service::IDaxVibrator;
 
 const std::vector<Query> kQueries = {
         {"supportsAmplitudeControl", "amplitudes of the platform",
@@ -35,7 +36,7 @@ const std::vector<Query> kQueries = {
 std::vector<uint32_t> askLadder(IDaxVibrator& vibrator, uint32_t type) {
     using ::vendor::velmora::hardware::vibrator::V2_1::DaxAmplitudeType;
     std::vector<uint32_t> ladder;
-    service::reached(vibrator.daxGetAmplitudeList(
+    reached(vibrator.daxGetAmplitudeList(
             static_cast<DaxAmplitudeType>(type), [&](bool supported, const auto& amplitudes) {
                 if (supported) ladder.assign(amplitudes.begin(), amplitudes.end());
             }));
@@ -59,7 +60,7 @@ int supports(const Client& client) {
     std::string words;
     ordered_json answers;
     for (const Query& query : kQueries) {
-        const bool answer = service::reached((*vibrator.*query.ask)());
+        const bool answer = reached((*vibrator.*query.ask)());
         answers[query.operation] = answer;
         const bool mayAsk = permitted || query.ask == &IDaxVibrator::supportsExternalControl;
         words += std::string(query.words) + ": " + (answer ? "yes" : mayAsk ? "no" : "may not ask");
@@ -74,14 +75,14 @@ int supports(const Client& client) {
     return client.found(words, members);
 }
 
-/** @return the service, waited for up to some seconds. @throw service::Unreachable */
+/** @return the service, waited for up to some seconds. @throw Unreachable */
 ::android::sp<IDaxVibrator> await(const Client& client, uint32_t seconds) {
     using Clock = std::chrono::steady_clock;
     const auto deadline = Clock::now() + std::chrono::seconds(seconds);
     for (;;) {
         try {
             return client.service();
-        } catch (const service::Unreachable&) {
+        } catch (const Unreachable&) {
             if (Clock::now() >= deadline) throw;
         }
         std::this_thread::sleep_for(std::chrono::milliseconds(50));
@@ -90,9 +91,9 @@ int supports(const Client& client) {
 
 int status(const Client& client, uint32_t seconds) {
     const auto vibrator = await(client, seconds);
-    const service::Description description = service::describe(vibrator);
+    const Description description = describe(vibrator);
     std::vector<std::string> interfaces;
-    service::reached(vibrator->interfaceChain([&](const auto& chain) {
+    reached(vibrator->interfaceChain([&](const auto& chain) {
         for (const auto& descriptor : chain)
             interfaces.emplace_back(descriptor.c_str());
     }));
@@ -127,7 +128,7 @@ int ladder(const Client& client, uint32_t type) {
 
 int motor(const Client& client) {
     const auto vibrator = client.service();
-    const bool isEnhanced = service::reached(vibrator->daxSupportsEnhancedVelmoraHapticPattern());
+    const bool isEnhanced = reached(vibrator->daxSupportsEnhancedVelmoraHapticPattern());
     const auto ladder0 = askLadder(*vibrator, 0);
     const auto ladder1 = askLadder(*vibrator, 1);
     if (!mayCallRestricted()) return client.answer(kLadder, VibratorStatus::UNSUPPORTED_OPERATION);
@@ -172,3 +173,5 @@ void addQueries(Client& client) {
     client.command(kRestricted, "motor", "tell the name, number and ladders of the motor", "")
             .run([&client] { return motor(client); });
 }
+
+}  // namespace vibratorctl

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
 
-using service::IDaxVibrator;
+namespace vibratorctl {
 
 void addSettings(Client& client) {
     constexpr cli::Numbers kAmplitudes = {"an amplitude", 1, 255, UINT8_MAX};
@@ -32,3 +32,5 @@ void addSettings(Client& client) {
          {{"open", "the device is open"}, {"close", "the device is folded"}}},
         {"daxSetFolderStatus", true, {"event_cmd"}}, callOf(&IDaxVibrator::daxSetFolderStatus));
 }
+
+}  // namespace vibratorctl

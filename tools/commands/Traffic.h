@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Client.h"
 #include "Driver.h"
 #include "Trace.h"
+#include "service/Client.h"
+
+namespace vibratorctl {
 
 /** The arguments of a command that reads node traffic. */
 struct Traffic {
@@ -27,3 +29,5 @@ struct Traffic {
     cli::Value<std::string> named;
     cli::Value<bool> log;
 };
+
+}  // namespace vibratorctl

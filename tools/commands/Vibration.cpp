@@ -1,9 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
 
+namespace vibratorctl {
+
 namespace platform = ::android::hardware::vibrator;
 using platform::V1_0::EffectStrength;
-using service::IDaxVibrator;
 
 namespace {
 
@@ -33,8 +34,7 @@ int performEffect(const Client& client, const std::string& argument, uint32_t ef
         answer.words = std::to_string(lengthMs) + " ms";
         answer.members["lengthMs"] = lengthMs;
     };
-    service::reached(
-            version == 1 ? vibrator->perform_1_1(platform::V1_1::Effect_1_1{effect}, strength, take)
+    reached(version == 1 ? vibrator->perform_1_1(platform::V1_1::Effect_1_1{effect}, strength, take)
             : version == 2 ? vibrator->perform_1_2(platform::V1_2::Effect{effect}, strength, take)
             : version == 3 ? vibrator->perform_1_3(platform::V1_3::Effect{effect}, strength, take)
                            : vibrator->perform(platform::V1_0::Effect{effect}, strength, take));
@@ -98,3 +98,5 @@ void addVibration(Client& client) {
                 return vibrator.setExternalControl(index == 0);
             });
 }
+
+}  // namespace vibratorctl

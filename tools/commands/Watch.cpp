@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
-#include "NodeAccess.h"
 #include "Traffic.h"
 #include "cli/Text.h"
+#include "traffic/NodeAccess.h"
 
 #include <fcntl.h>
 #include <unistd.h>
@@ -15,6 +15,8 @@
 #include <iostream>
 #include <sstream>
 #include <thread>
+
+namespace vibratorctl {
 
 namespace {
 
@@ -180,3 +182,5 @@ void addWatch(Client& client) {
             "--log, does.");
     command.withoutJson().run([=, &client] { return watch(client, traffic, *fromStart, *once); });
 }
+
+}  // namespace vibratorctl

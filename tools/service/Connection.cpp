@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Service.h"
+#include "service/Connection.h"
 
 #include <hwbinder/Host.h>
 
@@ -8,7 +8,7 @@
 
 namespace host = ::android::hardware::host;
 
-namespace service {
+namespace vibratorctl {
 
 ::android::sp<IDaxVibrator> connect(const std::string& instance) {
     ::android::sp<IDaxVibrator> vibrator = IDaxVibrator::tryGetService(instance);
@@ -33,4 +33,4 @@ Description describe(const ::android::sp<IDaxVibrator>& vibrator) {
     return description;
 }
 
-}  // namespace service
+}  // namespace vibratorctl

@@ -1,11 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Score.h"
-#include "Service.h"
+#include "scores/Score.h"
+#include "service/Connection.h"
 
 #include <iosfwd>
 #include <nlohmann/json.hpp>
+
+namespace vibratorctl {
 
 using VibratorStatus = ::android::hardware::vibrator::V1_0::Status;
 
@@ -51,11 +53,11 @@ class Client : public cli::Program {
 
     /** Reports the answer to a call. @return the exit code. */
     int answer(const Operation& operation, VibratorStatus status, Answer answer = {}) const;
-    /** The same for a call just made. @throw service::Unreachable */
+    /** The same for a call just made. @throw Unreachable */
     int answer(const Operation& operation,
                const ::android::hardware::Return<VibratorStatus>& status,
                Answer answer = {}) const {
-        return this->answer(operation, service::reached(status), std::move(answer));
+        return this->answer(operation, reached(status), std::move(answer));
     }
     /**
      * Reports the result of what is not a single call.
@@ -68,8 +70,8 @@ class Client : public cli::Program {
               bool ok = true) const;
     void complain(const std::string& status, const std::string& reason) const override;
 
-    /** @return the service. @throw service::Unreachable */
-    ::android::sp<service::IDaxVibrator> service() const { return service::connect(*mInstance); }
+    /** @return the service. @throw Unreachable */
+    ::android::sp<IDaxVibrator> service() const { return connect(*mInstance); }
     const std::string& instance() const { return *mInstance; }
     bool isVerbose() const { return *mVerbose; }
 
@@ -98,3 +100,5 @@ class Client : public cli::Program {
 
 /** @return what a file holds, or standard input for "-". @throw cli::UsageError */
 std::string readInput(const std::string& name);
+
+}  // namespace vibratorctl

@@ -9,7 +9,7 @@
 #include <string>
 
 /** How the client finds the service; only this part depends on the runtime's transport. */
-namespace service {
+namespace vibratorctl {
 
 using ::vendor::velmora::hardware::vibrator::V2_1::IDaxVibrator;
 
@@ -45,4 +45,4 @@ struct Description {
 /** @param vibrator the service; nullptr where there is none. */
 Description describe(const ::android::sp<IDaxVibrator>& vibrator);
 
-}  // namespace service
+}  // namespace vibratorctl

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Packets.h"
+#include "scores/Packets.h"
 
 #include "cli/Text.h"
 
@@ -7,6 +7,8 @@
 #include <charconv>
 #include <nlohmann/json.hpp>
 #include <sstream>
+
+namespace vibratorctl {
 
 namespace {
 
@@ -21,11 +23,11 @@ std::string_view trimmed(std::string_view text) {
     return text.substr(start, text.find_last_not_of(kBlanks) - start + 1);
 }
 
-void append(const int32_t (&values)[4], HapticEnginePackets* packets) {
+void append(const int32_t (&values)[4], Packets* packets) {
     packets->push_back({values[0], values[1], values[2], values[3]});
 }
 
-bool parseCsv(const std::string& text, HapticEnginePackets* packets, std::string* error) {
+bool parseCsv(const std::string& text, Packets* packets, std::string* error) {
     std::istringstream lines(text);
     std::string line;
     for (int number = 1; std::getline(lines, line); ++number) {
@@ -50,7 +52,7 @@ std::optional<int32_t> numberOf(const json& element, size_t index) {
     return static_cast<int32_t>(number);
 }
 
-bool parseJson(const std::string& text, HapticEnginePackets* packets, std::string* error) {
+bool parseJson(const std::string& text, Packets* packets, std::string* error) {
     const json list = json::parse(text, nullptr, false);
     if (!list.is_array()) {
         *error = "no JSON list";
@@ -75,7 +77,7 @@ bool parseJson(const std::string& text, HapticEnginePackets* packets, std::strin
 
 }  // namespace
 
-bool parsePacket(const std::string& text, HapticEnginePackets* packets, std::string* error) {
+bool parsePacket(const std::string& text, Packets* packets, std::string* error) {
     if (std::count(text.begin(), text.end(), ',') != 3) {
         *error = cli::inQuotes(text) + " is not PARAM0,INTENSITY,PARAM2,PARAM3";
         return false;
@@ -95,8 +97,10 @@ bool parsePacket(const std::string& text, HapticEnginePackets* packets, std::str
     return true;
 }
 
-bool parsePackets(const std::string& text, HapticEnginePackets* packets, std::string* error) {
+bool parsePackets(const std::string& text, Packets* packets, std::string* error) {
     const size_t first = text.find_first_not_of(" \t\r\n");
     const bool isJson = first != std::string::npos && (text[first] == '[' || text[first] == '{');
     return isJson ? parseJson(text, packets, error) : parseCsv(text, packets, error);
 }
+
+}  // namespace vibratorctl

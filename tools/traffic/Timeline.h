@@ -1,10 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "NodeAccess.h"
+#include "traffic/NodeAccess.h"
 
 #include <string>
 #include <vector>
+
+namespace vibratorctl {
 
 /**
  * What the driver was told, as an ideal motor would do it, without delay. As in the kernel, a run
@@ -46,3 +48,11 @@ Timeline makeTimeline(const std::vector<NodeAccess>& accesses);
 
 /** Cuts a timeline to the part between two times in it. */
 void cut(Timeline* timeline, double from, double to);
+
+/** @return the title of a plot. */
+std::string plotTitle(const Timeline& timeline);
+
+/** @return what a plot does not show by itself, like missing times; empty if there is nothing. */
+std::string plotNote(const Timeline& timeline);
+
+}  // namespace vibratorctl

@@ -6,8 +6,9 @@
 #include <string>
 #include <vector>
 
-using HapticEnginePackets =
-        std::vector<::vendor::velmora::hardware::vibrator::V2_0::DaxHapticEnginePacket>;
+namespace vibratorctl {
+
+using Packets = std::vector<::vendor::velmora::hardware::vibrator::V2_0::DaxHapticEnginePacket>;
 
 /**
  * Reads haptic engine packets from a text: CSV, one packet of four numbers a line, blank lines and
@@ -17,7 +18,9 @@ using HapticEnginePackets =
  * @param error set, on failure, to what is wrong and where.
  * @return whether the whole text made sense.
  */
-bool parsePackets(const std::string& text, HapticEnginePackets* packets, std::string* error);
+bool parsePackets(const std::string& text, Packets* packets, std::string* error);
 
 /** Reads one packet, "PARAM0,INTENSITY,PARAM2,PARAM3". @return whether it is one. */
-bool parsePacket(const std::string& text, HapticEnginePackets* packets, std::string* error);
+bool parsePacket(const std::string& text, Packets* packets, std::string* error);
+
+}  // namespace vibratorctl

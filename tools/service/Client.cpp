@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Client.h"
+#include "service/Client.h"
 
 #include "cli/Text.h"
 
@@ -7,6 +7,8 @@
 #include <cstring>
 #include <fstream>
 #include <iostream>
+
+namespace vibratorctl {
 
 using nlohmann::ordered_json;
 
@@ -42,10 +44,10 @@ Client::Client()
 }
 
 int Client::perform(const cli::Command& command) {
-    service::setCallTimeout(*mTimeout);
+    setCallTimeout(*mTimeout);
     try {
         return Program::perform(command);
-    } catch (const service::Unreachable& error) {
+    } catch (const Unreachable& error) {
         complain("UNREACHABLE", std::string("the service cannot be reached: ") + error.what() +
                                         "; \"vibratorctl doctor\" says what to do");
         return kUnreachable;
@@ -118,3 +120,5 @@ std::string readInput(const std::string& name) {
     }
     return text;
 }
+
+}  // namespace vibratorctl

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Timeline.h"
+#include "traffic/Timeline.h"
+
+#include "cli/Text.h"
 
 #include <algorithm>
 #include <cmath>
@@ -7,6 +9,8 @@
 #include <cstdlib>
 #include <sstream>
 #include <utility>
+
+namespace vibratorctl {
 
 namespace {
 
@@ -257,3 +261,16 @@ void cut(Timeline* timeline, double from, double to) {
         if (mark.time >= start && mark.time <= end) timeline->marks.push_back(std::move(mark));
     }
 }
+
+std::string plotTitle(const Timeline& timeline) {
+    const size_t calls = timeline.marks.size();
+    return "What the driver was told: " + std::to_string(calls) +
+           (calls == 1 ? " call" : " calls") + " in " +
+           cli::durationInWords(timeline.end - timeline.start);
+}
+
+std::string plotNote(const Timeline& timeline) {
+    return timeline.isTimed ? "" : "The log has no times: each call is drawn after the one before.";
+}
+
+}  // namespace vibratorctl

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "NodeAccess.h"
+#include "traffic/NodeAccess.h"
 
 #include <algorithm>
 #include <charconv>
@@ -7,6 +7,8 @@
 #include <cstring>
 #include <ctime>
 #include <utility>
+
+namespace vibratorctl {
 
 namespace {
 
@@ -268,3 +270,5 @@ std::optional<NodeAccess> AccessReader::readStep(std::string_view line) {
     }
     return std::nullopt;
 }
+
+}  // namespace vibratorctl

@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Client.h"
-#include "LocalDriver.h"
 #include "NodePathTable.h"
+#include "service/Client.h"
+#include "service/LocalDriver.h"
 
 #include <unistd.h>
+
+namespace vibratorctl {
 
 using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
@@ -48,3 +50,5 @@ std::string reasonOf(const Operation& operation, VibratorStatus status) {
     }
     return "the driver has refused it; the service's log has the error";
 }
+
+}  // namespace vibratorctl

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Plot.h"
+#include "traffic/Picture.h"
 #include "PlotScript.h"
 #include "cli/Text.h"
 
@@ -16,6 +16,8 @@
 #include <iterator>
 #include <sstream>
 #include <stdexcept>
+
+namespace vibratorctl {
 
 namespace {
 
@@ -147,17 +149,6 @@ std::string described(const Timeline& timeline, std::string svg) {
 
 }  // namespace
 
-std::string plotTitle(const Timeline& timeline) {
-    const size_t calls = timeline.marks.size();
-    return "What the driver was told: " + std::to_string(calls) +
-           (calls == 1 ? " call" : " calls") + " in " +
-           cli::durationInWords(timeline.end - timeline.start);
-}
-
-std::string plotNote(const Timeline& timeline) {
-    return timeline.isTimed ? "" : "The log has no times: each call is drawn after the one before.";
-}
-
 std::string plotScript(const Timeline& timeline, PictureFormat format) {
     // A little longer, so that the end is not on the frame.
     const double length = std::max((timeline.end - timeline.start) * 1.01, 0.001);
@@ -203,3 +194,5 @@ std::string drawPicture(const Timeline& timeline, PictureFormat format) {
     const std::string picture = runGnuplot(plotScript(timeline, format));
     return format == PictureFormat::kSvg ? described(timeline, picture) : picture;
 }
+
+}  // namespace vibratorctl

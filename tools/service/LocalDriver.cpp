@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "LocalDriver.h"
+#include "service/LocalDriver.h"
 
 #include "Driver.h"
 #include "Log.h"
@@ -14,6 +14,8 @@
 #include <algorithm>
 #include <cstdio>
 #include <cstdlib>
+
+namespace vibratorctl {
 
 using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
@@ -78,3 +80,5 @@ LocalDriver::Motor LocalDriver::motor() const {
     }
     return {number, MotorTypeNames[number], found};
 }
+
+}  // namespace vibratorctl

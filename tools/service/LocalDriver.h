@@ -5,6 +5,8 @@
 
 #include <string>
 
+namespace vibratorctl {
+
 /**
  * The driver that this process sees, the kernel's or the simulated one, as the service's own code
  * judges it. It only looks: it writes nothing, leaves nothing in a simulated driver's trace, and
@@ -60,3 +62,5 @@ class LocalDriver {
     bool mIsUsable = false;
     bool mIsThere = false;
 };
+
+}  // namespace vibratorctl

@@ -5,6 +5,8 @@
 
 #include <nlohmann/json_fwd.hpp>
 
+namespace vibratorctl {
+
 /** A command as a step of a score. */
 struct StepKind {
     std::string name;
@@ -65,3 +67,5 @@ struct Score {
  */
 std::vector<ScoreError> parseScore(const std::string& text, const std::vector<StepKind>& kinds,
                                    Score* score);
+
+}  // namespace vibratorctl

@@ -6,6 +6,8 @@
 #include <string>
 #include <string_view>
 
+namespace vibratorctl {
+
 /** One access of a node, from its open to its close; or a call that the service refused. */
 struct NodeAccess {
     enum Kind { kProbe, kRead, kWrite, kRefusal };
@@ -57,3 +59,5 @@ class AccessReader {
     /** For a log: the write of a text that has begun; one of a number may be inside it. */
     std::optional<NodeAccess> mText;
 };
+
+}  // namespace vibratorctl

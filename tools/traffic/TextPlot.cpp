@@ -1,10 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Plot.h"
+#include "traffic/TextPlot.h"
 #include "cli/Text.h"
 
 #include <algorithm>
 #include <cmath>
 #include <cstdio>
+
+namespace vibratorctl {
 
 namespace {
 
@@ -80,3 +82,5 @@ std::string plotText(const Timeline& timeline, size_t columns) {
     }
     return text;
 }
+
+}  // namespace vibratorctl

@@ -1,7 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Timeline.h"
+#include "traffic/Timeline.h"
+
+namespace vibratorctl {
 
 enum class PictureFormat { kSvg, kPng };
 
@@ -15,11 +17,4 @@ std::string plotScript(const Timeline& timeline, PictureFormat format);
  */
 std::string drawPicture(const Timeline& timeline, PictureFormat format);
 
-/** @return the timeline for a terminal of some columns. */
-std::string plotText(const Timeline& timeline, size_t columns);
-
-/** @return the title of a plot. */
-std::string plotTitle(const Timeline& timeline);
-
-/** @return what a plot does not show by itself, like missing times; empty if there is nothing. */
-std::string plotNote(const Timeline& timeline);
+}  // namespace vibratorctl

@@ -1,11 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Score.h"
+#include "scores/Score.h"
 
 #include "cli/Text.h"
 
 #include <algorithm>
 #include <nlohmann/json.hpp>
 #include <sstream>
+
+namespace vibratorctl {
 
 namespace {
 
@@ -162,3 +164,5 @@ std::vector<ScoreError> parseScore(const std::string& text, const std::vector<St
     errors.resize(std::min(errors.size(), kMostScoreErrors));
     return errors;
 }
+
+}  // namespace vibratorctl
