@@ -1,4 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "EffectPlayback.h"
+
 #include "Log.h"
 #include "Vibrator.h"
 
@@ -6,14 +8,6 @@
 #include <iterator>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
-namespace {
-
-constexpr uint32_t kClickMs = 20;
-
-/** Amplitude of the click, indexed by EffectStrength. */
-constexpr uint8_t kClickAmplitudes[] = {36, 128, 255};
-
-}  // namespace
 
 Return<void> Vibrator::perform(::android::hardware::vibrator::V1_0::Effect effect,
                                EffectStrength strength, perform_cb _hidl_cb) {

@@ -1,4 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "FolderStatus.h"
+
 #include "Log.h"
 #include "NodePathTable.h"
 #include "TextNode.h"
@@ -7,27 +9,19 @@
 #include <fcntl.h>
 
 #include <cerrno>
-#include <cstring>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
-namespace {
-
-const std::string FOLDER_OPEN_COMMAND = "FOLDER_OPEN\n";
-const std::string FOLDER_CLOSE_COMMAND = "FOLDER_CLOSE\n";
-
-}  // namespace
 
 Return<bool> Vibrator::daxSupportsFolderStatusSetting() {
     LOG_DEBUG("daxSupportsFolderStatusSetting starts");
     if (checkCallerPermission() != kCallerPermitted) return false;
 
-    char text[512];
+    char text[kFolderTextSize + 1];
     if (!readTextNode("daxSupportsFolderStatusSetting", THE_DEVICE_EVENT_CMD, O_RDWR, text,
                       sizeof(text))) {
         return false;
     }
-    // A driver that takes fold events shows one of its commands: any of these letters will do.
-    const bool supports = strpbrk(text, "DFLO") != nullptr;
+    const bool supports = takesFolderStatus(text);
     LOG_DEBUG(supports ? "daxSupportsFolderStatusSetting TRUE"
                        : "daxSupportsFolderStatusSetting FALSE");
     return supports;

@@ -9,17 +9,11 @@
 #include <cerrno>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
-namespace {
-
-/** The packets carry their own durations; this only sets the engine off. */
-constexpr uint32_t kTriggerMs = 1;
-
-}  // namespace
 
 Return<Status> Vibrator::daxPerformHapticEngine(const hidl_vec<DaxHapticEnginePacket>& packets,
                                                 uint32_t amplitude) {
     if (checkCallerPermission() != kCallerPermitted) return Status::UNKNOWN_ERROR;
-    if (!HapticEngineText::hasRoomFor(packets)) {
+    if (packets.size() > HapticEngineText::kMaxPackets) {
         LOG_ERROR("daxPerformHapticEngine packet size is exceed");
         return Status::BAD_VALUE;
     }
@@ -44,7 +38,7 @@ Return<Status> Vibrator::daxPerformHapticEngine(const hidl_vec<DaxHapticEnginePa
         LOG_DEBUG("daxPerformHapticEngine UNKNOWN_ERROR");
         return Status::UNKNOWN_ERROR;
     }
-    on(kTriggerMs);
+    on(kEngineMs);
     LOG_DEBUG("daxPerformHapticEngine OK");
     return Status::OK;
 }

@@ -6,14 +6,6 @@
 #include <charconv>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
-namespace {
-
-/** @return whether a value and its blank take no more than 9 characters. */
-constexpr bool isShort(int32_t value) {
-    return value >= -9999999 && value <= 99999999;
-}
-
-}  // namespace
 
 bool HapticEngineText::build(const HapticEnginePackets& packets, uint32_t amplitude,
                              int32_t* abnormal) {
@@ -23,7 +15,7 @@ bool HapticEngineText::build(const HapticEnginePackets& packets, uint32_t amplit
         const int32_t values[] = {packet.param0, static_cast<int32_t>(scaled), packet.param2,
                                   packet.param3};
         for (const int32_t value : values) {
-            if (!isShort(value)) {
+            if (!isEngineValue(value)) {
                 *abnormal = value;
                 return false;
             }

@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "NodePathTable.h"
 
-#include "Log.h"
-
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 
 uint8_t DriverMode = kTimedOutputMode;
@@ -24,53 +22,38 @@ std::string THE_DEVICE_EVENT_CMD;
 std::string THE_DEVICE_PATTERN_LENGTH;
 std::string THE_DEVICE_EXT_CONTROL;
 
-namespace {
+const std::string FOLDER_OPEN_COMMAND = "FOLDER_OPEN\n";
+const std::string FOLDER_CLOSE_COMMAND = "FOLDER_CLOSE\n";
 
-struct ModeDependentNode {
-    /** Format of the log line that shows the path. */
-    const char* format;
-    std::string& path;
-    const char* leaf;
+const NodeInfo NodePathTable[] = {
+        {"enable", nullptr, nullptr, false, kTimedOutputMode},
+        {"activate", nullptr, nullptr, false, kLedTriggerMode},
+        {"duration", nullptr, nullptr, false, kLedTriggerMode},
+        {"state", nullptr, nullptr, false, kLedTriggerMode},
+        {"intensity", &THE_DEVICE_INTENSITY, "Vibrator THE_DEVICE_INTENSITY %s"},
+        {"force_touch_intensity", &THE_DEVICE_FORCE_TOUCH_INTENSITY,
+         "Vibrator THE_DEVICE_FORCE_TOUCH_INTENSITY %s"},
+        {"multi_freq", &THE_DEVICE_MULTI_FREQ, "Vibrator THE_DEVICE_MULTI_FREQ %s"},
+        {"haptic_engine", &THE_DEVICE_HAPTIC_ENGINE, "Vibrator THE_DEVICE_HAPTIC_ENGINE %s"},
+        {"cp_trigger_index", &THE_DEVICE_HAPTIC_ENGINE_INDEX,
+         "Vibrator THE_DEVICE_HAPTIC_ENGINE_INDEX %s"},
+        {"cp_trigger_queue", &THE_DEVICE_HAPTIC_PLAYBACK_QUEUE,
+         "Vibrator THE_DEVICE_HAPTIC_PLAYBACK_QUEUE %s"},
+        {"num_waves", &THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES,
+         "Vibrator THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES %s", true},
+        {"motor_type", &THE_DEVICE_MOTOR_TYPE, "Vibrator THE_DEVICE_MOTOR_TYPE %s"},
+        {"event_cmd", &THE_DEVICE_EVENT_CMD, "Vibrator THE_DEVICE_EVENT_CMD %s"},
+        {"pattern_length", &THE_DEVICE_PATTERN_LENGTH, "Vibrator THE_DEVICE_PATTERN_LENGTH %s",
+         true},
+        {"ext_control", &THE_DEVICE_EXT_CONTROL, "Vibrator THE_DEVICE_EXT_CONTROL %s"},
 };
 
-/** In the order in which they are logged. */
-const ModeDependentNode kModeDependentNodes[] = {
-        {"Vibrator THE_DEVICE_INTENSITY %s", THE_DEVICE_INTENSITY, "intensity"},
-        {"Vibrator THE_DEVICE_FORCE_TOUCH_INTENSITY %s", THE_DEVICE_FORCE_TOUCH_INTENSITY,
-         "force_touch_intensity"},
-        {"Vibrator THE_DEVICE_MULTI_FREQ %s", THE_DEVICE_MULTI_FREQ, "multi_freq"},
-        {"Vibrator THE_DEVICE_HAPTIC_ENGINE %s", THE_DEVICE_HAPTIC_ENGINE, "haptic_engine"},
-        {"Vibrator THE_DEVICE_HAPTIC_ENGINE_INDEX %s", THE_DEVICE_HAPTIC_ENGINE_INDEX,
-         "cp_trigger_index"},
-        {"Vibrator THE_DEVICE_HAPTIC_PLAYBACK_QUEUE %s", THE_DEVICE_HAPTIC_PLAYBACK_QUEUE,
-         "cp_trigger_queue"},
-        {"Vibrator THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES %s", THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES,
-         "num_waves"},
-        {"Vibrator THE_DEVICE_MOTOR_TYPE %s", THE_DEVICE_MOTOR_TYPE, "motor_type"},
-        {"Vibrator THE_DEVICE_EVENT_CMD %s", THE_DEVICE_EVENT_CMD, "event_cmd"},
-        {"Vibrator THE_DEVICE_PATTERN_LENGTH %s", THE_DEVICE_PATTERN_LENGTH, "pattern_length"},
-        {"Vibrator THE_DEVICE_EXT_CONTROL %s", THE_DEVICE_EXT_CONTROL, "ext_control"},
-};
-
-/** Directory of each layout, indexed by DriverMode. */
-constexpr const char* kDirectories[] = {
-        "/sys/class/timed_output/vibrator/",
-        "/sys/class/leds/vibrator/",
-};
-
-}  // namespace
-
-void setDriverMode(uint8_t mode) {
-    DriverMode = mode;
-    for (const ModeDependentNode& node : kModeDependentNodes) {
-        node.path = std::string(kDirectories[mode]) + node.leaf;
+std::optional<uint8_t> findDriverMode(const std::function<bool(const std::string& node)>& opens) {
+    if (opens(THE_DEVICE_ENABLE)) return kTimedOutputMode;
+    if (opens(THE_DEVICE_ACTIVATE) && opens(THE_DEVICE_DURATION) && opens(THE_DEVICE_STATE)) {
+        return kLedTriggerMode;
     }
-}
-
-void logNodePathTable() {
-    for (const ModeDependentNode& node : kModeDependentNodes) {
-        LOG_DEBUG(node.format, node.path.c_str());
-    }
+    return std::nullopt;
 }
 
 }  // namespace vendor::velmora::hardware::vibrator::V2_1::implementation

@@ -1,20 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "Amplitude.h"
 #include "Log.h"
 #include "NodePathTable.h"
 #include "Vibrator.h"
 
-#include <cmath>
 #include <cstring>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
-namespace {
-
-/** Maps 1 to 255 on the driver's scale of 1 to 10000; the order of the steps fixes the rounding. */
-long intensityOf(uint8_t amplitude) {
-    return lround(static_cast<double>(amplitude - 1) / 254.0 * 9999.0 + 1.0);
-}
-
-}  // namespace
 
 Return<Status> Vibrator::on(uint32_t timeoutMs) {
     const auto timeout = static_cast<int32_t>(timeoutMs);

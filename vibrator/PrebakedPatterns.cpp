@@ -1,4 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "PrebakedPatterns.h"
+
 #include "Amplitude.h"
 #include "Log.h"
 #include "NodePathTable.h"
@@ -9,14 +11,6 @@
 #include <cstdio>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
-namespace {
-
-constexpr uint32_t kPatternMs = 1000;
-
-/** Written as the pattern number, makes the driver play its queue. */
-constexpr int kQueueIndex = 0xFFFE;
-
-}  // namespace
 
 Return<void> Vibrator::daxGetNumberOfPrebakedHapticPattern(
         daxGetNumberOfPrebakedHapticPattern_cb _hidl_cb) {

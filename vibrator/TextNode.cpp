@@ -23,11 +23,8 @@ bool readTextNode(const char* operation, const std::string& node, int mode, char
     }
     file.shut();
 
-    char& last = text[count - 1];
-    if (last == '\n') {
-        LOG_DEBUG("%s str has new-line char at the last", operation);
-        last = '\0';
-    }
+    if (text[count - 1] == '\n') LOG_DEBUG("%s str has new-line char at the last", operation);
+    text[textOf({text, static_cast<size_t>(count)}).size()] = '\0';
     LOG_DEBUG("%s string : %s ", operation, text);
     LOG_DEBUG("%s string len : %zu ", operation, strlen(text));
     return true;

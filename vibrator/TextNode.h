@@ -6,9 +6,16 @@
 #include <cstddef>
 #include <optional>
 #include <string>
+#include <string_view>
 
 /** The one way in which operations exchange text, rather than a number, with a node. */
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
+
+/** @return the text in what was read of a node: up to a zero byte, less one newline at the end. */
+constexpr std::string_view textOf(std::string_view bytes) {
+    if (!bytes.empty() && bytes.back() == '\n') bytes.remove_suffix(1);
+    return bytes.substr(0, bytes.find('\0'));
+}
 
 /**
  * Reads a node's text, less one final newline.

@@ -5,16 +5,30 @@
 #include "NodePathTable.h"
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
+namespace {
+
+void setDriverMode(uint8_t mode) {
+    DriverMode = mode;
+    for (const NodeInfo& node : NodePathTable) {
+        if (node.path != nullptr) *node.path = node.pathIn(mode);
+    }
+}
+
+void logNodePathTable() {
+    for (const NodeInfo& node : NodePathTable) {
+        if (node.path != nullptr) LOG_DEBUG(node.logFormat, node.path->c_str());
+    }
+}
+
+}  // namespace
 
 Vibrator::Vibrator() {
     LOG_DEBUG("!@QOR VIB HAL init");
-    if (isNodeExist(THE_DEVICE_ENABLE)) {
-        LOG_DEBUG("Vibrator using timed_output");
-        setDriverMode(kTimedOutputMode);
-    } else if (isNodeExist(THE_DEVICE_ACTIVATE) && isNodeExist(THE_DEVICE_DURATION) &&
-               isNodeExist(THE_DEVICE_STATE)) {
-        LOG_DEBUG("Vibrator using LED trigger");
-        setDriverMode(kLedTriggerMode);
+    const auto mode = findDriverMode([this](const std::string& node) { return isNodeExist(node); });
+    if (mode) {
+        LOG_DEBUG(*mode == kTimedOutputMode ? "Vibrator using timed_output"
+                                            : "Vibrator using LED trigger");
+        setDriverMode(*mode);
     } else {
         LOG_DEBUG("Vibrator driver does not exist. Remove VIB HAL or Setup Vibrator Driver");
     }

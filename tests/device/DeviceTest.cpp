@@ -65,15 +65,11 @@ TEST(DeviceTest, BlueprintNamesWhatThereIs) {
 }
 
 TEST(DeviceTest, InitStartsTheServiceAndGivesItTheNodes) {
-    std::multiset<std::string> given = {THE_DEVICE_ENABLE, THE_DEVICE_ACTIVATE, THE_DEVICE_DURATION,
-                                        THE_DEVICE_STATE};
+    std::multiset<std::string> given;
     for (const uint8_t mode : {kTimedOutputMode, kLedTriggerMode}) {
-        setDriverMode(mode);
-        given.insert({THE_DEVICE_INTENSITY, THE_DEVICE_FORCE_TOUCH_INTENSITY, THE_DEVICE_MULTI_FREQ,
-                      THE_DEVICE_HAPTIC_ENGINE, THE_DEVICE_HAPTIC_ENGINE_INDEX,
-                      THE_DEVICE_HAPTIC_PLAYBACK_QUEUE, THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES,
-                      THE_DEVICE_MOTOR_TYPE, THE_DEVICE_EVENT_CMD, THE_DEVICE_PATTERN_LENGTH,
-                      THE_DEVICE_EXT_CONTROL});
+        for (const NodeInfo& node : NodePathTable) {
+            if (node.isIn(mode)) given.insert(node.pathIn(mode));
+        }
     }
     const std::string chown = "chown system system ";
     // Class hal is started on boot, after this; the trigger makes the nodes that are given away.

@@ -27,8 +27,11 @@ LocalDriver::LocalDriver() {
     mIsUsable = !THE_DEVICE_INTENSITY.empty();
     mIsThere = mIsUsable || look(THE_DEVICE_ENABLE).exists || look(THE_DEVICE_ACTIVATE).exists;
     // The service's code ignores nodes that this user cannot open; doctor shows them.
-    if (!mIsUsable)
-        setDriverMode(look(THE_DEVICE_ENABLE).exists ? kTimedOutputMode : kLedTriggerMode);
+    if (mIsUsable) return;
+    DriverMode = look(THE_DEVICE_ENABLE).exists ? kTimedOutputMode : kLedTriggerMode;
+    for (const NodeInfo& node : NodePathTable) {
+        if (node.path != nullptr) *node.path = node.pathIn(DriverMode);
+    }
 }
 
 LocalDriver::Node LocalDriver::look(const std::string& path) const {
