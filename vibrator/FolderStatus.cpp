@@ -6,9 +6,8 @@
 #include "TextNode.h"
 #include "Vibrator.h"
 
-#include <fcntl.h>
-
 #include <cerrno>
+#include <cstring>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 
@@ -17,10 +16,13 @@ Return<bool> Vibrator::daxSupportsFolderStatusSetting() {
     if (checkCallerPermission() != kCallerPermitted) return false;
 
     char text[kFolderTextSize + 1];
-    if (!readTextNode("daxSupportsFolderStatusSetting", THE_DEVICE_EVENT_CMD, O_RDWR, text,
-                      sizeof(text))) {
+    if (!readTextNode("daxSupportsFolderStatusSetting", THE_DEVICE_EVENT_CMD, NodeMode::kReadWrite,
+                      text, sizeof(text))) {
         return false;
     }
+    LOG_DEBUG("daxSupportsFolderStatusSetting string : %s ", text);
+    LOG_DEBUG("daxSupportsFolderStatusSetting string len : %lu ",
+              static_cast<unsigned long>(strlen(text)));
     const bool supports = takesFolderStatus(text);
     LOG_DEBUG(supports ? "daxSupportsFolderStatusSetting TRUE"
                        : "daxSupportsFolderStatusSetting FALSE");

@@ -5,7 +5,7 @@
 #include "TextNode.h"
 #include "Vibrator.h"
 
-#include <fcntl.h>
+#include <cstring>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 namespace {
@@ -18,9 +18,12 @@ using MotorName = char[kMotorNameSize + 1];
 Return<int32_t> Vibrator::getMotorIndex() {
     LOG_DEBUG("getMotorIndex return motor type >>");
     MotorName name;
-    if (!readTextNode("getMotorIndex", THE_DEVICE_MOTOR_TYPE, O_RDWR, name, sizeof(name))) {
+    if (!readTextNode("getMotorIndex", THE_DEVICE_MOTOR_TYPE, NodeMode::kReadWrite, name,
+                      sizeof(name))) {
         return kMotorNone;
     }
+    LOG_DEBUG("getMotorIndex string : %s ", name);
+    LOG_DEBUG("getMotorIndex string len : %d ", static_cast<int>(strlen(name)));
     const MotorType type = motorOfName(name);
     LOG_DEBUG("getMotorIndex return motor type : %d <<", type);
     return type;
@@ -43,10 +46,13 @@ Return<bool> Vibrator::daxSupportsEnhancedVelmoraHapticPattern() {
     }
 
     MotorName name;
-    if (!readTextNode("daxSupportsEnhancedVelmoraHapticPattern", THE_DEVICE_MOTOR_TYPE, O_RDONLY,
-                      name, sizeof(name))) {
+    if (!readTextNode("daxSupportsEnhancedVelmoraHapticPattern", THE_DEVICE_MOTOR_TYPE,
+                      NodeMode::kRead, name, sizeof(name))) {
         return false;
     }
+    LOG_DEBUG("daxSupportsEnhancedVelmoraHapticPattern string : %s ", name);
+    LOG_DEBUG("daxSupportsEnhancedVelmoraHapticPattern string len : %lu ",
+              static_cast<unsigned long>(strlen(name)));
     const bool supports = motorOfName(name) == kMotorLinear1040;
     if (supports) {
         LOG_DEBUG("daxSupportsEnhancedVelmoraHapticPattern LINEAR_1040");

@@ -19,15 +19,21 @@ auto retryInterrupted(Call call) {
     return result;
 }
 
+enum class NodeMode { kRead, kReadWrite };
+
 /**
  * One access of a node: opens it, does one transfer, and closes it when it goes out of scope. The
  * driver sees each transfer as one value, so a short one is never continued.
  */
 class NodeFile {
   public:
-    /** @param mode O_RDONLY or O_RDWR; a node is never created. */
-    NodeFile(const char* path, int mode)
-        : mDescriptor(retryInterrupted([=] { return open(path, mode); })) {}
+    /** Opens a node, and never creates it. */
+    NodeFile(const char* path, NodeMode mode)
+        : mDescriptor(retryInterrupted([=] {
+              // With flags that the compiler does not know, open would become another function
+              // where the C library checks its callers.
+              return mode == NodeMode::kRead ? open(path, O_RDONLY) : open(path, O_RDWR);
+          })) {}
     NodeFile(const NodeFile&) = delete;
     NodeFile& operator=(const NodeFile&) = delete;
     ~NodeFile() { shut(); }

@@ -67,7 +67,7 @@ Return<Status> Vibrator::setAmplitude(uint8_t amplitude) {
     const long intensity = intensityOf(amplitude);
     LOG_DEBUG("Setting amplitude to: %ld", intensity);
     int error = 0;
-    if (writeNode(THE_DEVICE_INTENSITY, static_cast<int>(intensity), &error) != Status::OK) {
+    if (writeNumber(THE_DEVICE_INTENSITY, static_cast<int>(intensity), &error) != Status::OK) {
         LOG_ERROR("Failed to set amplitude (%d): %s", error, strerror(error));
         return Status::UNKNOWN_ERROR;
     }

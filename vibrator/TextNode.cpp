@@ -8,7 +8,7 @@
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 
-bool readTextNode(const char* operation, const std::string& node, int mode, char* text,
+bool readTextNode(const char* operation, const std::string& node, NodeMode mode, char* text,
                   size_t size) {
     memset(text, 0, size);
     NodeFile file(node.c_str(), mode);
@@ -25,13 +25,11 @@ bool readTextNode(const char* operation, const std::string& node, int mode, char
 
     if (text[count - 1] == '\n') LOG_DEBUG("%s str has new-line char at the last", operation);
     text[textOf({text, static_cast<size_t>(count)}).size()] = '\0';
-    LOG_DEBUG("%s string : %s ", operation, text);
-    LOG_DEBUG("%s string len : %zu ", operation, strlen(text));
     return true;
 }
 
 std::optional<ssize_t> writeTextNode(const std::string& node, const char* text, size_t length) {
-    const NodeFile file(node.c_str(), O_RDWR);
+    const NodeFile file(node.c_str(), NodeMode::kReadWrite);
     if (!file.isOpen()) return std::nullopt;
     return file.send(text, length);
 }

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "NodeFile.h"
+
 #include <sys/types.h>
 
 #include <cstddef>
@@ -21,11 +23,10 @@ constexpr std::string_view textOf(std::string_view bytes) {
  * Reads a node's text, less one final newline.
  *
  * @param operation name that the log lines begin with.
- * @param mode O_RDONLY or O_RDWR.
  * @param text buffer for at most size - 1 bytes of text; always terminated.
  * @return whether at least one byte could be read; if not, the reason has been logged.
  */
-bool readTextNode(const char* operation, const std::string& node, int mode, char* text,
+bool readTextNode(const char* operation, const std::string& node, NodeMode mode, char* text,
                   size_t size);
 
 /**

@@ -4,6 +4,7 @@
 #include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
 
 #include <cstdint>
+#include <optional>
 #include <string>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
@@ -30,8 +31,8 @@ constexpr int32_t kReadFailed = -1;
  * driver's nodes, and every answer is read back from the driver. The transport status of every
  * result is OK; failures are in the value.
  *
- * Operations named dax serve only the system user and root; to anybody else a query answers false
- * and every other operation Status::UNKNOWN_ERROR.
+ * Operations named dax serve only the system user and root; to anybody else a query, and
+ * daxGetAmplitudeList, answers false, and every other operation Status::UNKNOWN_ERROR.
  */
 class Vibrator : public IDaxVibrator {
   public:
@@ -155,21 +156,10 @@ class Vibrator : public IDaxVibrator {
 
     // What the operations are made of: the driver's nodes, and what they say of the motor.
 
-    /**
-     * Writes a number and a newline.
-     *
-     * @param error set to errno as the open that failed, or else the write, left it; errno itself
-     *     may have changed by the time that the caller has the result.
-     * @return OK, or UNKNOWN_ERROR when the node did not take all of it.
-     */
-    Return<Status> writeNode(std::string node, int value, int* error = nullptr);
-    /**
-     * Reads a number.
-     *
-     * @param isNumber set to true when the node holds a number; not touched when it cannot be read.
-     * @return the number at the beginning of the node's first 7 bytes, or kReadFailed.
-     */
-    Return<int32_t> readNode(std::string node, bool* isNumber = nullptr);
+    /** Writes a number and a newline. @return OK, or UNKNOWN_ERROR when not all of it was taken. */
+    Return<Status> writeNode(std::string node, int value);
+    /** @return the number at the beginning of the node's first 7 bytes, or kReadFailed. */
+    Return<int32_t> readNode(std::string node);
     /** @return whether the node can be opened for reading and writing. */
     Return<bool> isNodeExist(std::string node);
     /** @return whether the node can be opened for reading. */
@@ -180,16 +170,23 @@ class Vibrator : public IDaxVibrator {
 
     /** @return the motor type number, 1 to 9, by the driver's name for it; 0 for none known. */
     Return<int32_t> getMotorIndex();
-    /** @return the motor type number, 1 to 9, by the features that the driver offers. */
+    /** @return the motor type number, 1, 2, 5, 6, 7 or 9, by the features that the driver offers.
+     */
     Return<int32_t> getMotorIndexbyMethod();
 
+  private:
     /** Judges the caller, and logs a refusal. @return kCallerPermitted or kCallerRefused. */
     Return<uint32_t> checkCallerPermission();
 
-  private:
-    // The two ways of daxPerformPrebakedHapticPattern, for an amplitude in range.
-    Status playPattern(uint32_t pattern, uint32_t amplitude);
-    Status queuePattern(uint32_t pattern, uint32_t amplitude);
+    /**
+     * Does what writeNode does.
+     *
+     * @param error set to errno as the open that failed, or else the write, left it; errno itself
+     *     may have changed by the time that the caller has the result.
+     */
+    Status writeNumber(const std::string& node, int value, int* error);
+    /** Does what readNode does. @return the number, if the node could be read and holds one. */
+    std::optional<int32_t> readNumber(const std::string& node);
 };
 
 }  // namespace vendor::velmora::hardware::vibrator::V2_1::implementation

@@ -4,12 +4,13 @@
 #include "Driver.h"
 #include "Log.h"
 #include "MotorType.h"
-#include "NodeFile.h"
 #include "NodePathTable.h"
 #include "Trace.h"
 
+#include <fcntl.h>
 #include <pwd.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <cstdio>
@@ -43,16 +44,18 @@ LocalDriver::Node LocalDriver::look(const std::string& path) const {
     Node node;
     if (stat(isSimulated ? simulated.file.c_str() : path.c_str(), &info) != 0) return node;
     node.exists = true;
-    const NodeFile readable(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
-    const NodeFile writable(path.c_str(), O_WRONLY | O_CLOEXEC | O_NONBLOCK);
+    const int readable = open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
+    const int writable = open(path.c_str(), O_WRONLY | O_CLOEXEC | O_NONBLOCK);
     // Root may open any file, but the mode of a driver's attribute binds it, too.
-    node.reads = (info.st_mode & 0444) != 0 && readable.isOpen();
-    node.writes = (info.st_mode & 0222) != 0 && writable.isOpen();
+    node.reads = (info.st_mode & 0444) != 0 && readable >= 0;
+    node.writes = (info.st_mode & 0222) != 0 && writable >= 0;
     if (node.reads) {
         char text[512];
-        const ssize_t size = readable.receive(text, sizeof(text));
+        const ssize_t size = read(readable, text, sizeof(text));
         node.value.assign(text, static_cast<size_t>(std::max<ssize_t>(size, 0)));
     }
+    if (readable >= 0) close(readable);
+    if (writable >= 0) close(writable);
     char mode[8];
     snprintf(mode, sizeof(mode), "%04o", info.st_mode & 07777);
     node.mode = mode;
