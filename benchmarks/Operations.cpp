@@ -17,14 +17,14 @@
 namespace {
 
 using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
-using simulator::Layout;
+using model::Layout;
 
-const std::string kDirectory = simulator::sysfsDirectory(Layout::kLedTrigger);
+const std::string kDirectory = model::sysfsDirectory(Layout::kLedTrigger);
 
 /** Makes the nodes anew, as the operation expects them. @return its accesses of nodes. */
 std::vector<Step> prepare(const Operation& operation) {
-    simulator::Features features;
-    for (const std::string& name : simulator::featureNames())
+    model::Features features;
+    for (const std::string& name : model::featureNames())
         features.names.insert(name);
     if (simulator::createNodes("", Layout::kLedTrigger, features) != 0) abort();
     std::vector<Step> steps = parseSteps(Layout::kLedTrigger, operation.steps);

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Faults.h"
 
-#include "Trace.h"
+#include "TraceFile.h"
 
 #include <fcntl.h>
 #include <sys/file.h>

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Driver.h"
-#include "Trace.h"
+#include "SimulatedDriver.h"
+#include "TraceFile.h"
+#include "TraceLine.h"
 
 #include <unistd.h>
 
@@ -18,7 +19,7 @@ __attribute__((constructor)) void checkDirectory() {
         dprintf(STDERR_FILENO,
                 "libvibrator_sim: VIBRATOR_SIM_DIR: %s has no simulated driver, nothing is traced; "
                 "\"vibrator-sim create\" makes one\n",
-                simulator::quote(directory).c_str());
+                model::quote(directory).c_str());
     }
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Session.h"
 
-#include "Trace.h"
+#include "TraceFile.h"
 #include "cli/Text.h"
 
 #include <fcntl.h>

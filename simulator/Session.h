@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Driver.h"
+#include "SimulatedDriver.h"
 
 namespace simulator {
 

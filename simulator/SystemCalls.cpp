@@ -6,9 +6,10 @@
  * or linked into a test, whose own code does not change.
  */
 #undef _FORTIFY_SOURCE
-#include "Driver.h"
 #include "Faults.h"
-#include "Trace.h"
+#include "SimulatedDriver.h"
+#include "TraceFile.h"
+#include "TraceLine.h"
 
 #include <fcntl.h>
 #include <sys/syscall.h>
@@ -97,8 +98,9 @@ ssize_t simulate(const OpenNode& open, const std::string& name, const std::strin
             fault && fault->error != 0 ? -fault->error : action(fault ? fault->bytes : SIZE_MAX);
     std::string bytes;
     if (shown != nullptr && result >= 0)
-        bytes = simulator::quote({static_cast<const char*>(shown), static_cast<size_t>(result)});
-    simulator::trace(*open.directory, open.node.name() + ' ' + name + argument, result, bytes);
+        bytes = model::quote({static_cast<const char*>(shown), static_cast<size_t>(result)});
+    simulator::trace(*open.directory, model::traceName(open.node.path) + ' ' + name + argument,
+                     result, bytes);
     return result;
 }
 
@@ -128,7 +130,7 @@ ssize_t simulateRead(OpenNode& open, void* buffer, size_t size) {
 
 ssize_t simulateWrite(const OpenNode& open, const void* buffer, size_t size) {
     const std::string bytes(static_cast<const char*>(buffer), size);
-    return simulate(open, "write", ' ' + simulator::quote(bytes), [&](size_t most) {
+    return simulate(open, "write", ' ' + model::quote(bytes), [&](size_t most) {
         // A driver that gets only a part does not take the value.
         return most < SIZE_MAX ? static_cast<ssize_t>(std::min(size, most))
                                : simulator::store(open.node, bytes);

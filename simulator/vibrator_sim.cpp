@@ -2,7 +2,8 @@
 #include "Faults.h"
 #include "MotorType.h"
 #include "Session.h"
-#include "Trace.h"
+#include "TraceFile.h"
+#include "TraceLine.h"
 #include "cli/CommandLine.h"
 #include "cli/Text.h"
 
@@ -18,7 +19,7 @@ namespace {
 namespace product = ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
 using cli::UsageError;
-using simulator::Layout;
+using model::Layout;
 using Names = std::vector<std::string>;
 
 /** Refuses a word that is not among the known ones. */
@@ -30,7 +31,7 @@ void require(const std::string& word, const Names& known, const std::string& com
 
 /** @return the features that a list names. */
 std::set<std::string> featuresOf(const std::string& list) {
-    const Names all = simulator::featureNames();
+    const Names all = model::featureNames();
     if (list == "all") return {all.begin(), all.end()};
     if (list == "none") return {};
     std::set<std::string> features;
@@ -45,7 +46,7 @@ std::set<std::string> featuresOf(const std::string& list) {
 /** What driver to make. */
 struct DriverKind {
     Layout layout;
-    simulator::Features features;
+    model::Features features;
 };
 
 /** Adds the options that say what driver to make. @return what they say. */
@@ -64,7 +65,7 @@ std::function<DriverKind()> addDriverOptions(cli::Command& command) {
     const auto features =
             command.text("--features LIST",
                          "features of the driver, separated by commas; all, none, or of " +
-                                 cli::join(simulator::featureNames(), ", ", " and "),
+                                 cli::join(model::featureNames(), ", ", " and "),
                          "all");
     return [=] {
         return DriverKind{
@@ -145,7 +146,7 @@ class Simulator : public cli::Program {
     void addShow() {
         command(kAlone, "show", "print what each node holds", "").run([this] {
             for (const simulator::Node& node : simulator::listNodes(driver()))
-                std::cout << node.path << ' ' << simulator::quote(simulator::show(node)) << '\n';
+                std::cout << node.path << ' ' << model::quote(simulator::show(node)) << '\n';
             return cli::kSuccess;
         });
     }
@@ -159,7 +160,7 @@ class Simulator : public cli::Program {
                     for (std::string line; std::getline(file, line);)
                         std::cout << cli::printable(line) << '\n';
                     file.clear();
-                    if (file.tellg() >= simulator::kTraceLimit) {
+                    if (file.tellg() >= model::kTraceLimit) {
                         warn("trace: full; remove \"" + path + "\" to begin a new one");
                     }
                     return cli::kSuccess;

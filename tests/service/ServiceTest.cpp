@@ -42,10 +42,9 @@ TEST_F(ServiceTest, RegistersWithoutADriver) {
 TEST_F(ServiceTest, ServesEveryOperationToEveryCaller) {
     std::vector<uid_t> uids = {geteuid()};
     if (geteuid() == 0) uids = {0, 1000, 1001, 2000, 10123};
-    const std::vector<std::string> all = simulator::featureNames();
-    const simulator::Features features = {{all.begin(), all.end()}};
-    for (const simulator::Layout layout :
-         {simulator::Layout::kLedTrigger, simulator::Layout::kTimedOutput}) {
+    const std::vector<std::string> all = model::featureNames();
+    const model::Features features = {{all.begin(), all.end()}};
+    for (const model::Layout layout : {model::Layout::kLedTrigger, model::Layout::kTimedOutput}) {
         std::filesystem::remove_all(mDirectory.path() + "/sys");
         ASSERT_EQ(simulator::createDriver(mDirectory.path(), layout, features), 0);
         start();

@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Faults.h"
 #include "Folder.h"
-#include "Trace.h"
+#include "TraceFile.h"
+#include "TraceLine.h"
 #include "support/TransientTrigger.h"
 #include "support/VibratorTest.h"
 
@@ -152,10 +153,10 @@ TEST_F(SimulatedDriverTest, TraceIsLimitedAndStaysInsideMarkedFolders) {
         struct stat info {};
         return stat(file.c_str(), &info) == 0 ? info.st_size : -1;
     };
-    ASSERT_EQ(truncate(file.c_str(), simulator::kTraceLimit - 1), 0);
+    ASSERT_EQ(truncate(file.c_str(), model::kTraceLimit - 1), 0);
     get("intensity");
     const off_t full = size();
-    EXPECT_GT(full, simulator::kTraceLimit);
+    EXPECT_GT(full, model::kTraceLimit);
     get("intensity");
     EXPECT_EQ(size(), full);
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Driver.h"
+#include "SimulatedDriver.h"
 #include "support/Answer.h"
 #include "support/Process.h"
 #include "support/TemporaryDirectory.h"

@@ -2,7 +2,6 @@
 #include "support/Steps.h"
 
 #include "Faults.h"
-#include "Trace.h"
 
 #include <regex.h>
 
@@ -17,7 +16,7 @@
 
 namespace {
 
-using simulator::Layout;
+using model::Layout;
 
 std::string replaced(std::string text, const std::string& part, const std::string& other) {
     for (size_t at = 0; (at = text.find(part, at)) != std::string::npos; at += other.size())

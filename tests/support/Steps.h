@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Driver.h"
+#include "SimulatedDriver.h"
 #include "support/LogCapture.h"
 
 #include <map>
@@ -67,7 +67,7 @@ struct Step {
 };
 
 /** @return the steps that a text in the notation describes. */
-std::vector<Step> parseSteps(simulator::Layout layout, const std::string& text);
+std::vector<Step> parseSteps(model::Layout layout, const std::string& text);
 
 /** What is against a call beside what goes wrong with its steps. */
 struct Circumstances {
@@ -91,10 +91,10 @@ struct Behaviour {
  * @param answerFailed the same, when they do not and do not tell another answer.
  * @return what the steps should show.
  */
-Behaviour behaviourOf(simulator::Layout layout, const std::vector<Step>& steps,
+Behaviour behaviourOf(model::Layout layout, const std::vector<Step>& steps,
                       const std::string& answer, const std::string& answerFailed,
                       const Circumstances& circumstances = {});
 
 /** Puts into a driver's nodes what the steps read, and makes go wrong what they say does. */
-void prepareNodes(const std::string& directory, simulator::Layout layout,
+void prepareNodes(const std::string& directory, model::Layout layout,
                   const std::vector<Step>& steps);

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "support/VibratorTest.h"
 
-#include "Trace.h"
+#include "TraceFile.h"
 
 #include <cerrno>
 #include <cstdlib>
@@ -39,8 +39,8 @@ VibratorTest::~VibratorTest() {
 }
 
 void VibratorTest::createDriver() {
-    simulator::Features features;
-    for (const std::string& name : simulator::featureNames())
+    model::Features features;
+    for (const std::string& name : model::featureNames())
         features.names.insert(name);
     ASSERT_EQ(simulator::createDriver(mDirectory.path(), mLayout, features), 0);
 }

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Driver.h"
 #include "NodePathTable.h"
+#include "SimulatedDriver.h"
 #include "Vibrator.h"
 #include "libhwbinder/Driver.h"
 #include "support/LogCapture.h"
@@ -17,7 +17,7 @@
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 
 using ::android::hardware::CallerIdentity;
-using simulator::Layout;
+using model::Layout;
 
 /** A service object on a simulated driver, with the driver's trace and the log to look at. */
 class VibratorTest : public ::testing::Test {

@@ -2,7 +2,7 @@
 #include "Commands.h"
 #include "NodePathTable.h"
 #include "Queries.h"
-#include "Trace.h"
+#include "TraceLine.h"
 #include "cli/Text.h"
 #include "service/LocalDriver.h"
 
@@ -181,7 +181,7 @@ std::string Examination::nodeTable() const {
     std::string table = "\nNodes in " + directory + "\n" +
                         "NAME                  MODE OWNER    RW VALUE              FOR\n";
     for (const auto& node : mReport["nodes"]) {
-        const std::string value = simulator::quote(node["value"].get<std::string>());
+        const std::string value = model::quote(node["value"].get<std::string>());
         table += cell(node["path"].get<std::string>().substr(directory.size()), 21) +
                  cell(node["mode"], 4) + cell(node["owner"], 8) + (node["readable"] ? "r" : "-") +
                  (node["writable"] ? "w " : "- ") +

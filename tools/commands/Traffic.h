@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Driver.h"
-#include "Trace.h"
+#include "SimulatedDriver.h"
+#include "TraceFile.h"
 #include "service/Client.h"
 
 namespace vibratorctl {

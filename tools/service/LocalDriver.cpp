@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "service/LocalDriver.h"
 
-#include "Driver.h"
 #include "Log.h"
 #include "MotorType.h"
 #include "NodePathTable.h"
-#include "Trace.h"
+#include "SimulatedDriver.h"
+#include "TraceFile.h"
 
 #include <fcntl.h>
 #include <pwd.h>

@@ -1,28 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Trace.h"
-
-#include "Driver.h"
-
-#include <fcntl.h>
-#include <unistd.h>
+#include "TraceLine.h"
 
 #include <cstdio>
 #include <cstring>
 #include <ctime>
 
-namespace simulator {
-
-namespace {
-
-constexpr char kTraceName[] = "trace";
-
-bool sOnlyLooks = false;
-
-}  // namespace
-
-std::string traceFile(const std::string& directory) {
-    return directory + "/" + kTraceName;
-}
+namespace model {
 
 std::string quote(std::string_view bytes) {
     std::string quoted = "\"";
@@ -46,9 +29,13 @@ std::string quote(std::string_view bytes) {
     return quoted + '"';
 }
 
-void trace(const Folder& directory, const std::string& access, long result,
-           const std::string& shown) {
-    if (sOnlyLooks || !isMarked(directory)) return;
+std::string traceName(std::string_view path) {
+    constexpr size_t kStart = std::string_view("/sys/class/").size();
+    std::string name(path.substr(kStart, path.find('/', kStart) - kStart));
+    return name.append(path.substr(path.rfind('/')));
+}
+
+std::string traceLine(const std::string& access, long result, const std::string& shown) {
     timespec time{};
     clock_gettime(CLOCK_MONOTONIC, &time);
     char clock[32];
@@ -58,25 +45,7 @@ void trace(const Folder& directory, const std::string& access, long result,
     line += result < 0 ? std::string("-1 ") + strerrorname_np(static_cast<int>(-result))
                        : std::to_string(result);
     if (!shown.empty()) line += " " + shown;
-    line += '\n';
-
-    const int file = directory.open(kTraceName, O_WRONLY | O_APPEND | O_CREAT, 0644);
-    struct stat info;
-    if (file < 0 || fstat(file, &info) != 0) return;
-    // One write a line, so that the lines of several processes do not mix. A failure cannot be
-    // reported to anybody.
-    if (info.st_size < kTraceLimit) {
-        [[maybe_unused]] const ssize_t written = write(file, line.data(), line.size());
-    }
-    close(file);
+    return line + '\n';
 }
 
-void onlyLook() {
-    sOnlyLooks = true;
-}
-
-bool onlyLooks() {
-    return sOnlyLooks;
-}
-
-}  // namespace simulator
+}  // namespace model

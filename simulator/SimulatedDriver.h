@@ -1,39 +1,22 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "Attributes.h"
 #include "Folder.h"
 
 #include <sys/types.h>
 
-#include <cstddef>
-#include <set>
-
 /**
- * The model of the kernel vibrator driver. Its state is a directory of plain files, one for each
- * sysfs attribute, so that a daemon, a test and a person see the same driver.
+ * A kernel vibrator driver in a directory: a plain file for each sysfs attribute, so that a daemon,
+ * a test and a person see the same driver.
  */
 namespace simulator {
 
-enum class Layout { kTimedOutput, kLedTrigger };
+using model::Features;
+using model::Layout;
 
 /** @return the driver's directory that the environment names; empty where it names none. */
 std::string inheritedDirectory();
-
-/** @return where the kernel has the nodes of a layout; ends in a slash. */
-std::string sysfsDirectory(Layout layout);
-
-/** What a driver offers besides running its motor. */
-struct Features {
-    /** Names of featureNames(); each stands for one or more nodes. */
-    std::set<std::string> names;
-    /** Text of the motor_type node. */
-    std::string motor = "LINEAR_1040";
-    /** Number of patterns stored in the driver. */
-    int waves = 12;
-};
-
-/** @return all features that a driver can have. */
-std::vector<std::string> featureNames();
 
 /**
  * Takes a directory for a simulated driver: makes it, or marks it when it is empty.
@@ -60,8 +43,6 @@ struct Node {
     /** The file that holds its state. */
     std::string file;
 
-    /** @return its place as the trace names it, like "leds/intensity". */
-    std::string name() const;
     /** @return the last part of its path, like "intensity". */
     std::string leaf() const;
 };
@@ -79,6 +60,6 @@ int openNode(const Node& node, int flags);
 std::string show(const Node& node);
 
 /** Writes to the node. @return the number of bytes taken, or a negative errno. */
-ssize_t store(const Node& node, const std::string& bytes);
+ssize_t store(const Node& node, std::string_view bytes);
 
 }  // namespace simulator
