@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "support/ServiceTest.h"
+#include "support/DaemonTest.h"
 
 #include <sys/wait.h>
 #include <unistd.h>
@@ -40,7 +40,7 @@ bool makeCall(IDaxVibrator& vibrator, bool permitted, uint32_t client, uint32_t 
     return vibrator.daxGetAmplitudeList(DaxAmplitudeType::TYPE_0, take).isOk() && right;
 }
 
-class LoadTest : public ServiceTest {
+class LoadTest : public DaemonTest {
   protected:
     /** Starts a process, as one of several users, that makes calls; 0 is for ever. */
     static pid_t spawn(uint32_t client, uint32_t calls) {

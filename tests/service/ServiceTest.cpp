@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "support/ServiceTest.h"
+#include "support/DaemonTest.h"
 
 #include "support/LogCapture.h"
 #include "support/Operations.h"
@@ -13,6 +13,8 @@
 namespace {
 
 using Status = ::android::hardware::vibrator::V1_0::Status;
+
+class ServiceTest : public DaemonTest {};
 
 TEST_F(ServiceTest, StartsInItsOrder) {
     createDriver({"--features", "none"});

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "support/ServiceTest.h"
+#include "support/DaemonTest.h"
 
 #include <sys/wait.h>
 
@@ -12,7 +12,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-class VibratorSimTest : public ServiceTest {
+class VibratorSimTest : public DaemonTest {
   protected:
     /** Anybody may simulate a driver. */
     void SetUp() override {}

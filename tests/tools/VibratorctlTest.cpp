@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "support/ServiceTest.h"
+#include "support/DaemonTest.h"
 
 #include <chrono>
 #include <filesystem>
@@ -12,7 +12,7 @@ namespace {
 
 using nlohmann::json;
 
-class VibratorctlTest : public ServiceTest {
+class VibratorctlTest : public DaemonTest {
   protected:
     /** Runs the client with the words of a command line. */
     static Outcome run(const std::string& line) {
@@ -56,36 +56,28 @@ TEST_F(VibratorctlTest, DoctorAgreesWithTheServiceAndLeavesNoTrace) {
     unsetenv("TMPDIR");
 }
 
-TEST_F(VibratorctlTest, HelpShowsWhatWorks) {
+TEST_F(VibratorctlTest, EveryCommandHasHelpAndAnExampleThatWorks) {
     createDriver();
     start();
-    std::string helps;
     std::istringstream commands(
-            shell("vibratorctl --complete ''; vibratorctl --complete "
-                  "prebaked '' | sed 's/^/prebaked /'"));
-    for (std::string line; std::getline(commands, line);) {
-        const std::string command = line.substr(0, line.find('\t'));
-        // A group's help is that of its commands; what draws and follows has tests of its own.
-        const bool isOthers = command == "prebaked" || command == "play" || command == "watch" ||
-                              command == "plot";
-        if (isOthers) continue;
-        const Outcome help = run("help " + command);
-        EXPECT_EQ(help.output, run(command + " -h").output);
-        helps += help.output + "\n";
-        const size_t example = help.output.find("\nExample: vibratorctl ");
+            shell(R"(vibratorctl help | sed -nE 's/^  ([a-z][a-z-]*( [a-z-]+)?).*/\1/p')"));
+    size_t count = 0;
+    for (std::string command; std::getline(commands, command); ++count) {
+        const std::string help = run("help " + command).output;
+        EXPECT_EQ(help, run(command + " -h").output);
+        const size_t example = help.find("\nExample: vibratorctl ");
         ASSERT_NE(example, std::string::npos) << command;
-        EXPECT_EQ(run(help.output.substr(example + 22)).exitCode, 0) << help.output;
+        // What draws and follows has tests of its own.
+        if (command != "play" && command != "watch" && command != "plot") {
+            EXPECT_EQ(run(help.substr(example + 22)).exitCode, 0) << help;
+        }
         run("on 0");
         run("external off");
+        std::istringstream lines(help);
+        for (std::string line; std::getline(lines, line);)
+            EXPECT_LE(line.size(), 80U) << line;
     }
-    helps += shell("vibratorctl help | sed '/^Tools:/,/^$/d'");
-    EXPECT_EQ(run("help prebaked").output,
-              run("help prebaked count").output + run("help prebaked play").output);
-    EXPECT_EQ(helps, readFile(SOURCE_DIRECTORY "/tests/tools/help.txt"));
-    std::istringstream lines(helps);
-    for (std::string line; std::getline(lines, line);)
-        // A path cannot be broken.
-        EXPECT_TRUE(line.size() <= 80 || line.find(' ', 11) == std::string::npos) << line;
+    EXPECT_GT(count, 20U);
 }
 
 TEST_F(VibratorctlTest, OtherShellsCompleteAsBashDoes) {

@@ -13,16 +13,16 @@
 #include <vector>
 
 /** The real daemon, in a process of its own, on a simulated driver. */
-class ServiceTest : public ::testing::Test {
+class DaemonTest : public ::testing::Test {
   protected:
-    ServiceTest() {
+    DaemonTest() {
         setenv("HWBINDER_DIR", (mDirectory.path() + "/sockets").c_str(), 1);
         setenv("VIBRATOR_SIM_DIR", mDirectory.path().c_str(), 1);
         // A sanitizer's own library does not come first in a process with a preloaded one.
         setenv("ASAN_OPTIONS", "verify_asan_link_order=0", 1);
         simulator::claimDirectory(mDirectory.path());
     }
-    ~ServiceTest() override {
+    ~DaemonTest() override {
         unsetenv("HWBINDER_DIR");
         unsetenv("VIBRATOR_SIM_DIR");
     }
