@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Device.h"
 #include "cli/CommandLine.h"
-#include "cli/Text.h"
+#include "text/Text.h"
 
 #include <iostream>
 
@@ -17,7 +17,6 @@ class VibratorDriver : public cli::Program {
                 "Exit code: 0 done; 1 failed; 2 a mistake in the command line; run: that of its "
                 "command.");
         addList();
-        addCompletion("Help");
     }
 
   private:

@@ -2,7 +2,7 @@
 #include "Session.h"
 
 #include "TraceFile.h"
-#include "cli/Text.h"
+#include "text/Text.h"
 
 #include <fcntl.h>
 #include <sys/prctl.h>

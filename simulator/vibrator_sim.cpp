@@ -5,7 +5,7 @@
 #include "TraceFile.h"
 #include "TraceLine.h"
 #include "cli/CommandLine.h"
-#include "cli/Text.h"
+#include "text/Text.h"
 
 #include <algorithm>
 #include <cstring>
@@ -92,7 +92,6 @@ class Simulator : public cli::Program {
         addShow();
         addTrace();
         addFault();
-        addCompletion("Help");
     }
 
   private:

@@ -55,12 +55,12 @@ std::vector<std::string> valuesOf(const std::vector<Choice>& choices);
 template <typename T>
 using Value = std::shared_ptr<const T>;
 
-/** An argument or an option, as helps and completions show it. */
+/** An argument or an option. */
 struct Argument {
     /** "MS", or "--strength" for an option. */
     std::string name;
-    /** The option as a letter, "-v"; most have none. */
-    std::string letter;
+    /** The option's letter; most have none. */
+    char letter = 0;
     /** What stands for the option's value; empty for a flag. */
     std::string placeholder;
     std::string help;
@@ -70,6 +70,7 @@ struct Argument {
     /** Whether it takes any number of words, and whether options among them. */
     bool isMany = false;
     bool takesOptions = false;
+    bool isGiven = false;
     /** Goes back to the initial value. */
     std::function<void()> reset;
     /** Reads a word. @param isStrict whether nobody else judges it. @throw UsageError */
@@ -77,6 +78,11 @@ struct Argument {
 
     bool isOption() const { return name[0] == '-'; }
     bool isFlag() const { return isOption() && placeholder.empty(); }
+    /** @return the name as a help shows it: "-o, --output FILE". */
+    std::string title() const {
+        return (letter == 0 ? "" : std::string{'-', letter, ',', ' '}) + name +
+               (placeholder.empty() ? "" : " " + placeholder);
+    }
 };
 
 /**
@@ -95,12 +101,20 @@ class Command {
                             std::optional<std::string> initial = {});
     /** Like text, for the name of a file. */
     Value<std::string> file(const std::string& name, const std::string& help,
-                            std::optional<std::string> initial = {});
+                            std::optional<std::string> initial = {}) {
+        auto value = text(name, help, std::move(initial));
+        mArguments.back().isFile = true;
+        return value;
+    }
     /** Any number of words. @param check throws a UsageError for a wrong one. */
     Value<std::vector<std::string>> words(const std::string& name, const std::string& help,
                                           std::function<void(const std::string&)> check = {});
     /** All that stands behind the options, options of another command included. */
-    Value<std::vector<std::string>> rest(const std::string& name, const std::string& help);
+    Value<std::vector<std::string>> rest(const std::string& name, const std::string& help) {
+        auto value = words(name, help);
+        mArguments.back().takesOptions = true;
+        return value;
+    }
     Value<bool> flag(const std::string& name, const std::string& help);
 
     /** Says more in the command's help. */
@@ -114,26 +128,22 @@ class Command {
     const std::string& name() const { return mName; }
 
     /**
-     * Reads a step of a script: the values in the order in which they were added, options as well
-     * and without their names; a flag as its name without the dashes. There are no files in it.
+     * Reads a step of a script. Options may also be given without their names, in the order in
+     * which they were added, and flags without their dashes. There are no files in it.
      *
      * @throw UsageError with the index of the word
      */
-    void readStep(const std::vector<std::string>& words) const;
+    void readStep(const std::vector<std::string>& words);
     /** Does what the command does, with what was read last. */
     int perform() const { return mAction(); }
 
   private:
     friend class Program;
+    friend class Line;
 
-    /** Words, and what each was given for; of flags nothing but that they were given. */
-    using Given = std::vector<std::pair<const Argument*, std::string>>;
-
-    /** Reads what was given. @throw UsageError with the index of the word */
-    void read(const Given& given, bool isStep) const;
     template <typename T, typename Read>
     Value<T> add(const std::string& name, const std::string& help, const std::optional<T>& initial,
-                 Read read);
+                 const Read& read);
 
     std::string mName;
     std::string mGroup;
@@ -145,6 +155,8 @@ class Command {
     std::function<int()> mAction;
 };
 
+class Line;
+
 /** A program of many commands: reads its command line, helps, and completes for shells. */
 class Program {
   public:
@@ -154,7 +166,7 @@ class Program {
     virtual ~Program() = default;
 
     /** What stands before all commands: the options that they share, and the help's notes. */
-    Command& shared() { return mRoot; }
+    Command& shared() { return mShared; }
     /**
      * Adds a command.
      *
@@ -163,9 +175,6 @@ class Program {
      */
     Command& command(const std::string& group, const std::string& name, const std::string& help,
                      const std::string& example);
-    /** Adds the command that prints the scripts of shells. */
-    void addCompletion(const std::string& group);
-
     /** Runs the command that a command line asks for. @return the program's exit code. */
     int run(int argc, char** argv);
     /** Says something on standard error, unless answers are JSON. */
@@ -182,49 +191,26 @@ class Program {
     virtual void complain(const std::string& status, const std::string& reason) const;
 
   private:
-    /** What a command line says, as far as it makes sense. */
-    struct Line {
-        const Command* command = nullptr;
-        /** The words of the command, as far as they go. */
-        std::string typed;
-        Command::Given given;
-        /** What takes the next word, whatever it is: an option without its value yet, or a rest. */
-        const Argument* taking = nullptr;
-        bool hasOptionsEnded = false;
-        /** The first thing that makes no sense. */
-        std::string problem;
+    friend class Line;
 
-        void complain(const std::string& what);
-    };
-
+    void addHelp();
     /** Does what a command line asks for. */
     int obey(const std::vector<std::string>& words);
-    /** Reads a command line, and those flags that are in it. */
-    Line parse(const std::vector<std::string>& words) const;
-    static void takeOption(const Argument& option, const std::string& value, Line* line);
-    void takeWord(const std::string& word, Line* line) const;
-    /** @return the options that a command may have, its own first: effect has a --version, too. */
-    std::vector<const Argument*> optionsOf(const Command* command) const;
-    /** @return the argument that the next word is for, if it is no option; nullptr for none. */
-    static const Argument* nextArgument(const Line& line);
+    Command* find(const std::string& name);
     /** @return the words that may follow those of a command, with what they mean. */
     std::vector<Choice> commandsAfter(const std::string& typed) const;
-    const Command* find(const std::string& name) const;
-
     /** Prints the help of the commands with a name, or of the program. */
-    void help(const std::string& name) const;
+    void help(const std::string& name);
     void helpProgram() const;
     void helpCommand(const Command& command) const;
-    /** Prints what the last of some words may become: each a word, a tabulator and its meaning. */
-    void complete(const std::vector<std::string>& words) const;
-    /** @return what may stand behind a line in the place of a word; ":files" for a file's name. */
-    std::vector<Choice> answersFor(const Line& line, const std::string& word) const;
 
     std::string mName;
     std::string mVersion;
-    Command mRoot;
+    Command mShared;
     Value<bool> mWantsHelp;
     Value<bool> mWantsVersion;
+    /** The words behind "help". */
+    Value<std::vector<std::string>> mTopic;
     std::deque<Command> mCommands;
     const Command* mCurrent = nullptr;
 };

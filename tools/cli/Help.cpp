@@ -1,22 +1,38 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "CommandLine.h"
-#include "Text.h"
+#include "CompletionScripts.h"
+#include "text/Text.h"
 
 #include <algorithm>
 #include <cctype>
 #include <iostream>
+#include <regex>
 
 namespace cli {
 namespace {
 
-/** A line of a list: a name, and beside or below it what it means. */
-void printEntry(const std::string& name, const std::string& meaning) {
+/** Prints names, and beside or below each what it means. */
+void printList(const std::string& heading, const std::vector<Choice>& list) {
     constexpr size_t kColumn = 26;
-    const std::string start = "  " + name;
-    const bool fits = start.size() + 2 <= kColumn;
-    std::cout << start << (fits ? "" : "\n")
-              << std::string(fits ? kColumn - start.size() : kColumn, ' ')
-              << wrap(meaning, kColumn);
+    if (!list.empty()) std::cout << '\n' << heading << ":\n";
+    for (const Choice& each : list) {
+        std::string start = "  " + each.value;
+        if (start.size() + 2 > kColumn) {
+            std::cout << start << '\n';
+            start.clear();
+        }
+        start.resize(kColumn, ' ');
+        std::cout << start << wrap(each.meaning, kColumn);
+    }
+}
+
+/** Prints either the options or the other arguments. */
+void printList(const std::string& heading, const std::deque<Argument>& arguments, bool isOptions) {
+    std::vector<Choice> list;
+    for (const Argument& each : arguments) {
+        if (each.isOption() == isOptions) list.push_back({each.title(), each.help});
+    }
+    printList(heading, list);
 }
 
 /** @return the arguments as they stand in a call, without the options: " PATTERN [FILE...]". */
@@ -25,37 +41,34 @@ std::string inCall(const std::deque<Argument>& arguments) {
     for (const Argument& each : arguments) {
         if (each.isOption()) continue;
         const std::string name = each.name + (each.isMany ? "..." : "");
-        words += " " + (each.isRequired ? name : "[" + name + "]");
+        words += each.isRequired ? " " + name : " [" + name + "]";
     }
     return words;
 }
 
-/** Prints either the options or the other arguments. */
-void printList(const std::string& heading, const std::deque<Argument>& arguments, bool options) {
-    bool any = false;
-    for (const Argument& each : arguments) {
-        if (each.isOption() != options) continue;
-        if (!any) std::cout << '\n' << heading << ":\n";
-        any = true;
-        printEntry((each.letter.empty() ? "" : each.letter + ", ") + each.name +
-                           (each.placeholder.empty() ? "" : " " + each.placeholder),
-                   each.help);
-    }
-}
-
-void printNotes(const std::vector<std::string>& notes) {
-    for (const std::string& note : notes)
-        std::cout << '\n' << wrap(note, 0);
-}
-
-std::string sentence(std::string text) {
-    text[0] = static_cast<char>(std::toupper(static_cast<unsigned char>(text[0])));
-    return text + ".";
-}
-
 }  // namespace
 
-void Program::help(const std::string& name) const {
+void Program::addHelp() {
+    Command& first = command("Help", "help", "print the help of a command", mCommands[0].mName);
+    mTopic = first.words("COMMAND", "a command, in one or two words");
+    first.withoutJson().run([this] {
+        help(join(*mTopic, " ", " "));
+        return kSuccess;
+    });
+    Command& second =
+            command("Help", "completion", "print the completion script of a shell", "bash");
+    const auto shell =
+            second.choice("SHELL", {{"bash", ""}, {"zsh", ""}, {"fish", ""}}, "the shell");
+    second.note("To load it: \"source <(" + mName +
+                " completion bash)\", the same for zsh, and \"" + mName +
+                " completion fish | source\".");
+    second.withoutJson().run([this, shell] {
+        std::cout << std::regex_replace(kScripts[*shell], std::regex("NAME"), mName);
+        return kSuccess;
+    });
+}
+
+void Program::help(const std::string& name) {
     if (name.empty()) return helpProgram();
     if (const Command* command = find(name)) return helpCommand(*command);
     const std::vector<Choice> commands = commandsAfter(name);
@@ -69,35 +82,34 @@ void Program::help(const std::string& name) const {
 
 void Program::helpProgram() const {
     std::cout << "Usage: " << mName << " [OPTION...] COMMAND [ARGUMENT...]\n"
-              << wrap(mRoot.mHelp, 0);
-    std::vector<std::string> groups;
+              << wrap(mShared.mHelp, 0);
+    std::vector<std::pair<std::string, std::vector<Choice>>> groups;
     for (const Command& each : mCommands) {
-        if (std::find(groups.begin(), groups.end(), each.mGroup) == groups.end()) {
-            groups.push_back(each.mGroup);
-        }
+        const auto isItsGroup = [&](const auto& group) { return group.first == each.mGroup; };
+        auto group = std::find_if(groups.begin(), groups.end(), isItsGroup);
+        if (group == groups.end()) group = groups.insert(group, {each.mGroup, {}});
+        group->second.push_back({each.mName + inCall(each.mArguments), each.mHelp});
     }
-    // The help command is the first one, and stands last.
-    std::rotate(groups.begin(), groups.begin() + 1, groups.end());
-    for (const std::string& group : groups) {
-        std::cout << '\n' << group << ":\n";
-        for (const Command& each : mCommands) {
-            if (each.mGroup == group) printEntry(each.mName + inCall(each.mArguments), each.mHelp);
-        }
-    }
-    printList("Options of every command", mRoot.mArguments, true);
-    printNotes(mRoot.mNotes);
+    for (const auto& [name, commands] : groups)
+        printList(name, commands);
+    printList("Options of every command", mShared.mArguments, true);
+    for (const std::string& note : mShared.mNotes)
+        std::cout << '\n' << wrap(note, 0);
 }
 
 void Program::helpCommand(const Command& command) const {
     const auto& arguments = command.mArguments;
     const bool hasOptions = std::any_of(arguments.begin(), arguments.end(),
                                         [](const Argument& each) { return each.isOption(); });
+    std::string sentence = command.mHelp + ".";
+    sentence[0] = static_cast<char>(toupper(sentence[0]));
     std::cout << "Usage: " << mName << ' ' << command.mName << inCall(arguments)
               << (hasOptions ? " [OPTION...]" : "") << '\n'
-              << wrap(sentence(command.mHelp), 0);
+              << wrap(sentence, 0);
     printList("Arguments", arguments, false);
     printList("Options", arguments, true);
-    printNotes(command.mNotes);
+    for (const std::string& note : command.mNotes)
+        std::cout << '\n' << wrap(note, 0);
     std::cout << "\nExample: " << mName << ' ' << command.mName
               << (command.mExample.empty() ? "" : " ") << command.mExample << '\n';
 }

@@ -8,7 +8,6 @@ void addCommands(Client& client) {
                            addWatch, addPlot}) {
         add(client);
     }
-    client.addCompletion(kTools);
 }
 
 void addCall(Client& client, cli::Command& command, const OneArgument& argument,

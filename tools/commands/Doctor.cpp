@@ -3,7 +3,7 @@
 #include "NodePathTable.h"
 #include "Queries.h"
 #include "TraceLine.h"
-#include "cli/Text.h"
+#include "text/Text.h"
 #include "service/LocalDriver.h"
 
 #include <unistd.h>

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
-#include "cli/Text.h"
+#include "text/Text.h"
 
 #include <chrono>
 #include <csignal>

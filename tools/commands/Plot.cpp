@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
 #include "Traffic.h"
-#include "cli/Text.h"
+#include "text/Text.h"
 #include "traffic/Picture.h"
 #include "traffic/TextPlot.h"
 

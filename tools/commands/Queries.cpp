@@ -2,7 +2,7 @@
 #include "Queries.h"
 
 #include "Commands.h"
-#include "cli/Text.h"
+#include "text/Text.h"
 #include "service/LocalDriver.h"
 
 #include <chrono>

@@ -2,7 +2,7 @@
 #include "Commands.h"
 #include "TraceLine.h"
 #include "Traffic.h"
-#include "cli/Text.h"
+#include "text/Text.h"
 #include "traffic/NodeAccess.h"
 
 #include <fcntl.h>

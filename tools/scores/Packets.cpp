@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "scores/Packets.h"
 
-#include "cli/Text.h"
+#include "text/Text.h"
 
 #include <algorithm>
 #include <charconv>

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "scores/Score.h"
 
-#include "cli/Text.h"
+#include "text/Text.h"
 
 #include <algorithm>
 #include <nlohmann/json.hpp>

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "service/Client.h"
 
-#include "cli/Text.h"
+#include "text/Text.h"
 
 #include <cerrno>
 #include <cstring>

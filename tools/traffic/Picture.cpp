@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "traffic/Picture.h"
 #include "PlotScript.h"
-#include "cli/Text.h"
+#include "text/Text.h"
 
 #include <sys/mman.h>
 #include <sys/wait.h>

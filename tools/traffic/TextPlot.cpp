@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "traffic/TextPlot.h"
-#include "cli/Text.h"
+#include "text/Text.h"
 
 #include <algorithm>
 #include <cmath>

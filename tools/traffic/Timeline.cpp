@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "traffic/Timeline.h"
 
-#include "cli/Text.h"
+#include "text/Text.h"
 
 #include <algorithm>
 #include <cmath>

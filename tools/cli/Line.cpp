@@ -1,0 +1,236 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "CommandLine.h"
+#include "text/Text.h"
+
+#include <getopt.h>
+
+#include <algorithm>
+#include <cctype>
+#include <iostream>
+
+namespace cli {
+
+/** Reads the words of a command line, or of a step of a script, and sets the arguments. */
+class Line {
+  public:
+    explicit Line(Program& program) : mProgram(&program) { begin(nullptr); }
+    explicit Line(Command& step) {
+        for (Argument& each : step.mArguments) {
+            each.reset();
+            each.isGiven = false;
+        }
+        begin(&step);
+    }
+
+    Command* command() const { return mCommand; }
+    /** @return the words of the command, as far as they go. */
+    const std::string& typed() const { return mTyped; }
+
+    /** Reads words, as far as they make sense. */
+    void read(const std::vector<std::string>& words) {
+        // getopt_long() changes no word, and their order only if it is told to.
+        std::vector<char*> argv = {nullptr};
+        for (const std::string& word : words)
+            argv.push_back(const_cast<char*>(word.c_str()));
+        const auto count = static_cast<int>(argv.size());
+        argv.push_back(nullptr);
+        opterr = 0;
+        optind = 0;
+        int code = 0;
+        while (mTaking == nullptr && code != -1) {
+            code = getopt_long(count, argv.data(), mLetters.c_str(), mTable.data(), nullptr);
+            mIndex = static_cast<size_t>(optind) - 2;
+            if (code != -1) take(code, optarg == nullptr ? "" : optarg, words[mIndex]);
+        }
+        mHaveOptionsEnded = code == -1 && optind > 1 && words[mIndex] == "--";
+        for (mIndex = static_cast<size_t>(optind) - 1; mIndex < words.size(); ++mIndex)
+            takeWord(words[mIndex]);
+    }
+
+    /** Checks that there is no mistake, and that nothing is missing. @throw UsageError */
+    void finish() {
+        if (mTaking != nullptr && mTaking->isOption()) {
+            complain(mTaking->name + ": the value is missing");
+        } else if (mCommand == nullptr) {
+            const std::string known = join(valuesOf(mProgram->commandsAfter(mTyped)), ", ", " or ");
+            complain(mTyped.empty()
+                             ? "no command; " + inQuotes(mProgram->mName + " help") + " lists them"
+                             : mTyped + ": no command; " + known);
+        } else {
+            for (const Argument& each : mCommand->mArguments) {
+                if (each.isGiven || !(each.isRequired || (isStep() && each.isMany))) continue;
+                complain(each.name + " is missing: " + each.help);
+            }
+        }
+        if (mProblem) throw UsageError(*mProblem);
+    }
+
+    /** @return what a further word may be; ":files" for the name of a file. */
+    std::vector<Choice> answers(const std::string& word) const {
+        if (mProblem) return {};
+        if (mTaking == nullptr && !mHaveOptionsEnded && word[0] == '-') {
+            std::vector<Choice> options;
+            for (const Argument* each : mOptions)
+                options.push_back({each->name, each->help});
+            return options;
+        }
+        if (mTaking == nullptr && mCommand == nullptr) return mProgram->commandsAfter(mTyped);
+        if (mTyped == "help") return mProgram->commandsAfter(join(*mProgram->mTopic, " ", " "));
+        const Argument* next = mTaking != nullptr ? mTaking : argumentFor(word);
+        if (next == nullptr) return {};
+        return next->isFile ? std::vector<Choice>{{":files", ""}} : next->choices;
+    }
+
+  private:
+    bool isStep() const { return mProgram == nullptr; }
+
+    /** Goes on with the options of a command; of nullptr, with those that stand before it. */
+    void begin(Command* command) {
+        mCommand = command;
+        mOptions.clear();
+        mTable.clear();
+        // Words come in their order; and -5 is one, too.
+        mLetters = "-:0::1::2::3::4::5::6::7::8::9::";
+        if (mCommand != nullptr) addOptionsOf(*mCommand);
+        if (!isStep()) addOptionsOf(mProgram->mShared);
+        mTable.push_back({});
+    }
+
+    void addOptionsOf(Command& command) {
+        constexpr int kBehindLetters = 256;
+        for (Argument& each : command.mArguments) {
+            if (!each.isOption() || (isStep() && each.isFile)) continue;
+            const int number = kBehindLetters + static_cast<int>(mOptions.size());
+            const int takes = each.isFlag() ? no_argument : required_argument;
+            mTable.push_back({each.name.c_str() + 2, takes, nullptr,
+                              each.letter != 0 ? each.letter : number});
+            mOptions.push_back(&each);
+            if (each.letter != 0) mLetters += each.letter + std::string(each.isFlag() ? "" : ":");
+        }
+    }
+
+    /** @return the option for which getopt_long() has a code, or nullptr. */
+    Argument* optionOf(int code) const {
+        for (size_t i = 0; i < mOptions.size(); ++i) {
+            if (mTable[i].val == code) return mOptions[i];
+        }
+        return nullptr;
+    }
+
+    /** Takes what getopt_long() has found. */
+    void take(int code, const std::string& value, const std::string& word) {
+        if (code == 1) {
+            takeWord(value);
+        } else if (isdigit(code) != 0) {
+            takeWord(std::string{'-', static_cast<char>(code)} + value);
+        } else if (code == ':') {
+            mTaking = optionOf(optopt);
+        } else if (code != '?') {
+            give(*optionOf(code), value);
+        } else if (const Argument* flag = optionOf(optopt)) {
+            complain(flag->name + ": takes no value");
+        } else {
+            std::vector<std::string> known;
+            for (const Argument* each : mOptions)
+                known.push_back(each->name);
+            const std::string name = optopt == 0 ? word.substr(0, word.find('='))
+                                                 : std::string{'-', static_cast<char>(optopt)};
+            complain("no option " + inQuotes(name) + suggestion(name, known));
+        }
+    }
+
+    void takeWord(const std::string& word) {
+        if (mProblem) return;
+        if (mCommand == nullptr) return takeName(word);
+        Argument* argument = argumentFor(word);
+        if (argument == nullptr) return complain(inQuotes(word) + " is one argument too many");
+        if (argument->takesOptions) mTaking = argument;
+        give(*argument, word);
+    }
+
+    void takeName(const std::string& word) {
+        const std::string name = mTyped + (mTyped.empty() ? "" : " ") + word;
+        const std::vector<std::string> known = valuesOf(mProgram->commandsAfter(mTyped));
+        if (std::find(known.begin(), known.end(), word) == known.end()) {
+            return complain("no command " + inQuotes(name) + suggestion(word, known));
+        }
+        mTyped = name;
+        if (Command* found = mProgram->find(name)) begin(found);
+    }
+
+    /** @return the argument that a word is for which is no option; nullptr for none. */
+    Argument* argumentFor(const std::string& word) const {
+        Argument* found = nullptr;
+        for (Argument& each : mCommand->mArguments) {
+            if (isStep() && each.isFlag() && each.name == "--" + word) return &each;
+            const bool isNamed = isStep() ? each.isFlag() || each.isFile : each.isOption();
+            if (found == nullptr && !isNamed && (each.isMany || !each.isGiven)) found = &each;
+        }
+        return found;
+    }
+
+    void give(Argument& argument, const std::string& word) {
+        argument.isGiven = true;
+        try {
+            argument.read(word, isStep());
+        } catch (const UsageError& error) {
+            const bool isNamed = argument.isOption() && !isStep();
+            complain((isNamed ? argument.name + ": " : "") + error.what());
+        }
+    }
+
+    /** Keeps the first mistake. */
+    void complain(const std::string& what) {
+        if (!mProblem) mProblem.emplace(what, mIndex);
+    }
+
+    Program* mProgram = nullptr;
+    Command* mCommand = nullptr;
+    std::string mTyped;
+    /** What takes the next word, whatever it is: an option without its value yet, or a rest. */
+    Argument* mTaking = nullptr;
+    bool mHaveOptionsEnded = false;
+    std::optional<UsageError> mProblem;
+    /** The index of the word that is read. */
+    size_t mIndex = 0;
+    /** The options that may follow, those of the command first; and as getopt_long() wants them. */
+    std::vector<Argument*> mOptions;
+    std::vector<option> mTable;
+    std::string mLetters;
+};
+
+void Command::readStep(const std::vector<std::string>& words) {
+    Line line(*this);
+    line.read(words);
+    line.finish();
+}
+
+int Program::obey(const std::vector<std::string>& words) {
+    Line line(*this);
+    if (words.size() > 1 && words[0] == "--complete") {
+        const std::string& word = words.back();
+        line.read({words.begin() + 1, words.end() - 1});
+        for (const Choice& each : line.answers(word)) {
+            if (each.value[0] == ':') {
+                std::cout << each.value << '\n';
+            } else if (each.value.compare(0, word.size(), word) == 0) {
+                std::cout << each.value << '\t' << each.meaning << '\n';
+            }
+        }
+        return kSuccess;
+    }
+    line.read(words);
+    mCurrent = line.command();
+    if (*mWantsHelp) {
+        help(line.typed());
+    } else if (*mWantsVersion) {
+        std::cout << mName << ' ' << mVersion << '\n';
+    } else {
+        line.finish();
+        if (!isJson() || mCurrent->mHasJson) return perform(*mCurrent);
+        throw UsageError("has no JSON answer; leave out --json");
+    }
+    return kSuccess;
+}
+
+}  // namespace cli
