@@ -1,23 +1,97 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "SimulatedDriver.h"
+#include <sys/types.h>
 
-namespace simulator {
+#include <csignal>
+#include <cstdio>
+#include <functional>
+#include <string>
+#include <vector>
 
-/** Makes a driver in a directory. @throw std::runtime_error that says why it cannot. */
-void makeDriver(const std::string& directory, Layout layout, const Features& features);
+/** What runs the service on a driver that is there only for a while. */
+namespace session {
 
 /**
- * Makes a driver, starts the daemon on it, and runs a command that uses both. When the command or
- * this process ends, in whatever way, the daemon is ended and temporary files are removed.
- *
- * @param directory the driver's; empty for a temporary one.
- * @param command empty for a shell.
- * @return the command's exit code; 128 plus the signal's number if a signal ended it.
- * @throw std::runtime_error that says what kept the daemon from running on the driver.
+ * @param places where to look, relative to this program's directory.
+ * @return a file that belongs to this program, beside it or where it is built or installed.
+ * @throw std::runtime_error
  */
-int runSession(const std::string& directory, Layout layout, const Features& features,
-               std::vector<std::string> command);
+std::string findProgram(const std::string& name, const std::vector<const char*>& places);
 
-}  // namespace simulator
+/** A program that this one starts; the destructor kills it. */
+class Child {
+  public:
+    /** @param prepare called in the child before it runs the program. */
+    Child(const std::vector<std::string>& command, const std::function<void()>& prepare);
+    Child(const Child&) = delete;
+    Child& operator=(const Child&) = delete;
+    ~Child();
+
+    void signal(int number) const;
+    /** @return whether the program has ended. */
+    bool hasEnded();
+    /** Waits for the program's end. @return its exit code, as a shell gives it. */
+    int wait();
+
+  private:
+    pid_t mPid;
+    int mStatus = 0;
+};
+
+/** A directory in /tmp; a second process removes it when this one ends, even if it is killed. */
+class PrivateDirectory {
+  public:
+    PrivateDirectory();
+    PrivateDirectory(const PrivateDirectory&) = delete;
+    PrivateDirectory& operator=(const PrivateDirectory&) = delete;
+    ~PrivateDirectory();
+
+    std::string operator/(const std::string& name) const { return mPath + "/" + name; }
+
+  private:
+    std::string mPath = "/tmp/vibrator-sim.XXXXXX";
+    std::FILE* mRemover;
+};
+
+/** The service on a driver, and a command that uses both. */
+class Session {
+  public:
+    /** Finds the programs. From now on signals wait until run takes them. */
+    Session();
+
+    /** @return a path in a directory that is removed when this process ends, in whatever way. */
+    std::string operator/(const std::string& name) const { return mPlace / name; }
+
+    /** What the service is to run on. */
+    struct Driver {
+        /** Its directory, with its trace and the service's log; VIBRATOR_SIM_DIR has it. */
+        std::string directory;
+        /** Called in the service's process before it begins. */
+        std::function<void()> prepare = [] {};
+        /** Called when the service has ended before the command. */
+        std::function<void()> whenEnded = [] {};
+    };
+    /**
+     * Starts the service, and runs a command when it answers. When the command or this process
+     * ends, in whatever way, the service is ended.
+     *
+     * @param command empty for a shell.
+     * @return the command's exit code; 128 plus the signal's number if a signal ended it.
+     * @throw std::runtime_error that says what kept the service from running on the driver.
+     */
+    int run(const Driver& driver, std::vector<std::string> command);
+
+  private:
+    int takeSignal(siginfo_t* info) const;
+    void awaitDaemon(Child& daemon, const std::string& directory) const;
+    int awaitCommand(Child& command, Child& daemon, const Driver& driver) const;
+
+    std::string mDaemon;
+    std::string mClient;
+    // Before the directory: the process that removes it must not get the signals either.
+    sigset_t mSignals;
+    PrivateDirectory mPlace;
+};
+
+}  // namespace session

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Faults.h"
 #include "MotorType.h"
-#include "Session.h"
+#include "Run.h"
 #include "TraceFile.h"
 #include "TraceLine.h"
 #include "cli/CommandLine.h"
