@@ -2,11 +2,10 @@
 #pragma once
 
 #include <utils/Errors.h>
+#include <utils/FunctionRef.h>
 #include <utils/RefBase.h>
 
-#include <cstddef>
 #include <cstdint>
-#include <type_traits>
 
 namespace android::hardware {
 
@@ -17,28 +16,8 @@ class Parcel;
 /** An object that can be called, of this process or of another one. */
 class IBinder : public virtual RefBase {
   public:
-    /**
-     * Gets the reply while the results that it refers to still exist. Refers to a function, which
-     * must live as long as the call; that is cheaper to pass on than a copy.
-     */
-    class TransactCallback {
-      public:
-        TransactCallback(std::nullptr_t = nullptr) {}  // NOLINT: implicit as published
-        template <typename Function,
-                  typename = std::enable_if_t<!std::is_same_v<Function, TransactCallback>>>
-        TransactCallback(const Function& function)  // NOLINT: implicit as published
-            : mFunction(&function), mCall([](const void* each, Parcel& reply) {
-                  (*static_cast<const Function*>(each))(reply);
-              }) {}
-
-        void operator()(Parcel& reply) const {
-            if (mFunction != nullptr) mCall(mFunction, reply);
-        }
-
-      private:
-        const void* mFunction = nullptr;
-        void (*mCall)(const void* function, Parcel& reply) = nullptr;
-    };
+    /** Gets the reply while the results that it refers to still exist. */
+    using TransactCallback = FunctionRef<void(Parcel& reply)>;
 
     /** Flag of a call that has no reply and is not waited for. */
     static constexpr uint32_t FLAG_ONEWAY = 0x01;
