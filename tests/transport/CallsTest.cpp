@@ -95,8 +95,6 @@ TEST_F(CallsTest, BaseOperationsAnswerForTheObject) {
                         .isOk());
     EXPECT_EQ(pid, mServer.pid());
     EXPECT_TRUE(mClient->ping().isOk());
-    EXPECT_TRUE(mClient->setHALInstrumentation().isOk());
-    EXPECT_TRUE(mClient->notifySyspropsChanged().isOk());
     EXPECT_TRUE(mClient->debug(nullptr, {"one", "", "three"}).isOk());
     EXPECT_EQ(mClient->perform_1_1({}, {}, nullptr).description(),
               "Null synchronous callback passed.");

@@ -73,8 +73,6 @@ inline status_t writeToParcel(const Status& status, Parcel* parcel) {
     return parcel->writeInt32(Status::EX_NONE);
 }
 inline status_t readFromParcel(Status* status, const Parcel& parcel) {
-    // The stub of setHALInstrumentation sends a reply with nothing in it.
-    if (parcel.dataSize() == 0) return OK;
     int32_t code = Status::EX_NONE;
     const status_t read = parcel.readInt32(&code);
     if (read != OK || code == Status::EX_NONE) return read;
