@@ -22,6 +22,24 @@ bool setAddress(const uint8_t* parentObject, const binder_buffer_object& object)
     return true;
 }
 
+/**
+ * @return whether an embedded object comes where the kernel lets it, too: next after its parent and
+ *     what that holds so far, at a place behind theirs. So nothing is added to a buffer later, and
+ * no address is written over.
+ */
+bool isInOrder(const uint8_t* data, const binder_size_t* offsets, size_t index,
+               const binder_buffer_object& object) {
+    size_t least = 0;
+    for (size_t last = index - 1; last != object.parent;) {
+        binder_buffer_object before;
+        memcpy(&before, data + offsets[last], sizeof(before));
+        if ((before.flags & BINDER_BUFFER_FLAG_HAS_PARENT) == 0) return false;
+        least = before.parent_offset + sizeof(before.buffer);
+        last = before.parent;
+    }
+    return object.parent_offset >= least;
+}
+
 }  // namespace
 
 bool Packet::clearAddress(size_t parentObject, const binder_buffer_object& object) {
@@ -91,7 +109,8 @@ bool Packet::relocate(const Header& header) {
         if (buffersAt > size) return false;
         memcpy(data + offset, &object, sizeof(object));
         if ((object.flags & BINDER_BUFFER_FLAG_HAS_PARENT) == 0) continue;
-        if (object.parent >= i || !setAddress(data + offsets[object.parent], object)) {
+        if (object.parent >= i || !isInOrder(data, offsets, i, object) ||
+            !setAddress(data + offsets[object.parent], object)) {
             return false;
         }
     }

@@ -4,47 +4,10 @@
 #include <hwbinder/Parcel.h>
 #include <hwbinder/ProcessState.h>
 
-#include <algorithm>
-#include <cstdlib>
 #include <cstring>
 #include <string>
 
 namespace android::hardware {
-namespace {
-
-/** Doubles an array that lies in the parcel, or on the heap. @return nullptr without memory. */
-template <typename T>
-T* moveToHeap(T* array, const T* inlined, size_t count, size_t capacity) {
-    if (array != inlined) return static_cast<T*>(realloc(array, capacity * sizeof(T)));
-    auto* moved = static_cast<T*>(malloc(capacity * sizeof(T)));
-    if (moved != nullptr) memcpy(moved, array, count * sizeof(T));
-    return moved;
-}
-
-}  // namespace
-
-void Parcel::releaseMore() {
-    if (mRelease != nullptr) {
-        mRelease(mData, mOwner);
-        return;
-    }
-    if (mData != mInlineData) free(mData);
-    if (mOffsets != mInlineOffsets) free(mOffsets);
-    delete mBinders;
-}
-
-bool Parcel::reserve(size_t size) {
-    // What was received is not written to.
-    if (mCapacity == 0 || size < mSize) return false;
-    const size_t capacity = std::max(size, 2 * mCapacity);
-    uint8_t* larger = moveToHeap(mData, mInlineData, mSize, capacity);
-    if (larger == nullptr) return false;
-    mData = larger;
-    mHasMore = true;
-    mCapacity = capacity;
-    return true;
-}
-
 status_t Parcel::writeInterfaceToken(const char* interface) {
     return write(interface, strlen(interface) + 1);
 }
@@ -61,24 +24,19 @@ status_t Parcel::writeString16(const char* text, size_t length) {
     return OK;
 }
 
-bool Parcel::addOffset(size_t offset) {
-    if (mOffsetCount == mOffsetCapacity) {
-        const size_t capacity = 2 * mOffsetCapacity;
-        binder_size_t* larger = moveToHeap(mOffsets, mInlineOffsets, mOffsetCount, capacity);
-        if (larger == nullptr) return false;
-        mOffsets = larger;
-        mHasMore = true;
-        mOffsetCapacity = capacity;
-    }
-    mOffsets[mOffsetCount++] = offset;
-    return true;
-}
-
 status_t Parcel::writeObject(const void* object, size_t size) {
-    const size_t offset = mSize;
+    const size_t offset = mData.size();
     const status_t status = write(object, size);
     if (status != OK) return status;
-    return addOffset(offset) ? OK : NO_MEMORY;
+    binder_size_t* place = mOffsets.grow(1);
+    if (place == nullptr) return NO_MEMORY;
+    *place = offset;
+    return OK;
+}
+
+status_t Parcel::writePointer(const binder_buffer_object& object, size_t* handle) {
+    if (handle != nullptr) *handle = mOffsets.size();
+    return writeObject(&object, sizeof(object));
 }
 
 status_t Parcel::writeBuffer(const void* buffer, size_t length, size_t* handle) {
@@ -86,8 +44,7 @@ status_t Parcel::writeBuffer(const void* buffer, size_t length, size_t* handle) 
     object.hdr.type = BINDER_TYPE_PTR;
     object.buffer = reinterpret_cast<binder_uintptr_t>(buffer);
     object.length = length;
-    if (handle != nullptr) *handle = mOffsetCount;
-    return writeObject(&object, sizeof(object));
+    return writePointer(object, handle);
 }
 
 status_t Parcel::writeEmbeddedBuffer(const void* buffer, size_t length, size_t* handle,
@@ -99,8 +56,9 @@ status_t Parcel::writeEmbeddedBuffer(const void* buffer, size_t length, size_t* 
     object.length = length;
     object.parent = parentHandle;
     object.parent_offset = parentOffset;
-    if (handle != nullptr) *handle = mOffsetCount;
-    return writeObject(&object, sizeof(object));
+    // Not in the list of offsets, as on a device: the driver would fill in an address.
+    if (buffer == nullptr) return write(&object, sizeof(object));
+    return writePointer(object, handle);
 }
 
 status_t Parcel::writeStrongBinder(const sp<IBinder>& binder) {
@@ -120,9 +78,7 @@ status_t Parcel::writeStrongBinder(const sp<IBinder>& binder) {
         object.binder = reinterpret_cast<binder_uintptr_t>(local->getWeakRefs());
         object.cookie = reinterpret_cast<binder_uintptr_t>(local);
     }
-    if (mBinders == nullptr) mBinders = new std::vector<sp<IBinder>>;
-    mHasMore = true;
-    mBinders->push_back(binder);
+    mBinders.push_back(binder);
     return writeObject(&object, sizeof(object));
 }
 
@@ -162,60 +118,90 @@ status_t Parcel::readString16(std::string* text) const {
 }
 
 status_t Parcel::readObject(uint32_t type, void* object, size_t size, size_t* index) const {
-    if (mPosition > mSize || size > mSize - mPosition) return NOT_ENOUGH_DATA;
-    if (mNextObject >= mOffsetCount || mOffsets[mNextObject] != mPosition) return BAD_TYPE;
+    if (mPosition > dataSize() || size > dataSize() - mPosition) return NOT_ENOUGH_DATA;
+    if (!isObjectNext()) return BAD_TYPE;
     binder_object_header header;
-    memcpy(&header, mData + mPosition, sizeof(header));
+    memcpy(&header, data() + mPosition, sizeof(header));
     if (header.type != type) return BAD_TYPE;
-    memcpy(object, mData + mPosition, size);
+    memcpy(object, data() + mPosition, size);
     mPosition += size;
     *index = mNextObject++;
     return OK;
 }
 
-status_t Parcel::readPointer(size_t length, size_t* handle, binder_buffer_object* object) const {
-    size_t index = 0;
-    const status_t status = readObject(BINDER_TYPE_PTR, object, sizeof(*object), &index);
+bool Parcel::isPointer(size_t index, binder_buffer_object* object) const {
+    if (index >= offsetCount()) return false;
+    const uint8_t* place = data() + mOffsets[index];
+    memcpy(&object->hdr, place, sizeof(object->hdr));
+    if (object->hdr.type != BINDER_TYPE_PTR) return false;
+    memcpy(object, place, sizeof(*object));
+    return true;
+}
+
+bool Parcel::isParent(size_t index) const {
+    // Both drivers let the first child follow its parent at once.
+    binder_buffer_object next;
+    return isPointer(index + 1, &next) && (next.flags & BINDER_BUFFER_FLAG_HAS_PARENT) != 0 &&
+           next.parent == index;
+}
+
+status_t Parcel::readPointer(size_t length, size_t* index, binder_buffer_object* object) const {
+    const status_t status = readObject(BINDER_TYPE_PTR, object, sizeof(*object), index);
     if (status != OK) return status;
-    if (object->length != length) return BAD_VALUE;
-    if (handle != nullptr) *handle = index;
-    return OK;
+    return object->length == length ? OK : BAD_VALUE;
 }
 
 status_t Parcel::readBuffer(size_t length, size_t* handle, const void** buffer) const {
     binder_buffer_object object;
-    const status_t status = readPointer(length, handle, &object);
+    size_t index = 0;
+    const status_t status = readPointer(length, &index, &object);
     if (status != OK) return status;
     if ((object.flags & BINDER_BUFFER_FLAG_HAS_PARENT) != 0) return BAD_VALUE;
+    if (handle != nullptr) *handle = index;
     *buffer = reinterpret_cast<const void*>(object.buffer);
     return OK;
+}
+
+status_t Parcel::readNullPointer(size_t parentHandle, size_t parentOffset) const {
+    const uint8_t* place = read(sizeof(binder_buffer_object));
+    if (place == nullptr) return NOT_ENOUGH_DATA;
+    binder_buffer_object object;
+    memcpy(&object, place, sizeof(object));
+    if (object.hdr.type != BINDER_TYPE_PTR) return BAD_TYPE;
+    // The address in the parent is the sender's, since the driver has not filled it in.
+    binder_buffer_object parent;
+    if (!isPointer(parentHandle, &parent)) return BAD_VALUE;
+    binder_uintptr_t address = 0;
+    memcpy(&address, reinterpret_cast<const uint8_t*>(parent.buffer) + parentOffset,
+           sizeof(address));
+    return object.buffer == 0 && object.length == 0 && address == 0 ? OK : BAD_VALUE;
 }
 
 status_t Parcel::readEmbeddedBuffer(size_t length, size_t* handle, size_t parentHandle,
                                     size_t parentOffset, const void** buffer) const {
+    if (length == 0 && !isObjectNext()) {
+        *buffer = nullptr;
+        return readNullPointer(parentHandle, parentOffset);
+    }
     binder_buffer_object object;
-    const status_t status = readPointer(length, handle, &object);
+    size_t index = 0;
+    const status_t status = readPointer(length, &index, &object);
     if (status != OK) return status;
     if ((object.flags & BINDER_BUFFER_FLAG_HAS_PARENT) == 0 || object.parent != parentHandle ||
-        object.parent_offset != parentOffset || parentHandle >= mOffsetCount) {
+        object.parent_offset != parentOffset) {
         return BAD_VALUE;
     }
-    // Objects that overlap could have made the driver write over the address again.
-    binder_buffer_object parent;
-    memcpy(&parent, mData + mOffsets[parentHandle], sizeof(parent));
-    binder_uintptr_t address = 0;
-    memcpy(&address, reinterpret_cast<const uint8_t*>(parent.buffer) + parentOffset,
-           sizeof(address));
-    if (address != object.buffer) return BAD_VALUE;
     *buffer = reinterpret_cast<const void*>(object.buffer);
+    // Where no address belongs, it would be taken for values of the sender.
+    if (handle == nullptr) return isParent(index) ? BAD_VALUE : OK;
+    *handle = index;
     return OK;
 }
 
 status_t Parcel::readNullableStrongBinder(sp<IBinder>* binder) const {
-    const bool isObject = mNextObject < mOffsetCount && mOffsets[mNextObject] == mPosition;
     flat_binder_object object;
     size_t index = 0;
-    if (!isObject) {
+    if (!isObjectNext()) {
         const uint8_t* place = read(sizeof(object));
         if (place == nullptr) return NOT_ENOUGH_DATA;
         memcpy(&object, place, sizeof(object));
@@ -241,12 +227,9 @@ status_t Parcel::readNullableNativeHandleNoDup(const native_handle_t** handle) c
 
 size_t Parcel::buffersSize() const {
     size_t total = 0;
-    for (size_t i = 0; i < mOffsetCount; ++i) {
+    for (size_t i = 0; i < offsetCount(); ++i) {
         binder_buffer_object object;
-        memcpy(&object.hdr, mData + mOffsets[i], sizeof(object.hdr));
-        if (object.hdr.type != BINDER_TYPE_PTR) continue;
-        memcpy(&object, mData + mOffsets[i], sizeof(object));
-        total += (object.length + 7) & ~size_t{7};
+        if (isPointer(i, &object)) total += (object.length + 7) & ~size_t{7};
     }
     return total;
 }

@@ -13,6 +13,7 @@ namespace {
 
 using ::android::sp;
 using ::android::hardware::getOrCreateCachedBinder;
+using ::android::hardware::hidl_vec;
 using ::android::hardware::IBinder;
 using ::android::hardware::Parcel;
 using ::android::hardware::ProcessState;
@@ -75,6 +76,26 @@ TEST(ParcelTest, ObjectsAreReadAsWhatTheyAre) {
     std::string read;
     EXPECT_EQ(parcel.readString16(&read), android::OK);
     EXPECT_EQ(read, text);
+}
+
+TEST(ParcelTest, ListWithoutElementsIsWrittenAsOnADevice) {
+    // One that has been emptied has an address all the same.
+    for (const size_t listed : {0, 1}) {
+        const hidl_vec<int32_t> list = listed == 0 ? hidl_vec<int32_t>() : hidl_vec<int32_t>(0);
+        Parcel parcel;
+        size_t parent = 0;
+        size_t child = 0;
+        parcel.writeBuffer(&list, sizeof(list), &parent);
+        EXPECT_EQ(writeEmbeddedToParcel(list, &parcel, parent, 0, &child), android::OK);
+        EXPECT_EQ(parcel.dataSize(), 2 * sizeof(binder_buffer_object));
+        EXPECT_EQ(parcel.offsetCount(), 1 + listed);
+        parcel.setDataPosition(0);
+        const void* read = nullptr;
+        EXPECT_EQ(parcel.readBuffer(sizeof(list), &parent, &read), android::OK);
+        EXPECT_EQ(readEmbeddedFromParcel(list, parcel, parent, 0, &child), android::OK);
+        uint32_t more = 0;
+        EXPECT_EQ(parcel.readUint32(&more), android::NOT_ENOUGH_DATA);
+    }
 }
 
 TEST(ParcelTest, WhatWasReceivedIsGivenBackAndNotWrittenTo) {

@@ -117,8 +117,16 @@ const struct {
         {"place beyond the parent", [](auto& m) { m.objects[1].parent_offset = 9; }, kFailed},
         {"place that overflows", [](auto& m) { m.objects[1].parent_offset = UINT64_MAX - 7; },
          kFailed},
-        // As objects that overlap could do it.
-        {"address written over", [](auto& m) { m.add("short", true); }, kBadValue, kFailed},
+        {"address written over", [](auto& m) { m.add("short", true); }, kFailed},
+        // Else an address of the receiver's is taken for what the sender says.
+        {"address in the elements", [](auto& m) { m.add("short", true, m.objects.size() - 1); },
+         kBadValue},
+        {"address in the elements, late",
+         [](auto& m) {
+             m.add("short");
+             m.add("short", true, 1);
+         },
+         kFailed},
         {"odd offset", [](auto& m) { m.offsets[0] += 1; }, kFailed},
         {"offset that overflows", [](auto& m) { m.offsets[0] = UINT64_MAX - 3 - m.head.size(); },
          kFailed},
@@ -222,7 +230,8 @@ TEST_P(HostileRequestTest, WrongTokensAndCodesAreRefused) {
 }
 
 TEST_P(HostileRequestTest, OnewayOfEverythingCostsNobodyAnything) {
-    std::vector<uint32_t> codes = {raw::kPing, raw::kInterfaceChain, raw::kDebug};
+    std::vector<uint32_t> codes = {raw::kPing, raw::kInterfaceChain, raw::kDebug,
+                                   raw::kSetHalInstrumentation, raw::kNotifySyspropsChanged};
     for (uint32_t code = 0; code <= 26; ++code)
         codes.push_back(code);
     for (const uint32_t code : codes) {
@@ -233,6 +242,9 @@ TEST_P(HostileRequestTest, OnewayOfEverythingCostsNobodyAnything) {
     expectService();
     for (int i = 0; i < 300; ++i)
         call(RawMessage::to(GetParam().interface), GetParam().code, TF_ONE_WAY);
+    // On a device these are oneway, and nothing else.
+    for (const uint32_t code : {raw::kSetHalInstrumentation, raw::kNotifySyspropsChanged})
+        EXPECT_EQ(call(RawMessage::to(raw::kBase), code), INT32_MIN) << code;
 }
 
 TEST_P(HostileRequestTest, LargeRefusedRequestsLeaveNothing) {
@@ -288,6 +300,41 @@ TEST_P(HostileRequestTest, BufferIsReadAsNothingElse) {
     add.addString("name");
     add.add("an object");
     EXPECT_EQ(call(add, raw::kManagersAdd), kBadType);
+}
+
+TEST_P(HostileRequestTest, EmptyListsAreReadInBothForms) {
+    const struct {
+        const char* name;
+        uint64_t address;
+        uint32_t count;
+        binder_buffer_object elements;
+        status_t status;
+    } forms[] = {
+            {"a device's", 0, 0, {{BINDER_TYPE_PTR}, 1, 0, 0, 0, 0}, android::OK},
+            {"with an address", 4096, 0, {{BINDER_TYPE_PTR}, 1, 4096, 0, 0, 0}, kBadValue},
+            {"with an address in the list", 4096, 0, {{BINDER_TYPE_PTR}, 1, 0, 0, 0, 0}, kBadValue},
+            {"with an address in the object",
+             0,
+             0,
+             {{BINDER_TYPE_PTR}, 1, 4096, 0, 0, 0},
+             kBadValue},
+            {"with a length", 0, 0, {{BINDER_TYPE_PTR}, 1, 0, 1, 0, 0}, kBadValue},
+            {"with a count", 0, 1, {{BINDER_TYPE_PTR}, 1, 0, 0, 0, 0}, kBadType},
+            {"of another type", 0, 0, {{BINDER_TYPE_FDA}, 1, 0, 0, 0, 0}, kBadType},
+    };
+    RawMessage listed = RawMessage::to(raw::kBase);
+    listed.head += bytesOf(uint64_t{0});
+    listed.addList(0, "");
+    EXPECT_EQ(call(listed, raw::kDebug), android::OK);
+    for (const auto& [name, address, count, elements, status] : forms) {
+        RawMessage debug = RawMessage::to(raw::kBase);
+        debug.head += bytesOf(uint64_t{0});
+        debug.add(bytesOf(address) + bytesOf(uint64_t{count}));
+        debug.tail = bytesOf(elements);
+        EXPECT_EQ(call(debug, raw::kDebug), status) << name;
+        debug.tail.resize(36);
+        EXPECT_NE(call(debug, raw::kDebug), android::OK) << name << ", cut short";
+    }
 }
 
 constexpr char kPeer[] = "vendor.velmora.hardware.peer@1.0::IPeer";

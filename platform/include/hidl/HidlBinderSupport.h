@@ -12,6 +12,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <type_traits>
 
 // Converts the types of interfaces to parcels and back, and objects of interfaces to binders and
 // back.
@@ -55,10 +56,13 @@ status_t readEmbeddedFromParcel(const hidl_string& text, const Parcel& parcel, s
 template <typename T>
 status_t readEmbeddedFromParcel(const hidl_vec<T>& list, const Parcel& parcel, size_t parentHandle,
                                 size_t parentOffset, size_t* handle) {
-    // Cannot overflow: the count has 32 bits, and an element is small.
     const void* buffer = nullptr;
-    return parcel.readEmbeddedBuffer(list.size() * sizeof(T), handle, parentHandle,
-                                     parentOffset + hidl_vec<T>::kOffsetOfBuffer, &buffer);
+    // Only elements that own something, strings and lists, have addresses in them.
+    constexpr bool hasAddresses = !std::is_trivially_copyable_v<T>;
+    // Cannot overflow: the count has 32 bits, and an element is small.
+    return parcel.readEmbeddedBuffer(list.size() * sizeof(T), hasAddresses ? handle : nullptr,
+                                     parentHandle, parentOffset + hidl_vec<T>::kOffsetOfBuffer,
+                                     &buffer);
 }
 
 namespace details {

@@ -3,6 +3,7 @@
 
 #include <cutils/native_handle.h>
 #include <hwbinder/Binder.h>
+#include <hwbinder/InlineArray.h>
 #include <linux/android/binder.h>
 #include <utils/Errors.h>
 
@@ -10,7 +11,6 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
-#include <iterator>
 #include <string>
 #include <vector>
 
@@ -31,9 +31,7 @@ class Parcel {
     using ReleaseBuffer = void (*)(const uint8_t* data, void* owner);
 
     Parcel() = default;
-    ~Parcel() {
-        if (mHasMore) releaseMore();
-    }
+    ~Parcel() { giveBack(); }
     Parcel(const Parcel&) = delete;
     Parcel& operator=(const Parcel&) = delete;
 
@@ -52,7 +50,11 @@ class Parcel {
     status_t writeString16(const char* text, size_t length);
     /** Refers to a buffer. @param handle its number, for buffers embedded in it; may be nullptr. */
     status_t writeBuffer(const void* buffer, size_t length, size_t* handle);
-    /** Refers to a buffer whose address is in another one, its parent. */
+    /**
+     * Refers to a buffer whose address is in another one, its parent.
+     *
+     * @param buffer nullptr for that of an empty list.
+     */
     status_t writeEmbeddedBuffer(const void* buffer, size_t length, size_t* handle,
                                  size_t parentHandle, size_t parentOffset);
     /** @param binder nullptr for no object. */
@@ -75,6 +77,10 @@ class Parcel {
     status_t readString16(std::string* text) const;
     /** @param length the size that the buffer must have. */
     status_t readBuffer(size_t length, size_t* handle, const void** buffer) const;
+    /**
+     * @param handle takes the number of the buffer; nullptr if no addresses belong into it. Then
+     *     one that has a buffer embedded in it is refused.
+     */
     status_t readEmbeddedBuffer(size_t length, size_t* handle, size_t parentHandle,
                                 size_t parentOffset, const void** buffer) const;
     /** @param binder nullptr if no object was sent. */
@@ -84,10 +90,10 @@ class Parcel {
 
     // For the drivers.
 
-    const uint8_t* data() const { return mData; }
-    size_t dataSize() const { return mSize; }
-    const binder_size_t* offsets() const { return mOffsets; }
-    size_t offsetCount() const { return mOffsetCount; }
+    const uint8_t* data() const { return mData.data(); }
+    size_t dataSize() const { return mData.size(); }
+    const binder_size_t* offsets() const { return mOffsets.data(); }
+    size_t offsetCount() const { return mOffsets.size(); }
     /** @return the room that its buffers need, each rounded up to 8, in bytes. */
     size_t buffersSize() const;
     void setDataPosition(size_t position) const { mPosition = position; }
@@ -99,40 +105,31 @@ class Parcel {
      */
     void ipcSetDataReference(const uint8_t* data, size_t size, const binder_size_t* offsets,
                              size_t offsetCount, ReleaseBuffer release, void* owner) {
-        if (mHasMore || mSize > 0) clear();
-        // Never written to: there is no capacity for it.
-        mData = const_cast<uint8_t*>(data);
-        mSize = size;
-        mCapacity = 0;
-        mOffsets = const_cast<binder_size_t*>(offsets);
-        mOffsetCount = offsetCount;
-        mOffsetCapacity = 0;
+        clear();
+        mData.refer(data, size);
+        mOffsets.refer(offsets, offsetCount);
         mRelease = release;
         mOwner = owner;
-        mHasMore = release != nullptr;
     }
     /** Empties the parcel. */
     void clear() {
-        if (mHasMore) releaseMore();
-        mData = mInlineData;
-        mSize = 0;
-        mCapacity = sizeof(mInlineData);
-        mOffsets = mInlineOffsets;
-        mOffsetCount = 0;
-        mOffsetCapacity = std::size(mInlineOffsets);
+        giveBack();
+        mRelease = nullptr;
+        mData.clear();
+        mOffsets.clear();
+        mBinders.clear();
         mPosition = 0;
         mNextObject = 0;
-        mRelease = nullptr;
-        mBinders = nullptr;
-        mHasMore = false;
     }
 
   private:
     /** Values begin at multiples of 4; objects, too. */
     static constexpr size_t padded(size_t size) { return (size + 3) & ~size_t{3}; }
 
-    /** Gives back what the parcel has outside itself. */
-    void releaseMore();
+    /** Gives what the driver has received back to it. */
+    void giveBack() {
+        if (mRelease != nullptr) mRelease(mData.data(), mOwner);
+    }
     template <typename T>
     status_t writePadded(T value) {
         return write(&value, sizeof(value));
@@ -152,51 +149,49 @@ class Parcel {
     }
     /** @return room for a value at the end; nullptr without memory, and in what was received. */
     uint8_t* grow(size_t size) {
-        const size_t start = mSize;
-        const size_t needed = start + padded(size);
-        if ((needed > mCapacity || needed < start) && !reserve(needed)) return nullptr;
-        mSize = needed;
+        const size_t needed = padded(size);
+        if (needed < size) return nullptr;
+        uint8_t* place = mData.grow(needed);
         // The padding of the last 4 bytes is zero.
-        if (size > 0) memset(mData + needed - 4, 0, 4);
-        return mData + start;
+        if (place != nullptr && size > 0) memset(place + needed - 4, 0, 4);
+        return place;
     }
-    bool reserve(size_t size);
     status_t writeObject(const void* object, size_t size);
-    bool addOffset(size_t offset);
+    status_t writePointer(const binder_buffer_object& object, size_t* handle);
+    /** @return whether the driver knows of an object that is read next. */
+    bool isObjectNext() const {
+        return mNextObject < mOffsets.size() && mOffsets[mNextObject] == mPosition;
+    }
     /** @return where the next value lies, and goes past it; nullptr past the end. */
     const uint8_t* read(size_t size) const {
-        if (mPosition > mSize || size > mSize - mPosition) return nullptr;
+        if (mPosition > dataSize() || size > dataSize() - mPosition) return nullptr;
         // The bytes of an object, which the driver has filled in, are never read as plain values.
-        if (mNextObject < mOffsetCount && mPosition + size > mOffsets[mNextObject]) return nullptr;
-        const uint8_t* place = mData + mPosition;
-        mPosition = std::min(mSize, mPosition + padded(size));
+        if (mNextObject < offsetCount() && mPosition + size > mOffsets[mNextObject]) return nullptr;
+        const uint8_t* place = data() + mPosition;
+        mPosition = std::min(dataSize(), mPosition + padded(size));
         return place;
     }
     /** Reads an object of a kind that the driver has checked. @param index its number. */
     status_t readObject(uint32_t type, void* object, size_t size, size_t* index) const;
-    status_t readPointer(size_t length, size_t* handle, binder_buffer_object* object) const;
+    status_t readPointer(size_t length, size_t* index, binder_buffer_object* object) const;
+    /** Reads the embedded buffer of an empty list that the driver does not know of. */
+    status_t readNullPointer(size_t parentHandle, size_t parentOffset) const;
+    /** @param object takes a known object, if that is a buffer. @return whether it is. */
+    bool isPointer(size_t index, binder_buffer_object* object) const;
+    /** @return whether another buffer's address is written into this one. */
+    bool isParent(size_t index) const;
 
-    // Most calls fit into the parcel itself and need no memory from the heap.
-    // Left uninitialised: it is written before it is read.
-    alignas(8) uint8_t mInlineData[256];
-    binder_size_t mInlineOffsets[8];
-
-    uint8_t* mData = mInlineData;
-    binder_size_t* mOffsets = mInlineOffsets;
-    size_t mCapacity = sizeof(mInlineData);
-    size_t mOffsetCapacity = std::size(mInlineOffsets);
-    // Side by side, since these are cleared at once.
-    size_t mSize = 0;
-    size_t mOffsetCount = 0;
+    // Most calls fit into the parcel itself.
+    InlineArray<uint8_t, 256> mData;
+    /** Where the objects lie in the data, for the driver. */
+    InlineArray<binder_size_t, 8> mOffsets;
     mutable size_t mPosition = 0;
     /** Index of the next offset to read. */
     mutable size_t mNextObject = 0;
     ReleaseBuffer mRelease = nullptr;
     void* mOwner = nullptr;
-    /** Keeps what was written alive until the driver has taken it over; nullptr without any. */
-    std::vector<sp<IBinder>>* mBinders = nullptr;
-    /** Whether there is anything to give back: memory, or binders. Most parcels have nothing. */
-    bool mHasMore = false;
+    /** Keeps what was written alive until the driver has taken it over. */
+    std::vector<sp<IBinder>> mBinders;
 };
 
 }  // namespace android::hardware
