@@ -3,7 +3,7 @@
 #include "libhwbinder/Driver.h"
 
 #include <hidl/HidlTransportSupport.h>
-#include <hwbinder/Host.h>
+#include <hidl/Host.h>
 #include <hwbinder/ProcessState.h>
 
 #include <cerrno>

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "LocalServiceManager.h"
 
-#include "libhwbinder/LocalDriver.h"
 #include "libhwbinder/SocketDirectory.h"
 
 #include <android/hidl/base/1.0/BpHwBase.h>
@@ -119,12 +118,21 @@ class Notifications {
 
 }  // namespace
 
+Error LocalServiceManager::find(LocalDriver& driver, const std::string& interface,
+                                const std::string& instance, sp<IBase>* service) {
+    uint32_t handle = 0;
+    Error error = driver.connect(interface, instance, &handle);
+    if (error.isOk()) {
+        *service = new ::android::hidl::base::V1_0::BpHwBase(
+                ProcessState::self()->getStrongProxyForHandle(handle));
+    }
+    return error;
+}
+
 Return<sp<IBase>> LocalServiceManager::get(const hidl_string& interface, const hidl_string& name) {
-    lookupError().clear();
-    const uint32_t handle = mDriver.connect(interface, name, &lookupError());
-    if (handle == 0) return sp<IBase>();
-    return sp<IBase>(new ::android::hidl::base::V1_0::BpHwBase(
-            ProcessState::self()->getStrongProxyForHandle(handle)));
+    sp<IBase> service;
+    (void)find(mDriver, interface, name, &service);
+    return service;
 }
 
 Return<void> LocalServiceManager::list(list_cb callback) {

@@ -1,13 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "ServiceManagerBase.h"
+#include "libhidl/ServiceManagerBase.h"
+#include "libhwbinder/LocalDriver.h"
 
 #include <string>
 
 namespace android::hardware {
-
-class LocalDriver;
 
 /**
  * The service manager where calls go over sockets. It is no process of its own: each process looks
@@ -16,6 +15,10 @@ class LocalDriver;
 class LocalServiceManager : public ServiceManagerBase {
   public:
     explicit LocalServiceManager(LocalDriver& driver) : mDriver(driver) {}
+
+    /** Finds a service. @return OK, or why it is not there. */
+    static Error find(LocalDriver& driver, const std::string& interface,
+                      const std::string& instance, sp<::android::hidl::base::V1_0::IBase>* service);
 
     Return<sp<::android::hidl::base::V1_0::IBase>> get(const hidl_string& interface,
                                                        const hidl_string& name) override;

@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "libhwbinder/Driver.h"
+#include "LocalServiceManager.h"
 
-#include <android/hidl/manager/1.2/IServiceManager.h>
+#include <android/hidl/manager/1.2/BpHwServiceManager.h>
 #include <android/log.h>
+#include <hidl/Host.h>
 #include <hidl/ServiceManagement.h>
-#include <hwbinder/Host.h>
 #include <hwbinder/ProcessState.h>
 
 #include <algorithm>
@@ -16,6 +16,7 @@ namespace {
 
 using ::android::hidl::base::V1_0::IBase;
 using ::android::hidl::manager::V1_0::IServiceManager;
+using ::android::hidl::manager::V1_2::BpHwServiceManager;
 using std::chrono::milliseconds;
 using std::chrono::steady_clock;
 using Manager = ::android::hidl::manager::V1_2::IServiceManager;
@@ -23,67 +24,96 @@ using Manager = ::android::hidl::manager::V1_2::IServiceManager;
 constexpr milliseconds kPatience(5000);
 constexpr milliseconds kForEver = milliseconds::max();
 
+Driver& driver() {
+    return ProcessState::self()->driver();
+}
+
+/** Asks once for the service manager. @return OK, or why none answers. */
+Error askForManager(sp<Manager>* manager) {
+    if (LocalDriver* sockets = driver().localDriver()) {
+        *manager = new LocalServiceManager(*sockets);
+        return {};
+    }
+    Error error = driver().check();
+    if (!error.isOk()) return error;
+    const sp<Manager> proxy =
+            new BpHwServiceManager(ProcessState::self()->getStrongProxyForHandle(0));
+    if (!proxy->ping().isOk()) {
+        return {DEAD_OBJECT, driver().name() + ": no service manager answers"};
+    }
+    *manager = proxy;
+    return {};
+}
+
+/** Asks once for a service. @return OK, or why it is not there. */
+Error askForService(const std::string& interface, const std::string& instance, sp<IBase>* service) {
+    if (LocalDriver* sockets = driver().localDriver()) {
+        return LocalServiceManager::find(*sockets, interface, instance, service);
+    }
+    sp<Manager> manager;
+    Error error = askForManager(&manager);
+    if (!error.isOk()) return error;
+    const Return<sp<IBase>> found = manager->get(interface, instance);
+    if (!found.isOk()) return {UNKNOWN_ERROR, found.description()};
+    *service = found;
+    if (*service != nullptr) return {};
+    return {NAME_NOT_FOUND, driver().name() + ": the service manager does not know it"};
+}
+
 /**
  * Asks for something until it is there.
  *
  * @param patience for how long; it is asked once at least.
- * @param what is waited for, for the log.
- * @param find gives nullptr while it is not there, and then the reason in its argument.
+ * @param what is waited for.
+ * @return OK, or why it is not there.
  */
-template <typename Find>
-auto waitFor(milliseconds patience, const std::string& what, Find find) {
+template <typename Ask>
+Error waitFor(milliseconds patience, const std::string& what, Ask ask) {
+    if (!driver().check().isOk()) patience = milliseconds(0);
     const steady_clock::time_point start = steady_clock::now();
     milliseconds pause(1);
     for (;;) {
-        std::string whyNot;
-        auto found = find(&whyNot);
-        if (found != nullptr) return found;
-        lookupError() = what + " is not there: " + whyNot;
-        if (patience != kForEver && steady_clock::now() - start >= patience) return found;
+        Error error = ask();
+        if (error.isOk()) return error;
+        error = {error.code(), what + " is not there: " + error.text()};
+        if (patience != kForEver && steady_clock::now() - start >= patience) return error;
         if (pause == milliseconds(1)) {
-            __android_log_print(ANDROID_LOG_INFO, kLogTag, "waiting; %s", lookupError().c_str());
+            __android_log_print(ANDROID_LOG_INFO, kLogTag, "waiting; %s", error.text().c_str());
         }
         std::this_thread::sleep_for(pause);
         pause = std::min(2 * pause, milliseconds(128));
     }
 }
 
-sp<Manager> findManager(milliseconds patience) {
-    Driver& driver = ProcessState::self()->driver();
-    return waitFor(driver.isUsable() ? patience : milliseconds(0), "the service manager",
-                   [&](std::string* whyNot) { return driver.serviceManager(whyNot); });
+Error findManager(milliseconds patience, sp<Manager>* manager) {
+    return waitFor(patience, "the service manager", [&] { return askForManager(manager); });
+}
+
+Error findService(milliseconds patience, const std::string& interface, const std::string& instance,
+                  sp<IBase>* service) {
+    return waitFor(patience, interface + "/" + instance,
+                   [&] { return askForService(interface, instance, service); });
 }
 
 }  // namespace
-
-std::string& lookupError() {
-    static thread_local std::string error;
-    return error;
-}
 
 sp<IServiceManager> defaultServiceManager() {
     return defaultServiceManager1_2();
 }
 
 sp<Manager> defaultServiceManager1_2() {
-    return findManager(kPatience);
+    sp<Manager> manager;
+    (void)findManager(kPatience, &manager);
+    return manager;
 }
 
 namespace details {
 
 sp<IBase> getRawServiceInternal(const std::string& interface, const std::string& instance,
                                 bool retry) {
-    Driver& driver = ProcessState::self()->driver();
-    const bool waits = retry && driver.isUsable();
-    return waitFor(waits ? kPatience : milliseconds(0), interface + "/" + instance,
-                   [&](std::string* whyNot) -> sp<IBase> {
-                       const sp<Manager> manager = driver.serviceManager(whyNot);
-                       if (manager == nullptr) return nullptr;
-                       lookupError() = driver.name() + ": the service manager does not know it";
-                       const Return<sp<IBase>> service = manager->get(interface, instance);
-                       *whyNot = service.isOk() ? lookupError() : service.description();
-                       return service.withDefault(nullptr);
-                   });
+    sp<IBase> service;
+    (void)findService(retry ? kPatience : milliseconds(0), interface, instance, &service);
+    return service;
 }
 
 status_t registerAsServiceInternal(const sp<IBase>& service, const std::string& instance) {
@@ -92,9 +122,10 @@ status_t registerAsServiceInternal(const sp<IBase>& service, const std::string& 
     const auto complain = [](const std::string& whyNot) {
         __android_log_print(ANDROID_LOG_ERROR, kLogTag, "not registered: %s", whyNot.c_str());
     };
-    const sp<Manager> manager = findManager(kForEver);
-    if (manager == nullptr) {
-        complain(lookupError());
+    sp<Manager> manager;
+    const Error error = findManager(kForEver, &manager);
+    if (!error.isOk()) {
+        complain(error.text());
         return NO_INIT;
     }
     bool isKnown = false;
@@ -110,15 +141,25 @@ status_t registerAsServiceInternal(const sp<IBase>& service, const std::string& 
 
 namespace host {
 
-std::string serviceManagerDescription() {
-    Driver& driver = ProcessState::self()->driver();
-    if (!driver.hasServiceManager()) return "none is needed";
-    std::string whyNot;
-    return driver.serviceManager(&whyNot) == nullptr ? whyNot : "answers";
+std::string transportDescription() {
+    return ProcessState::self()->driverDescription();
 }
 
-std::string lookupError() {
-    return ::android::hardware::lookupError();
+void setCallTimeout(milliseconds limit) {
+    ::android::hardware::setCallTimeout(static_cast<int>(limit.count()));
+}
+
+std::string serviceManagerDescription() {
+    if (driver().localDriver() != nullptr) return "none is needed";
+    sp<Manager> manager;
+    const Error error = askForManager(&manager);
+    return error.isOk() ? "answers" : error.text();
+}
+
+std::string lookupError(const std::string& interface, const std::string& instance) {
+    sp<IBase> service;
+    const Error error = findService(milliseconds(0), interface, instance, &service);
+    return error.isOk() ? interface + "/" + instance + " is there now" : error.text();
 }
 
 }  // namespace host

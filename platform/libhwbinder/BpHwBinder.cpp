@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Driver.h"
+#include "libhwbinder/Driver.h"
 
 #include <hwbinder/BpHwBinder.h>
 #include <hwbinder/Parcel.h>
@@ -10,18 +10,18 @@
 namespace android::hardware {
 
 BpHwBinder::BpHwBinder(uint32_t handle)
-    : mDriver(ProcessState::self()->driver()), mHandle(handle), mLink(mDriver.acquire(handle)) {}
+    : mHandle(handle), mRemote(ProcessState::self()->driver().open(handle)) {}
 
 BpHwBinder::~BpHwBinder() {
     const bool isLast = ProcessState::self()->expungeHandle(mHandle, this);
     // If the handle has another proxy by now, that one takes the notice over.
-    if (isLast && !mRecipients.empty()) mDriver.clearDeathNotice(mHandle);
-    mDriver.release(mHandle);
+    if (isLast && !mRecipients.empty()) mRemote->clearDeathNotice();
 }
 
 status_t BpHwBinder::transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags,
                               TransactCallback /* callback */) {
-    const status_t status = mDriver.transact(mHandle, mLink, code, data, reply, flags);
+    if (mRemote == nullptr) return DEAD_OBJECT;
+    const status_t status = mRemote->transact(code, data, reply, flags);
     if (status == DEAD_OBJECT) {
         const std::lock_guard<std::mutex> lock(mMutex);
         mAlive = false;
@@ -31,9 +31,9 @@ status_t BpHwBinder::transact(uint32_t code, const Parcel& data, Parcel* reply, 
 
 status_t BpHwBinder::linkToDeath(const sp<DeathRecipient>& recipient) {
     const std::lock_guard<std::mutex> lock(mMutex);
-    if (!mAlive) return DEAD_OBJECT;
+    if (!mAlive || mRemote == nullptr) return DEAD_OBJECT;
     if (mRecipients.empty()) {
-        const status_t status = mDriver.requestDeathNotice(mHandle);
+        const status_t status = mRemote->requestDeathNotice();
         if (status != OK) return status;
     }
     mRecipients.push_back(recipient);
@@ -45,7 +45,7 @@ status_t BpHwBinder::unlinkToDeath(const sp<DeathRecipient>& recipient) {
     const auto found = std::find(mRecipients.begin(), mRecipients.end(), recipient);
     if (found == mRecipients.end()) return NAME_NOT_FOUND;
     mRecipients.erase(found);
-    if (mRecipients.empty()) mDriver.clearDeathNotice(mHandle);
+    if (mRecipients.empty()) mRemote->clearDeathNotice();
     return OK;
 }
 

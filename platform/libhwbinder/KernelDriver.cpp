@@ -3,9 +3,7 @@
 
 #include "KernelThread.h"
 
-#include <android/hidl/manager/1.2/BpHwServiceManager.h>
 #include <fcntl.h>
-#include <hwbinder/ProcessState.h>
 #include <linux/android/binder.h>
 #include <sys/ioctl.h>
 #include <sys/mman.h>
@@ -24,21 +22,54 @@ size_t mappingSize() {
 
 }  // namespace
 
+/** An object that the kernel knows by a handle. */
+class KernelDriver::Object : public RemoteObject {
+  public:
+    Object(KernelDriver& driver, uint32_t handle) : mDriver(driver), mHandle(handle) {
+        thread().queue(BC_ACQUIRE, mHandle);
+    }
+    ~Object() override {
+        thread().queue(BC_RELEASE, mHandle);
+        thread().flush();
+    }
+    Object(const Object&) = delete;
+    Object& operator=(const Object&) = delete;
+
+    status_t transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags) override {
+        return thread().transact(mHandle, code, data, reply, flags);
+    }
+    status_t requestDeathNotice() override {
+        thread().queue(BC_REQUEST_DEATH_NOTIFICATION, binder_handle_cookie{mHandle, mHandle});
+        return thread().flush();
+    }
+    void clearDeathNotice() override {
+        thread().queue(BC_CLEAR_DEATH_NOTIFICATION, binder_handle_cookie{mHandle, mHandle});
+        thread().flush();
+    }
+
+  private:
+    KernelThread& thread() const { return KernelThread::self(mDriver); }
+
+    KernelDriver& mDriver;
+    const uint32_t mHandle;
+};
+
 KernelDriver::KernelDriver(const std::string& device) : mName(device) {
-    mDevice = open(device.c_str(), O_RDWR | O_CLOEXEC);
+    mDevice = ::open(device.c_str(), O_RDWR | O_CLOEXEC);
     if (mDevice < 0) {
-        mError = device + ": " + strerror(errno);
+        mError = Error::ofErrno({device});
         return;
     }
     binder_version version{};
     uint32_t noFurtherThreads = 0;
     if (ioctl(mDevice, BINDER_VERSION, &version) != 0) {
-        mError = device + ": not a binder device";
+        mError = {NO_INIT, device + ": not a binder device"};
     } else if (version.protocol_version != BINDER_CURRENT_PROTOCOL_VERSION) {
-        mError = device + ": speaks version " + std::to_string(version.protocol_version) +
-                 " of the protocol, not " + std::to_string(BINDER_CURRENT_PROTOCOL_VERSION);
+        mError = {NO_INIT, device + ": speaks version " + std::to_string(version.protocol_version) +
+                                   " of the protocol, not " +
+                                   std::to_string(BINDER_CURRENT_PROTOCOL_VERSION)};
     } else if (ioctl(mDevice, BINDER_SET_MAX_THREADS, &noFurtherThreads) != 0) {
-        mError = device + ": " + strerror(errno);
+        mError = Error::ofErrno({device});
     } else {
         void* mapping =
                 mmap(nullptr, mappingSize(), PROT_READ, MAP_PRIVATE | MAP_NORESERVE, mDevice, 0);
@@ -46,7 +77,7 @@ KernelDriver::KernelDriver(const std::string& device) : mName(device) {
             mMapping = mapping;
             return;
         }
-        mError = device + ": mmap: " + strerror(errno);
+        mError = Error::ofErrno({device, ": mmap"});
     }
     close(mDevice);
     mDevice = -1;
@@ -57,53 +88,16 @@ KernelDriver::~KernelDriver() {
     if (mDevice >= 0) close(mDevice);
 }
 
-status_t KernelDriver::transact(uint32_t handle, void* /* link */, uint32_t code,
-                                const Parcel& data, Parcel* reply, uint32_t flags) {
-    return KernelThread::self(*this).transact(handle, code, data, reply, flags);
+std::unique_ptr<RemoteObject> KernelDriver::open(uint32_t handle) {
+    return std::make_unique<Object>(*this, handle);
 }
 
 void KernelDriver::serve() {
     KernelThread::self(*this).serve();
 }
 
-void* KernelDriver::acquire(uint32_t handle) {
-    KernelThread::self(*this).queue(BC_ACQUIRE, handle);
-    return nullptr;
-}
-
-void KernelDriver::release(uint32_t handle) {
-    KernelThread::self(*this).queue(BC_RELEASE, handle);
-    KernelThread::self(*this).flush();
-}
-
-status_t KernelDriver::requestDeathNotice(uint32_t handle) {
-    const binder_handle_cookie notice{handle, handle};
-    KernelThread::self(*this).queue(BC_REQUEST_DEATH_NOTIFICATION, notice);
-    return KernelThread::self(*this).flush();
-}
-
-void KernelDriver::clearDeathNotice(uint32_t handle) {
-    const binder_handle_cookie notice{handle, handle};
-    KernelThread::self(*this).queue(BC_CLEAR_DEATH_NOTIFICATION, notice);
-    KernelThread::self(*this).flush();
-}
-
-sp<::android::hidl::manager::V1_2::IServiceManager> KernelDriver::serviceManager(
-        std::string* whyNot) {
-    if (!isOpen()) {
-        *whyNot = mError;
-        return nullptr;
-    }
-    sp<::android::hidl::manager::V1_2::IServiceManager> manager =
-            new ::android::hidl::manager::V1_2::BpHwServiceManager(
-                    ProcessState::self()->getStrongProxyForHandle(0));
-    if (manager->ping().isOk()) return manager;
-    *whyNot = mName + ": no service manager answers";
-    return nullptr;
-}
-
 status_t KernelDriver::becomeContextManager(const sp<BHwBinder>& object) {
-    if (!isOpen()) return NO_INIT;
+    if (!mError.isOk()) return NO_INIT;
     mContextManager = object;
     // Without FLAT_BINDER_FLAG_ACCEPTS_FDS, as every object.
     flat_binder_object description{};

@@ -86,7 +86,7 @@ KernelThread::~KernelThread() {
 }
 
 status_t KernelThread::exchange(bool receive) {
-    if (!mDriver.isOpen()) {
+    if (mDriver.mDevice < 0) {
         mOutSize = 0;
         return NO_INIT;
     }

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "LocalConnection.h"
 
+#include "LocalServer.h"
 #include "Packet.h"
 
 #include <sys/socket.h>
@@ -75,6 +76,14 @@ auto retry(Call call) {
 
 LocalConnection::~LocalConnection() {
     close(mSocket);
+}
+
+status_t LocalConnection::requestDeathNotice() {
+    return mWatcher->watch(mHandle, mSocket) ? OK : DEAD_OBJECT;
+}
+
+void LocalConnection::clearDeathNotice() {
+    mWatcher->unwatch(mSocket);
 }
 
 inline status_t LocalConnection::exchange(Packet* packet, bool oneway) {

@@ -1,36 +1,37 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include <hwbinder/Parcel.h>
-#include <utils/Errors.h>
+#include "libhwbinder/Driver.h"
 
 #include <cstdint>
 #include <mutex>
 
 namespace android::hardware {
 
+class LocalServer;
 struct Packet;
 
 /**
  * A client's connection to an object. It may be shared between threads; their calls go one after
  * the other. Once it has failed it stays dead.
  */
-class LocalConnection {
+class LocalConnection : public RemoteObject {
   public:
-    explicit LocalConnection(int socket) : mSocket(socket) {}
-    ~LocalConnection();
-    LocalConnection(const LocalConnection&) = delete;
-    LocalConnection& operator=(const LocalConnection&) = delete;
+    /** @param watcher sends the obituary of the handle, if asked to. */
+    LocalConnection(int socket, const LocalServer* watcher, uint32_t handle)
+        : mSocket(socket), mWatcher(watcher), mHandle(handle) {}
+    ~LocalConnection() override;
 
-    status_t transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags);
-
-    /** @return the socket, which lives as long as the connection. */
-    int socket() const { return mSocket; }
+    status_t transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags) override;
+    status_t requestDeathNotice() override;
+    void clearDeathNotice() override;
 
   private:
     status_t exchange(Packet* packet, bool oneway);
 
     const int mSocket;
+    const LocalServer* const mWatcher;
+    const uint32_t mHandle;
     std::mutex mMutex;
     bool mDead = false;
 };

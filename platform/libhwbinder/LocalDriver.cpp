@@ -1,64 +1,51 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "LocalDriver.h"
+#include "libhwbinder/LocalDriver.h"
 
-#include "SocketDirectory.h"
-#include "libhidl/LocalServiceManager.h"
+#include "LocalConnection.h"
+#include "LocalServer.h"
+#include "libhwbinder/SocketDirectory.h"
 
 namespace android::hardware {
 
-status_t LocalDriver::transact(uint32_t /* handle */, void* connection, uint32_t code,
-                               const Parcel& data, Parcel* reply, uint32_t flags) {
-    if (connection == nullptr) return DEAD_OBJECT;
-    return static_cast<LocalConnection*>(connection)->transact(code, data, reply, flags);
-}
+LocalDriver::LocalDriver() : mServer(std::make_unique<LocalServer>()) {}
 
-void* LocalDriver::acquire(uint32_t handle) {
+LocalDriver::~LocalDriver() = default;
+
+std::unique_ptr<RemoteObject> LocalDriver::open(uint32_t handle) {
     const std::lock_guard<std::mutex> lock(mMutex);
-    const auto found = mConnections.find(handle);
-    return found == mConnections.end() ? nullptr : &found->second;
+    const auto found = mConnections.extract(handle);
+    return found.empty() ? nullptr : std::move(found.mapped());
 }
 
-void LocalDriver::release(uint32_t handle) {
-    const std::lock_guard<std::mutex> lock(mMutex);
-    mConnections.erase(handle);
-}
-
-status_t LocalDriver::requestDeathNotice(uint32_t handle) {
-    const std::lock_guard<std::mutex> lock(mMutex);
-    const auto found = mConnections.find(handle);
-    const bool isWatched =
-            found != mConnections.end() && mServer.watch(handle, found->second.socket());
-    return isWatched ? OK : DEAD_OBJECT;
-}
-
-void LocalDriver::clearDeathNotice(uint32_t handle) {
-    const std::lock_guard<std::mutex> lock(mMutex);
-    const auto found = mConnections.find(handle);
-    if (found != mConnections.end()) mServer.unwatch(found->second.socket());
-}
-
-sp<::android::hidl::manager::V1_2::IServiceManager> LocalDriver::serviceManager(
-        std::string* /* whyNot */) {
-    return new LocalServiceManager(*this);
+void LocalDriver::serve() {
+    mServer->serve();
 }
 
 std::string LocalDriver::name() const {
     return "sockets in " + serverDirectory();
 }
 
-uint32_t LocalDriver::connect(const std::string& interface, const std::string& instance,
-                              std::string* whyNot) {
+Error LocalDriver::connect(const std::string& interface, const std::string& instance,
+                           uint32_t* handle) {
+    std::string whyNot;
     for (const std::string& directory : clientDirectories()) {
         std::string why;
         const int socket = connectTo(directory, socketName(interface, instance), &why);
         if (socket >= 0) {
             const std::lock_guard<std::mutex> lock(mMutex);
-            mConnections.emplace(++mLastHandle, socket);
-            return mLastHandle;
+            *handle = ++mLastHandle;
+            mConnections[*handle] =
+                    std::make_unique<LocalConnection>(socket, mServer.get(), *handle);
+            return {};
         }
-        *whyNot += (whyNot->empty() ? "" : "; ") + why;
+        whyNot += (whyNot.empty() ? "" : "; ") + why;
     }
-    return 0;
+    return {NAME_NOT_FOUND, whyNot};
+}
+
+bool LocalDriver::publish(const sp<BHwBinder>& object, const std::vector<std::string>& chain,
+                          const std::string& instance) {
+    return mServer->publish(object, chain, instance);
 }
 
 }  // namespace android::hardware

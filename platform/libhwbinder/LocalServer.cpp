@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "LocalServer.h"
 
-#include "Driver.h"
-#include "SocketDirectory.h"
+#include "libhwbinder/Driver.h"
+#include "libhwbinder/SocketDirectory.h"
 
 #include <android/log.h>
 #include <fcntl.h>
@@ -158,7 +158,8 @@ int LocalServer::retryPending() {
 
 bool LocalServer::watch(uint32_t handle, int connection) const {
     epoll_event event{};
-    event.events = EPOLLRDHUP;
+    // The death is news only once.
+    event.events = EPOLLRDHUP | EPOLLONESHOT;
     event.data.u64 = kWatched | handle;
     return epoll_ctl(mEpoll, EPOLL_CTL_ADD, connection, &event) == 0;
 }
@@ -204,9 +205,7 @@ bool LocalServer::collect(int timeout) {
         const uint64_t word = events[i].data.u64;
         if (word == kWake) continue;
         if ((word & kWatched) != 0) {
-            const auto handle = static_cast<uint32_t>(word);
-            ProcessState::self()->driver().clearDeathNotice(handle);
-            ProcessState::self()->sendObituary(handle);
+            ProcessState::self()->sendObituary(static_cast<uint32_t>(word));
         } else {
             acceptAll(static_cast<Endpoint*>(events[i].data.ptr));
         }

@@ -1,11 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Driver.h"
 #include "KernelDriver.h"
-#include "LocalDriver.h"
+#include "libhwbinder/LocalDriver.h"
 
 #include <android/log.h>
 #include <hwbinder/BpHwBinder.h>
-#include <hwbinder/Host.h>
 #include <hwbinder/ProcessState.h>
 
 #include <atomic>
@@ -22,20 +20,21 @@ std::unique_ptr<Driver> chooseDriver(std::string* description) {
     const std::string device = environment("HWBINDER_DEVICE");
     if (!device.empty()) {
         auto kernel = std::make_unique<KernelDriver>(device);
-        *description = (kernel->isOpen() ? device : kernel->error()) + ", as HWBINDER_DEVICE says";
+        const Error error = kernel->check();
+        *description = (error.isOk() ? device : error.text()) + ", as HWBINDER_DEVICE says";
         return kernel;
+    }
+    std::string reason = ", as HWBINDER_DIR says";
+    if (environment("HWBINDER_DIR").empty()) {
+        auto kernel = std::make_unique<KernelDriver>(kDevice);
+        if (kernel->check().isOk()) {
+            *description = std::string(kDevice) + ", which is there";
+            return kernel;
+        }
+        reason = ", because of " + kernel->check().text();
     }
     auto local = std::make_unique<LocalDriver>();
-    if (!environment("HWBINDER_DIR").empty()) {
-        *description = local->name() + ", as HWBINDER_DIR says";
-        return local;
-    }
-    auto kernel = std::make_unique<KernelDriver>(kDevice);
-    if (kernel->isOpen()) {
-        *description = std::string(kDevice) + ", which is there";
-        return kernel;
-    }
-    *description = local->name() + ", because of " + kernel->error();
+    *description = local->name() + reason;
     return local;
 }
 
@@ -114,16 +113,8 @@ int callTimeout() {
     return timeout();
 }
 
+void setCallTimeout(int milliseconds) {
+    timeout() = milliseconds;
+}
+
 }  // namespace android::hardware
-
-namespace android::hardware::host {
-
-std::string transportDescription() {
-    return ProcessState::self()->driverDescription();
-}
-
-void setCallTimeout(std::chrono::milliseconds limit) {
-    timeout() = static_cast<int>(limit.count());
-}
-
-}  // namespace android::hardware::host

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "SocketDirectory.h"
+#include "libhwbinder/SocketDirectory.h"
 
-#include "Driver.h"
+#include "libhwbinder/Driver.h"
 
 #include <fcntl.h>
 #include <sys/file.h>

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 
 // A client as it is written for a device: only what is published, and nothing of this platform's
-// own. It is compiled by check-hidl, and runs where there is no service.
+// own. It runs where there is no service.
 
 #include <android/hidl/manager/1.0/IServiceNotification.h>
 #include <hidl/HidlTransportSupport.h>

@@ -4,8 +4,8 @@
 
 #include <android/hidl/manager/1.2/IServiceManager.h>
 #include <hidl/HidlBinderSupport.h>
+#include <hidl/Host.h>
 #include <hidl/ServiceManagement.h>
-#include <hwbinder/Host.h>
 #include <utils/Errors.h>
 
 #include <algorithm>
@@ -284,14 +284,14 @@ TEST_F(CallsTest, SearchWaitsForAServiceThatIsToCome) {
     const std::string whyNot = kChain[0] + "/default is not there: " +
                                (isKernel() ? "/dev/hwbinder: the service manager does not know it"
                                            : mDirectory.path());
-    EXPECT_EQ(host::lookupError().find(whyNot), 0U) << host::lookupError();
+    EXPECT_EQ(host::lookupError(kChain[0]).find(whyNot), 0U) << host::lookupError(kChain[0]);
     std::thread later([&] {
         std::this_thread::sleep_for(milliseconds(100));
         startDaemon(mServer);
     });
     const sp<IDaxVibrator> found = IDaxVibrator::getService();
     later.join();
-    ASSERT_NE(found, nullptr) << host::lookupError();
+    ASSERT_NE(found, nullptr) << host::lookupError(kChain[0]);
     EXPECT_TRUE(found->ping().isOk());
 }
 

@@ -2,7 +2,7 @@
 #include "support/LogCapture.h"
 #include "transport/TransportTest.h"
 
-#include <hwbinder/Host.h>
+#include <hidl/Host.h>
 #include <sys/socket.h>
 #include <sys/stat.h>
 #include <sys/un.h>
@@ -25,7 +25,9 @@ class PublicationTest : public TransportTest {
     }
     /** @return why a client finds no service. */
     static std::string whyNot() {
-        return IDaxVibrator::tryGetService() == nullptr ? host::lookupError() : "found";
+        return IDaxVibrator::tryGetService() == nullptr
+                       ? host::lookupError(IDaxVibrator::descriptor)
+                       : "found";
     }
     /** Expects that a daemon that is started, as somebody, has a text in its log. */
     void expectLog(const std::string& text, const std::vector<std::string>& command = {SERVICE},

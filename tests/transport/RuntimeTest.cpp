@@ -10,9 +10,9 @@
 #include <fcntl.h>
 #include <hidl/HidlBinderSupport.h>
 #include <hidl/HidlTransportSupport.h>
+#include <hidl/Host.h>
 #include <hidl/ServiceManagement.h>
 #include <hwbinder/BpHwBinder.h>
-#include <hwbinder/Host.h>
 #include <hwbinder/Parcel.h>
 #include <hwbinder/ProcessState.h>
 #include <sys/file.h>
@@ -68,7 +68,7 @@ size_t threadCount() {
 
 TEST_F(RuntimeTest, DeviceThatCannotBeOpenedServesNothingHoweverOften) {
     android::hardware::KernelDriver driver("/dev/null");
-    EXPECT_EQ(driver.error(), "/dev/null: not a binder device");
+    EXPECT_EQ(driver.check().text(), "/dev/null: not a binder device");
     EXPECT_EQ(driver.becomeContextManager(nullptr), android::NO_INIT);
     std::thread([&] {
         for (int i = 0; i < 300; ++i)
@@ -113,7 +113,7 @@ TEST(LocalConnectionTest, WrongReplyIsAFailureAndAnEndOrOneThatIsTooLargeADeath)
     for (const std::string& last : {std::string(), std::string(packet.kMaxSize + 1, '\0')}) {
         int sockets[2];
         ASSERT_EQ(socketpair(AF_UNIX, SOCK_SEQPACKET, 0, sockets), 0);
-        android::hardware::LocalConnection connection(sockets[0]);
+        android::hardware::LocalConnection connection(sockets[0], nullptr, 0);
         android::hardware::Parcel reply;
         for (const std::string& wrong : {success, std::string(17, '\0')}) {
             ASSERT_GT(send(sockets[1], wrong.data(), wrong.size(), 0), 0);
@@ -232,13 +232,14 @@ TEST_F(RuntimeTest, SocketThatCannotBeHadIsSaid) {
     };
     allow(0);
     EXPECT_EQ(IServiceNotification::tryGetService("second"), nullptr);
+    const std::string whyNot = host::lookupError(IServiceNotification::descriptor, "second");
     // The lock's file takes it.
     allow(1);
     EXPECT_NE((new Slow)->registerAsService("second"), android::OK);
     setrlimit(RLIMIT_NOFILE, &before);
     const std::string complaint = "no socket for " + mDirectory.path() + "/" +
                                   IServiceNotification::descriptor + ".second: Too many open files";
-    EXPECT_NE(host::lookupError().find(complaint), std::string::npos) << host::lookupError();
+    EXPECT_NE(whyNot.find(complaint), std::string::npos) << whyNot;
     const std::string text = log.takeText();
     EXPECT_NE(text.find(complaint), std::string::npos) << text;
 }

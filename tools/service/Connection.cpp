@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "service/Connection.h"
 
-#include <hwbinder/Host.h>
+#include <hidl/Host.h>
 
 #include <chrono>
 #include <fstream>
@@ -12,7 +12,8 @@ namespace vibratorctl {
 
 ::android::sp<IDaxVibrator> connect(const std::string& instance) {
     ::android::sp<IDaxVibrator> vibrator = IDaxVibrator::tryGetService(instance);
-    if (vibrator == nullptr) throw Unreachable(host::lookupError());
+    if (vibrator == nullptr)
+        throw Unreachable(host::lookupError(IDaxVibrator::descriptor, instance));
     return vibrator;
 }
 

@@ -3,12 +3,13 @@
 
 #include <hwbinder/IBinder.h>
 
+#include <memory>
 #include <mutex>
 #include <vector>
 
 namespace android::hardware {
 
-class Driver;
+class RemoteObject;
 
 /** An object of another process, which the driver knows by a handle. */
 class BpHwBinder : public IBinder {
@@ -28,10 +29,9 @@ class BpHwBinder : public IBinder {
     void sendObituary();
 
   private:
-    Driver& mDriver;
     const uint32_t mHandle;
-    /** The driver's data for the handle. */
-    void* const mLink;
+    /** The object itself; nullptr if there is none with the handle. */
+    const std::unique_ptr<RemoteObject> mRemote;
     std::mutex mMutex;
     bool mAlive = true;
     std::vector<sp<DeathRecipient>> mRecipients;

@@ -13,8 +13,8 @@ std::string transportDescription();
 /** @return whether a service manager answers, in words. */
 std::string serviceManagerDescription();
 
-/** @return why the last getService or tryGetService of this thread gave nullptr, in words. */
-std::string lookupError();
+/** Looks once for a service. @return why it is not there, in words. */
+std::string lookupError(const std::string& interface, const std::string& instance = "default");
 
 /**
  * Limits how long a call may take; one that takes longer fails with TIMED_OUT. Over sockets its

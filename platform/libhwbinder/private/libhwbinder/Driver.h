@@ -1,60 +1,69 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "libutils/Error.h"
+
 #include <hwbinder/Binder.h>
 #include <hwbinder/IPCThreadState.h>
 #include <hwbinder/Parcel.h>
 #include <utils/Errors.h>
 
 #include <cstdint>
+#include <memory>
 #include <string>
-
-namespace android::hidl::manager::V1_2 {
-struct IServiceManager;
-}
 
 namespace android::hardware {
 
-/** What carries calls between processes: the kernel's binder driver, or sockets in its place. */
-class Driver {
+class LocalDriver;
+
+/** An object of another process, as its proxy sees it. It is given up when this ends. */
+class RemoteObject {
   public:
-    virtual ~Driver() = default;
+    RemoteObject() = default;
+    virtual ~RemoteObject() = default;
+    RemoteObject(const RemoteObject&) = delete;
+    RemoteObject& operator=(const RemoteObject&) = delete;
 
     /**
-     * Makes a call of a remote object and, unless it is oneway, waits for the reply. Calls that
-     * the other process makes meanwhile, in the course of this one, are served.
+     * Makes a call and, unless it is oneway, waits for the reply. Calls that the other process
+     * makes meanwhile, in the course of this one, are served.
      *
-     * @param link what acquire has given for the handle.
      * @return OK; DEAD_OBJECT; TIMED_OUT; FAILED_TRANSACTION for what the driver does not take; or
      *     what the object has answered instead of a reply.
      */
-    virtual status_t transact(uint32_t handle, void* link, uint32_t code, const Parcel& data,
-                              Parcel* reply, uint32_t flags) = 0;
+    virtual status_t transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags) = 0;
+
+    /** Asks for news of the death of the object's process: BpHwBinder::sendObituary. */
+    virtual status_t requestDeathNotice() = 0;
+    virtual void clearDeathNotice() = 0;
+};
+
+/**
+ * What carries calls between processes: the kernel's binder driver, or sockets in its place. It
+ * knows nothing of interfaces.
+ */
+class Driver {
+  public:
+    Driver() = default;
+    virtual ~Driver() = default;
+    Driver(const Driver&) = delete;
+    Driver& operator=(const Driver&) = delete;
+
+    /** @return the object of a handle; nullptr if there is none. */
+    virtual std::unique_ptr<RemoteObject> open(uint32_t handle) = 0;
 
     /** Serves calls and news of deaths with the calling thread, until that becomes impossible. */
     virtual void serve() = 0;
 
-    // Called when the proxy of a handle is made, and when it is destroyed.
-    /** @return data that the driver gets with each call, to save it a search. */
-    virtual void* acquire(uint32_t handle) = 0;
-    virtual void release(uint32_t handle) = 0;
-    /** Asks for news of the death of the process behind a handle: BpHwBinder::sendObituary. */
-    virtual status_t requestDeathNotice(uint32_t handle) = 0;
-    virtual void clearDeathNotice(uint32_t handle) = 0;
-
-    /** @return the service manager; nullptr, with the reason, while none answers. */
-    virtual sp<::android::hidl::manager::V1_2::IServiceManager> serviceManager(
-            std::string* whyNot) = 0;
-
-    /** @return whether the service manager is a process of its own. */
-    virtual bool hasServiceManager() const { return false; }
+    /** @return this as the driver that finds services itself; nullptr where a manager does that. */
+    virtual LocalDriver* localDriver() { return nullptr; }
     /** Makes an object the service manager of every process. @return OK, or why not. */
     virtual status_t becomeContextManager(const sp<BHwBinder>& /* object */) {
         return INVALID_OPERATION;
     }
 
-    /** @return whether it can carry calls, now or later. */
-    virtual bool isUsable() const { return true; }
+    /** @return OK if it can carry calls, now or later. */
+    virtual Error check() const { return {}; }
     /** @return what this is, in words: "/dev/hwbinder". */
     virtual std::string name() const = 0;
 };
@@ -67,9 +76,7 @@ std::string environment(const char* name);
 
 /** @return how long a call may take, in ms; 0 without a limit. */
 int callTimeout();
-
-/** @return why this thread's last search for a service has failed; set by what searches. */
-std::string& lookupError();
+void setCallTimeout(int milliseconds);
 
 /** Sets this thread's caller while one of its calls is served. */
 class CallerIdentity {
