@@ -4,34 +4,36 @@
 #include "support/Operations.h"
 
 #include "PrivateSysfs.h"
+#include "SimulatedDriver.h"
 #include "Vibrator.h"
 
 #include <benchmark/benchmark.h>
 #include <fcntl.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <cstdlib>
 #include <memory>
 
 namespace {
 
 using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
+using namespace tests;
 using model::Layout;
 
 const std::string kDirectory = model::sysfsDirectory(Layout::kLedTrigger);
 
 /** Makes the nodes anew, as the operation expects them. @return its accesses of nodes. */
-std::vector<Step> prepare(const Operation& operation) {
+Steps prepare(const Operation& operation) {
     model::Features features;
     for (const std::string& name : model::featureNames())
         features.names.insert(name);
     if (simulator::createNodes("", Layout::kLedTrigger, features) != 0) abort();
-    std::vector<Step> steps = parseSteps(Layout::kLedTrigger, operation.steps);
+    Steps steps = parseSteps(Layout::kLedTrigger, operation.steps);
     prepareNodes("", Layout::kLedTrigger, steps);
-    const auto isNone = [](const Step& step) { return !step.isAccess() || step.isAfterFailure; };
-    steps.erase(std::remove_if(steps.begin(), steps.end(), isNone), steps.end());
-    return steps;
+    Steps accesses;
+    for (const Step* access : accessesOf(steps))
+        accesses.push_back(*access);
+    return accesses;
 }
 
 void runOperation(benchmark::State& state, const Operation& operation) {
@@ -78,7 +80,7 @@ void runFloor(benchmark::State& state, const Operation& operation) {
 
 void registerOperations() {
     for (const Operation& operation : allOperations()) {
-        const std::string name = "operation/" + operation.name;
+        const std::string name = "operation/" + operation.name();
         benchmark::RegisterBenchmark(name.c_str(), runOperation, operation);
         benchmark::RegisterBenchmark((name + "/floor").c_str(), runFloor, operation);
     }

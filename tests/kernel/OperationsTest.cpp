@@ -12,6 +12,7 @@ namespace {
 using ::android::sp;
 using ::android::hardware::IPCThreadState;
 using ::vendor::velmora::hardware::vibrator::V2_1::implementation::Vibrator;
+using namespace tests;
 
 const std::string kLed = "/sys/class/leds/vibrator/";
 
@@ -37,7 +38,7 @@ TEST_F(OperationsTest, AnswersAreThoseOfTheObjectForEveryCaller) {
         ASSERT_EQ(seteuid(uid), 0);
         for (const Operation& operation : allOperations()) {
             const std::string expected = outcome(operation, *local);
-            EXPECT_EQ(outcome(operation, *remote), expected) << operation.name << " by " << uid;
+            EXPECT_EQ(outcome(operation, *remote), expected) << operation.name() << " by " << uid;
         }
         ASSERT_EQ(seteuid(0), 0);
     }

@@ -1,14 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "support/Answer.h"
 
+namespace tests {
 namespace {
 
 struct InWords {
     std::string operator()(bool answer) const { return answer ? "true" : "false"; }
-    std::string operator()(VibratorStatus status) const {
-        const char* const names[] = {"OK", "UNKNOWN_ERROR", "BAD_VALUE", "UNSUPPORTED_OPERATION"};
-        return names[static_cast<size_t>(status)];
-    }
+    std::string operator()(VibratorStatus status) const { return toString(status); }
     std::string operator()(const StatusAndNumber& answer) const {
         return "(" + (*this)(answer.first) + ", " + std::to_string(answer.second) + ")";
     }
@@ -27,3 +25,5 @@ std::string Answer::inWords() const {
     if (times != 1) return "answered " + std::to_string(times) + " times";
     return std::visit(InWords(), value);
 }
+
+}  // namespace tests

@@ -7,6 +7,8 @@
 #include <utility>
 #include <variant>
 
+namespace tests {
+
 using IDaxVibrator = ::vendor::velmora::hardware::vibrator::V2_1::IDaxVibrator;
 using VibratorStatus = ::android::hardware::vibrator::V1_0::Status;
 using StatusAndNumber = std::pair<VibratorStatus, uint32_t>;
@@ -42,3 +44,5 @@ Answer answerTo(Operation operation) {
     answer.isOk = result.isOk();
     return answer;
 }
+
+}  // namespace tests

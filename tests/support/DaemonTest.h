@@ -12,6 +12,8 @@
 #include <string>
 #include <vector>
 
+using tests::IDaxVibrator;
+
 /** The real daemon, in a process of its own, on a simulated driver. */
 class DaemonTest : public ::testing::Test {
   protected:

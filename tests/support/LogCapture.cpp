@@ -25,18 +25,12 @@ std::string LogCapture::takeText() {
     return text;
 }
 
-Lines LogCapture::takeLines() {
-    return cutDown(takeText());
-}
-
-Lines cutDown(const std::string& log) {
+std::string cutDown(const std::string& log) {
     const std::string ownTag = "/QorVibrator-HAL2.1(";
-    Lines lines;
-    std::istringstream text(log);
-    for (std::string line; std::getline(text, line);) {
-        const size_t message = line.find("): ") + 3;
-        const bool isOwn = line.compare(1, ownTag.size(), ownTag) == 0;
-        lines.push_back(isOwn ? line[0] + (" " + line.substr(message)) : line);
+    std::string all;
+    std::istringstream lines(log);
+    for (std::string line; std::getline(lines, line); all += line + "\n") {
+        if (line.compare(1, ownTag.size(), ownTag) == 0) line.replace(1, line.find("): ") + 2, " ");
     }
-    return lines;
+    return all;
 }

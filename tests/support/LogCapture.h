@@ -2,9 +2,6 @@
 #pragma once
 
 #include <string>
-#include <vector>
-
-using Lines = std::vector<std::string>;
 
 /** Collects, in place of the terminal, what this process writes to standard error. */
 class LogCapture {
@@ -16,11 +13,6 @@ class LogCapture {
 
     /** @return what has been written since the last call. */
     std::string takeText();
-    /**
-     * @return the lines since the last call, each cut down to its priority and its message, like
-     *     "E Pemission denied (2000)"; a line of another tag than the service object's is whole.
-     */
-    Lines takeLines();
 
   private:
     int mBefore;
@@ -28,5 +20,8 @@ class LogCapture {
     long mRead = 0;
 };
 
-/** @return the lines of a log, cut down as takeLines does. */
-Lines cutDown(const std::string& log);
+/**
+ * @return a log, with each line of the service object's tag cut down to its priority and message,
+ *     like "E Pemission denied (2000)".
+ */
+std::string cutDown(const std::string& log);

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "support/Operations.h"
 
+namespace tests {
 namespace {
 
 constexpr char kUnknown[] = "UNKNOWN_ERROR";
@@ -10,18 +11,17 @@ constexpr char kNone[] = "(UNSUPPORTED_OPERATION, 0)";
 }  // namespace
 
 std::vector<Operation> allOperations() {
-    using I = IDaxVibrator;
     using Packets = std::vector<::vendor::velmora::hardware::vibrator::V2_0::DaxHapticEnginePacket>;
     return {
-            {"on", call(&I::on, 500), "OK", "on=500", kUnknown},
-            {"off", call(&I::off), "OK", "off", kUnknown},
-            {"supportsAmplitudeControl", call(&I::supportsAmplitudeControl), "true", R"(
-                (; @; intensity?; )
+            {CALL(on)(500), "OK", "on=500", kUnknown},
+            {CALL(off)(), "OK", "off", kUnknown},
+            {CALL(supportsAmplitudeControl)(), "true", R"(
+                (daxSupportsAmplitudeControl; @; intensity?; )
                 !E supportsAmplitudeControl is impossible
                 D supportsAmplitudeControl is possible)",
              "false"},
-            {"setAmplitude", call(&I::setAmplitude, 128), "OK", R"(
-                (; @; intensity?; )
+            {CALL(setAmplitude)(128), "OK", R"(
+                (daxSupportsAmplitudeControl; @; intensity?; )
                 !E setAmplitude is impossible because of intensity
                 !=UNSUPPORTED_OPERATION
                 D Setting amplitude to: 5001
@@ -29,54 +29,44 @@ std::vector<Operation> allOperations() {
                 !E Failed to set amplitude {error})",
              kUnknown},
             // A click is reported as played whatever fails, and goes on to its strength.
-            {"perform", call(&I::perform, 0, 1), "(OK, 20)", R"(
+            {CALL(perform)(0, 1), "(OK, 20)", R"(
                 D perform start effect : 0, strength : 1
-                on=20~
-                (
-                (; @; intensity?; )
+                ~on=20
+                ~(setAmplitude
+                (daxSupportsAmplitudeControl; @; intensity?; )
                 !E setAmplitude is impossible because of intensity
                 D Setting amplitude to: 5001
                 intensity=5001
                 !E Failed to set amplitude {error}
-                )~
+                )
                 D perform end effect)",
              ""},
-            {"perform_1_1", call(&I::perform_1_1, 0, 1), kNone,
-             "D perform_1_1 start effect : 0, strength : 1", ""},
-            {"perform_1_2", call(&I::perform_1_2, 0, 1), kNone,
-             "D perform_1_2 start effect : 0, strength : 1", ""},
-            {"supportsExternalControl", call(&I::supportsExternalControl), "true", "ext_control?",
-             "false"},
+            {CALL(perform_1_1)(0, 1), kNone, "D perform_1_1 start effect : 0, strength : 1", ""},
+            {CALL(perform_1_2)(0, 1), kNone, "D perform_1_2 start effect : 0, strength : 1", ""},
+            {CALL(supportsExternalControl)(), "true", "ext_control?", "false"},
             // A motor that cannot be asked counts as idle.
-            {"setExternalControl", call(&I::setExternalControl, true), "OK", R"(
+            {CALL(setExternalControl)(true), "OK", R"(
                 running?
                 D isVibrating : false
                 D setExternalControl external control set as true
                 ext_control=1
                 !E THE_DEVICE_EXT_CONTROL is impossible)",
              kUnsupported},
-            {"perform_1_3", call(&I::perform_1_3, 0, 1), kNone,
-             "D perform_1_3 start effect : 0, strength : 1", ""},
-            {"daxSupportsAmplitudeControl", call(&I::daxSupportsAmplitudeControl), "true",
-             "@; intensity?", "false"},
-            {"daxSupportsForceTouchAmplitudeControl",
-             call(&I::daxSupportsForceTouchAmplitudeControl), "true", "@; force_touch_intensity?",
+            {CALL(perform_1_3)(0, 1), kNone, "D perform_1_3 start effect : 0, strength : 1", ""},
+            {CALL(daxSupportsAmplitudeControl)(), "true", "@; intensity?", "false"},
+            {CALL(daxSupportsForceTouchAmplitudeControl)(), "true", "@; force_touch_intensity?",
              "false"},
-            {"daxSupportsFrequencyControl", call(&I::daxSupportsFrequencyControl), "true",
-             "@; multi_freq?", "false"},
-            {"daxSupportsHapticEngine", call(&I::daxSupportsHapticEngine), "true",
-             "@; haptic_engine?", "false"},
-            {"daxSupportsPrebakedHapticPattern", call(&I::daxSupportsPrebakedHapticPattern), "true",
-             "@; cp_trigger_index?", "false"},
-            {"daxSupportsFolderStatusSetting", call(&I::daxSupportsFolderStatusSetting), "true", R"(
+            {CALL(daxSupportsFrequencyControl)(), "true", "@; multi_freq?", "false"},
+            {CALL(daxSupportsHapticEngine)(), "true", "@; haptic_engine?", "false"},
+            {CALL(daxSupportsPrebakedHapticPattern)(), "true", "@; cp_trigger_index?", "false"},
+            {CALL(daxSupportsFolderStatusSetting)(), "true", R"(
                 D daxSupportsFolderStatusSetting starts
                 @
                 event_cmd:511="FOLDER_OPEN\n"
                 D daxSupportsFolderStatusSetting TRUE)",
              "false"},
             // A motor whose name cannot be read is judged by the haptic engine.
-            {"daxSupportsEnhancedVelmoraHapticPattern",
-             call(&I::daxSupportsEnhancedVelmoraHapticPattern), "true", R"(
+            {CALL(daxSupportsEnhancedVelmoraHapticPattern)(), "true", R"(
                 @
                 motor_type?r
                 !haptic_engine?
@@ -85,13 +75,11 @@ std::vector<Operation> allOperations() {
                 motor_type:31r="LINEAR_1040\n"
                 D daxSupportsEnhancedVelmoraHapticPattern LINEAR_1040)",
              "false"},
-            {"daxSetAmplitude", call(&I::daxSetAmplitude, 7000), "OK", "@; intensity=7000",
+            {CALL(daxSetAmplitude)(7000), "OK", "@; intensity=7000", kUnknown},
+            {CALL(daxSetForceTouchAmplitude)(6000), "OK", "@; force_touch_intensity=6000",
              kUnknown},
-            {"daxSetForceTouchAmplitude", call(&I::daxSetForceTouchAmplitude, 6000), "OK",
-             "@; force_touch_intensity=6000", kUnknown},
-            {"daxSetFrequencyType", call(&I::daxSetFrequencyType, 3), "OK", "@; multi_freq=3",
-             kUnknown},
-            {"daxSetFolderStatus", call(&I::daxSetFolderStatus, 1), "OK", R"(
+            {CALL(daxSetFrequencyType)(3), "OK", "@; multi_freq=3", kUnknown},
+            {CALL(daxSetFolderStatus)(1), "OK", R"(
                 D daxSetFolderStatus starts
                 @
                 D FOLDER_CLOSE\n
@@ -102,8 +90,7 @@ std::vector<Operation> allOperations() {
                 D ret : 13
                 D daxSetFolderStatus end)",
              kUnknown},
-            {"daxGetNumberOfPrebakedHapticPattern", call(&I::daxGetNumberOfPrebakedHapticPattern),
-             "(OK, 12)", R"(
+            {CALL(daxGetNumberOfPrebakedHapticPattern)(), "(OK, 12)", R"(
                 @
                 num_waves?r
                 !D daxGetNumberOfPrebakedHapticPattern unsupports
@@ -113,19 +100,16 @@ std::vector<Operation> allOperations() {
                 D daxGetNumberOfPrebakedHapticPattern value : 12)",
              "(UNKNOWN_ERROR, 0)"},
             // That the motor is set off is no part of the answer.
-            {"daxPerformHapticEngine",
-             call(&I::daxPerformHapticEngine, Packets{{10, 5000, 150, 0}, {20, 10000, 200, 1}},
-                  5000),
+            {CALL(daxPerformHapticEngine)(Packets{{10, 5000, 150, 0}, {20, 10000, 200, 1}}, 5000),
              "OK", R"(
                 @
                 D daxPerformHapticEngine : 8 10 2500 150 0 20 5000 200 1\n
                 haptic_engine="8 10 2500 150 0 20 5000 200 1\n"
                 !D daxPerformHapticEngine UNKNOWN_ERROR
-                on=1~
+                ~on=1
                 D daxPerformHapticEngine OK)",
              kUnknown},
-            {"daxPerformPrebakedHapticPattern",
-             call(&I::daxPerformPrebakedHapticPattern, 3, 5050, false), "OK", R"(
+            {CALL(daxPerformPrebakedHapticPattern)(3, 5050, false), "OK", R"(
                 D daxPerformPrebakedHapticPattern pattern : 3, amplitude : 5050
                 @
                 D daxPerformPrebakedHapticPattern one shoot starts
@@ -137,8 +121,7 @@ std::vector<Operation> allOperations() {
                 !D daxPerformPrebakedHapticPattern on fail
                 D daxPerformPrebakedHapticPattern one shoot end)",
              kUnknown},
-            {"daxPerformPrebakedHapticPattern/repeat",
-             call(&I::daxPerformPrebakedHapticPattern, 3, 5050, true), "OK", R"(
+            {CALL(daxPerformPrebakedHapticPattern)(3, 5050, true), "OK", R"(
                 D daxPerformPrebakedHapticPattern pattern : 3, amplitude : 5050
                 @
                 D daxPerformPrebakedHapticPattern repeat starts
@@ -152,12 +135,12 @@ std::vector<Operation> allOperations() {
                 on=1000
                 !D daxPerformPrebakedHapticPattern on Trigger fail
                 D daxPerformPrebakedHapticPattern end)",
-             kUnknown},
+             kUnknown, "/repeat"},
             // Without its name the motor is taken for a LINEAR_INDEX, which has another ladder.
-            {"daxGetAmplitudeList", call(&I::daxGetAmplitudeList, 0), "true [ 0 1000 5000 9000 ]",
+            {CALL(daxGetAmplitudeList)(0), "true [ 0 1000 5000 9000 ]",
              R"(
                 @
-                (
+                (getMotorIndex
                 D getMotorIndex return motor type >>
                 motor_type:31="COINDC_PMIC\n"
                 D getMotorIndex return motor type : 3 <<
@@ -183,3 +166,5 @@ std::vector<Operation> allOperations() {
              "false [ ]"},
     };
 }
+
+}  // namespace tests

@@ -11,15 +11,28 @@
 #include <utility>
 #include <vector>
 
-/** A call of an operation with certain arguments, and what it does. */
-struct Operation {
+namespace tests {
+
+/** A call of an operation with certain arguments. */
+struct Call {
     std::string name;
-    std::function<Answer(IDaxVibrator&)> call;
+    std::function<Answer(IDaxVibrator&)> make;
+
+    Answer operator()(IDaxVibrator& vibrator) const { return make(vibrator); }
+};
+
+/** A call, and what it does. */
+struct Operation {
+    Call call;
     std::string answer;
     /** In the notation of Steps.h. */
     std::string steps;
     /** The answer when a step fails that does not tell another one. */
     std::string answerFailed;
+    /** Distinguishes it from another call of the same operation. */
+    std::string variant = {};
+
+    std::string name() const { return call.name + variant; }
 };
 
 /** @return each operation of the interface, on a driver that has every feature and is at rest. */
@@ -43,19 +56,30 @@ struct GivenTo<std::function<void(Given...)>> {
     using Type = std::pair<std::decay_t<Given>...>;
 };
 
-/** @return a call of an operation; its enums and structures are taken as plain numbers, too. */
-template <typename Result, typename Interface, typename... Taken, typename... Given>
-std::function<Answer(IDaxVibrator&)> call(
-        ::android::hardware::Return<Result> (Interface::*operation)(Taken...), Given... given) {
-    return [=](IDaxVibrator& vibrator) {
-        if constexpr (std::is_void_v<Result>) {
-            using Callback = std::tuple_element_t<sizeof...(Given), std::tuple<Taken...>>;
-            using Both = typename GivenTo<std::decay_t<Callback>>::Type;
-            return answerTo<Both>([&](const auto& callback) {
-                return (vibrator.*operation)(Argument<Given>{given}..., callback);
-            });
-        } else {
-            return answerOf((vibrator.*operation)(Argument<Given>{given}...));
-        }
+/** @return what makes a Call from arguments; enums and structures are taken as plain numbers, too.
+ */
+template <typename Result, typename Interface, typename... Taken>
+auto callsOf(const char* name,
+             ::android::hardware::Return<Result> (Interface::*operation)(Taken...)) {
+    return [=](auto... given) {
+        return Call{
+                name, [=](IDaxVibrator& vibrator) {
+                    if constexpr (std::is_void_v<Result>) {
+                        using Callback =
+                                std::tuple_element_t<sizeof...(given), std::tuple<Taken...>>;
+                        using Both = typename GivenTo<std::decay_t<Callback>>::Type;
+                        return answerTo<Both>([&](const auto& callback) {
+                            return (vibrator.*operation)(Argument<decltype(given)>{given}...,
+                                                         callback);
+                        });
+                    } else {
+                        return answerOf((vibrator.*operation)(Argument<decltype(given)>{given}...));
+                    }
+                }};
     };
 }
+
+/** CALL(on)(500) is a Call of on. */
+#define CALL(operation) ::tests::callsOf(#operation, &::tests::IDaxVibrator::operation)
+
+}  // namespace tests

@@ -2,18 +2,18 @@
 #include "support/Steps.h"
 
 #include "Faults.h"
+#include "support/Operations.h"
 
-#include <regex.h>
-
-#include <algorithm>
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <iostream>
-#include <iterator>
-#include <map>
+#include <regex>
+#include <sstream>
+#include <tuple>
 
+namespace tests {
 namespace {
 
 using model::Layout;
@@ -29,181 +29,133 @@ std::string expanded(Layout layout, const std::string& step) {
     const bool isTimed = layout == Layout::kTimedOutput;
     if (step == "off")
         return isTimed ? "enable=0" : "activate=0; !E THE_DEVICE_ACTIVATE is impossible";
-    if (step == "running?") return isTimed ? R"(enable:7="0\n"~)" : R"(duration:7="0\n"~)";
-    if (step.compare(0, 3, "on=") != 0) return step;
-    if (isTimed) return "enable=" + step.substr(3);
-    const size_t end = std::min(step.find('~'), step.size());
-    return "(; state=1; !E THE_DEVICE_STATE is impossible; duration=" + step.substr(3, end - 3) +
+    if (step == "running?") return isTimed ? R"(~enable:7="0\n")" : R"(~duration:7="0\n")";
+    const size_t number = step.find("on=") + strlen("on=");
+    if (step.compare(0, number, "on=") != 0 && step.compare(0, number, "~on=") != 0) return step;
+    const std::string mark = step.substr(0, step.find("on="));
+    if (isTimed) return mark + "enable=" + step.substr(number);
+    return mark +
+           "(on; state=1; !E THE_DEVICE_STATE is impossible; duration=" + step.substr(number) +
            "; !E THE_DEVICE_DURATION is impossible; activate=1; "
-           "!E THE_DEVICE_ACTIVATE is impossible; )" +
-           step.substr(end);
+           "!E THE_DEVICE_ACTIVATE is impossible; )";
 }
 
-/** The parts of a step that accesses a node; none if the text is no such step. */
-std::map<std::string, std::string> partsOfAccess(const std::string& text) {
-    static const char* const kGroups[] = {"",     "leaf",  "",       "open fault", "access", "size",
-                                          "read", "value", "quoted", "",           "fault",  "end"};
-    // Not std::regex, which takes the compiler seconds.
-    static const regex_t access = [] {
-        regex_t pattern;
-        if (regcomp(&pattern,
-                    R"re(^(\w+)(!(\w+))?(\?r?|=|:([0-9]+)(r?)=)(-?[0-9]+|"([^"]*)")?(!(\w+))?(~?)$)re",
-                    REG_EXTENDED) != 0)
-            abort();
-        return pattern;
-    }();
-    regmatch_t found[std::size(kGroups)];
-    std::map<std::string, std::string> parts;
-    if (regexec(&access, text.c_str(), std::size(found), found, 0) != 0) return parts;
-    for (size_t i = 1; i < std::size(found); ++i) {
-        if (found[i].rm_so < 0) continue;
-        parts[kGroups[i]] = text.substr(static_cast<size_t>(found[i].rm_so),
-                                        static_cast<size_t>(found[i].rm_eo - found[i].rm_so));
-    }
-    return parts;
-}
-
-Step parseStep(std::string text) {
-    Step step;
-    if (text[0] == '!') {
-        step.isAfterFailure = true;
-        text.erase(0, 1);
-    }
-    if (text.compare(0, 2, "D ") == 0 || text.compare(0, 2, "E ") == 0) {
-        step.text = text;
-    } else if (text[0] == '=') {
-        step.kind = Step::kAnswer;
-        step.text = text.substr(1);
-    } else if (text == "@") {
-        step.kind = Step::kGate;
-    } else if (text == "(") {
-        step.kind = Step::kBegin;
-    } else if (text == ")" || text == ")~") {
-        step.kind = Step::kEnd;
-        step.isOptional = text.size() > 1;
-    } else if (auto parts = partsOfAccess(text); !parts.empty()) {
-        const char kind = parts["access"][0];
-        const bool isQuoted = parts.count("quoted") > 0;
-        step.kind = kind == '?' ? Step::kProbe : kind == '=' ? Step::kWrite : Step::kRead;
-        step.leaf = parts["leaf"];
-        step.size = kind == ':' ? std::stoul(parts["size"]) : 0;
-        step.isPrimitive = kind == '?' || (kind == '=' ? !isQuoted : step.size == 7);
-        step.readsOnly =
-                parts["access"] == "?r" || parts["read"] == "r" || (kind == ':' && step.size == 7);
-        step.text = isQuoted ? parts["quoted"] : parts["value"] + "\\n";
-        if (const std::string& fault = parts["open fault"]; !fault.empty())
-            step.faults["open"] = fault;
-        if (const std::string& fault = parts["fault"]; !fault.empty())
-            step.faults[step.kind == Step::kProbe ? "open" : step.transfer()] =
-                    fault[0] == 'E' ? fault : "short=" + fault;
-        step.isFaultTold = !step.faults.empty();
-        step.isOptional = !parts["end"].empty();
-    } else {
+Step parseAccess(const std::string& text) {
+    // The node, a fault of its opening, the kind, a read's size, its mode, the number or the text,
+    // and a fault of the transfer.
+    static const std::regex pattern(
+            R"re((\w+)(?:!(\w+))?(\?r?|=|:(\d+)(r?)=)(-?\d+)?(?:"([^"]*)")?(?:!(\w+))?)re");
+    std::smatch parts;
+    if (!std::regex_match(text, parts, pattern)) {
         std::cerr << "\"" << text << "\" is no step\n";
         abort();
     }
+    const char kind = parts.str(3)[0];
+    Step step;
+    step.kind = kind == '?' ? Step::kProbe : kind == '=' ? Step::kWrite : Step::kRead;
+    step.leaf = parts[1];
+    step.size = kind == ':' ? std::stoul(parts[4]) : 0;
+    step.isPrimitive = kind == '?' || (kind == '=' ? !parts[7].matched : step.size == 7);
+    step.readsOnly = parts[3] == "?r" || parts[5] == "r" || step.size == 7;
+    step.text = parts[7].matched ? parts.str(7) : parts.str(6) + "\\n";
+    if (parts[2].matched) step.faults["open"] = parts[2];
+    if (parts[8].matched) {
+        const std::string fault = parts[8];
+        step.faults[kind == '?' ? "open" : step.transfer()] =
+                fault[0] == 'E' ? fault : "short=" + fault;
+    }
+    step.isOptional = !step.faults.empty();
     return step;
 }
 
-/** Follows the steps of one call. */
-class Play {
+Step parseStep(const std::string& text) {
+    if (text[0] == '=') return {Step::kAnswer, text.substr(1)};
+    if (text[0] == '(') return {Step::kBracket, text.substr(1)};
+    if (text == "@") return {Step::kGate, ""};
+    if (text.compare(0, 2, "D ") == 0 || text.compare(0, 2, "E ") == 0) return {Step::kLine, text};
+    return parseAccess(text);
+}
+
+/** @return the steps up to the end, or up to the bracket's that they are in. */
+Steps parse(std::istream& lines) {
+    Steps steps;
+    for (std::string line; std::getline(lines >> std::ws, line) && line[0] != ')';) {
+        const char mark = line[0];
+        Step step = parseStep(line.substr(mark == '!' || mark == '~' ? 1 : 0));
+        if (mark == '~') step.isOptional = true;
+        if (step.kind == Step::kBracket) step.children = parse(lines);
+        (mark == '!' ? steps.back().afterFailure : steps).push_back(step);
+    }
+    return steps;
+}
+
+/** Makes the steps of one call. */
+class Player {
   public:
-    Play(Layout layout, const std::vector<Step>& steps, const Circumstances& circumstances)
-        : mLayout(layout), mSteps(steps), mCircumstances(circumstances) {}
+    Player(Layout layout, const Operation& operation, uid_t caller)
+        : mLayout(layout), mName(operation.call.name), mCaller(caller) {}
 
-    Behaviour run(const std::string& answer, const std::string& answerFailed) {
-        mBehaviour.answer = answer;
-        for (size_t i = 0; i < mSteps.size(); ++i) {
-            if (mSteps[i].isAfterFailure || make(i)) continue;
-            while (!mSteps[i].isOptional) {
-                const size_t failed = i;
-                while (i + 1 < mSteps.size() && mSteps[i + 1].isAfterFailure) {
-                    if (mSteps[++i].kind == Step::kAnswer) {
-                        mBehaviour.answer = mSteps[i].text;
-                        return mBehaviour;
-                    }
-                    if (!mIsSaid || mSteps[i].kind != Step::kLine) make(i);
-                }
-                mIsSaid = false;
-                i = endOfBracket(failed);
-                if (i == mSteps.size()) {
-                    mBehaviour.answer = answerFailed;
-                    return mBehaviour;
-                }
+    /** @return whether the steps come to their end. */
+    bool play(const Steps& steps) {
+        for (const Step& step : steps) {
+            if (make(step) || step.isOptional) continue;
+            // A text that cannot be opened has said so already.
+            const bool isSaid = step.isAccess() && !step.isPrimitive && !mIsOpen;
+            for (const Step& next : step.afterFailure) {
+                if (next.kind != Step::kLine || !isSaid) make(next);
             }
-        }
-        return mBehaviour;
-    }
-
-  private:
-    /** @return the bracket's end that comes after a step. */
-    size_t endOfBracket(size_t i) const {
-        int depth = 1;
-        while (++i < mSteps.size() && depth > 0) {
-            if (mSteps[i].kind == Step::kBegin) ++depth;
-            if (mSteps[i].kind == Step::kEnd && --depth == 0) return i;
-        }
-        return mSteps.size();
-    }
-
-    void log(const std::string& line) { mBehaviour.log.push_back(line); }
-
-    void trace(const std::string& call, const std::string& result) {
-        if (!mPath.empty()) mBehaviour.trace.push_back(mNode + " " + call + " = " + result);
-    }
-
-    /** @return whether the steps that come next are what comes next. */
-    bool make(size_t i) {
-        const Step& step = mSteps[i];
-        if (step.kind == Step::kGate && mCircumstances.refused) {
-            const auto uid = static_cast<int>(*mCircumstances.refused);
-            log("E Pemission denied (" + std::to_string(uid) + ")");
             return false;
         }
-        if (step.kind == Step::kLine) {
-            log(replaced(replaced(step.text, "{result}", mResult), "{error}",
-                         "(" + std::to_string(mError) + "): " + strerror(mError)));
-        }
-        return !step.isAccess() || access(step) || step.isFaultTold;
+        return true;
     }
 
-    /** The name that the log lines of a text begin with. */
-    static std::string ownerOf(const Step& step) {
-        if (step.leaf == "haptic_engine") return "daxPerformHapticEngine";
-        if (step.leaf == "cp_trigger_queue") return "daxPerformPrebakedHapticPattern";
-        if (step.leaf == "motor_type")
-            return step.readsOnly ? "daxSupportsEnhancedVelmoraHapticPattern" : "getMotorIndex";
-        return step.kind == Step::kRead ? "daxSupportsFolderStatusSetting" : "daxSetFolderStatus";
+    Behaviour mShown;
+
+  private:
+    /** @return whether it goes well. */
+    bool make(const Step& step) {
+        switch (step.kind) {
+            case Step::kLine:
+                log(replaced(replaced(step.text, "{result}", mResult), "{error}",
+                             "(" + std::to_string(mError) + "): " + strerror(mError)));
+                return true;
+            case Step::kAnswer:
+                mShown.answer = step.text;
+                return true;
+            case Step::kGate:
+                if (mCaller == 0 || mCaller == 1000) return true;
+                log("E Pemission denied (" + std::to_string(static_cast<int>(mCaller)) + ")");
+                return false;
+            case Step::kBracket: {
+                const std::string caller = mName;
+                mName = step.text;
+                const bool isDone = play(step.children);
+                mName = caller;
+                return isDone;
+            }
+            default:
+                return access(step);
+        }
+    }
+
+    bool access(const Step& step) {
+        setNode(step.leaf);
+        if (step.isPrimitive) logBegin(step);
+        bool isDone = call(step, "open", step.readsOnly ? " O_RDONLY" : " O_RDWR", "0");
+        mIsOpen = isDone;
+        if (mIsOpen && step.kind != Step::kProbe) isDone = transfer(step);
+        logEnd(step, isDone);
+        const auto last = std::pair(mResult, mError);
+        if (mIsOpen) call(step, "close", "", "0");
+        std::tie(mResult, mError) = last;
+        return isDone;
     }
 
     void setNode(const std::string& leaf) {
-        const bool isEnable = leaf == "enable";
         const bool isLeds = leaf == "activate" || leaf == "duration" || leaf == "state";
-        const bool isTimed = isEnable || (!isLeds && mLayout == Layout::kTimedOutput);
+        const bool isTimed = leaf == "enable" || (!isLeds && mLayout == Layout::kTimedOutput);
         mNode = (isTimed ? "timed_output/" : "leds/") + leaf;
         mPath = sysfsDirectory(isTimed ? Layout::kTimedOutput : Layout::kLedTrigger) + leaf;
-        if (mCircumstances.isDriverAbsent && !isEnable && !isLeds) mPath.clear();
-    }
-
-    /** @return whether it goes well. */
-    bool access(const Step& step) {
-        setNode(step.leaf);
-        if (step.isPrimitive) log(logBegin(step));
-        const bool opens = call(step, "open", step.readsOnly ? " O_RDONLY" : " O_RDWR", "0");
-        const bool goesWell = opens && (step.kind == Step::kProbe || transfer(step));
-        if (goesWell) {
-            logSuccess(step);
-        } else {
-            logFailure(step, opens);
-        }
-        // A text that cannot be opened has said so already.
-        mIsSaid = !opens && !step.isPrimitive;
-        const int error = mError;
-        const std::string result = mResult;
-        if (opens) call(step, "close", "", "0");
-        mError = error;
-        mResult = result;
-        return goesWell;
     }
 
     bool transfer(const Step& step) {
@@ -219,7 +171,6 @@ class Play {
               const std::string& result, const std::string& shown = {}) {
         const auto entry = step.faults.find(name);
         std::string fault = entry == step.faults.end() ? "" : entry->second;
-        if (mCircumstances.isDriverAbsent) fault = "ENOENT";
         for (unsigned i = 0; fault == "EINTR" && name != "close" && i < step.times; ++i)
             trace(name + arguments, "-1 EINTR");
         if (fault == "EINTR" && name != "close") fault.clear();
@@ -232,59 +183,63 @@ class Play {
         return fault.empty();
     }
 
-    std::string logBegin(const Step& step) const {
-        if (step.kind == Step::kRead) return "D >> readNode node:" + mPath + " ";
-        if (step.kind == Step::kProbe) {
-            return (step.readsOnly ? "D isNodeExistForRead node:" : "D isNodeExist node:") + mPath +
-                   " ";
+    void logBegin(const Step& step) {
+        if (step.kind == Step::kRead) {
+            log("D >> readNode node:" + mPath + " ");
+        } else if (step.kind == Step::kProbe) {
+            log((step.readsOnly ? "D isNodeExistForRead node:" : "D isNodeExist node:") + mPath +
+                " ");
+        } else {
+            log("D >> writeNode node:" + mPath +
+                " val:" + step.text.substr(0, step.text.size() - strlen("\\n")));
         }
-        return "D >> writeNode node:" + mPath +
-               " val:" + step.text.substr(0, step.text.size() - strlen("\\n"));
     }
 
-    void logSuccess(const Step& step) {
-        if (step.kind == Step::kProbe) log("D true");
-        if (step.isPrimitive && step.kind == Step::kWrite) log("D << writeNode node OK");
-        if (step.isPrimitive && step.kind == Step::kRead) log("D << readNode done");
-        if (step.isPrimitive || step.kind == Step::kWrite) return;
-        const std::string owner = ownerOf(step);
-        std::string text = step.bytes();
+    void logEnd(const Step& step, bool isDone) {
+        const std::string owner = step.isPrimitive ? "" : mName + " ";
+        const bool isRead = step.kind == Step::kRead;
+        if (step.kind == Step::kProbe) {
+            log(isDone ? "D true" : "D false");
+        } else if (!mIsOpen && step.kind == Step::kWrite && !step.isPrimitive) {
+            log("E " + owner + "is fail: " + std::to_string(mError));
+        } else if (!mIsOpen || (isRead && !isDone && (mError != 0 || !step.isPrimitive))) {
+            log("E " + owner + "node: " + mPath + (mIsOpen ? " read" : " open") +
+                " failed. errno: " + std::to_string(mError));
+        } else if (step.isPrimitive) {
+            log(isRead   ? "D << readNode done"
+                : isDone ? "D << writeNode node OK"
+                         : "D << writeNode node UNKNOWN_ERROR");
+        } else if (isRead) {
+            logText(step.bytes());
+        }
+    }
+
+    /** Logs a text that was read. */
+    void logText(std::string text) {
         if (text.back() == '\n') {
-            log("D " + owner + " str has new-line char at the last");
+            log("D " + mName + " str has new-line char at the last");
             text.pop_back();
         }
         text = text.substr(0, text.find('\0'));
-        log("D " + owner + " string : " + replaced(text, "\n", "\\n") + " ");
-        log("D " + owner + " string len : " + std::to_string(text.size()) + " ");
+        log("D " + mName + " string : " + replaced(text, "\n", "\\n") + " ");
+        log("D " + mName + " string len : " + std::to_string(text.size()) + " ");
     }
 
-    void logFailure(const Step& step, bool opens) {
-        const std::string error = std::to_string(mError);
-        if (step.kind == Step::kProbe) {
-            log("D false");
-        } else if (step.kind == Step::kWrite && opens) {
-            if (step.isPrimitive) log("D << writeNode node UNKNOWN_ERROR");
-        } else if (step.kind == Step::kWrite && !step.isPrimitive) {
-            log("E " + ownerOf(step) + " is fail: " + error);
-        } else if (opens && step.isPrimitive && mError == 0) {
-            // Nothing at all was read, which is no number.
-            log("D << readNode done");
-        } else {
-            log("E " + (step.isPrimitive ? "" : ownerOf(step) + " ") + "node: " + mPath +
-                (opens ? " read" : " open") + " failed. errno: " + error);
-        }
+    void log(const std::string& line) { mShown.log += line + "\n"; }
+    void trace(const std::string& call, const std::string& result) {
+        mShown.trace += mNode + " " + call + " = " + result + "\n";
     }
 
     const Layout mLayout;
-    const std::vector<Step>& mSteps;
-    const Circumstances& mCircumstances;
-    Behaviour mBehaviour;
+    /** Of what is called: the operation, or one that it calls. */
+    std::string mName;
+    const uid_t mCaller;
     // Of the last access.
     std::string mNode;
     std::string mPath;
+    bool mIsOpen = false;
     std::string mResult;
     int mError = 0;
-    bool mIsSaid = false;
 };
 
 }  // namespace
@@ -297,48 +252,54 @@ std::string Step::bytes() const {
     return replaced(replaced(text, "\\n", "\n"), "\\0", std::string(1, '\0'));
 }
 
-std::vector<Step> parseSteps(Layout layout, const std::string& text) {
-    const auto each = [](const std::string& all, const auto& function) {
-        for (size_t at = 0; (at = all.find_first_not_of(" ;\n", at)) != std::string::npos;) {
-            const size_t end = std::min(all.find_first_of(";\n", at), all.size());
-            function(all.substr(at, end - at));
-            at = end;
-        }
-    };
-    std::vector<Step> steps;
-    each(text, [&](const std::string& one) {
-        each(expanded(layout, one),
-             [&](const std::string& part) { steps.push_back(parseStep(part)); });
-    });
-    return steps;
+Steps parseSteps(Layout layout, const std::string& text) {
+    std::istringstream steps(replaced(text, ";", "\n"));
+    std::stringstream lines;
+    for (std::string step; std::getline(steps >> std::ws, step);)
+        lines << replaced(expanded(layout, step), ";", "\n") << '\n';
+    return parse(lines);
 }
 
-Behaviour behaviourOf(Layout layout, const std::vector<Step>& steps, const std::string& answer,
-                      const std::string& answerFailed, const Circumstances& circumstances) {
-    return Play(layout, steps, circumstances).run(answer, answerFailed);
+std::vector<Step*> accessesOf(Steps& steps) {
+    std::vector<Step*> accesses;
+    for (Step& step : steps) {
+        if (step.isAccess()) accesses.push_back(&step);
+        const std::vector<Step*> inner = accessesOf(step.children);
+        accesses.insert(accesses.end(), inner.begin(), inner.end());
+    }
+    return accesses;
 }
 
-void prepareNodes(const std::string& directory, Layout layout, const std::vector<Step>& steps) {
+Behaviour behaviourOf(Layout layout, const Operation& operation, const Steps& steps, uid_t caller) {
+    Player player(layout, operation, caller);
+    player.mShown.answer = operation.answerFailed;
+    if (player.play(steps)) player.mShown.answer = operation.answer;
+    return player.mShown;
+}
+
+void prepareNodes(const std::string& directory, Layout layout, Steps steps) {
     // How often each call on a node is made, and what goes wrong with some of them, all in a row.
     std::map<std::pair<std::string, std::string>, unsigned> made;
     std::map<std::pair<std::string, std::string>, simulator::Fault> faults;
-    for (const Step& step : steps) {
-        if (!step.isAccess() || step.isAfterFailure) continue;
+    for (const Step* step : accessesOf(steps)) {
         // What the timed output shows is the time that is left, whatever its file holds.
-        if (step.kind == Step::kRead && step.leaf != "enable") {
-            const std::string file = directory + sysfsDirectory(layout) + step.leaf;
+        if (step->kind == Step::kRead && step->leaf != "enable") {
+            const std::string file = directory + sysfsDirectory(layout) + step->leaf;
             std::filesystem::remove(file);
-            std::ofstream(file) << step.bytes();
+            std::ofstream(file) << step->bytes();
         }
-        for (const auto& [call, text] : step.faults) {
-            const auto key = std::pair(step.leaf, call);
+        for (const auto& [call, text] : step->faults) {
+            const auto key = std::pair(step->leaf, call);
             const auto [entry, isNew] = faults.try_emplace(key, *simulator::parseFault(text));
             if (isNew) entry->second.after = made[key];
-            entry->second.times += step.times;
+            entry->second.times += step->times;
         }
-        for (const std::string& call : {std::string("open"), step.transfer(), std::string("close")})
-            ++made[std::pair(step.leaf, call)];
+        for (const std::string& call :
+             {std::string("open"), step->transfer(), std::string("close")})
+            ++made[std::pair(step->leaf, call)];
     }
     for (const auto& [key, fault] : faults)
         simulator::setFault(directory, key.first, key.second, fault);
 }
+
+}  // namespace tests

@@ -11,13 +11,24 @@
 
 #include <gtest/gtest.h>
 
-#include <functional>
+#include <ostream>
 #include <string>
+#include <vector>
+
+namespace model {
+
+inline void PrintTo(Layout layout, std::ostream* out) {
+    *out << (layout == Layout::kTimedOutput ? "TimedOutput" : "LedTrigger");
+}
+
+}  // namespace model
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 
 using ::android::hardware::CallerIdentity;
 using model::Layout;
+using namespace ::tests;
+using Lines = std::vector<std::string>;
 
 /** A service object on a simulated driver, with the driver's trace and the log to look at. */
 class VibratorTest : public ::testing::Test {
@@ -34,18 +45,17 @@ class VibratorTest : public ::testing::Test {
 
     /** @return where the node is on a device. */
     std::string path(const std::string& leaf) const { return sysfsDirectory(mLayout) + leaf; }
-    /** @return the accesses of nodes since the last call, without their times. */
-    Lines trace();
-    Lines log() { return mLog.takeLines(); }
+    /** @return the accesses of nodes since the last call, a line each, without their times. */
+    std::string trace();
+    /** @return the lines of the log since the last call, cut down. */
+    std::string log() { return cutDown(mLog.takeText()); }
 
     /** Makes a call on what there is, and compares all that it shows with its steps. */
-    void expectBehaviour(const Operation& operation, const std::vector<Step>& steps,
-                         const Circumstances& circumstances = {});
+    void expectBehaviour(const Operation& operation, const Steps& steps, uid_t uid = 1000);
     /** The same on a driver made anew. */
-    void expect(const Operation& operation, const std::vector<Step>& steps,
-                const Circumstances& circumstances = {});
-    void expect(const Operation& operation, const Circumstances& circumstances = {}) {
-        expect(operation, parseSteps(mLayout, operation.steps), circumstances);
+    void expect(const Operation& operation, const Steps& steps, uid_t uid = 1000);
+    void expect(const Operation& operation, uid_t uid = 1000) {
+        expect(operation, parseSteps(mLayout, operation.steps), uid);
     }
 
     /** The system user calls, whoever runs the tests. */
@@ -65,17 +75,13 @@ class BothLayoutsTest : public VibratorTest, public ::testing::WithParamInterfac
     BothLayoutsTest() { start(GetParam()); }
 
     /** Expects of a call an answer and steps, which also tell what goes wrong. */
-    void row(const std::function<Answer(IDaxVibrator&)>& call, const std::string& answer,
-             const std::string& steps) {
-        expect({"", call, answer, steps, ""});
+    void row(const Call& call, const std::string& answer, const std::string& steps) {
+        expect({call, answer, steps, ""});
     }
 };
 
-#define INSTANTIATE_FOR_BOTH_LAYOUTS(Suite)                                                 \
-    INSTANTIATE_TEST_SUITE_P(                                                               \
-            Layouts, Suite, ::testing::Values(Layout::kTimedOutput, Layout::kLedTrigger),   \
-            [](const auto& layout) {                                                        \
-                return layout.param == Layout::kTimedOutput ? "TimedOutput" : "LedTrigger"; \
-            })
+#define INSTANTIATE_FOR_BOTH_LAYOUTS(Suite)                                        \
+    INSTANTIATE_TEST_SUITE_P(Layouts, Suite, ::testing::ValuesIn(model::kLayouts), \
+                             ::testing::PrintToStringParamName())
 
 }  // namespace vendor::velmora::hardware::vibrator::V2_1::implementation

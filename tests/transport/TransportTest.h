@@ -16,6 +16,12 @@
 #include <thread>
 #include <vector>
 
+using tests::Answer;
+using tests::answerTo;
+using tests::IDaxVibrator;
+using tests::StatusAndNumber;
+using tests::VibratorStatus;
+
 /**
  * The daemon, without a look at what its driver is, and a way to it: a directory of sockets, or the
  * kernel's binder where HWBINDER_DEVICE names it.

@@ -4,7 +4,6 @@
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 namespace {
 
-using I = IDaxVibrator;
 using Packets = std::vector<DaxHapticEnginePacket>;
 
 constexpr char kOk[] = "OK";
@@ -17,13 +16,13 @@ INSTANTIATE_FOR_BOTH_LAYOUTS(ArgumentsTest);
 
 TEST_P(ArgumentsTest, OfOn) {
     for (const uint32_t ms : {0U, 1U, 2147483647U})
-        row(call(&I::on, ms), kOk, "on=" + std::to_string(ms));
+        row(CALL(on)(ms), kOk, "on=" + std::to_string(ms));
     if (mLayout == Layout::kTimedOutput) {
-        row(call(&I::on, 4294967295U), kOk, "enable=-1");
-        row(call(&I::on, 2147483648U), kOk, "enable=-2147483648");
+        row(CALL(on)(4294967295U), kOk, "enable=-1");
+        row(CALL(on)(2147483648U), kOk, "enable=-2147483648");
     } else {
         // The kernel's trigger takes unsigned numbers only.
-        row(call(&I::on, 4294967295U), "UNKNOWN_ERROR",
+        row(CALL(on)(4294967295U), "UNKNOWN_ERROR",
             "state=1; duration=-1!EINVAL; E THE_DEVICE_DURATION is impossible");
     }
 }
@@ -32,45 +31,45 @@ TEST_P(ArgumentsTest, OfSetAmplitude) {
     for (int amplitude = 1; amplitude <= 255; ++amplitude) {
         // 1 + (amplitude - 1) * 9999 / 254, rounded half up, in whole numbers.
         const std::string intensity = std::to_string(1 + ((amplitude - 1) * 9999 * 2 + 254) / 508);
-        row(call(&I::setAmplitude, amplitude), kOk,
+        row(CALL(setAmplitude)(amplitude), kOk,
             "intensity?; D Setting amplitude to: " + intensity + "; intensity=" + intensity);
     }
-    row(call(&I::setAmplitude, 0), kBad, "intensity?; E setAmplitude amplitude is BAD_VALUE 0");
-    row(call(&I::setAmplitude, 0), kUnsupported,
+    row(CALL(setAmplitude)(0), kBad, "intensity?; E setAmplitude amplitude is BAD_VALUE 0");
+    row(CALL(setAmplitude)(0), kUnsupported,
         "intensity?!EACCES; E setAmplitude is impossible because of intensity");
 }
 
 TEST_P(ArgumentsTest, OfEffects) {
     const std::string start = "D perform start effect : ";
     const std::string end = "; D perform end effect";
-    row(call(&I::perform, 0, 0), "(OK, 20)",
+    row(CALL(perform)(0, 0), "(OK, 20)",
         start + "0, strength : 0; on=20; intensity?; D Setting amplitude to: 1379; intensity=1379" +
                 end);
-    row(call(&I::perform, 0, 2), "(OK, 20)",
+    row(CALL(perform)(0, 2), "(OK, 20)",
         start +
                 "0, strength : 2; on=20; intensity?; D Setting amplitude to: 10000; "
                 "intensity=10000" +
                 end);
-    row(call(&I::perform, 0, 3), kNone, start + "0, strength : 3");
-    row(call(&I::perform, 0, 255), kNone, start + "0, strength : 255");
-    row(call(&I::perform, 1, 0), kNone, start + "1, strength : 0" + end);
-    row(call(&I::perform, 1, 3), kNone, start + "1, strength : 3" + end);
-    row(call(&I::perform, 4294967295U, 1), kNone, start + "-1, strength : 1" + end);
-    row(call(&I::perform_1_3, 21, 9), kNone, "D perform_1_3 start effect : 21, strength : 9");
+    row(CALL(perform)(0, 3), kNone, start + "0, strength : 3");
+    row(CALL(perform)(0, 255), kNone, start + "0, strength : 255");
+    row(CALL(perform)(1, 0), kNone, start + "1, strength : 0" + end);
+    row(CALL(perform)(1, 3), kNone, start + "1, strength : 3" + end);
+    row(CALL(perform)(4294967295U, 1), kNone, start + "-1, strength : 1" + end);
+    row(CALL(perform_1_3)(21, 9), kNone, "D perform_1_3 start effect : 21, strength : 9");
 }
 
 TEST_P(ArgumentsTest, OfExternalControl) {
-    row(call(&I::setExternalControl, false), kOk, R"(
+    row(CALL(setExternalControl)(false), kOk, R"(
         running?
         D isVibrating : false
         D setExternalControl external control set as false
         ext_control=0)");
     if (mLayout == Layout::kTimedOutput) return;
-    row(call(&I::setExternalControl, true), kUnsupported, R"(
+    row(CALL(setExternalControl)(true), kUnsupported, R"(
         duration:7="1\n"
         D isVibrating : true
         D setExternalControl external control while vibrating. Not supported)");
-    row(call(&I::setExternalControl, true), kOk, R"(
+    row(CALL(setExternalControl)(true), kOk, R"(
         duration:7="-1\n"
         D isVibrating : false
         D setExternalControl external control set as true
@@ -78,21 +77,20 @@ TEST_P(ArgumentsTest, OfExternalControl) {
 }
 
 TEST_P(ArgumentsTest, OfSettings) {
-    row(call(&I::daxSetAmplitude, 1), kOk, "intensity=1");
-    row(call(&I::daxSetAmplitude, 10000), kOk, "intensity=10000");
-    row(call(&I::daxSetForceTouchAmplitude, 1), kOk, "force_touch_intensity=1");
-    row(call(&I::daxSetForceTouchAmplitude, 10000), kOk, "force_touch_intensity=10000");
+    row(CALL(daxSetAmplitude)(1), kOk, "intensity=1");
+    row(CALL(daxSetAmplitude)(10000), kOk, "intensity=10000");
+    row(CALL(daxSetForceTouchAmplitude)(1), kOk, "force_touch_intensity=1");
+    row(CALL(daxSetForceTouchAmplitude)(10000), kOk, "force_touch_intensity=10000");
     for (const uint32_t amplitude : {0U, 10001U, 4294967295U}) {
         const std::string end = " amplitude is abnormal " + std::to_string(amplitude);
-        row(call(&I::daxSetAmplitude, amplitude), kBad, "E daxSetAmplitude" + end);
-        row(call(&I::daxSetForceTouchAmplitude, amplitude), kBad,
-            "E daxSetForceTouchAmplitude" + end);
+        row(CALL(daxSetAmplitude)(amplitude), kBad, "E daxSetAmplitude" + end);
+        row(CALL(daxSetForceTouchAmplitude)(amplitude), kBad, "E daxSetForceTouchAmplitude" + end);
     }
-    row(call(&I::daxSetFrequencyType, 0), kOk, "multi_freq=0");
-    row(call(&I::daxSetFrequencyType, 4), kOk, "multi_freq=4");
-    row(call(&I::daxSetFrequencyType, 5), kBad, "E daxSetFrequencyType is abnormal 5");
-    row(call(&I::daxSetFrequencyType, 4294967295U), kBad, "E daxSetFrequencyType is abnormal -1");
-    row(call(&I::daxSetFolderStatus, 0), kOk, R"(
+    row(CALL(daxSetFrequencyType)(0), kOk, "multi_freq=0");
+    row(CALL(daxSetFrequencyType)(4), kOk, "multi_freq=4");
+    row(CALL(daxSetFrequencyType)(5), kBad, "E daxSetFrequencyType is abnormal 5");
+    row(CALL(daxSetFrequencyType)(4294967295U), kBad, "E daxSetFrequencyType is abnormal -1");
+    row(CALL(daxSetFolderStatus)(0), kOk, R"(
         D daxSetFolderStatus starts
         D FOLDER_OPEN\n
         D length : 12
@@ -100,7 +98,7 @@ TEST_P(ArgumentsTest, OfSettings) {
         D ret : 12
         D daxSetFolderStatus end)");
     for (const uint32_t status : {2U, 4294967295U}) {
-        row(call(&I::daxSetFolderStatus, status), kBad,
+        row(CALL(daxSetFolderStatus)(status), kBad,
             "D daxSetFolderStatus starts; D daxSetFolderStatus BAD_VALUE");
     }
 }
@@ -111,16 +109,16 @@ TEST_P(ArgumentsTest, OfStoredPatterns) {
         return prefix + "pattern : " + std::to_string(static_cast<int>(pattern)) +
                ", amplitude : " + std::to_string(static_cast<int>(amplitude)) + "; ";
     };
-    const auto play = &I::daxPerformPrebakedHapticPattern;
-    row(call(play, 0, 1, false), kOk,
+    const auto play = CALL(daxPerformPrebakedHapticPattern);
+    row(play(0, 1, false), kOk,
         entry(0, 1) + prefix + "one shoot starts; intensity=1; cp_trigger_index=0");
-    row(call(play, 1, 10000, false), kOk,
+    row(play(1, 10000, false), kOk,
         entry(1, 10000) + prefix +
                 "one shoot starts; intensity=10000; cp_trigger_index=1; on=1000; " + prefix +
                 "one shoot end");
     for (const uint32_t amplitude : {0U, 10001U, 4294967295U}) {
         for (const bool repeat : {false, true}) {
-            row(call(play, 1, amplitude, repeat), kBad,
+            row(play(1, amplitude, repeat), kBad,
                 entry(1, amplitude) + "E daxPerformPrebakedHapticPattern amplitude is abnormal " +
                         std::to_string(amplitude));
         }
@@ -133,7 +131,7 @@ TEST_P(ArgumentsTest, OfStoredPatterns) {
             {3, 199, "3.1"}, {2147483648U, 10000, "-2147483648.100"}};
     for (const auto& [pattern, amplitude, start] : queued) {
         const std::string text = start + ", 10, 0~";
-        row(call(play, pattern, amplitude, true), kOk,
+        row(play(pattern, amplitude, true), kOk,
             entry(pattern, amplitude) + prefix + "repeat starts; " + prefix + ": " + text + " , " +
                     std::to_string(text.size()) + "; cp_trigger_index=65534; cp_trigger_queue=\"" +
                     text + "\\0\"; D ret : " + std::to_string(text.size() + 1) + "; on=1000; " +
@@ -142,15 +140,15 @@ TEST_P(ArgumentsTest, OfStoredPatterns) {
 }
 
 TEST_P(ArgumentsTest, OfHapticEnginePackets) {
-    const auto engine = &I::daxPerformHapticEngine;
+    const auto engine = CALL(daxPerformHapticEngine);
     const std::string prefix = "D daxPerformHapticEngine ";
     const auto plays = [&](const Packets& packets, uint32_t amplitude, const std::string& text) {
-        row(call(engine, packets, amplitude), kOk,
+        row(engine(packets, amplitude), kOk,
             prefix + ": " + text + "\\n; haptic_engine=\"" + text + "\\n\"; on=1; " + prefix +
                     "OK");
     };
     const auto refuses = [&](const Packets& packets, uint32_t amplitude, const std::string& why) {
-        row(call(engine, packets, amplitude), kBad, "E daxPerformHapticEngine " + why);
+        row(engine(packets, amplitude), kBad, "E daxPerformHapticEngine " + why);
     };
     plays({}, 10000, "0");
     plays({{1, 429496, 2, 3}}, 10000, "4 1 429496 2 3");
@@ -177,18 +175,21 @@ TEST_P(ArgumentsTest, OfHapticEnginePackets) {
     for (int i = 0; i < 339; ++i)
         longest += " -9999999 429496 99999999 -9999999";
     const std::string shown = (prefix + ": " + longest).substr(0, strlen("D ") + 1023);
-    row(call(engine, Packets(339, {-9999999, 429496, 99999999, -9999999}), 10000), "UNKNOWN_ERROR",
+    row(engine(Packets(339, {-9999999, 429496, 99999999, -9999999}), 10000), "UNKNOWN_ERROR",
         shown + "; haptic_engine=\"" + longest + "\\n\"!4096; " + prefix + "UNKNOWN_ERROR");
 }
 
 TEST_P(ArgumentsTest, AreNotLookedAtBeforeTheCaller) {
-    const CallerIdentity caller(2000, 1);
-    const std::string denied = "E Pemission denied (2000)";
-    row(call(&I::daxSetAmplitude, 0), "UNKNOWN_ERROR", denied);
-    row(call(&I::daxPerformHapticEngine, Packets(340), 0), "UNKNOWN_ERROR", denied);
-    row(call(&I::daxPerformPrebakedHapticPattern, 4294967295U, 0, true), "UNKNOWN_ERROR",
-        "D daxPerformPrebakedHapticPattern pattern : -1, amplitude : 0; " + denied);
-    row(call(&I::daxGetAmplitudeList, 2), "false [ ]", denied);
+    for (const Operation& operation : {
+                 Operation{CALL(daxSetAmplitude)(0), "", "@", "UNKNOWN_ERROR"},
+                 Operation{CALL(daxPerformHapticEngine)(Packets(340), 0), "", "@", "UNKNOWN_ERROR"},
+                 Operation{CALL(daxPerformPrebakedHapticPattern)(-1, 0, true), "",
+                           "D daxPerformPrebakedHapticPattern pattern : -1, amplitude : 0; @",
+                           "UNKNOWN_ERROR"},
+                 Operation{CALL(daxGetAmplitudeList)(2), "", "@", "false [ ]"},
+         }) {
+        expect(operation, 2000);
+    }
 }
 
 }  // namespace

@@ -6,15 +6,13 @@
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 namespace {
 
-using I = IDaxVibrator;
-
 class NodeTextsTest : public BothLayoutsTest {};
 INSTANTIATE_FOR_BOTH_LAYOUTS(NodeTextsTest);
 
 TEST_P(NodeTextsTest, LeadingNumberOfSevenBytesIsTheCount) {
     const auto expectCount = [&](const std::string& text, const std::string& answer,
                                  const std::string& value) {
-        row(call(&I::daxGetNumberOfPrebakedHapticPattern), answer,
+        row(CALL(daxGetNumberOfPrebakedHapticPattern)(), answer,
             "num_waves?r; num_waves:7=\"" + text +
                     "\"; D daxGetNumberOfPrebakedHapticPattern value : " + value);
     };
@@ -47,7 +45,7 @@ TEST_P(NodeTextsTest, OneOfFourLettersMeansFoldEvents) {
             {R"(\n)", false}, {R"(GEN\n)", false}, {R"(a\0D)", false}, {R"(0\nD\n)", true},
     };
     for (const auto& [text, supported] : cases) {
-        row(call(&I::daxSupportsFolderStatusSetting), supported ? "true" : "false",
+        row(CALL(daxSupportsFolderStatusSetting)(), supported ? "true" : "false",
             std::string("D daxSupportsFolderStatusSetting starts; event_cmd:511=\"") + text +
                     "\"; D daxSupportsFolderStatusSetting " + (supported ? "TRUE" : "FALSE"));
     }
@@ -55,15 +53,15 @@ TEST_P(NodeTextsTest, OneOfFourLettersMeansFoldEvents) {
 
 TEST_P(NodeTextsTest, OnlyTheExactNameMeansEnhancedPatterns) {
     const std::string prefix = "D daxSupportsEnhancedVelmoraHapticPattern ";
-    row(call(&I::daxSupportsEnhancedVelmoraHapticPattern), "true",
+    row(CALL(daxSupportsEnhancedVelmoraHapticPattern)(), "true",
         R"(motor_type?r; motor_type:31r="LINEAR_1040"; )" + prefix + "LINEAR_1040");
     for (const char* name : {R"(LINEAR_1040\n\n)", R"(linear_1040\n)", R"(LINEAR_1040 \n)",
                              R"(LINEAR_0832RC\n)", R"(LINEAR_104\n)", R"(\n)", "LINEAR_10400"}) {
-        row(call(&I::daxSupportsEnhancedVelmoraHapticPattern), "false",
+        row(CALL(daxSupportsEnhancedVelmoraHapticPattern)(), "false",
             std::string("motor_type?r; motor_type:31r=\"") + name + "\"; " + prefix +
                     "can not supports. Out of capability");
     }
-    row(call(&I::daxSupportsEnhancedVelmoraHapticPattern), "false",
+    row(CALL(daxSupportsEnhancedVelmoraHapticPattern)(), "false",
         "motor_type?r!ENOENT; haptic_engine?!ENOENT; "
         "E daxSupportsEnhancedVelmoraHapticPattern not supports");
 }
@@ -81,7 +79,7 @@ class LaddersTest : public BothLayoutsTest {
                     bool hasIndex = true) {
         const std::string prefix = "; D daxGetAmplitudeList ";
         const auto size = std::to_string(std::count(list.begin(), list.end(), ' ') - 2);
-        row(call(&I::daxGetAmplitudeList, type), list,
+        row(CALL(daxGetAmplitudeList)(type), list,
             finding + prefix + "type: " + std::to_string(type) + " : " + std::to_string(motor) +
                     "; cp_trigger_index?" + (hasIndex ? "" : "!ENOENT") + prefix +
                     (hasIndex ? "support" : "NOT support") + " index method" +
@@ -90,8 +88,8 @@ class LaddersTest : public BothLayoutsTest {
                                                "list_outputsize size: " + size));
     }
     static std::string named(const std::string& text, int motor) {
-        return "D getMotorIndex return motor type >>; motor_type:31=\"" + text +
-               "\"; D getMotorIndex return motor type : " + std::to_string(motor) + " <<";
+        return "(getMotorIndex; D getMotorIndex return motor type >>; motor_type:31=\"" + text +
+               "\"; D getMotorIndex return motor type : " + std::to_string(motor) + " <<; )";
     }
     /** @return the steps that infer a motor from its features, where its name says nothing. */
     static std::string inferred(const std::string& naming, const std::string& probes, int motor) {
@@ -125,23 +123,21 @@ TEST_P(LaddersTest, NameAndTypeSelectTheList) {
 
 TEST_P(LaddersTest, FeaturesSelectTheListOfAnUnknownMotor) {
     const std::string unreadable =
-            R"(D getMotorIndex return motor type >>; motor_type!EACCES:31="")";
+            R"((getMotorIndex; D getMotorIndex return motor type >>; motor_type!EACCES:31=""; ))";
     const std::string noIndex = "cp_trigger_index?!ENOENT; ";
     for (const char* name : {R"(NONE\n)", R"(LINEAR_1040\n\n)", R"(linear_1040\n)", R"( LINEAR\n)",
                              R"(LINEAR_104\n)", R"(\n)", R"(9\n)"}) {
         expectList(inferred(named(name, 0), "cp_trigger_index?; haptic_engine?", 5), 5, 0, kZ);
     }
     expectList(inferred(unreadable, "cp_trigger_index?; haptic_engine?!ENOENT", 9), 9, 1, kX);
-    const std::string enhanced = "D daxSupportsEnhancedVelmoraHapticPattern ";
-    expectList(inferred(unreadable,
-                        noIndex + "haptic_engine?; motor_type?r; motor_type:31r=\"LINEAR_1040\"; " +
-                                enhanced + "LINEAR_1040",
-                        7),
-               7, 0, kZ, false);
-    expectList(inferred(unreadable,
-                        noIndex + "haptic_engine?; motor_type?r; motor_type:31r=\"LINEAR\"; " +
-                                enhanced + "can not supports. Out of capability",
-                        6),
+    const auto enhanced = [&](const std::string& name, const std::string& verdict) {
+        return noIndex +
+               "haptic_engine?; (daxSupportsEnhancedVelmoraHapticPattern; motor_type?r; "
+               "motor_type:31r=\"" +
+               name + "\"; D daxSupportsEnhancedVelmoraHapticPattern " + verdict + "; )";
+    };
+    expectList(inferred(unreadable, enhanced("LINEAR_1040", "LINEAR_1040"), 7), 7, 0, kZ, false);
+    expectList(inferred(unreadable, enhanced("LINEAR", "can not supports. Out of capability"), 6),
                6, 1, kX, false);
     expectList(inferred(unreadable, noIndex + "haptic_engine?!ENOENT; intensity?", 2), 2, 1, kY,
                false);
@@ -152,7 +148,7 @@ TEST_P(LaddersTest, FeaturesSelectTheListOfAnUnknownMotor) {
 TEST_P(LaddersTest, UnknownTypeIsRefusedAfterTheMotorIsKnown) {
     for (const int type : {2, -1}) {
         const std::string number = std::to_string(type);
-        row(call(&I::daxGetAmplitudeList, type), kNoList,
+        row(CALL(daxGetAmplitudeList)(type), kNoList,
             named("LINEAR_1040", 7) + "; D daxGetAmplitudeList type: " + number +
                     " : 7; E daxGetAmplitudeList is abnormal " + number);
     }
