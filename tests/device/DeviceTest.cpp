@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "Attributes.h"
 #include "NodePathTable.h"
 #include "support/Process.h"
 
@@ -64,28 +65,41 @@ TEST(DeviceTest, BlueprintNamesWhatThereIs) {
                               "vendor.velmora.hardware.vibrator@2.1"}));
 }
 
-TEST(DeviceTest, InitStartsTheServiceAndGivesItTheNodes) {
-    std::multiset<std::string> given;
+TEST(DeviceTest, EveryListOfNodesIsTheTables) {
+    // Class hal is started on boot, after this; the trigger makes the nodes that are given away.
+    Texts init = {"service vendor.vibrator-2-1 " + kInstalled,
+                  "class hal",
+                  "user system",
+                  "group system",
+                  "on early-boot",
+                  "write /sys/class/leds/vibrator/trigger transient"};
+    const std::string guide = readFile(kSource + "/docs/device.md");
     for (const uint8_t mode : {kTimedOutputMode, kLedTriggerMode}) {
+        EXPECT_NE(guide.find("`" + std::string(kNodeDirectories[mode]) + "`"), std::string::npos);
         for (const NodeInfo& node : NodePathTable) {
-            if (node.isIn(mode)) given.insert(node.pathIn(mode));
+            if (node.isIn(mode)) init.push_back("chown system system " + node.pathIn(mode));
         }
     }
-    const std::string chown = "chown system system ";
-    // Class hal is started on boot, after this; the trigger makes the nodes that are given away.
-    Texts expected = {"service vendor.vibrator-2-1 " + kInstalled,
-                      "class hal",
-                      "user system",
-                      "group system",
-                      "on early-boot",
-                      "write /sys/class/leds/vibrator/trigger transient"};
-    const auto count = static_cast<std::ptrdiff_t>(expected.size());
-    for (const std::string& node : given)
-        expected.push_back(chown + node);
-    Texts lines = linesOf("device/" + kBinary + ".rc");
-    ASSERT_EQ(lines.size(), expected.size());
-    std::sort(lines.begin() + count, lines.end());
-    EXPECT_EQ(lines, expected);
+    EXPECT_EQ(linesOf("device/" + kBinary + ".rc"), init);
+
+    std::string given = "for node in";
+    std::set<std::string> expected;
+    for (const NodeInfo& node : NodePathTable) {
+        given += std::string(" ") + node.leaf;
+        expected.insert(std::string(node.onlyMode ? kNodeDirectories[*node.onlyMode] : "") +
+                        node.leaf + (node.isOnlyRead ? " r" : " rw"));
+        if (!node.onlyMode) continue;
+        EXPECT_NE(guide.find("`" + std::string(node.leaf) + "`"), std::string::npos) << node.leaf;
+    }
+    EXPECT_NE(readFile(NODES_SCRIPT).find(given + "; do\n"), std::string::npos);
+
+    std::set<std::string> simulated;
+    for (const model::Attribute& attribute : model::attributes()) {
+        const auto* layout = std::get_if<model::Layout>(&attribute.origin);
+        simulated.insert(std::string(layout != nullptr ? model::sysfsDirectory(*layout) : "") +
+                         attribute.leaf + ((attribute.mode & 0222) == 0 ? " r" : " rw"));
+    }
+    EXPECT_EQ(simulated, expected);
 }
 
 /** @return the interfaces that a manifest or a matrix names, each in all that is said of it. */
