@@ -80,7 +80,7 @@ TEST(ParcelTest, ObjectsAreReadAsWhatTheyAre) {
 
 TEST(ParcelTest, ListWithoutElementsIsWrittenAsOnADevice) {
     // One that has been emptied has an address all the same.
-    for (const size_t listed : {0, 1}) {
+    for (const size_t listed : {size_t{0}, size_t{1}}) {
         const hidl_vec<int32_t> list = listed == 0 ? hidl_vec<int32_t>() : hidl_vec<int32_t>(0);
         Parcel parcel;
         size_t parent = 0;

@@ -3,8 +3,8 @@
 #include "NodePathTable.h"
 #include "Queries.h"
 #include "TraceLine.h"
-#include "text/Text.h"
 #include "service/LocalDriver.h"
+#include "text/Text.h"
 
 #include <unistd.h>
 

@@ -2,8 +2,8 @@
 #include "Queries.h"
 
 #include "Commands.h"
-#include "text/Text.h"
 #include "service/LocalDriver.h"
+#include "text/Text.h"
 
 #include <chrono>
 #include <thread>
