@@ -9,10 +9,10 @@ using namespace vibratorctl;
 /** The input is a score: mistakes are in its lines, and a score without mistakes can be played. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     static Client client;
-    if (client.stepKinds().empty()) addCommands(client);
+    if (client.steps.empty()) addCommands(client);
     const std::string text(reinterpret_cast<const char*>(data), size);
     Score score;
-    const std::vector<ScoreError> errors = parseScore(text, client.stepKinds(), &score);
+    const std::vector<ScoreError> errors = parseScore(text, client.steps, &score);
     for (const ScoreError& error : errors) {
         if (error.line == 0 || error.column == 0 || error.column > size + 1) abort();
     }

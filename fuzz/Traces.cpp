@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "traffic/AccessReader.h"
 #include "traffic/Picture.h"
 #include "traffic/TextPlot.h"
 
@@ -10,8 +11,8 @@ using namespace vibratorctl;
 
 /** The input is a trace and a log, drawn in all ways, whole and in part. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-    AccessReader trace(false);
-    AccessReader log(true);
+    TraceReader trace;
+    LogReader log;
     std::vector<NodeAccess> accesses;
     std::istringstream lines(std::string(reinterpret_cast<const char*>(data), size));
     for (std::string line; std::getline(lines, line);) {

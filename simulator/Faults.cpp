@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Faults.h"
 
-#include "TraceFile.h"
-
 #include <fcntl.h>
 #include <sys/file.h>
 #include <unistd.h>
@@ -85,7 +83,7 @@ bool setFault(const std::string& directory, const std::string& leaf, const std::
 
 std::optional<Fault> takeFault(const Folder& directory, const std::string& leaf,
                                const std::string& operation) {
-    const int file = onlyLooks() ? -1 : directory.open(fileName(leaf, operation), O_RDWR);
+    const int file = directory.open(fileName(leaf, operation), O_RDWR);
     if (file < 0) return std::nullopt;
     std::optional<Fault> fault;
     if (flock(file, LOCK_EX) == 0) fault = countDown(file);

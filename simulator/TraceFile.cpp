@@ -13,8 +13,6 @@ namespace {
 
 constexpr char kTraceName[] = "trace";
 
-bool sOnlyLooks = false;
-
 }  // namespace
 
 std::string traceFile(const std::string& directory) {
@@ -23,7 +21,7 @@ std::string traceFile(const std::string& directory) {
 
 void trace(const Folder& directory, const std::string& access, long result,
            const std::string& shown) {
-    if (sOnlyLooks || !isMarked(directory)) return;
+    if (!isMarked(directory)) return;
     const std::string line = model::traceLine(access, result, shown);
     const int file = directory.open(kTraceName, O_WRONLY | O_APPEND | O_CREAT, 0644);
     struct stat info;
@@ -34,14 +32,6 @@ void trace(const Folder& directory, const std::string& access, long result,
         [[maybe_unused]] const ssize_t written = write(file, line.data(), line.size());
     }
     close(file);
-}
-
-void onlyLook() {
-    sOnlyLooks = true;
-}
-
-bool onlyLooks() {
-    return sOnlyLooks;
 }
 
 }  // namespace simulator

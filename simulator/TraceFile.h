@@ -17,9 +17,4 @@ std::string traceFile(const std::string& directory);
 void trace(const Folder& directory, const std::string& access, long result,
            const std::string& shown = {});
 
-/** From now on this process only looks: its accesses are not traced, and faults do not apply. */
-void onlyLook();
-/** @return whether this process only looks. */
-bool onlyLooks();
-
 }  // namespace simulator

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "support/Process.h"
+#include "traffic/AccessReader.h"
 #include "traffic/Picture.h"
 #include "traffic/TextPlot.h"
 
@@ -31,7 +32,7 @@ TEST(AccessReaderTest, TellsTimes) {
             {"[   77.500000] host vibrator[539]: D/", "77.500000", 77.5},
             {"1732486683.125   539   541 D ", "1732486683.125", 1732486683.125 - 20051 * 86400.0}};
     for (const auto& [start, clock, seconds] : forms) {
-        AccessReader reader(true);
+        LogReader reader;
         reader.read(start + tag + ">> writeNode node:/sys/class/leds/vibrator/state val:1");
         const auto access = reader.read(start + tag + "<< writeNode node OK");
         ASSERT_TRUE(access) << start;

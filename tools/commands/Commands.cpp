@@ -25,9 +25,9 @@ void addCall(Client& client, cli::Command& command, const OneArgument& argument,
         return choices.empty() ? std::to_string(number()) : choices[number()].value;
     };
     command.run([=, &client] {
-        return client.answer(operation, call(*client.service(), number()), {shown()});
+        return client.report().answer(operation, call(*client.service(), number()), {shown()});
     });
-    client.addStep({command.name(), &command});
+    client.steps.push_back({command.name(), &command});
 }
 
 }  // namespace vibratorctl

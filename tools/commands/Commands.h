@@ -1,9 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "service/Client.h"
+#include "Amplitude.h"
+#include "Client.h"
 
 namespace vibratorctl {
+
+namespace product = ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
 /** Adds all commands, in the order of the help. */
 void addCommands(Client& client);
@@ -24,7 +27,8 @@ inline constexpr char kRestricted[] = "For root and system";
 inline constexpr char kTools[] = "Tools";
 
 /** The driver's own scale, up to full strength; numbers out of range go to the service, too. */
-inline constexpr cli::Numbers kIntensities = {"an intensity", 1, 10000, UINT32_MAX};
+inline constexpr cli::Numbers kIntensities = {"an intensity", 1, product::kMaxAmplitude,
+                                              UINT32_MAX};
 
 /** The only argument of a command: a number, or one of some words. */
 struct OneArgument {

@@ -1,5 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
+#include "HapticEngineText.h"
+#include "Input.h"
+#include "PrebakedPatterns.h"
 #include "scores/Packets.h"
 
 #include <algorithm>
@@ -7,6 +10,8 @@
 namespace vibratorctl {
 
 namespace {
+
+constexpr size_t kMaxPackets = product::HapticEngineText::kMaxPackets;
 
 /** @return the status of the query for the number of stored patterns. */
 VibratorStatus countPatterns(const Client& client, uint32_t* count) {
@@ -30,8 +35,8 @@ void addCount(Client& client) {
             answer.words = std::to_string(count) + " patterns";
             answer.members["count"] = count;
         }
-        return client.answer({"daxGetNumberOfPrebakedHapticPattern", true, {"num_waves"}}, status,
-                             answer);
+        return client.report().answer({"daxGetNumberOfPrebakedHapticPattern", true, {"num_waves"}},
+                                      status, answer);
     });
 }
 
@@ -39,16 +44,14 @@ int playPattern(const Client& client, uint32_t pattern, uint32_t amplitude, bool
     const Operation operation = {"daxPerformPrebakedHapticPattern",
                                  true,
                                  {"cp_trigger_index", "intensity", "cp_trigger_queue"},
-                                 "an amplitude is 1 to 10000"};
+                                 "an amplitude is " + kIntensities.range()};
     Answer answer{std::to_string(pattern)};
     uint32_t count = 0;
     if (countPatterns(client, &count) == VibratorStatus::OK && pattern > count) {
-        const std::string warning = "the driver counts only " + std::to_string(count) +
-                                    " stored patterns; it may play nothing";
-        client.warn("prebaked play " + answer.argument + ": " + warning);
-        answer.members["warning"] = warning;
+        answer.warning = "the driver counts only " + std::to_string(count) +
+                         " stored patterns; it may play nothing";
     }
-    return client.answer(
+    return client.report().answer(
             operation,
             client.service()->daxPerformPrebakedHapticPattern(pattern, amplitude, isRepeated),
             answer);
@@ -60,14 +63,14 @@ void addPattern(Client& client) {
             client.command(kRestricted, "prebaked play",
                            "play a pattern that the driver has stored", "3 --amplitude 5000");
     const auto pattern = command.number("PATTERN", kPatterns, "0 selects without playing");
-    const auto amplitude =
-            command.number("--amplitude N", kIntensities, "how strong; 10000 is full", 10000);
+    const auto amplitude = command.number("--amplitude N", kIntensities,
+                                          "how strong; 10000 is full", kIntensities.most);
     const auto isRepeated = command.flag("--repeat", "play it through the driver's queue");
     command.run([=, &client] { return playPattern(client, *pattern, *amplitude, *isRepeated); });
-    client.addStep({"pattern", &command, [=]() -> std::optional<double> {
-                        if (*pattern == 0) return std::nullopt;
-                        return 1000;
-                    }});
+    client.steps.push_back({"pattern", &command, [=]() -> std::optional<double> {
+                                if (*pattern == 0) return std::nullopt;
+                                return product::kPatternMs;
+                            }});
 }
 
 Packets readPackets(const std::vector<std::string>& words, const std::string& file) {
@@ -87,7 +90,7 @@ Packets readPackets(const std::vector<std::string>& words, const std::string& fi
 }
 
 /**
- * Checks that no intensity overflows 32 bits when the service scales it by amplitude / 10000.
+ * Checks that no intensity overflows 32 bits, in which the service multiplies it by the amplitude.
  *
  * @throw cli::UsageError
  */
@@ -101,18 +104,29 @@ void checkScaling(const Packets& packets, uint32_t amplitude) {
     }
 }
 
-/** Refuses what the service would refuse. @return how long the packets last, in ms. */
-double judgePackets(const Packets& packets) {
-    constexpr size_t kMost = 339;
-    if (packets.size() > kMost) throw cli::UsageError("more than 339 packets");
-    double length = 0;
+/** @return the limit that packets, or their amplitude, go beyond; empty if they keep to all. */
+std::string limitOf(const Packets& packets, uint32_t amplitude) {
+    if (packets.size() > kMaxPackets) {
+        return std::to_string(packets.size()) + " packets are more than " +
+               std::to_string(kMaxPackets);
+    }
+    if (!product::isAmplitude(amplitude)) return "an amplitude is " + kIntensities.range();
     for (const auto& packet : packets) {
-        length += std::max(0, packet.param0);
         for (const int32_t value : {packet.param0, packet.param2, packet.param3}) {
-            if (value >= -9'999'999 && value <= 99'999'999) continue;
-            throw cli::UsageError(std::to_string(value) + " has more than 8 characters");
+            if (!product::isEngineValue(value))
+                return std::to_string(value) + " has more than 8 characters";
         }
     }
+    return "";
+}
+
+/** Refuses what the service would refuse. @return how long the packets last, in ms. */
+double judgePackets(const Packets& packets, uint32_t amplitude) {
+    if (const std::string limit = limitOf(packets, amplitude); !limit.empty())
+        throw cli::UsageError(limit);
+    double length = 0;
+    for (const auto& packet : packets)
+        length += std::max(0, packet.param0);
     return length;
 }
 
@@ -122,8 +136,9 @@ void addEngine(Client& client) {
                            "10,5000,150,0 20,10000,200,1 --amplitude 5000");
     const auto file =
             command.file("--file FILE", "CSV or JSON file of packets; - is standard input", "");
-    const auto amplitude = command.number("--amplitude N", kIntensities,
-                                          "scales the intensities; 10000 leaves them", 10000);
+    const auto amplitude =
+            command.number("--amplitude N", kIntensities,
+                           "scales the intensities; 10000 leaves them", kIntensities.most);
     const auto words = command.words("PACKET", "PARAM0,INTENSITY,PARAM2,PARAM3, whole numbers",
                                      [](const std::string& word) { readPackets({word}, ""); });
     const auto packets = [=] {
@@ -134,17 +149,16 @@ void addEngine(Client& client) {
     command.run([=, &client] {
         const Packets read = packets();
         const Operation operation = {
-                "daxPerformHapticEngine",
-                true,
-                {"haptic_engine"},
-                "at most 339 packets, an amplitude of 1 to 10000, values of at most 8 characters"};
+                "daxPerformHapticEngine", true, {"haptic_engine"}, limitOf(read, *amplitude)};
         const std::string count = std::to_string(read.size());
-        return client.answer(operation, client.service()->daxPerformHapticEngine(read, *amplitude),
-                             {"",
-                              count + (read.size() == 1 ? " packet" : " packets"),
-                              {{"packets", read.size()}}});
+        return client.report().answer(operation,
+                                      client.service()->daxPerformHapticEngine(read, *amplitude),
+                                      {"",
+                                       count + (read.size() == 1 ? " packet" : " packets"),
+                                       {{"packets", read.size()}}});
     });
-    client.addStep({"engine", &command, [packets] { return judgePackets(packets()); }});
+    client.steps.push_back(
+            {"engine", &command, [=] { return judgePackets(packets(), *amplitude); }});
 }
 
 }  // namespace

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
+#include "Input.h"
 #include "text/Text.h"
 
 #include <chrono>
@@ -40,9 +41,7 @@ void wait(uint32_t ms) {
 int playStep(Client& client, const ScoreStep& step) {
     if (step.command == nullptr) {
         wait(step.pause);
-        nlohmann::ordered_json members = {{"argument", step.argument()}};
-        members.update(step.place());
-        return client.found("", members);
+        return client.report().found("", {{"argument", step.argument()}});
     }
     // Other steps may have set the command's arguments.
     step.command->readStep(step.words);
@@ -70,14 +69,13 @@ int playScore(Client& client, const std::string& file, const Score& score) {
         const std::string place =
                 file + ":" + std::to_string(step.line) + ":" + std::to_string(step.column);
         int code = cli::kSuccess;
-        client.setStep(&step);
+        const Subject play = client.report().setSubject({step.name, step.argument(), step.place()});
         try {
             code = playStep(client, step);
         } catch (const Unreachable& error) {
-            client.setStep(nullptr);
             throw Unreachable(std::string(error.what()) + ", at " + place);
         }
-        client.setStep(nullptr);
+        client.report().setSubject(play);
         if (code != cli::kSuccess) return stop(client, "FAILED", place + ": the step failed");
         std::cout.flush();
         if (interruption != 0) {
@@ -91,7 +89,7 @@ int playScore(Client& client, const std::string& file, const Score& score) {
 
 int play(Client& client, const std::string& file, bool isCheck) {
     Score score;
-    const auto errors = parseScore(readInput(file), client.stepKinds(), &score);
+    const auto errors = parseScore(readInput(file), client.steps, &score);
     for (const ScoreError& error : errors) {
         client.complain("USAGE", file + ":" + std::to_string(error.line) + ":" +
                                          std::to_string(error.column) + ": " + error.what);
@@ -102,9 +100,10 @@ int play(Client& client, const std::string& file, bool isCheck) {
     if (!errors.empty()) return cli::kUsage;
     if (!isCheck) return playScore(client, file, score);
     const size_t steps = score.order.size();
-    return client.found("OK, " + std::to_string(steps) + (steps == 1 ? " step, " : " steps, ") +
-                                cli::durationInWords(score.seconds()) + "\n",
-                        {{"steps", steps}, {"seconds", score.seconds()}});
+    return client.report().found("OK, " + std::to_string(steps) +
+                                         (steps == 1 ? " step, " : " steps, ") +
+                                         cli::durationInWords(score.seconds()) + "\n",
+                                 {{"steps", steps}, {"seconds", score.seconds()}});
 }
 
 }  // namespace

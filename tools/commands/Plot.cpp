@@ -1,7 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
+#include "Input.h"
 #include "Traffic.h"
 #include "text/Text.h"
+#include "traffic/AccessReader.h"
 #include "traffic/Picture.h"
 #include "traffic/TextPlot.h"
 
@@ -51,18 +53,17 @@ void writeWhole(const std::string& file, const std::string& bytes) {
     throw std::runtime_error(file + ": cannot be written: " + reason);
 }
 
-Timeline readTimeline(const Traffic& traffic) {
-    AccessReader reader(traffic.isLog());
+Timeline readTimeline(const std::string& file) {
+    AccessReader reader;
     std::vector<NodeAccess> accesses;
-    std::istringstream lines(readInput(traffic.file()));
+    std::istringstream lines(readInput(file));
     for (std::string line; std::getline(lines, line);) {
         if (const auto access = reader.read(line)) accesses.push_back(*access);
     }
     Timeline timeline = makeTimeline(accesses);
     if (!timeline.marks.empty()) return timeline;
-    throw cli::UsageError(traffic.file() + ": no write to the driver in it; is it " +
-                          (traffic.isLog() ? "the daemon's log?"
-                                           : "a trace? For the daemon's log give --log, too"));
+    throw cli::UsageError(file +
+                          ": no write to the driver in it; is it a trace, or the daemon's log?");
 }
 
 /** @return the time that an option gives, in s, or what holds without it. */
@@ -88,7 +89,7 @@ PictureFormat formatOf(const std::string& name, size_t format) {
 void addPlot(Client& client) {
     cli::Command& command = client.command(kTools, "plot", "draw what the driver was told",
                                            "--last 10s -o plot.svg");
-    const Traffic traffic(command);
+    const auto traffic = addTraffic(command);
     const auto output = command.file("-o,--output FILE",
                                      "picture to draw, .svg or .png, by gnuplot; - for standard "
                                      "output; without it, text",
@@ -105,8 +106,8 @@ void addPlot(Client& client) {
     command.withoutJson().run([=] {
         const bool isText = output->empty();
         const PictureFormat kind = isText ? PictureFormat::kSvg : formatOf(*output, *format);
-        if (!isText && *output != "-") checkTarget(*output, traffic.file());
-        Timeline timeline = readTimeline(traffic);
+        if (!isText && *output != "-") checkTarget(*output, traffic());
+        Timeline timeline = readTimeline(traffic());
         const double length = timeline.end;
         const double start = last->empty() ? 0 : length - timeOf("--last", *last, 0);
         if (!last->empty() && !(from->empty() && to->empty())) {

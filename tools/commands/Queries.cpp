@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Queries.h"
+#include "service/Queries.h"
 
 #include "Commands.h"
-#include "service/LocalDriver.h"
 #include "text/Text.h"
 
 #include <chrono>
@@ -11,44 +10,6 @@
 namespace vibratorctl {
 
 using nlohmann::ordered_json;
-
-const std::vector<Query> kQueries = {
-        {"supportsAmplitudeControl", "amplitudes of the platform",
-         &IDaxVibrator::supportsAmplitudeControl, nullptr},
-        {"supportsExternalControl", "external control", &IDaxVibrator::supportsExternalControl,
-         "external-control"},
-        {"daxSupportsAmplitudeControl", "intensities", &IDaxVibrator::daxSupportsAmplitudeControl,
-         "amplitude"},
-        {"daxSupportsForceTouchAmplitudeControl", "force-touch feedback",
-         &IDaxVibrator::daxSupportsForceTouchAmplitudeControl, "force-touch"},
-        {"daxSupportsFrequencyControl", "frequency types",
-         &IDaxVibrator::daxSupportsFrequencyControl, "frequency"},
-        {"daxSupportsHapticEngine", "haptic engine packets", &IDaxVibrator::daxSupportsHapticEngine,
-         "haptic-engine"},
-        {"daxSupportsPrebakedHapticPattern", "stored patterns",
-         &IDaxVibrator::daxSupportsPrebakedHapticPattern, "prebaked"},
-        {"daxSupportsFolderStatusSetting", "fold state",
-         &IDaxVibrator::daxSupportsFolderStatusSetting, "fold"},
-        {"daxSupportsEnhancedVelmoraHapticPattern", "enhanced patterns",
-         &IDaxVibrator::daxSupportsEnhancedVelmoraHapticPattern, nullptr},
-};
-
-std::vector<uint32_t> askLadder(IDaxVibrator& vibrator, uint32_t type) {
-    using ::vendor::velmora::hardware::vibrator::V2_1::DaxAmplitudeType;
-    std::vector<uint32_t> ladder;
-    reached(vibrator.daxGetAmplitudeList(
-            static_cast<DaxAmplitudeType>(type), [&](bool supported, const auto& amplitudes) {
-                if (supported) ladder.assign(amplitudes.begin(), amplitudes.end());
-            }));
-    return ladder;
-}
-
-std::string ladderInWords(const std::vector<uint32_t>& ladder) {
-    std::string words;
-    for (const uint32_t step : ladder)
-        words += (words.empty() ? "" : " ") + std::to_string(step);
-    return words.empty() ? "none" : words;
-}
 
 namespace {
 
@@ -61,10 +22,10 @@ int supports(const Client& client) {
     ordered_json answers;
     for (const Query& query : kQueries) {
         const bool answer = reached((*vibrator.*query.ask)());
-        answers[query.operation] = answer;
-        const bool mayAsk = permitted || query.ask == &IDaxVibrator::supportsExternalControl;
+        const bool mayAsk = permitted || query.isForAll;
+        answers[query.operation] = mayAsk ? ordered_json(answer) : nullptr;
         words += std::string(query.words) + ": " + (answer ? "yes" : mayAsk ? "no" : "may not ask");
-        if (client.isVerbose()) words += std::string(" [") + query.operation + "]";
+        if (client.report().isVerbose()) words += std::string(" [") + query.operation + "]";
         words += "\n";
     }
     ordered_json members = {{"permitted", permitted}, {"supports", answers}};
@@ -72,7 +33,7 @@ int supports(const Client& client) {
         members["reason"] = notPermitted();
         client.warn("supports: " + notPermitted());
     }
-    return client.found(words, members);
+    return client.report().found(words, members);
 }
 
 /** @return the service, waited for up to some seconds. @throw Unreachable */
@@ -91,39 +52,41 @@ int supports(const Client& client) {
 
 int status(const Client& client, uint32_t seconds) {
     const auto vibrator = await(client, seconds);
-    const Description description = describe(vibrator);
+    const Route route = describeRoute();
+    const auto server = serverOf(*vibrator);
     std::vector<std::string> interfaces;
     reached(vibrator->interfaceChain([&](const auto& chain) {
         for (const auto& descriptor : chain)
             interfaces.emplace_back(descriptor.c_str());
     }));
     const std::string indent = "\n            ";
-    return client.found("service:    " + client.instance() + ", answers\nserved by:  " +
-                                description.server + "\ntransport:  " + description.transport +
-                                "\nmanager:    " + description.manager +
-                                "\ninterfaces: " + cli::join(interfaces, indent, indent) + "\n",
-                        {{"instance", client.instance()},
-                         {"answers", true},
-                         {"server", description.server},
-                         {"transport", description.transport},
-                         {"manager", description.manager},
-                         {"interfaces", interfaces}});
+    return client.report().found(
+            "service:    " + client.instance() + ", answers\nserved by:  " + serverInWords(server) +
+                    "\ntransport:  " + route.transport + "\nmanager:    " + route.manager +
+                    "\ninterfaces: " + cli::join(interfaces, indent, indent) + "\n",
+            {{"instance", client.instance()},
+             {"answers", true},
+             {"server", serverAsJson(server)},
+             {"transport", route.transport},
+             {"manager", route.manager},
+             {"interfaces", interfaces}});
 }
 
 int ladder(const Client& client, uint32_t type) {
-    const auto steps = askLadder(*client.service(), type);
+    const auto vibrator = client.service();
+    const auto steps = askLadder(*vibrator, type);
     if (!steps.empty()) {
-        return client.answer(kLadder, VibratorStatus::OK,
-                             {"", ladderInWords(steps), {{"ladder", steps}}});
+        return client.report().answer(kLadder, VibratorStatus::OK,
+                                      {"", ladderInWords(steps), {{"ladder", steps}}});
     }
-    if (type > 1) return client.answer(kLadder, VibratorStatus::BAD_VALUE);
+    if (type > 1) return client.report().answer(kLadder, VibratorStatus::BAD_VALUE);
     Answer answer;
     if (mayCallRestricted()) {
-        const LocalDriver driver;
+        const LocalDriver driver = driverOf(*vibrator);
         answer.reason = driver.isUsable() ? "the motor, " + driver.motor().name + ", has no ladder"
                                           : "the motor has no ladder";
     }
-    return client.answer(kLadder, VibratorStatus::UNSUPPORTED_OPERATION, answer);
+    return client.report().answer(kLadder, VibratorStatus::UNSUPPORTED_OPERATION, answer);
 }
 
 int motor(const Client& client) {
@@ -131,22 +94,24 @@ int motor(const Client& client) {
     const bool isEnhanced = reached(vibrator->daxSupportsEnhancedVelmoraHapticPattern());
     const auto ladder0 = askLadder(*vibrator, 0);
     const auto ladder1 = askLadder(*vibrator, 1);
-    if (!mayCallRestricted()) return client.answer(kLadder, VibratorStatus::UNSUPPORTED_OPERATION);
+    if (!mayCallRestricted())
+        return client.report().answer(kLadder, VibratorStatus::UNSUPPORTED_OPERATION);
 
     ordered_json members;
-    std::string words = "not known, since its nodes cannot be opened here";
-    const LocalDriver driver;
+    std::string words = "not known, since the service has no driver";
+    const LocalDriver driver = driverOf(*vibrator);
     if (driver.isUsable()) {
         const LocalDriver::Motor motor = driver.motor();
         words = motor.inWords();
-        members = {{"name", motor.name}, {"number", motor.number}, {"found", motor.found}};
+        members = asJson(motor);
     }
     members["ladders"] = {{"0", ladder0}, {"1", ladder1}};
     members["enhancedPatterns"] = isEnhanced;
-    return client.found("motor:    " + words + "\nladder 0: " + ladderInWords(ladder0) +
-                                "\nladder 1: " + ladderInWords(ladder1) +
-                                "\nenhanced patterns: " + (isEnhanced ? "yes" : "no") + "\n",
-                        members);
+    return client.report().found("motor:    " + words + "\nladder 0: " + ladderInWords(ladder0) +
+                                         "\nladder 1: " + ladderInWords(ladder1) +
+                                         "\nenhanced patterns: " + (isEnhanced ? "yes" : "no") +
+                                         "\n",
+                                 members);
 }
 
 }  // namespace

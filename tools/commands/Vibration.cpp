@@ -1,5 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
+#include "EffectPlayback.h"
+#include "Strengths.h"
+#include "service/Queries.h"
 
 namespace vibratorctl {
 
@@ -11,8 +14,23 @@ namespace {
 cli::Value<size_t> addStrength(cli::Command& command) {
     constexpr size_t kMedium = 1;
     return command.choice("--strength STRENGTH",
-                          {{"light", "weak"}, {"medium", "as usual"}, {"strong", "full strength"}},
+                          {{kStrengths[0], "weak"},
+                           {kStrengths[1], "as usual"},
+                           {kStrengths[2], "full strength"}},
                           "how strong", kMedium);
+}
+
+/** @return what a click that is answered with OK does without; empty if nothing. */
+std::string whatClickLacks(const LocalDriver& driver) {
+    if (!driver.isUsable()) {
+        return R"(the service has no driver, nothing moved; "vibratorctl doctor" says what to do)";
+    }
+    if (!mayCallRestricted()) {
+        return "the strength is the one that was set before; only " + permittedUsers() +
+               " may change it";
+    }
+    if (driver.daxSupportsAmplitudeControl()) return "";
+    return "this driver has no control of the strength";
 }
 
 /**
@@ -40,8 +58,10 @@ int performEffect(const Client& client, const std::string& argument, uint32_t ef
                            : vibrator->perform(platform::V1_0::Effect{effect}, strength, take));
     if (status == VibratorStatus::UNSUPPORTED_OPERATION) {
         answer.reason = "this service plays one effect only: effect 0 of version 1.0, the click";
+    } else if (status == VibratorStatus::OK) {
+        answer.warning = whatClickLacks(driverOf(*vibrator));
     }
-    return client.answer({kOperations[version]}, status, answer);
+    return client.report().answer({kOperations[version]}, status, answer);
 }
 
 void addClick(Client& client) {
@@ -49,7 +69,7 @@ void addClick(Client& client) {
             client.command(kForAll, "click", "play the predefined click", "--strength strong");
     const auto strength = addStrength(click);
     click.run([&client, strength] { return performEffect(client, "", 0, 0, *strength); });
-    client.addStep({"click", &click, [] { return 20; }});
+    client.steps.push_back({"click", &click, [] { return product::kClickMs; }});
 }
 
 void addEffect(Client& client) {
@@ -76,13 +96,13 @@ void addVibration(Client& client) {
     cli::Command& on = client.command(kForAll, "on", "run the motor", "500");
     const auto ms = on.number("MS", kTimes, "how long, in ms");
     on.run([&client, ms] {
-        return client.answer({"on"}, client.service()->on(*ms), {std::to_string(*ms)});
+        return client.report().answer({"on"}, client.service()->on(*ms), {std::to_string(*ms)});
     });
-    client.addStep({"on", &on, [ms] { return *ms; }});
+    client.steps.push_back({"on", &on, [ms] { return *ms; }});
 
     cli::Command& off = client.command(kForAll, "off", "stop the motor", "");
-    off.run([&client] { return client.answer({"off"}, client.service()->off()); });
-    client.addStep({"off", &off, [] { return 0; }});
+    off.run([&client] { return client.report().answer({"off"}, client.service()->off()); });
+    client.steps.push_back({"off", &off, [] { return 0; }});
 
     addClick(client);
     addEffect(client);

@@ -3,7 +3,7 @@
 #include "TraceLine.h"
 #include "Traffic.h"
 #include "text/Text.h"
-#include "traffic/NodeAccess.h"
+#include "traffic/AccessReader.h"
 
 #include <fcntl.h>
 #include <unistd.h>
@@ -53,8 +53,7 @@ void print(const NodeAccess& access, bool isColoured) {
 /** Prints the access that each line ends; warns once if no line does. */
 class Printer {
   public:
-    Printer(const Client& client, const Traffic& traffic)
-        : mClient(client), mTraffic(traffic), mReader(traffic.isLog()) {}
+    Printer(const Client& client, std::string file) : mClient(client), mFile(std::move(file)) {}
 
     /** Takes what has come; an incomplete line is kept until the rest comes. */
     void take(const std::string& part) {
@@ -66,7 +65,7 @@ class Printer {
         }
         mLine.append(part, start);
         if (mLine.size() > kLongest) {
-            throw cli::UsageError(mTraffic.file() + ": a line of more than 1 MiB");
+            throw cli::UsageError(mFile + ": a line of more than 1 MiB");
         }
     }
     void forgetIncomplete() { mLine.clear(); }
@@ -78,9 +77,8 @@ class Printer {
     void end() {
         if (mIsKnown || mLines == 0) return;
         mIsKnown = true;
-        mClient.warn("watch: " + mTraffic.file() +
-                     (mTraffic.isLog() ? ": no log of the daemon"
-                                       : ": no trace of the driver; for a log give --log, too"));
+        mClient.warn("watch: " + mFile +
+                     ": no access of a node in it; is it a trace, or the daemon's log?");
     }
 
   private:
@@ -94,7 +92,7 @@ class Printer {
     }
 
     const Client& mClient;
-    const Traffic& mTraffic;
+    const std::string mFile;
     AccessReader mReader;
     std::string mLine;
     bool mIsColoured = wantsColour();
@@ -145,17 +143,16 @@ class GrowingFile {
 };
 
 /** Shows accesses as they come, or only those that are there. @return the exit code. */
-int watch(const Client& client, const Traffic& traffic, bool fromStart, bool once) {
-    const std::string name = traffic.file();
+int watch(const Client& client, const std::string& name, bool fromStart, bool once) {
     const bool isInput = name == "-";
     GrowingFile file(name);
     if (!isInput && !fromStart) file.skip();
     if (!once) {
-        std::cerr << "Waiting for " << (traffic.isLog() ? "lines of the daemon's log" : "accesses")
-                  << " in " << (isInput ? "standard input" : cli::printable(name))
-                  << "; Ctrl-C ends it." << std::endl;
+        std::cerr << "Waiting for accesses in "
+                  << (isInput ? "standard input" : cli::printable(name)) << "; Ctrl-C ends it."
+                  << std::endl;
     }
-    Printer printer(client, traffic);
+    Printer printer(client, name);
     while (std::cout) {
         const std::string part = file.read();
         printer.take(part);
@@ -175,13 +172,12 @@ int watch(const Client& client, const Traffic& traffic, bool fromStart, bool onc
 void addWatch(Client& client) {
     cli::Command& command = client.command(
             kTools, "watch", "show the service's node traffic as it comes", "--all --once");
-    const Traffic traffic(command);
+    const auto traffic = addTraffic(command);
     const auto fromStart = command.flag("--all", "also show what is there already");
     const auto once = command.flag("--once", "end instead of waiting for more");
     command.note(
-            "A trace does not show the calls that the service refused; the daemon's log, read with "
-            "--log, does.");
-    command.withoutJson().run([=, &client] { return watch(client, traffic, *fromStart, *once); });
+            "A trace does not show the calls that the service refused; the daemon's log does.");
+    command.withoutJson().run([=, &client] { return watch(client, traffic(), *fromStart, *once); });
 }
 
 }  // namespace vibratorctl

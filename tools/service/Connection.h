@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "service/Process.h"
+
 #include <hidl/Status.h>
 #include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
 
@@ -32,17 +34,17 @@ T reached(const ::android::hardware::Return<T>& result) {
     return static_cast<T>(result);
 }
 
-/** Who serves the calls, and how they get there; in words for a person. */
-struct Description {
+/** @return the process that serves the calls; nothing where /proc does not show it. */
+std::optional<Process> serverOf(IDaxVibrator& vibrator);
+
+/** How calls get to the service; in words for a person. */
+struct Route {
     /** What carries the calls. */
     std::string transport;
     /** Whether a service manager answers. */
     std::string manager;
-    /** Process and program; empty where there is no service. */
-    std::string server;
 };
 
-/** @param vibrator the service; nullptr where there is none. */
-Description describe(const ::android::sp<IDaxVibrator>& vibrator);
+Route describeRoute();
 
 }  // namespace vibratorctl

@@ -1,41 +1,74 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "service/LocalDriver.h"
 
-#include "Log.h"
-#include "MotorType.h"
-#include "NodePathTable.h"
+#include "AmplitudeLists.h"
+#include "FolderStatus.h"
 #include "SimulatedDriver.h"
-#include "TraceFile.h"
+#include "TextNode.h"
 
 #include <fcntl.h>
 #include <pwd.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <cstdio>
 #include <cstdlib>
+#include <utility>
 
 namespace vibratorctl {
 
 using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
-LocalDriver::LocalDriver() {
-    simulator::onlyLook();
-    // Only the daemon logs.
-    setenv("ANDROID_LOG_TAGS", (std::string(kLogTag) + ":S").c_str(), 1);
-    mVibrator = new Vibrator();
-    mIsUsable = !THE_DEVICE_INTENSITY.empty();
-    mIsThere = mIsUsable || look(THE_DEVICE_ENABLE).exists || look(THE_DEVICE_ACTIVATE).exists;
-    // The service's code ignores nodes that this user cannot open; doctor shows them.
-    if (mIsUsable) return;
-    DriverMode = look(THE_DEVICE_ENABLE).exists ? kTimedOutputMode : kLedTriggerMode;
-    for (const NodeInfo& node : NodePathTable) {
-        if (node.path != nullptr) *node.path = node.pathIn(DriverMode);
+namespace {
+
+/** @return the name that /etc/passwd has for a user, or the number; it needs no shared library. */
+std::string userName(uid_t uid) {
+    std::string name = std::to_string(uid);
+    std::FILE* users = fopen("/etc/passwd", "re");
+    if (users == nullptr) return name;
+    while (const passwd* user = fgetpwent(users)) {
+        if (user->pw_uid != uid) continue;
+        name = user->pw_name;
+        break;
     }
+    fclose(users);
+    return name;
 }
 
-LocalDriver::Node LocalDriver::look(const std::string& path) const {
+/** @return the first bytes of a file; empty where it cannot be read. */
+std::string readStart(const std::string& path) {
+    char text[512];
+    const int file = open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
+    const ssize_t size = read(file, text, sizeof(text));
+    if (file >= 0) close(file);
+    return {text, static_cast<size_t>(std::max<ssize_t>(size, 0))};
+}
+
+/** @return what a node shows; empty where this process cannot read it. */
+std::string readNode(const std::string& path, const simulator::Node* simulated) {
+    if (simulated == nullptr) return readStart(path);
+    const int file = simulator::openNode(*simulated, O_RDONLY);
+    if (file < 0) return "";
+    close(file);
+    return simulator::show(*simulated);
+}
+
+}  // namespace
+
+LocalDriver::LocalDriver(Process opener) : mOpener(std::move(opener)) {
+    const auto found = findDriverMode([this](const std::string& node) { return opens(node); });
+    const bool isTimed = look(THE_DEVICE_ENABLE).exists;
+    mIsUsable = found.has_value();
+    mIsThere = isTimed || look(THE_DEVICE_ACTIVATE).exists;
+    mMode = found.value_or(isTimed ? kTimedOutputMode : kLedTriggerMode);
+}
+
+std::string LocalDriver::path(const std::string& leaf) const {
+    return kNodeDirectories[mMode] + leaf;
+}
+
+LocalDriver::Node LocalDriver::look(const std::string& name) const {
+    const std::string path = name[0] == '/' ? name : this->path(name);
     simulator::Node simulated;
     const std::string simulation = simulator::inheritedDirectory();
     const bool isSimulated =
@@ -44,47 +77,63 @@ LocalDriver::Node LocalDriver::look(const std::string& path) const {
     Node node;
     if (stat(isSimulated ? simulated.file.c_str() : path.c_str(), &info) != 0) return node;
     node.exists = true;
-    const int readable = open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
-    const int writable = open(path.c_str(), O_WRONLY | O_CLOEXEC | O_NONBLOCK);
-    // Root may open any file, but the mode of a driver's attribute binds it, too.
-    node.reads = (info.st_mode & 0444) != 0 && readable >= 0;
-    node.writes = (info.st_mode & 0222) != 0 && writable >= 0;
-    if (node.reads) {
-        char text[512];
-        const ssize_t size = read(readable, text, sizeof(text));
-        node.value.assign(text, static_cast<size_t>(std::max<ssize_t>(size, 0)));
-    }
-    if (readable >= 0) close(readable);
-    if (writable >= 0) close(writable);
+    node.reads = mOpener.mayOpen(info, true, false);
+    node.writes = mOpener.mayOpen(info, false, true);
+    node.value = readNode(path, isSimulated ? &simulated : nullptr);
     char mode[8];
     snprintf(mode, sizeof(mode), "%04o", info.st_mode & 07777);
     node.mode = mode;
-    const passwd* user = getpwuid(info.st_uid);
-    node.owner = user != nullptr ? user->pw_name : std::to_string(info.st_uid);
+    node.uid = info.st_uid;
+    node.owner = userName(info.st_uid);
     return node;
+}
+
+bool LocalDriver::opens(const std::string& name) const {
+    const Node node = look(name);
+    return node.reads && node.writes;
 }
 
 std::string LocalDriver::layout() const {
     if (!mIsThere) return "none";
-    return DriverMode == kTimedOutputMode ? "timed output" : "LED trigger";
+    return mMode == kTimedOutputMode ? "timed output" : "LED trigger";
 }
 
-std::string LocalDriver::directory() const {
-    return THE_DEVICE_INTENSITY.substr(0, THE_DEVICE_INTENSITY.rfind('/') + 1);
+const char* LocalDriver::runningNode() const {
+    return mMode == kTimedOutputMode ? "enable" : "duration";
 }
 
 bool LocalDriver::isVibrating() const {
-    return mVibrator->isVibrating();
+    return atoi(look(runningNode()).value.c_str()) > 0;
+}
+
+bool LocalDriver::daxSupportsFolderStatusSetting() const {
+    return opens("event_cmd") &&
+           takesFolderStatus(textOf(look("event_cmd").value.substr(0, kFolderTextSize)));
+}
+
+bool LocalDriver::daxSupportsEnhancedVelmoraHapticPattern() const {
+    const Node node = look("motor_type");
+    if (!node.reads) return daxSupportsHapticEngine();
+    return motorOfName(textOf(node.value.substr(0, kMotorNameSize))) == kMotorLinear1040;
 }
 
 LocalDriver::Motor LocalDriver::motor() const {
-    int32_t number = mVibrator->getMotorIndex();
+    MotorType number = kMotorNone;
     const char* found = "by the driver's name for it";
+    if (opens("motor_type")) {
+        number = motorOfName(textOf(look("motor_type").value.substr(0, kMotorNameSize)));
+    }
     if (number == kMotorNone) {
-        number = mVibrator->getMotorIndexbyMethod();
+        number = motorOfFeatures(*this);
         found = "by the features of the driver";
     }
     return {number, MotorTypeNames[number], found};
+}
+
+std::vector<uint32_t> LocalDriver::ladder(uint32_t type) const {
+    using ::vendor::velmora::hardware::vibrator::V2_1::DaxAmplitudeType;
+    return selectAmplitudeList(motor().number, static_cast<DaxAmplitudeType>(type),
+                               daxSupportsPrebakedHapticPattern());
 }
 
 }  // namespace vibratorctl

@@ -1,7 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "NodePathTable.h"
-#include "service/Client.h"
+#include "service/Reasons.h"
+
+#include "CallerPermission.h"
 #include "service/LocalDriver.h"
+#include "service/System.h"
+#include "text/Text.h"
 
 #include <unistd.h>
 
@@ -11,44 +14,58 @@ using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
 namespace {
 
-/** @return why external control is refused while the motor counts as running. */
-std::string runningReason(const LocalDriver& driver) {
-    const bool isLed = DriverMode == kLedTriggerMode;
-    return std::string("refused while the motor counts as running (") +
-           (isLed ? "duration" : "enable") + " is " +
-           driver.look(isLed ? THE_DEVICE_DURATION : THE_DEVICE_ENABLE).firstLine() +
-           "); first: vibratorctl " + (isLed ? "on 0" : "off");
-}
+const std::string kDoctor = R"("vibratorctl doctor" says what to do)";
 
 }  // namespace
 
 bool mayCallRestricted() {
-    return getuid() == 0 || getuid() == 1000;
+    return isPermittedCaller(geteuid());
+}
+
+std::string permittedUsers() {
+    return "root and uid " + std::to_string(AID_SYSTEM) + " (system)";
 }
 
 std::string notPermitted() {
-    return "not permitted: only root and uid 1000 (system) may do this, not uid " +
-           std::to_string(getuid());
+    return "not permitted: only " + permittedUsers() + " may do this, not uid " +
+           std::to_string(geteuid());
 }
 
-std::string reasonOf(const Operation& operation, VibratorStatus status) {
+std::string howToStop(const LocalDriver& driver) {
+    // Switching the LED trigger off does not reset its duration.
+    return driver.mode() == kLedTriggerMode ? "vibratorctl on 0" : "vibratorctl off";
+}
+
+std::string reasonOf(const Operation& operation, VibratorStatus status, const Process& service) {
     if (operation.isRestricted && !mayCallRestricted()) return notPermitted();
-    if (status == VibratorStatus::BAD_VALUE) return "out of range: " + operation.range;
-    const LocalDriver driver;
-    if (!driver.isThere()) {
-        return "no vibrator driver is found; \"vibratorctl doctor\" says what to do";
+    if (status == VibratorStatus::BAD_VALUE) {
+        return operation.range.empty() ? "the service does not take the value"
+                                       : "out of range: " + operation.range;
     }
-    if (operation.name == "setExternalControl" && driver.isVibrating()) {
-        return runningReason(driver);
+    if (status != VibratorStatus::UNKNOWN_ERROR &&
+        status != VibratorStatus::UNSUPPORTED_OPERATION) {
+        return "the service answered with a status that this client does not know: " +
+               toString(status);
     }
+    const LocalDriver driver(service);
+    if (!driver.isThere()) return "no vibrator driver is found; " + kDoctor;
     for (const std::string& name : operation.nodes) {
-        const LocalDriver::Node node = driver.look(driver.directory() + name);
+        const LocalDriver::Node node = driver.look(name);
         if (!node.exists) return "this driver has no node \"" + name + "\"";
         if (driver.isUsable() && !(node.reads && node.writes)) {
-            return "the node \"" + name + R"(" cannot be opened; "vibratorctl doctor" says more)";
+            return "the service, uid " + std::to_string(service.uid) + ", cannot open the node \"" +
+                   name + "\"; " + kDoctor;
         }
     }
-    return "the driver has refused it; the service's log has the error";
+    if (operation.name == "setExternalControl" && driver.isVibrating()) {
+        return std::string("refused while the motor counts as running (") + driver.runningNode() +
+               " is " + driver.look(driver.runningNode()).firstLine() +
+               "); first: " + howToStop(driver);
+    }
+    const std::string nodes = operation.nodes.empty() ? "its nodes for the motor"
+                                                      : cli::join(operation.nodes, ", ", " or ");
+    return "the driver has refused it at " + nodes + ", or the service does not use the driver; " +
+           kDoctor + "; the error is in the service's log: " + thisSystem().log;
 }
 
 }  // namespace vibratorctl

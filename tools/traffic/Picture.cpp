@@ -9,6 +9,7 @@
 
 #include <algorithm>
 #include <cctype>
+#include <cerrno>
 #include <cstdio>
 #include <cstring>
 #include <fstream>
@@ -77,8 +78,10 @@ std::vector<Timeline::Mark> labelsOf(const std::vector<Timeline::Mark>& marks, d
 class MemoryFile {
   public:
     explicit MemoryFile(const std::string& text = {}) : mFile(memfd_create("plot", 0)) {
-        // If not everything fits, gnuplot fails.
-        [[maybe_unused]] const ssize_t written = write(mFile, text.data(), text.size());
+        if (write(mFile, text.data(), text.size()) == static_cast<ssize_t>(text.size())) return;
+        const std::string reason = strerror(errno);
+        close(mFile);
+        throw std::runtime_error("no memory for the plot: " + reason);
     }
     MemoryFile(const MemoryFile&) = delete;
     MemoryFile& operator=(const MemoryFile&) = delete;

@@ -1,12 +1,20 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "traffic/Timeline.h"
 
+#include "Amplitude.h"
+#include "EffectPlayback.h"
+#include "HapticEngineText.h"
+#include "NodePathTable.h"
+#include "PrebakedPatterns.h"
+#include "Strengths.h"
 #include "text/Text.h"
 
 #include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <cstdlib>
+#include <cstring>
+#include <iterator>
 #include <sstream>
 #include <utility>
 
@@ -14,33 +22,30 @@ namespace vibratorctl {
 
 namespace {
 
+using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 using Segment = Timeline::Segment;
 
-/** The full strength of the driver's scales. */
-constexpr double kFull = 10000;
-/** The index that makes the driver play its queue. */
-constexpr long long kQueueIndex = 0xFFFE;
 /** The longest time between two accesses of one call, in s. */
 constexpr double kSameCall = 0.05;
-/** The times that the service sets for a click, a stored pattern and packets, in ms. */
-constexpr long long kClickMs = 20;
-constexpr long long kPatternMs = 1000;
-constexpr long long kEngineMs = 1;
 
 /** @return the amplitude from 1 to 255 that the service turns into an intensity; 0 for none. */
 int amplitudeOf(long long intensity) {
-    int amplitude = 255;
-    while (amplitude > 0 && std::lround((amplitude - 1) / 254.0 * 9999 + 1) != intensity)
+    int amplitude = UINT8_MAX;
+    while (amplitude > 0 && intensityOf(static_cast<uint8_t>(amplitude)) != intensity)
         --amplitude;
     return amplitude;
 }
 
 /** @return the strength of the click that has an amplitude; nullptr if none has. */
 const char* clickOf(int amplitude) {
-    return amplitude == 36    ? "light"
-           : amplitude == 128 ? "medium"
-           : amplitude == 255 ? "strong"
-                              : nullptr;
+    const auto* found =
+            std::find(std::begin(kClickAmplitudes), std::end(kClickAmplitudes), amplitude);
+    return found == std::end(kClickAmplitudes) ? nullptr : kStrengths[found - kClickAmplitudes];
+}
+
+/** @return a number of the driver's scale, where 1 is full strength. */
+double strengthOf(double intensity) {
+    return std::max(0.0, intensity / kMaxAmplitude);
 }
 
 class TimelineMaker {
@@ -78,36 +83,38 @@ class TimelineMaker {
     /** What a call that has begun may still become. */
     enum Begun { kNoCall, kOn, kIntensity, kPattern, kEngine };
 
-    void write(const std::string& leaf, const std::string& bytes) {
-        const long long value = strtoll(bytes.c_str(), nullptr, 10);
-        const std::string number = std::to_string(value);
-        if (leaf == "enable") {
-            start(value);
-        } else if (leaf == "duration") {
-            mDuration = value;
-        } else if (leaf == "activate") {
-            activate(value != 0);
-        } else if (leaf == "intensity") {
-            setIntensity(value);
-        } else if (leaf == "haptic_engine") {
-            takePackets(bytes);
-        } else if (leaf == "cp_trigger_index") {
-            choosePattern(value);
-        } else if (leaf == "cp_trigger_queue") {
-            // "PATTERN.PERCENT, REPEATS, DELAY~"
-            const size_t dot = bytes.find('.');
-            const long long percent =
-                    dot == std::string::npos ? 0 : strtoll(bytes.c_str() + dot + 1, nullptr, 10);
-            mQueueStrength = static_cast<double>(std::max(0LL, percent)) / 100;
-            mark("pattern " + number + " repeat", kPattern);
-        } else if (leaf == "event_cmd") {
-            set(bytes == "FOLDER_OPEN\n" ? "fold open" : "fold close");
-        } else if (leaf == "ext_control") {
-            set(value == 0 ? "external off" : "external on");
-        } else if (leaf == "multi_freq") {
-            set("frequency " + number);
-        } else if (leaf == "force_touch_intensity") {
-            set("force-touch " + number);
+    /**
+     * Takes what a node was told.
+     *
+     * @param text begins with a number, where the node takes one.
+     */
+    void write(const std::string& leaf, const std::string& text) {
+        using Maker = TimelineMaker;
+        using Take = void (*)(Maker & maker, long long value, const std::string& text);
+        static constexpr std::pair<std::string_view, Take> kNodes[] = {
+                {"enable", [](Maker& m, auto value, auto&) { m.start(value); }},
+                {"duration", [](Maker& m, auto value, auto&) { m.mDuration = value; }},
+                {"activate", [](Maker& m, auto value, auto&) { m.activate(value != 0); }},
+                {"intensity", [](Maker& m, auto value, auto&) { m.setIntensity(value); }},
+                {"haptic_engine", [](Maker& m, auto, auto& packets) { m.takePackets(packets); }},
+                {"cp_trigger_index", [](Maker& m, auto value, auto&) { m.choosePattern(value); }},
+                {"cp_trigger_queue",
+                 [](Maker& m, auto pattern, auto& queue) { m.queuePattern(pattern, queue); }},
+                {"event_cmd",
+                 [](Maker& m, auto, auto& command) {
+                     m.set(command == FOLDER_OPEN_COMMAND ? "fold open" : "fold close");
+                 }},
+                {"ext_control", [](Maker& m, auto value,
+                                   auto&) { m.set(value == 0 ? "external off" : "external on"); }},
+                {"multi_freq",
+                 [](Maker& m, auto value, auto&) { m.set("frequency " + std::to_string(value)); }},
+                {"force_touch_intensity",
+                 [](Maker& m, auto value, auto&) {
+                     m.set("force-touch " + std::to_string(value));
+                 }},
+        };
+        for (const auto& [name, take] : kNodes) {
+            if (name == leaf) take(*this, strtoll(text.c_str(), nullptr, 10), text);
         }
     }
 
@@ -128,7 +135,7 @@ class TimelineMaker {
     void set(const std::string& label, Begun begun = kNoCall) { mark(label, begun, kGap); }
 
     void setIntensity(long long value) {
-        const double strength = std::max(0.0, static_cast<double>(value) / kFull);
+        const double strength = strengthOf(static_cast<double>(value));
         // The service looks for the node before it sets an amplitude, and not before an intensity.
         const int amplitude = mProbed ? amplitudeOf(value) : 0;
         mStrength = strength;
@@ -157,7 +164,7 @@ class TimelineMaker {
         mPackets.clear();
         while (numbers >> values[0] >> values[1] >> values[2] >> values[3]) {
             mPackets.emplace_back(std::max(0.0, static_cast<double>(values[0]) / 1000),
-                                  std::max(0.0, static_cast<double>(values[1]) / kFull));
+                                  strengthOf(static_cast<double>(values[1])));
         }
         mark("engine, " + std::to_string(mPackets.size()) +
                      (mPackets.size() == 1 ? " packet" : " packets"),
@@ -175,6 +182,14 @@ class TimelineMaker {
             mark(label);
         }
         mBegun = value == 0 ? kNoCall : kPattern;
+    }
+
+    /** @param text "PATTERN.PERCENT, REPEATS, DELAY~". */
+    void queuePattern(long long pattern, const std::string& text) {
+        const char* dot = strchr(text.c_str(), '.');
+        const long long percent = dot == nullptr ? 0 : strtoll(dot + 1, nullptr, 10);
+        mQueueStrength = static_cast<double>(std::max(0LL, percent)) / 100;
+        mark("pattern " + std::to_string(pattern) + " repeat", kPattern);
     }
 
     void activate(bool isOn) {

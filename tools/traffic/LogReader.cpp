@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "traffic/NodeAccess.h"
+#include "traffic/LogReader.h"
 
 #include <algorithm>
-#include <charconv>
 #include <cstdlib>
 #include <cstring>
 #include <ctime>
@@ -11,37 +10,6 @@
 namespace vibratorctl {
 
 namespace {
-
-/** Takes the next word, up to a blank, off the front of a text. */
-std::string_view takeWord(std::string_view* text) {
-    const size_t end = text->find(' ');
-    const std::string_view word = text->substr(0, end);
-    text->remove_prefix(end == std::string_view::npos ? text->size() : end + 1);
-    return word;
-}
-
-/** @return the bytes between quotation marks, which are escaped as in C. */
-std::string unquote(std::string_view text) {
-    const size_t first = text.find('"');
-    const size_t last = text.rfind('"');
-    std::string bytes;
-    for (size_t i = first + 1; first != last && i < last; ++i) {
-        if (text[i] != '\\' || i + 1 == last) {
-            bytes += text[i];
-            continue;
-        }
-        const char escaped = text[++i];
-        if (escaped == 'x' && i + 2 < last) {
-            unsigned byte = 0;
-            std::from_chars(text.data() + i + 1, text.data() + i + 3, byte, 16);
-            bytes += static_cast<char>(byte);
-            i += 2;
-        } else {
-            bytes += escaped == 'n' ? '\n' : escaped == '0' ? '\0' : escaped;
-        }
-    }
-    return bytes;
-}
 
 /** @return the name of the errno that a text gives. */
 std::string errorName(const std::string& number) {
@@ -114,11 +82,14 @@ enum Step {
     kTextEnd,
 };
 
+/** The error of a line that has an errno behind its mark. */
+constexpr const char* kErrnoFollows = nullptr;
+
 /** The lines of the log that mean accesses. The first whose mark is in a line applies. */
 constexpr struct {
     const char* mark;
     Step step;
-    /** For a text the leaf of its node; for a refusal or an end the error, nullptr: an errno. */
+    /** Of kTextRead and kText: the leaf of the text's node. Of the others: the error, if any. */
     const char* detail;
 } kLogLines[] = {
         {"Pemission denied (", kRefusal, "not permitted to this uid"},
@@ -137,7 +108,7 @@ constexpr struct {
         {"daxPerformHapticEngine : ", kText, "haptic_engine"},
         {"daxPerformPrebakedHapticPattern : ", kText, "cp_trigger_queue"},
         {": FOLDER_", kText, "event_cmd"},
-        {" is fail: ", kTextEnd, nullptr},
+        {" is fail: ", kTextEnd, kErrnoFollows},
         {"repeat error", kTextEnd, "not taken"},
         {"daxSetFolderStatus error", kTextEnd, "not taken"},
         {"daxPerformHapticEngine UNKNOWN_ERROR", kTextEnd, "not taken"},
@@ -146,7 +117,7 @@ constexpr struct {
         {"isNodeExistForRead node:", kProbe, ""},
         {">> readNode node:", kRead, ""},
         {">> writeNode node:", kWrite, ""},
-        {"failed. errno: ", kEnd, nullptr},
+        {"failed. errno: ", kEnd, kErrnoFollows},
         {"<< readNode done", kEnd, ""},
         {"<< writeNode node OK", kEnd, ""},
         {"<< writeNode node UNKNOWN_ERROR", kEnd, "not taken"},
@@ -164,49 +135,12 @@ std::string writtenText(const std::string& logged) {
 
 }  // namespace
 
-std::optional<NodeAccess> AccessReader::read(std::string_view line) {
-    return mIsLog ? readLog(line) : readTrace(line);
-}
-
-std::optional<NodeAccess> AccessReader::readTrace(std::string_view line) {
-    constexpr double kLatest = 1e12;
-    const std::string clock(takeWord(&line));
-    const double time = strtod(clock.c_str(), nullptr);
-    const std::string node(takeWord(&line));
-    const std::string_view call = takeWord(&line);
-    const bool isTransfer = call == "read" || call == "write";
-    const size_t equals = line.rfind("= ");
-    if (!(time >= 0 && time < kLatest) || equals == std::string_view::npos) return std::nullopt;
-    if (!isTransfer && call != "open" && call != "close") return std::nullopt;
-
-    std::string_view error = line.substr(equals + 2);
-    const std::string result(takeWord(&error));
-    if (result != "-1") error = {};
-    // An interrupted access is repeated.
-    if (error == "EINTR" && call != "close") return std::nullopt;
-    NodeAccess& access = mOpen[node];
-    if (call == "open") access = {node, NodeAccess::kProbe};
-    if (call != "close") access.error = error;
-    if (isTransfer) {
-        access.kind = call == "read" ? NodeAccess::kRead : NodeAccess::kWrite;
-        access.bytes = unquote(line);
-        const bool isShort = strtoul(result.c_str(), nullptr, 10) != access.bytes.size();
-        if (call == "write" && error.empty() && isShort) access.error = "cut short";
-        return std::nullopt;
-    }
-    if (call == "open" && error.empty()) return std::nullopt;
-    access.node = node;
-    access.time = time;
-    access.clock = clock;
-    return mOpen.extract(node).mapped();
-}
-
-void AccessReader::begin(std::string_view path, NodeAccess::Kind kind, const std::string& bytes) {
+void LogReader::begin(std::string_view path, NodeAccess::Kind kind, const std::string& bytes) {
     mNumber = {nodeName(path), kind, bytes};
     mDirectory = mNumber->node.substr(0, mNumber->node.find('/'));
 }
 
-std::optional<NodeAccess> AccessReader::beginWrite(const std::string& text) {
+std::optional<NodeAccess> LogReader::beginWrite(const std::string& text) {
     constexpr std::string_view kValue = " val:";
     const size_t value = std::min(text.rfind(kValue), text.size());
     const std::string path = text.substr(0, value);
@@ -220,7 +154,7 @@ std::optional<NodeAccess> AccessReader::beginWrite(const std::string& text) {
     return done;
 }
 
-std::optional<NodeAccess> AccessReader::readLog(std::string_view line) {
+std::optional<NodeAccess> LogReader::read(std::string_view line) {
     const size_t tag = std::min(line.find("QorVibrator"), line.size());
     std::optional<NodeAccess> done = readStep(line);
     if (!done) return done;
@@ -233,14 +167,15 @@ std::optional<NodeAccess> AccessReader::readLog(std::string_view line) {
     return done;
 }
 
-std::optional<NodeAccess> AccessReader::readStep(std::string_view line) {
+std::optional<NodeAccess> LogReader::readStep(std::string_view line) {
     std::optional<std::string_view> rest;
     const auto* row = std::find_if(std::begin(kLogLines), std::end(kLogLines),
                                    [&](const auto& each) { return rest = after(line, each.mark); });
     if (!rest) return std::nullopt;
     const std::string text(*rest);
     const auto end = [&](std::optional<NodeAccess>* access) {
-        if (*access) (*access)->error = row->detail != nullptr ? row->detail : errorName(text);
+        if (*access)
+            (*access)->error = row->detail == kErrnoFollows ? errorName(text) : row->detail;
         return std::exchange(*access, std::nullopt);
     };
     switch (row->step) {

@@ -2,7 +2,9 @@
 #pragma once
 
 #include "service/Connection.h"
+#include "service/LocalDriver.h"
 
+#include <string>
 #include <vector>
 
 namespace vibratorctl {
@@ -13,10 +15,18 @@ struct Query {
     /** What it asks for, in words. */
     const char* words;
     ::android::hardware::Return<bool> (IDaxVibrator::*ask)();
+    /** What a permitted caller is answered, by the driver. */
+    bool (LocalDriver::*expect)() const;
     /** The driver's feature that it asks for; nullptr for none. */
-    const char* feature;
+    const char* feature = nullptr;
+    /** Whether everybody may ask. */
+    bool isForAll = false;
 };
 extern const std::vector<Query> kQueries;
+
+/** @return the driver, judged for the process that serves the calls; where that is not seen, for
+ * this one. */
+LocalDriver driverOf(IDaxVibrator& vibrator);
 
 /** @return a ladder of intensities; empty where there is none. @throw Unreachable */
 std::vector<uint32_t> askLadder(IDaxVibrator& vibrator, uint32_t type);

@@ -1,0 +1,53 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "service/Queries.h"
+
+namespace vibratorctl {
+
+const std::vector<Query> kQueries = {
+        {"supportsAmplitudeControl", "amplitudes of the platform",
+         &IDaxVibrator::supportsAmplitudeControl, &LocalDriver::daxSupportsAmplitudeControl},
+        {"supportsExternalControl", "external control", &IDaxVibrator::supportsExternalControl,
+         &LocalDriver::supportsExternalControl, "external-control", true},
+        {"daxSupportsAmplitudeControl", "intensities", &IDaxVibrator::daxSupportsAmplitudeControl,
+         &LocalDriver::daxSupportsAmplitudeControl, "amplitude"},
+        {"daxSupportsForceTouchAmplitudeControl", "force-touch feedback",
+         &IDaxVibrator::daxSupportsForceTouchAmplitudeControl,
+         &LocalDriver::daxSupportsForceTouchAmplitudeControl, "force-touch"},
+        {"daxSupportsFrequencyControl", "frequency types",
+         &IDaxVibrator::daxSupportsFrequencyControl, &LocalDriver::daxSupportsFrequencyControl,
+         "frequency"},
+        {"daxSupportsHapticEngine", "haptic engine packets", &IDaxVibrator::daxSupportsHapticEngine,
+         &LocalDriver::daxSupportsHapticEngine, "haptic-engine"},
+        {"daxSupportsPrebakedHapticPattern", "stored patterns",
+         &IDaxVibrator::daxSupportsPrebakedHapticPattern,
+         &LocalDriver::daxSupportsPrebakedHapticPattern, "prebaked"},
+        {"daxSupportsFolderStatusSetting", "fold state",
+         &IDaxVibrator::daxSupportsFolderStatusSetting,
+         &LocalDriver::daxSupportsFolderStatusSetting, "fold"},
+        {"daxSupportsEnhancedVelmoraHapticPattern", "enhanced patterns",
+         &IDaxVibrator::daxSupportsEnhancedVelmoraHapticPattern,
+         &LocalDriver::daxSupportsEnhancedVelmoraHapticPattern},
+};
+
+LocalDriver driverOf(IDaxVibrator& vibrator) {
+    return LocalDriver(serverOf(vibrator).value_or(thisProcess()));
+}
+
+std::vector<uint32_t> askLadder(IDaxVibrator& vibrator, uint32_t type) {
+    using ::vendor::velmora::hardware::vibrator::V2_1::DaxAmplitudeType;
+    std::vector<uint32_t> ladder;
+    reached(vibrator.daxGetAmplitudeList(
+            static_cast<DaxAmplitudeType>(type), [&](bool supported, const auto& amplitudes) {
+                if (supported) ladder.assign(amplitudes.begin(), amplitudes.end());
+            }));
+    return ladder;
+}
+
+std::string ladderInWords(const std::vector<uint32_t>& ladder) {
+    std::string words;
+    for (const uint32_t step : ladder)
+        words += (words.empty() ? "" : " ") + std::to_string(step);
+    return words.empty() ? "none" : words;
+}
+
+}  // namespace vibratorctl

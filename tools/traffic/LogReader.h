@@ -1,0 +1,34 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "traffic/NodeAccess.h"
+
+#include <optional>
+#include <string_view>
+
+namespace vibratorctl {
+
+/**
+ * Puts accesses together from the lines of the daemon's log as the daemon writes it and as
+ * journalctl and logcat show it. Logcat's forms brief, tag and raw have no times.
+ */
+class LogReader {
+  public:
+    /** @return the access that ends with the line, or that it refuses; none if it does neither. */
+    std::optional<NodeAccess> read(std::string_view line);
+
+  private:
+    std::optional<NodeAccess> readStep(std::string_view line);
+    void begin(std::string_view path, NodeAccess::Kind kind, const std::string& bytes);
+    /** @return the text whose success the write shows, if it does. */
+    std::optional<NodeAccess> beginWrite(const std::string& text);
+
+    /** The directory of the last node, like "leds". */
+    std::string mDirectory = "vibrator";
+    /** The access of a number, or the probe, that has begun. */
+    std::optional<NodeAccess> mNumber;
+    /** The write of a text that has begun; one of a number may be inside it. */
+    std::optional<NodeAccess> mText;
+};
+
+}  // namespace vibratorctl
