@@ -119,12 +119,13 @@ const struct {
          kFailed},
         {"address written over", [](auto& m) { m.add("short", true); }, kFailed},
         // Else an address of the receiver's is taken for what the sender says.
-        {"address in the elements", [](auto& m) { m.add("short", true, m.objects.size() - 1); },
+        {"address in the elements",
+         [](auto& m) { m.addLast(BINDER_BUFFER_FLAG_HAS_PARENT, m.objects.size() - 1); },
          kBadValue},
         {"address in the elements, late",
          [](auto& m) {
-             m.add("short");
-             m.add("short", true, 1);
+             m.addLast(0, 0);
+             m.addLast(BINDER_BUFFER_FLAG_HAS_PARENT, 1);
          },
          kFailed},
         {"odd offset", [](auto& m) { m.offsets[0] += 1; }, kFailed},
