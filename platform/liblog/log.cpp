@@ -7,10 +7,12 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <climits>
 #include <csignal>
 #include <cstdarg>
+#include <cstdint>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -51,18 +53,42 @@ const LogFilter& filter() {
     return instance;
 }
 
-/** Copies text with its control characters escaped. @return the end of the copy. */
+/**
+ * @return the length of the UTF-8 sequence at the beginning of a text; 0 where that is a control
+ *     character, of U+0080 to U+009F too, or is not UTF-8.
+ */
+size_t printableLength(const char* text) {
+    const auto lead = static_cast<unsigned char>(*text);
+    if (lead < 0x80) return lead >= 0x20 && lead != 0x7f ? 1 : 0;
+    if (lead < 0xc0 || lead >= 0xf8) return 0;
+    const size_t length = lead >= 0xf0 ? 4 : lead >= 0xe0 ? 3 : 2;
+    uint32_t character = lead & (0x7fU >> length);
+    for (size_t i = 1; i < length; ++i) {
+        const auto next = static_cast<unsigned char>(text[i]);
+        if ((next & 0xc0) != 0x80) return 0;
+        character = character << 6 | (next & 0x3f);
+    }
+    // A longer sequence than the character needs could hide a control character.
+    constexpr uint32_t kMin[] = {0, 0, 0xa0, 0x800, 0x10000};
+    const bool isSurrogate = character >= 0xd800 && character <= 0xdfff;
+    return character >= kMin[length] && character <= 0x10ffff && !isSurrogate ? length : 0;
+}
+
+/** Copies text, escaping control characters and what is not UTF-8. @return the end of the copy. */
 char* escape(const char* text, char* out) {
     constexpr char kHex[] = "0123456789abcdef";
-    for (; *text != '\0'; ++text) {
-        const auto byte = static_cast<unsigned char>(*text);
-        if (byte >= 0x20 && byte != 0x7f) {
-            *out++ = *text;
-        } else if (byte == '\n') {
-            *out++ = '\\';
+    while (*text != '\0') {
+        const size_t length = printableLength(text);
+        if (length > 0) {
+            out = std::copy_n(text, length, out);
+            text += length;
+            continue;
+        }
+        const auto byte = static_cast<unsigned char>(*text++);
+        *out++ = '\\';
+        if (byte == '\n') {
             *out++ = 'n';
         } else {
-            *out++ = '\\';
             *out++ = 'x';
             *out++ = kHex[byte >> 4];
             *out++ = kHex[byte & 15];
@@ -72,23 +98,27 @@ char* escape(const char* text, char* out) {
 }
 
 /**
- * @return standard error or, where that is a terminal, the same terminal opened anew: a terminal
- *     that is stopped makes a write wait although poll has promised room, and standard error cannot
- *     be told not to wait without telling all who share it.
+ * @return standard error or, where that is a terminal or a pipe, the same opened anew: a write to a
+ *     terminal that is stopped, or to a pipe that another process has just filled, waits although
+ *     poll has promised room, and standard error cannot be told not to wait without telling all who
+ *     share it.
  */
 int logDescriptor() {
     struct stat info;
-    if (fstat(STDERR_FILENO, &info) != 0 || !S_ISCHR(info.st_mode)) return STDERR_FILENO;
+    if (fstat(STDERR_FILENO, &info) != 0) return STDERR_FILENO;
+    if (!S_ISCHR(info.st_mode) && !S_ISFIFO(info.st_mode)) return STDERR_FILENO;
     static std::mutex mutex;
-    static int terminal = -1;
+    static int opened = -1;
     static dev_t device = 0;
+    static ino_t number = 0;
     const std::lock_guard<std::mutex> lock(mutex);
-    if (terminal < 0 || device != info.st_rdev) {
-        if (terminal >= 0) close(terminal);
-        terminal = open("/proc/self/fd/2", O_WRONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC);
-        device = info.st_rdev;
+    if (opened < 0 || device != info.st_dev || number != info.st_ino) {
+        if (opened >= 0) close(opened);
+        opened = open("/proc/self/fd/2", O_WRONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC);
+        device = info.st_dev;
+        number = info.st_ino;
     }
-    return terminal >= 0 ? terminal : STDERR_FILENO;
+    return opened >= 0 ? opened : STDERR_FILENO;
 }
 
 /** Writes without waiting for a slow reader, or being killed by SIGPIPE when it has gone. */
