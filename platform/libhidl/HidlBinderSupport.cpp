@@ -54,10 +54,9 @@ Return<bool> canCastInterface(IBase* object, const char* interface, bool emitErr
             canCast = canCast || each == interface;
     });
     if (result.isOk()) return canCast;
-    if (emitError) {
-        __android_log_print(ANDROID_LOG_ERROR, "hwbinder", "no cast to %s: %s", interface,
-                            result.description().c_str());
-    }
+    if (!emitError) return false;
+    __android_log_print(ANDROID_LOG_ERROR, "hwbinder", "no cast to %s: %s", interface,
+                        result.description().c_str());
     return Status::fromStatusT(DEAD_OBJECT);
 }
 

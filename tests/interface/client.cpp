@@ -67,10 +67,9 @@ void useTypes() {
 
 /** What a client does with a service, whether it is there or not. */
 void use(const sp<IVibrator>& vibrator) {
-    if (vibrator == nullptr) return;
-    if (!vibrator->on(10).isOk()) return;
-    const sp<IDaxVibrator> extended = IDaxVibrator::castFrom(vibrator).withDefault(nullptr);
-    if (extended == nullptr) return;
+    if (!vibrator || !vibrator->on(10).isOk()) return;
+    const sp<IDaxVibrator> extended = IDaxVibrator::castFrom(vibrator);
+    if (!extended) return;
     extended->linkToDeath(new Recipient, 0);
     extended->daxGetAmplitudeList(DaxAmplitudeType::TYPE_0,
                                   [](bool /* supported */, const hidl_vec<uint32_t>& list) {

@@ -326,6 +326,7 @@ TEST_F(CallsTest, CallsCanHaveATimeLimit) {
 TEST_F(CallsTest, ValueOfAFailedCallEndsTheProcess) {
     mServer.kill();
     const Return<VibratorStatus> failed = mClient->off();
+    EXPECT_EQ(sp<IDaxVibrator>(IDaxVibrator::castFrom(sp<IBase>(mClient))), nullptr);
     LogCapture ownLog;
     const Return<sp<IDaxVibrator>> cast = IDaxVibrator::castFrom(sp<IBase>(mClient), true);
     EXPECT_TRUE(cast.isDeadObject());

@@ -91,7 +91,11 @@ namespace details {
 /** @return the object of this process behind its stub. */
 sp<::android::hidl::base::V1_0::IBase> localObject(const sp<IBinder>& binder);
 
-/** @return whether an object has an interface, going by its chain. */
+/**
+ * @param emitError whether a failure of the call, as of a dead object, is returned, with a line in
+ * the log, and does not just count as no.
+ * @return whether an object has an interface, going by its chain.
+ */
 Return<bool> canCastInterface(::android::hidl::base::V1_0::IBase* object, const char* interface,
                               bool emitError = false);
 

@@ -17,10 +17,12 @@ class ServiceManagerBase : public ::android::hidl::manager::V1_2::IServiceManage
                 [&](const auto& chain) { success = addWithChain(name, service, chain); });
         return result.isOk() && success;
     }
-    /** There is no list of declared services: only a service that is there has a transport. */
-    Return<Transport> getTransport(const hidl_string& interface, const hidl_string& name) override {
-        const Return<sp<::android::hidl::base::V1_0::IBase>> service = get(interface, name);
-        return service.withDefault(nullptr) != nullptr ? Transport::HWBINDER : Transport::EMPTY;
+    /**
+     * There is no list of declared services, so every service may still come, and then over this: a
+     * device's clients do not wait for one that has no transport.
+     */
+    Return<Transport> getTransport(const hidl_string&, const hidl_string&) override {
+        return Transport::HWBINDER;
     }
     Return<void> registerPassthroughClient(const hidl_string&, const hidl_string&) override {
         return Void();

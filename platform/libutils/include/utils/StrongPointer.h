@@ -34,6 +34,7 @@ class sp {
     T& operator*() const { return *mObject; }
     T* operator->() const { return mObject; }
     T* get() const { return mObject; }
+    explicit operator bool() const { return mObject != nullptr; }
 
     bool operator==(const T* other) const { return mObject == other; }
     bool operator!=(const T* other) const { return mObject != other; }
