@@ -4,6 +4,7 @@
 #include <android/log.h>
 #include <hidl/HidlTransportSupport.h>
 #include <hwbinder/IPCThreadState.h>
+#include <private/android_filesystem_config.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -20,13 +21,10 @@ using ::android::hardware::IPCThreadState;
 
 constexpr char kTag[] = "hwservicemanager";
 
-/** AID_SYSTEM of the platform's android_filesystem_config.h. */
-constexpr uid_t kSystemUid = 1000;
-
 /** Notifications that one user may ask for at the most: each takes memory of the manager. */
-constexpr ptrdiff_t kMostListenersPerUid = 64;
-/** No name of an interface or an instance is longer, in characters. */
-constexpr size_t kLongestName = 1024;
+constexpr ptrdiff_t kMaxListenersPerUid = 64;
+/** Of the name of an interface or an instance, in characters. */
+constexpr size_t kMaxNameLength = 1024;
 
 /** Calls a function when a remote object has died. */
 class WhenDead : public hidl_death_recipient {
@@ -44,7 +42,7 @@ class WhenDead : public hidl_death_recipient {
 /** @return whether the caller may add services. */
 bool mayAdd(const std::string& name) {
     const uid_t uid = IPCThreadState::self()->getCallingUid();
-    if (uid == 0 || uid == kSystemUid || uid == getuid()) return true;
+    if (uid == AID_ROOT || uid == AID_SYSTEM || uid == getuid()) return true;
     __android_log_print(ANDROID_LOG_WARN, kTag, "uid %u may not add a service \"%s\"", uid,
                         name.c_str());
     return false;
@@ -141,8 +139,8 @@ ServiceManager::Return<bool> ServiceManager::registerForNotifications(
     const uid_t uid = IPCThreadState::self()->getCallingUid();
     const auto count = std::count_if(mListeners.begin(), mListeners.end(),
                                      [&](const Listener& each) { return each.uid == uid; });
-    if (callback == nullptr || interface.empty() || count >= kMostListenersPerUid ||
-        interface.size() > kLongestName || name.size() > kLongestName) {
+    if (callback == nullptr || interface.empty() || count >= kMaxListenersPerUid ||
+        interface.size() > kMaxNameLength || name.size() > kMaxNameLength) {
         return false;
     }
     const sp<hidl_death_recipient> recipient =

@@ -25,32 +25,31 @@ size_t mappingSize() {
 /** An object that the kernel knows by a handle. */
 class KernelDriver::Object : public RemoteObject {
   public:
-    Object(KernelDriver& driver, uint32_t handle) : mDriver(driver), mHandle(handle) {
-        thread().queue(BC_ACQUIRE, mHandle);
+    explicit Object(uint32_t handle) : mHandle(handle) {
+        KernelThread::self().queue(BC_ACQUIRE, mHandle);
     }
     ~Object() override {
-        thread().queue(BC_RELEASE, mHandle);
-        thread().flush();
+        KernelThread::self().queue(BC_RELEASE, mHandle);
+        KernelThread::self().flush();
     }
     Object(const Object&) = delete;
     Object& operator=(const Object&) = delete;
 
     status_t transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags) override {
-        return thread().transact(mHandle, code, data, reply, flags);
+        return KernelThread::self().transact(mHandle, code, data, reply, flags);
     }
     status_t requestDeathNotice() override {
-        thread().queue(BC_REQUEST_DEATH_NOTIFICATION, binder_handle_cookie{mHandle, mHandle});
-        return thread().flush();
+        KernelThread::self().queue(BC_REQUEST_DEATH_NOTIFICATION,
+                                   binder_handle_cookie{mHandle, mHandle});
+        return KernelThread::self().flush();
     }
     void clearDeathNotice() override {
-        thread().queue(BC_CLEAR_DEATH_NOTIFICATION, binder_handle_cookie{mHandle, mHandle});
-        thread().flush();
+        KernelThread::self().queue(BC_CLEAR_DEATH_NOTIFICATION,
+                                   binder_handle_cookie{mHandle, mHandle});
+        KernelThread::self().flush();
     }
 
   private:
-    KernelThread& thread() const { return KernelThread::self(mDriver); }
-
-    KernelDriver& mDriver;
     const uint32_t mHandle;
 };
 
@@ -89,11 +88,11 @@ KernelDriver::~KernelDriver() {
 }
 
 std::unique_ptr<RemoteObject> KernelDriver::open(uint32_t handle) {
-    return std::make_unique<Object>(*this, handle);
+    return std::make_unique<Object>(handle);
 }
 
 void KernelDriver::serve() {
-    KernelThread::self(*this).serve();
+    KernelThread::self().serve();
 }
 
 status_t KernelDriver::becomeContextManager(const sp<BHwBinder>& object) {

@@ -24,8 +24,7 @@ constexpr uint32_t kTransactionPendingFrozen = _IO('r', 20);
 void release(const uint8_t* data, void* thread) {
     // Any thread may give it back, not only the one that has received it.
     (void)thread;
-    auto& driver = static_cast<KernelDriver&>(ProcessState::self()->driver());
-    KernelThread::self(driver).queue(BC_FREE_BUFFER, reinterpret_cast<binder_uintptr_t>(data));
+    KernelThread::self().queue(BC_FREE_BUFFER, reinterpret_cast<binder_uintptr_t>(data));
 }
 
 }  // namespace
@@ -75,8 +74,12 @@ class KernelThread::Alarm {
     timespec mEnd{};
 };
 
-KernelThread& KernelThread::self(KernelDriver& driver) {
-    static thread_local KernelThread thread(driver);
+// A process has one driver, and calls reach this one only where it is that.
+KernelThread::KernelThread()
+    : mDriver(static_cast<KernelDriver&>(ProcessState::self()->driver())) {}
+
+KernelThread& KernelThread::self() {
+    static thread_local KernelThread thread;
     return thread;
 }
 

@@ -14,8 +14,8 @@ namespace android::hardware {
 /** A thread's exchange with the kernel's driver: commands go there, returns come back. */
 class KernelThread {
   public:
-    /** @return the state of the current thread. */
-    static KernelThread& self(KernelDriver& driver);
+    /** @return the state of the current thread, in its exchange with the driver of this process. */
+    static KernelThread& self();
 
     status_t transact(uint32_t handle, uint32_t code, const Parcel& data, Parcel* reply,
                       uint32_t flags);
@@ -33,7 +33,7 @@ class KernelThread {
     status_t flush();
 
   private:
-    explicit KernelThread(KernelDriver& driver) : mDriver(driver) {}
+    KernelThread();
     ~KernelThread();
 
     class Alarm;
