@@ -1,4 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "libhwbinder/Driver.h"
+
 #include <android/hidl/base/1.0/BnHwBase.h>
 #include <android/hidl/base/1.0/BpHwBase.h>
 #include <android/log.h>
@@ -47,17 +49,23 @@ sp<IBase> localObject(const sp<IBinder>& binder) {
     return static_cast<BnHwBase*>(binder->localBinder())->getImpl();
 }
 
-Return<bool> canCastInterface(IBase* object, const char* interface, bool emitError) {
-    bool canCast = false;
+Return<bool> hasInterface(IBase* object, const char* interface) {
+    bool isInChain = false;
     const Return<void> result = object->interfaceChain([&](const auto& chain) {
         for (const hidl_string& each : chain)
-            canCast = canCast || each == interface;
+            isInChain = isInChain || each == interface;
     });
-    if (result.isOk()) return canCast;
+    if (!result.isOk()) return result.status();
+    return isInChain;
+}
+
+Return<bool> canCastInterface(IBase* object, const char* interface, bool emitError) {
+    const Return<bool> result = hasInterface(object, interface);
+    if (result.isOk()) return result;
     if (!emitError) return false;
-    __android_log_print(ANDROID_LOG_ERROR, "hwbinder", "no cast to %s: %s", interface,
+    __android_log_print(ANDROID_LOG_ERROR, kLogTag, "no cast to %s: %s", interface,
                         result.description().c_str());
-    return Status::fromStatusT(DEAD_OBJECT);
+    return result;
 }
 
 }  // namespace details
@@ -85,7 +93,7 @@ sp<IBinder> getOrCreateCachedBinder(IBase* object) {
     object->interfaceDescriptor([&](const hidl_string& each) { descriptor = each; });
     const auto make = details::getBnConstructorMap().get(descriptor, nullptr);
     if (make == nullptr) {
-        __android_log_print(ANDROID_LOG_ERROR, "hwbinder", "no stub is known for %s",
+        __android_log_print(ANDROID_LOG_ERROR, kLogTag, "no stub is known for %s",
                             descriptor.c_str());
         return nullptr;
     }

@@ -9,7 +9,10 @@
 
 #include <algorithm>
 #include <chrono>
+#include <mutex>
 #include <thread>
+#include <utility>
+#include <vector>
 
 namespace android::hardware {
 namespace {
@@ -45,8 +48,8 @@ Error askForManager(sp<Manager>* manager) {
     return {};
 }
 
-/** Asks once for a service. @return OK, or why it is not there. */
-Error askForService(const std::string& interface, const std::string& instance, sp<IBase>* service) {
+/** Looks a name up once. @return OK, or why nothing has it. */
+Error lookUp(const std::string& interface, const std::string& instance, sp<IBase>* service) {
     if (LocalDriver* sockets = driver().localDriver()) {
         return LocalServiceManager::find(*sockets, interface, instance, service);
     }
@@ -58,6 +61,21 @@ Error askForService(const std::string& interface, const std::string& instance, s
     *service = found;
     if (*service != nullptr) return {};
     return {NAME_NOT_FOUND, driver().name() + ": the service manager does not know it"};
+}
+
+/** Asks once for a service. @return OK, or why it is not there. */
+Error askForService(const std::string& interface, const std::string& instance, sp<IBase>* service) {
+    sp<IBase> found;
+    Error error = lookUp(interface, instance, &found);
+    if (!error.isOk()) return error;
+    // Whoever has registered it has said so, but may be wrong.
+    const Return<bool> hasInterface = details::hasInterface(found.get(), interface.c_str());
+    if (!hasInterface.isOk()) {
+        return {hasInterface.status().transactionError(), hasInterface.description()};
+    }
+    if (!hasInterface) return {BAD_TYPE, "what has the name does not have the interface"};
+    *service = found;
+    return {};
 }
 
 /**
@@ -95,6 +113,72 @@ Error findService(milliseconds patience, const std::string& interface, const std
                    [&] { return askForService(interface, instance, service); });
 }
 
+/** Tells a service manager of an object, under the names of all of its interfaces. */
+Return<bool> add(Manager& manager, const sp<IBase>& service, const std::string& instance) {
+    hidl_vec<hidl_string> chain;
+    const Return<void> asked = service->interfaceChain([&](const auto& names) { chain = names; });
+    if (!asked.isOk()) return asked.status();
+    const Return<bool> added = manager.addWithChain(instance, service, chain);
+    // A manager of 1.0 or 1.1 asks the object itself for its interfaces.
+    const bool isOlder = added.status().transactionError() == UNKNOWN_TRANSACTION;
+    return isOlder ? manager.add(instance, service) : added;
+}
+
+/**
+ * What this process has registered. When the service manager dies, it is registered again with the
+ * one that comes in its place.
+ */
+class Registrations : public hidl_death_recipient {
+  public:
+    /** Waits until the manager answers. @return OK, or why it does not know the service. */
+    Error add(const sp<IBase>& service, const std::string& instance) {
+        const std::lock_guard<std::mutex> lock(mMutex);
+        if (mManager == nullptr) {
+            Error error = connect();
+            if (!error.isOk()) return error;
+        }
+        const Return<bool> added = hardware::add(*mManager, service, instance);
+        if (!added.isOk()) return {added.status().transactionError(), added.description()};
+        if (!added) return {UNKNOWN_ERROR, "the service manager refuses it"};
+        mServices.emplace_back(service, instance);
+        return {};
+    }
+
+    void serviceDied(uint64_t /* cookie */, const wp<IBase>& /* who */) override {
+        // The thread that has this news serves the calls of those who have found the services.
+        std::thread([this] { addAgain(); }).detach();
+    }
+
+  private:
+    /** Finds the manager, and asks for news of its death. */
+    Error connect() {
+        for (;;) {
+            Error error = findManager(kForEver, &mManager);
+            if (!error.isOk() || mManager->linkToDeath(this, 0).withDefault(false)) return error;
+            // It has just died, or its predecessor's proxy still lives.
+            mManager.clear();
+            std::this_thread::sleep_for(milliseconds(100));
+        }
+    }
+
+    void addAgain() {
+        const std::lock_guard<std::mutex> lock(mMutex);
+        mManager.clear();
+        if (!connect().isOk()) return;
+        for (const auto& [service, instance] : mServices) {
+            const Return<bool> added = hardware::add(*mManager, service, instance);
+            const bool isKnown = added.withDefault(false);
+            __android_log_print(isKnown ? ANDROID_LOG_INFO : ANDROID_LOG_ERROR, kLogTag,
+                                "%s with the new service manager: %s",
+                                isKnown ? "registered" : "not registered", instance.c_str());
+        }
+    }
+
+    std::mutex mMutex;
+    sp<Manager> mManager;
+    std::vector<std::pair<sp<IBase>, std::string>> mServices;
+};
+
 }  // namespace
 
 sp<IServiceManager> defaultServiceManager() {
@@ -119,22 +203,14 @@ sp<IBase> getRawServiceInternal(const std::string& interface, const std::string&
 status_t registerAsServiceInternal(const sp<IBase>& service, const std::string& instance) {
     __android_log_print(ANDROID_LOG_INFO, kLogTag, "calls go over %s",
                         host::transportDescription().c_str());
-    const auto complain = [](const std::string& whyNot) {
-        __android_log_print(ANDROID_LOG_ERROR, kLogTag, "not registered: %s", whyNot.c_str());
-    };
-    sp<Manager> manager;
-    const Error error = findManager(kForEver, &manager);
-    if (!error.isOk()) {
-        complain(error.text());
-        return NO_INIT;
+    // Never destroyed: the manager may die at any time.
+    static auto* const registrations = new sp<Registrations>(new Registrations);
+    const Error error = (*registrations)->add(service, instance);
+    // Over sockets the server has said why, and goes on trying.
+    if (!error.isOk() && driver().localDriver() == nullptr) {
+        __android_log_print(ANDROID_LOG_ERROR, kLogTag, "not registered: %s", error.text().c_str());
     }
-    bool isKnown = false;
-    const Return<void> asked = service->interfaceChain([&](const auto& chain) {
-        const Return<bool> added = manager->addWithChain(instance, service, chain);
-        isKnown = added.withDefault(false);
-        if (!added.isOk()) complain(added.description());
-    });
-    return asked.isOk() && isKnown ? OK : UNKNOWN_ERROR;
+    return error.code();
 }
 
 }  // namespace details

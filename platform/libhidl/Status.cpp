@@ -1,4 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "libhwbinder/Driver.h"
+
 #include <android/log.h>
 #include <hidl/Status.h>
 
@@ -49,7 +51,7 @@ std::string Status::description() const {
 namespace details {
 
 void return_status::abortOnUse() const {
-    __android_log_print(ANDROID_LOG_FATAL, "hwbinder", "the value of a failed call was used: %s",
+    __android_log_print(ANDROID_LOG_FATAL, kLogTag, "the value of a failed call was used: %s",
                         description().c_str());
     abort();
 }

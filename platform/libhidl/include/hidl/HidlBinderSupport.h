@@ -91,10 +91,13 @@ namespace details {
 /** @return the object of this process behind its stub. */
 sp<::android::hidl::base::V1_0::IBase> localObject(const sp<IBinder>& binder);
 
+/** @return whether an object has an interface, going by its chain. */
+Return<bool> hasInterface(::android::hidl::base::V1_0::IBase* object, const char* interface);
+
 /**
- * @param emitError whether a failure of the call, as of a dead object, is returned, with a line in
- * the log, and does not just count as no.
- * @return whether an object has an interface, going by its chain.
+ * As above, but a failure of the call, as of a dead object's, counts as no.
+ *
+ * @param emitError whether it is logged and returned instead.
  */
 Return<bool> canCastInterface(::android::hidl::base::V1_0::IBase* object, const char* interface,
                               bool emitError = false);
@@ -104,7 +107,7 @@ template <typename Child, typename Parent, typename BpChild>
 Return<sp<Child>> castInterface(const sp<Parent>& parent, const char* interface, bool emitError) {
     if (parent == nullptr) return sp<Child>();
     const Return<bool> canCast = canCastInterface(parent.get(), interface, emitError);
-    if (!canCast.isOk()) return Status::fromStatusT(DEAD_OBJECT);
+    if (!canCast.isOk()) return canCast.status();
     if (!canCast) return sp<Child>();
     if (parent->isRemote()) return sp<Child>(new BpChild(getOrCreateCachedBinder(parent.get())));
     return sp<Child>(static_cast<Child*>(parent.get()));

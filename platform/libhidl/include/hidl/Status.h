@@ -59,6 +59,8 @@ class return_status {
 
     /** @return whether the call reached its object and the answer came back. */
     bool isOk() const { return mStatus.isOk(); }
+    /** @return the outcome of the transport; it is this platform's own to ask for it so. */
+    const Status& status() const { return mStatus; }
     /** @return whether the object's process has ended. */
     bool isDeadObject() const { return mStatus.transactionError() == DEAD_OBJECT; }
     /** @return the outcome of the transport in words, "No error" for success. */

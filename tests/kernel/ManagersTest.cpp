@@ -1,0 +1,44 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "hwservicemanager/ServiceManager.h"
+#include "libhwbinder/Driver.h"
+#include "support/Process.h"
+
+#include <android/hidl/manager/1.0/BnHwServiceManager.h>
+#include <gtest/gtest.h>
+#include <hidl/HidlTransportSupport.h>
+#include <hwbinder/ProcessState.h>
+
+/** A service whose managers come, go and are of several versions, on a binder device of its own. */
+namespace {
+
+using ::android::sp;
+using ::android::hidl::manager::V1_0::BnHwServiceManager;
+namespace hardware = ::android::hardware;
+
+/** Knows the operations of manager 1.0 alone, since only their stub receives its calls. */
+TEST(ManagersTest, DISABLED_OfVersion1_0) {
+    const sp<BnHwServiceManager> manager = new BnHwServiceManager(new ServiceManager);
+    ASSERT_EQ(hardware::ProcessState::self()->driver().becomeContextManager(manager), android::OK);
+    hardware::configureRpcThreadpool(1, true);
+    hardware::joinRpcThreadpool();
+}
+
+TEST(ManagersTest, ServiceIsFoundWithEachManagerThatComes) {
+    const std::string device = "HWBINDER_DEVICE=/dev/binder";
+    ChildProcess daemon;
+    daemon.startProgram({SERVICE}, "/tmp/daemon", {device});
+    const std::vector<std::string> older = {"/bin/binder-tests", "--gtest_also_run_disabled_tests",
+                                            "--gtest_filter=*DISABLED_OfVersion1_0"};
+    const std::vector<std::string> newer = {"/bin/hwservicemanager"};
+    for (const auto& command : {older, newer, older}) {
+        ChildProcess manager;
+        manager.startProgram(command, "/tmp/manager", {device});
+        EXPECT_TRUE(eventually([&] {
+            return runProgram({"/bin/busybox", "env", device, VIBRATORCTL, "off"}).exitCode == 0;
+        })) << readFile("/tmp/daemon")
+            << readFile("/tmp/manager");
+        EXPECT_TRUE(daemon.isAlive());
+    }
+}
+
+}  // namespace
