@@ -29,7 +29,7 @@ Steps prepare(const Operation& operation) {
     model::Features features;
     for (const std::string& name : model::featureNames())
         features.names.insert(name);
-    if (simulator::createNodes("", Layout::kLedTrigger, features) != 0) abort();
+    if (simulator::createNodes(std::string(), Layout::kLedTrigger, features) != 0) abort();
     Steps steps = parseSteps(Layout::kLedTrigger, operation.steps);
     prepareNodes("", Layout::kLedTrigger, steps);
     Steps accesses;

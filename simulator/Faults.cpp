@@ -73,29 +73,23 @@ std::optional<Fault> parseFault(const std::string& text) {
     return std::nullopt;
 }
 
-bool setFault(const std::string& directory, const std::string& leaf, const std::string& operation,
+bool setFault(const Folder& directory, const std::string& leaf, const std::string& operation,
               const std::optional<Fault>& fault) {
-    const Folder folder(directory);
-    if (fault) return folder.replace(fileName(leaf, operation), inWords(*fault), 0644) == 0;
-    folder.remove(fileName(leaf, operation));
-    return folder.error() == 0;
+    if (fault) return directory.replace(fileName(leaf, operation), inWords(*fault), 0644) == 0;
+    directory.remove(fileName(leaf, operation));
+    return directory.error() == 0;
 }
 
 std::optional<Fault> takeFault(const Folder& directory, const std::string& leaf,
                                const std::string& operation) {
-    const int file = directory.open(fileName(leaf, operation), O_RDWR);
-    if (file < 0) return std::nullopt;
-    std::optional<Fault> fault;
-    if (flock(file, LOCK_EX) == 0) fault = countDown(file);
-    close(file);
-    return fault;
+    const Descriptor file = directory.open(fileName(leaf, operation), O_RDWR);
+    return flock(file.get(), LOCK_EX) == 0 ? countDown(file.get()) : std::nullopt;
 }
 
-std::vector<std::string> listFaults(const std::string& directory) {
+std::vector<std::string> listFaults(const Folder& directory) {
     std::vector<std::string> lines;
-    const Folder folder(directory);
-    for (const std::string& name : faultFiles(folder)) {
-        const auto fault = fromWords(folder.read(name));
+    for (const std::string& name : faultFiles(directory)) {
+        const auto fault = fromWords(directory.read(name));
         if (!fault) continue;
         std::string line = name.substr(strlen(kPrefix));
         line.replace(line.rfind('.'), 1, " ");
@@ -108,11 +102,10 @@ std::vector<std::string> listFaults(const std::string& directory) {
     return lines;
 }
 
-int clearFaults(const std::string& directory) {
-    const Folder folder(directory);
-    for (const std::string& name : faultFiles(folder))
-        folder.remove(name);
-    return folder.error();
+int clearFaults(const Folder& directory) {
+    for (const std::string& name : faultFiles(directory))
+        directory.remove(name);
+    return directory.error();
 }
 
 }  // namespace simulator

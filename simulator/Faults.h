@@ -30,7 +30,7 @@ std::optional<Fault> parseFault(const std::string& text);
  * @param operation "open", "read", "write" or "close".
  * @return whether it could be stored.
  */
-bool setFault(const std::string& directory, const std::string& leaf, const std::string& operation,
+bool setFault(const Folder& directory, const std::string& leaf, const std::string& operation,
               const std::optional<Fault>& fault);
 
 /**
@@ -41,9 +41,9 @@ std::optional<Fault> takeFault(const Folder& directory, const std::string& leaf,
                                const std::string& operation);
 
 /** @return a line for each fault that is set, like "intensity write EIO, 2 times". */
-std::vector<std::string> listFaults(const std::string& directory);
+std::vector<std::string> listFaults(const Folder& directory);
 
 /** Removes all faults. @return an errno, 0 for success. */
-int clearFaults(const std::string& directory);
+int clearFaults(const Folder& directory);
 
 }  // namespace simulator

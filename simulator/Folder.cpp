@@ -19,85 +19,80 @@ const char* inside(const std::string& name) {
     return leaves ? "" : name.c_str();
 }
 
+/** Makes a folder that all may see, whatever the umask, unless there is something already. */
+void makeFolder(int above, const char* name) {
+    const mode_t before = umask(0022);
+    mkdirat(above, name, 0755);
+    umask(before);
+}
+
 }  // namespace
 
 // openat throughout: in a program with the stand-ins, open is one of them.
 Folder::Folder(const std::string& path)
-    : mFile(openat(AT_FDCWD, path.empty() ? "/" : path.c_str(), kOpenFolder)) {
-    if (mFile < 0) mError = errno;
-}
+    : mFolder(openat(AT_FDCWD, path.empty() ? "/" : path.c_str(), kOpenFolder)) {}
 
-Folder::Folder(const Folder& above, std::string_view path, bool create) : mError(above.mError) {
-    if (mError != 0) return;
-    mFile = fcntl(above.mFile, F_DUPFD_CLOEXEC, 0);
-    mError = mFile < 0 ? errno : 0;
-    while (mFile >= 0 && !path.empty()) {
+Folder::Folder(const Folder& above, std::string_view path, bool create)
+    : mFolder(above.error() != 0 ? Descriptor::failed(above.error())
+                                 : Descriptor(openat(above.mFolder.get(), ".", kOpenFolder))) {
+    while (mFolder.isOpen() && !path.empty()) {
         const std::string name(path.substr(0, path.find('/')));
         path.remove_prefix(std::min(name.size() + 1, path.size()));
-        if (create) mkdirat(mFile, inside(name), 0755);
-        const int next = openat(mFile, inside(name), kOpenFolder | O_NOFOLLOW);
-        mError = next < 0 ? errno : 0;
-        close(mFile);
-        mFile = next;
+        if (create) makeFolder(mFolder.get(), inside(name));
+        mFolder = Descriptor(openat(mFolder.get(), inside(name), kOpenFolder | O_NOFOLLOW));
     }
-}
-
-Folder::~Folder() {
-    if (mFile >= 0) close(mFile);
 }
 
 mode_t Folder::mode(const std::string& name) const {
     struct stat info;
-    return fstatat(mFile, inside(name), &info, AT_SYMLINK_NOFOLLOW) == 0 ? info.st_mode : 0;
+    return fstatat(mFolder.get(), inside(name), &info, AT_SYMLINK_NOFOLLOW) == 0 ? info.st_mode : 0;
 }
 
-int Folder::open(const std::string& name, int flags, mode_t mode) const {
-    if (mError != 0) return -mError;
+Descriptor Folder::open(const std::string& name, int flags, mode_t mode) const {
+    if (error() != 0) return Descriptor::failed(error());
     // O_NONBLOCK: opening a pipe in a file's place must not block.
     constexpr int kSafely = O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC;
-    const int file = openat(mFile, inside(name), flags | kSafely, mode);
-    if (file < 0) return -errno;
+    Descriptor file(openat(mFolder.get(), inside(name), flags | kSafely, mode));
     struct stat info;
-    if (fstat(file, &info) == 0 && S_ISREG(info.st_mode)) return file;
-    close(file);
-    return -EINVAL;
+    const bool isPlain = fstat(file.get(), &info) == 0 && S_ISREG(info.st_mode);
+    return !file.isOpen() || isPlain ? std::move(file) : Descriptor::failed(EINVAL);
 }
 
 std::string Folder::read(const std::string& name) const {
     std::string text;
-    const int file = open(name, O_RDONLY);
-    if (file < 0) return text;
+    const Descriptor file = open(name, O_RDONLY);
     char piece[4096];
-    for (ssize_t count; (count = ::read(file, piece, sizeof(piece))) > 0;)
+    for (ssize_t count; (count = ::read(file.get(), piece, sizeof(piece))) > 0;)
         text.append(piece, static_cast<size_t>(count));
-    close(file);
     return text;
 }
 
 int Folder::replace(const std::string& name, std::string_view text, mode_t mode) const {
-    if (mError != 0) return mError;
+    if (error() != 0) return error();
     // A name for each thread; a file that a killed one left is removed.
     const std::string fresh = ".new." + std::to_string(gettid());
     remove(fresh);
-    const int file = openat(mFile, fresh.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600);
-    if (file < 0) return errno;
+    constexpr int kCreate = O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC;
+    const Descriptor file(openat(mFolder.get(), fresh.c_str(), kCreate, 0600));
+    if (!file.isOpen()) return file.error();
     errno = ENOSPC;
-    const bool isDone =
-            write(file, text.data(), text.size()) == static_cast<ssize_t>(text.size()) &&
-            fchmod(file, mode) == 0 && renameat(mFile, fresh.c_str(), mFile, inside(name)) == 0;
-    const int error = isDone ? 0 : errno;
-    close(file);
-    if (!isDone) remove(fresh);
-    return error;
+    if (write(file.get(), text.data(), text.size()) == static_cast<ssize_t>(text.size()) &&
+        fchmod(file.get(), mode) == 0 &&
+        renameat(mFolder.get(), fresh.c_str(), mFolder.get(), inside(name)) == 0) {
+        return 0;
+    }
+    const int failure = errno;
+    remove(fresh);
+    return failure;
 }
 
 void Folder::remove(const std::string& name) const {
-    unlinkat(mFile, inside(name), 0);
+    unlinkat(mFolder.get(), inside(name), 0);
 }
 
 std::vector<std::string> Folder::names() const {
     std::vector<std::string> names;
-    const int file = openat(mFile, ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    const int file = openat(mFolder.get(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     DIR* folder = file < 0 ? nullptr : fdopendir(file);
     if (folder == nullptr) return names;
     while (const dirent* entry = readdir(folder)) {

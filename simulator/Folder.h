@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "Descriptor.h"
+
 #include <sys/stat.h>
 
 #include <string>
@@ -15,20 +17,17 @@ namespace simulator {
  */
 class Folder {
   public:
-    /** Opens a folder by its path. Follows links in it, since the user has named it. */
-    explicit Folder(const std::string& path);
+    /** Opens a folder by its path, "" for the root. Follows links: the user has named it. */
+    Folder(const std::string& path);
     /** Opens the folder at a relative path below another. @param create whether to make it. */
     Folder(const Folder& above, std::string_view path, bool create = false);
-    Folder(const Folder&) = delete;
-    Folder& operator=(const Folder&) = delete;
-    ~Folder();
 
     /** @return the errno of opening it; 0 when it is open. */
-    int error() const { return mError; }
+    int error() const { return mFolder.error(); }
     /** @return a file's type and mode; 0 when there is no such file. */
     mode_t mode(const std::string& name) const;
-    /** Opens a plain file. @return its descriptor, or a negative errno. */
-    int open(const std::string& name, int flags, mode_t mode = 0) const;
+    /** Opens a plain file. */
+    Descriptor open(const std::string& name, int flags, mode_t mode = 0) const;
     /** @return what a plain file holds; "" when there is none. */
     std::string read(const std::string& name) const;
     /** Replaces a file, of any type, in one step. @return an errno, 0 for success. */
@@ -39,8 +38,7 @@ class Folder {
     std::vector<std::string> names() const;
 
   private:
-    int mFile = -1;
-    int mError = 0;
+    Descriptor mFolder;
 };
 
 }  // namespace simulator

@@ -17,7 +17,7 @@ __attribute__((constructor)) void checkDirectory() {
                 "libvibrator_sim: VIBRATOR_SIM_DIR is not set, nothing is simulated\n");
     } else if (!simulator::isMarked(simulator::Folder(directory))) {
         dprintf(STDERR_FILENO,
-                "libvibrator_sim: VIBRATOR_SIM_DIR: %s has no simulated driver, nothing is traced; "
+                "libvibrator_sim: VIBRATOR_SIM_DIR: %s has no simulated driver; "
                 "\"vibrator-sim create\" makes one\n",
                 model::quote(directory).c_str());
     }

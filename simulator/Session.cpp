@@ -46,7 +46,7 @@ void becomeDaemon(const std::string& directory, pid_t parent) {
     setpgid(0, 0);
     prctl(PR_SET_PDEATHSIG, SIGKILL);
     if (getppid() != parent) _exit(1);
-    const int log = Folder(directory).open("log", O_WRONLY | O_APPEND);
+    const int log = Folder(directory).open("log", O_WRONLY | O_APPEND).release();
     dup2(open("/dev/null", O_RDONLY | O_CLOEXEC), STDIN_FILENO);
     dup2(log, STDOUT_FILENO);
     dup2(log, STDERR_FILENO);

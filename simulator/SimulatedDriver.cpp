@@ -23,13 +23,13 @@ constexpr char kMarkFile[] = ".vibrator-sim";
 constexpr char kDeadlineFile[] = ".deadline";
 
 /** @return the folder of a sysfs directory, whose path begins and ends with a slash. */
-Folder openBelow(const std::string& directory, std::string_view path, bool create = false) {
-    return {Folder(directory), path.substr(1, path.size() - 2), create};
+Folder openBelow(const Folder& directory, std::string_view path, bool create = false) {
+    return {directory, path.substr(1, path.size() - 2), create};
 }
 
 /** @return the folder that a node's file lies in. */
 Folder folderOf(const Node& node) {
-    return openBelow(node.directory, node.path.substr(0, node.path.rfind('/') + 1));
+    return openBelow(*node.directory, node.path.substr(0, node.path.rfind('/') + 1));
 }
 
 int64_t now() {
@@ -74,17 +74,13 @@ bool isMarked(const Folder& directory) {
     return S_ISREG(directory.mode(kMarkFile));
 }
 
-int claimDirectory(const std::string& directory) {
-    std::error_code error;
-    std::filesystem::create_directories(directory, error);
-    if (error) return error.value();
-    const Folder folder(directory);
-    if (isMarked(folder)) return 0;
-    if (folder.error() == 0 && !folder.names().empty()) return ENOTEMPTY;
-    return folder.replace(kMarkFile, "", 0644);
+int claimDirectory(const Folder& directory) {
+    if (isMarked(directory)) return 0;
+    if (directory.error() == 0 && !directory.names().empty()) return ENOTEMPTY;
+    return directory.replace(kMarkFile, "", 0644);
 }
 
-int createNodes(const std::string& directory, Layout layout, const Features& features) {
+int createNodes(const Folder& directory, Layout layout, const Features& features) {
     const Folder nodes = openBelow(directory, model::sysfsDirectory(layout), true);
     // The driver that was there before may be running its motor.
     nodes.remove(kDeadlineFile);
@@ -100,6 +96,12 @@ int createNodes(const std::string& directory, Layout layout, const Features& fea
 }
 
 int createDriver(const std::string& directory, Layout layout, const Features& features) {
+    std::error_code error;
+    std::filesystem::create_directories(directory, error);
+    return error ? error.value() : createDriver(Folder(directory), layout, features);
+}
+
+int createDriver(const Folder& directory, Layout layout, const Features& features) {
     int error = claimDirectory(directory);
     if (error == 0) error = clearFaults(directory);
     return error != 0 ? error : createNodes(directory, layout, features);
@@ -115,17 +117,18 @@ bool findNode(const std::string& directory, const char* path, Node* node) {
                 const std::string_view place = model::sysfsDirectory(layout);
                 return strncmp(path, place.data(), place.size()) == 0;
             });
-    if (isBelow) *node = {path, directory, directory + path};
+    if (isBelow) *node = {path, std::make_shared<const Folder>(directory), directory + path};
     return isBelow;
 }
 
 std::vector<Node> listNodes(const std::string& directory) {
+    const auto folder = std::make_shared<const Folder>(directory);
     std::vector<Node> nodes;
     for (const Layout layout : model::kLayouts) {
         const std::string place(model::sysfsDirectory(layout));
-        for (const std::string& leaf : openBelow(directory, place).names()) {
+        for (const std::string& leaf : openBelow(*folder, place).names()) {
             if (leaf[0] == '.') continue;
-            nodes.push_back({place + leaf, directory, directory + place + leaf});
+            nodes.push_back({place + leaf, folder, directory + place + leaf});
         }
     }
     return nodes;
@@ -140,7 +143,7 @@ int openNode(const Node& node, int flags) {
     const bool writes = (flags & O_ACCMODE) != O_RDONLY;
     if (mode == 0 || leaf[0] == '.') return -ENOENT;
     if ((reads && (mode & 0444) == 0) || (writes && (mode & 0222) == 0)) return -EACCES;
-    return folder.open(leaf, flags & O_ACCMODE);
+    return folder.open(leaf, flags & O_ACCMODE).release();
 }
 
 std::string show(const Node& node) {

@@ -6,6 +6,8 @@
 
 #include <sys/types.h>
 
+#include <memory>
+
 /**
  * A kernel vibrator driver in a directory: a plain file for each sysfs attribute, so that a daemon,
  * a test and a person see the same driver.
@@ -19,28 +21,30 @@ using model::Layout;
 std::string inheritedDirectory();
 
 /**
- * Takes a directory for a simulated driver: makes it, or marks it when it is empty.
+ * Takes a directory for a simulated driver: marks it, if it is empty.
  *
  * @return an errno, 0 for success; ENOTEMPTY if it has other content and no mark.
  */
-int claimDirectory(const std::string& directory);
+int claimDirectory(const Folder& directory);
 /** @return whether a directory has been claimed. */
 bool isMarked(const Folder& directory);
 /**
  * Makes a driver in a directory that can be claimed, and replaces one of the same layout. Follows
  * no links inside. @return an errno, 0 for success.
  */
+int createDriver(const Folder& directory, Layout layout, const Features& features);
+/** The same in a directory that is made if there is none. */
 int createDriver(const std::string& directory, Layout layout, const Features& features);
-/** Makes only the nodes, in any directory; "" is the root. @return an errno, 0 for success. */
-int createNodes(const std::string& directory, Layout layout, const Features& features);
+/** Makes only the nodes, in any directory. @return an errno, 0 for success. */
+int createNodes(const Folder& directory, Layout layout, const Features& features);
 
 /** A node of the simulated driver. */
 struct Node {
     /** Its path on a device. */
     std::string path;
     /** The directory of the driver. */
-    std::string directory;
-    /** The file that holds its state. */
+    std::shared_ptr<const Folder> directory;
+    /** The path of the file that holds its state. */
     std::string file;
 
     /** @return the last part of its path, like "intensity". */

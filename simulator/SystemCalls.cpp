@@ -23,13 +23,11 @@
 #include <cstdlib>
 #include <cstring>
 #include <map>
-#include <memory>
 #include <mutex>
 #include <utility>
 
 namespace {
 
-using simulator::Folder;
 using simulator::Node;
 
 int kernelClose(int file) {
@@ -39,7 +37,6 @@ int kernelClose(int file) {
 /** An open node; its descriptor is that of the file that holds its state. */
 struct OpenNode {
     Node node;
-    std::shared_ptr<const Folder> directory;
     /** What it showed at the first read; later reads continue in it. */
     std::string shown;
     size_t offset = 0;
@@ -93,20 +90,21 @@ auto answer(Call call) {
 template <typename Action>
 ssize_t simulate(const OpenNode& open, const std::string& name, const std::string& argument,
                  Action action, const void* shown = nullptr) {
-    const auto fault = simulator::takeFault(*open.directory, open.node.leaf(), name);
+    const auto fault = simulator::takeFault(*open.node.directory, open.node.leaf(), name);
     const ssize_t result =
             fault && fault->error != 0 ? -fault->error : action(fault ? fault->bytes : SIZE_MAX);
     std::string bytes;
     if (shown != nullptr && result >= 0)
         bytes = model::quote({static_cast<const char*>(shown), static_cast<size_t>(result)});
-    simulator::trace(*open.directory, model::traceName(open.node.path) + ' ' + name + argument,
+    simulator::trace(*open.node.directory, model::traceName(open.node.path) + ' ' + name + argument,
                      result, bytes);
     return result;
 }
 
 int simulateOpen(const Node& node, int flags) {
     constexpr const char* kNames[] = {" O_RDONLY", " O_WRONLY", " O_RDWR", " O_ACCMODE"};
-    const OpenNode open{node, std::make_shared<const Folder>(node.directory), {}};
+    if (!simulator::isMarked(*node.directory)) return -ENOENT;
+    const OpenNode open{node, {}};
     int file = -1;
     const ssize_t result = simulate(open, "open", kNames[flags & O_ACCMODE], [&](size_t) {
         file = simulator::openNode(node, flags);

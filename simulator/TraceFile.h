@@ -11,8 +11,8 @@ namespace simulator {
 std::string traceFile(const std::string& directory);
 
 /**
- * Appends the line of one access, as model::traceLine makes it, to the trace. Only in a directory
- * that is marked as a driver's, and up to the limit.
+ * Appends the line of one access, as model::traceLine makes it, to the trace of a directory that is
+ * marked as a driver's. Up to the limit.
  */
 void trace(const Folder& directory, const std::string& access, long result,
            const std::string& shown = {});

@@ -101,9 +101,9 @@ class Simulator : public cli::Program {
         throw UsageError("no directory of a driver; name one with --dir or VIBRATOR_SIM_DIR");
     }
     /** @return the directory, in which there is a driver. */
-    std::string driver() const {
-        const simulator::Folder folder(directory());
-        if (simulator::isMarked(folder)) return directory();
+    simulator::Folder driver() const {
+        simulator::Folder folder(directory());
+        if (simulator::isMarked(folder)) return folder;
         const int error = folder.error() != 0 ? folder.error() : ENOENT;
         throw std::runtime_error("\"" + directory() + "\" has no simulated driver: " +
                                  strerror(error) + "; \"vibrator-sim create\" makes one");
@@ -144,7 +144,8 @@ class Simulator : public cli::Program {
 
     void addShow() {
         command(kAlone, "show", "print what each node holds", "").run([this] {
-            for (const simulator::Node& node : simulator::listNodes(driver()))
+            driver();
+            for (const simulator::Node& node : simulator::listNodes(directory()))
                 std::cout << node.path << ' ' << model::quote(simulator::show(node)) << '\n';
             return cli::kSuccess;
         });
@@ -154,7 +155,8 @@ class Simulator : public cli::Program {
         command(kAlone, "trace", "print every access of the nodes so far", "")
                 .note("Each line: time in seconds, node, access, result.")
                 .run([this] {
-                    const std::string path = simulator::traceFile(driver());
+                    driver();
+                    const std::string path = simulator::traceFile(directory());
                     std::ifstream file(path);
                     for (std::string line; std::getline(file, line);)
                         std::cout << cli::printable(line) << '\n';
@@ -204,12 +206,13 @@ class Simulator : public cli::Program {
         }
         if (fault) fault->times = times;
         if (fault) fault->after = after;
+        const simulator::Folder folder = driver();
         Names leaves;
-        for (const simulator::Node& node : simulator::listNodes(driver()))
+        for (const simulator::Node& node : simulator::listNodes(directory()))
             leaves.push_back(node.leaf());
         require(leaf, leaves, "the driver has no node " + cli::inQuotes(leaf));
-        if (!simulator::setFault(driver(), leaf, operation, fault)) {
-            throw std::runtime_error("\"" + driver() + "\" cannot be written to");
+        if (!simulator::setFault(folder, leaf, operation, fault)) {
+            throw std::runtime_error("\"" + directory() + "\" cannot be written to");
         }
     }
 

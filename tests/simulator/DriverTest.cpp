@@ -11,13 +11,154 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <cerrno>
 #include <chrono>
+#include <cstdio>
 #include <fstream>
 #include <thread>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 namespace {
+
+/** A driver in memory that says what it is asked for. */
+class TestState : public model::State {
+  public:
+    std::string text(const std::string& leaf) const override { return mTexts.at(leaf); }
+    int setText(const std::string& leaf, std::string_view text) override {
+        mTexts[leaf] = text;
+        return 0;
+    }
+    uint64_t timeLeft() const override { return mTimeLeft; }
+    int perform(const model::Action& action) override {
+        if (mError != 0) return mError;
+        if (const auto* run = std::get_if<model::RunMotor>(&action)) {
+            said() << "run " << run->milliseconds;
+        } else if (const auto* intensity = std::get_if<model::SetIntensity>(&action)) {
+            said() << "intensity " << intensity->value;
+        } else if (const auto* engine = std::get_if<model::SetPackets>(&action)) {
+            for (const auto& [first, strength, second, third] : engine->packets)
+                said() << first << ' ' << strength << ' ' << second << ' ' << third;
+        } else if (const auto* pattern = std::get_if<model::SetPattern>(&action)) {
+            said() << "pattern " << pattern->index;
+        } else if (const auto* queue = std::get_if<model::SetQueue>(&action)) {
+            said() << "queue " << queue->pattern << ' ' << queue->percent << ' ' << queue->repeats
+                   << ' ' << queue->delay;
+        } else if (const auto* control = std::get_if<model::SetExternalControl>(&action)) {
+            said() << "external " << control->isOn;
+        }
+        return 0;
+    }
+
+    std::string takeSaid() {
+        std::string words = mSaid.str();
+        mSaid.str("");
+        return words;
+    }
+
+    std::map<std::string, std::string> mTexts;
+    uint64_t mTimeLeft = 0;
+    int mError = 0;
+
+  private:
+    std::ostream& said() { return mSaid.str().empty() ? mSaid : mSaid << "; "; }
+
+    std::ostringstream mSaid{"", std::ios_base::ate};
+};
+
+TEST(ModelTest, ValuesAreCheckedAsTheKernelDoes) {
+    using namespace std::string_literals;
+    const struct {
+        std::string leaf;
+        std::string text;
+        int error;
+        std::string asked = "";
+    } cases[] = {
+            {"intensity", "10000\n", 0, "intensity 10000"},
+            {"intensity", "0", 0, "intensity 0"},
+            {"intensity", "10001\n", EINVAL},
+            {"intensity", "-1", EINVAL},
+            {"intensity", "99999999999", ERANGE},
+            {"force_touch_intensity", "10000", 0},
+            {"multi_freq", "4", 0},
+            {"multi_freq", "5", EINVAL},
+            {"cp_trigger_index", "65535", 0, "pattern 65535"},
+            {"cp_trigger_index", "65536", EINVAL},
+            {"cp_trigger_queue", "3.50, 10, 0~\0"s, 0, "queue 3 50 10 0"},
+            {"cp_trigger_queue", "3.50, 10, 0~", EINVAL},
+            {"cp_trigger_queue", "3.50, 10, 0~\n", EINVAL},
+            {"cp_trigger_queue", "3.50, 10~\0"s, EINVAL},
+            {"haptic_engine", "4 1 2 3 4\n", 0, "1 2 3 4"},
+            {"haptic_engine", "8 1 2 3 4 5 6 7 -8\n", 0, "1 2 3 4; 5 6 7 -8"},
+            {"haptic_engine", "0\n", 0},
+            {"haptic_engine", "4 1 2 3 4", EINVAL},
+            {"haptic_engine", "4 1 2 3\n", EINVAL},
+            {"haptic_engine", "3 1 2 3\n", EINVAL},
+            {"haptic_engine", "4 1 2  3 4\n", EINVAL},
+            {"haptic_engine", "4 1 2 3 4 \n", EINVAL},
+            {"haptic_engine", "4 1 2 3 4\n\n", EINVAL},
+            {"event_cmd", "FOLDER_CLOSE\n", 0},
+            {"event_cmd", "FOLDER_AJAR\n", EINVAL},
+            {"ext_control", "1", 0, "external 1"},
+            {"motor_type", "LINEAR\n", EIO},
+            {"enable", "-5", 0, "run 0"},
+            {"enable", "7 ms", 0, "run 7"},
+            {"enable", "seven", EINVAL},
+            {"duration", "300", 0},
+            {"activate", "1", 0, "run 300"},
+    };
+    TestState state;
+    for (const model::Attribute& attribute : model::attributes())
+        state.setText(attribute.leaf, attribute.initialText({}));
+    for (const auto& [leaf, text, error, asked] : cases) {
+        SCOPED_TRACE(leaf + ' ' + testing::PrintToString(text));
+        const auto before = state.mTexts;
+        if (!asked.empty()) {
+            state.mError = -ENODEV;
+            EXPECT_EQ(model::store(state, leaf, text), -ENODEV);
+            EXPECT_EQ(state.mTexts, before) << "a motor that is not there";
+            state.mError = 0;
+        }
+        const auto size = static_cast<ssize_t>(text.size());
+        EXPECT_EQ(model::store(state, leaf, text), error == 0 ? size : -error);
+        EXPECT_EQ(state.takeSaid(), asked);
+        if (error != 0) {
+            EXPECT_EQ(state.mTexts, before);
+        }
+    }
+    state.mTimeLeft = 12;
+    EXPECT_EQ(model::store(state, "activate", "1"), 1);
+    EXPECT_EQ(state.takeSaid(), "") << "it runs already";
+}
+
+/** @return lines that tell in what layouts an attribute can be, and whether it is only read. */
+template <typename Attributes, typename IsIn, typename IsOnlyRead>
+std::set<std::string> inWords(const Attributes& attributes, IsIn isIn, IsOnlyRead isOnlyRead) {
+    std::set<std::string> lines;
+    for (const auto& each : attributes) {
+        lines.insert(std::string(each.leaf) + (isIn(each, Layout::kTimedOutput) ? " timed" : "") +
+                     (isIn(each, Layout::kLedTrigger) ? " led" : "") +
+                     (isOnlyRead(each) ? " read" : ""));
+    }
+    return lines;
+}
+
+TEST(ModelTest, AttributesAreTheNodesThatTheServiceUses) {
+    const std::vector<std::string> names = model::featureNames();
+    const model::Features features{{names.begin(), names.end()}};
+    const auto known = inWords(
+            model::attributes(),
+            [&](const auto& each, Layout layout) { return each.isIn(layout, features); },
+            [](const auto& each) { return (each.mode & 0222) == 0; });
+    const auto used = inWords(
+            NodePathTable,
+            [](const NodeInfo& each, Layout layout) {
+                return each.isIn(layout == Layout::kTimedOutput ? kTimedOutputMode
+                                                                : kLedTriggerMode);
+            },
+            [](const NodeInfo& each) { return each.isOnlyRead; });
+    EXPECT_EQ(known, used);
+}
 
 class SimulatedDriverTest : public VibratorTest {
   protected:
@@ -51,42 +192,13 @@ TEST_F(SimulatedDriverTest, TransientTriggerIsTheKernels) {
     expectTransientTrigger(sysfsDirectory(Layout::kLedTrigger));
 }
 
-TEST_F(SimulatedDriverTest, ValuesAreCheckedAsTheKernelDoes) {
+TEST_F(SimulatedDriverTest, ModesBindRootToo) {
     start(Layout::kLedTrigger);
-    const struct {
-        std::string leaf;
-        std::string text;
-        int error;
-    } cases[] = {
-            {"intensity", "10000\n", 0},
-            {"intensity", "10001\n", EINVAL},
-            {"intensity", "-1", EINVAL},
-            {"intensity", "99999999999", ERANGE},
-            {"multi_freq", "5", EINVAL},
-            {"cp_trigger_index", "65536", EINVAL},
-            {"cp_trigger_queue", "3.50, 10, 0~", EINVAL},
-            {"haptic_engine", "4 1 2 3 4\n", 0},
-            {"haptic_engine", "4 1 2 3 4", EINVAL},
-            {"haptic_engine", "4 1 2 3\n", EINVAL},
-            {"haptic_engine", "3 1 2 3\n", EINVAL},
-            {"haptic_engine", "4 1 2  3 4\n", EINVAL},
-            {"haptic_engine", "4 1 2 3 4 \n", EINVAL},
-            {"haptic_engine", "4 1 2 3 4\n\n", EINVAL},
-            {"event_cmd", "FOLDER_AJAR\n", EINVAL},
-            {"motor_type", "LINEAR\n", EIO},
-            {"num_waves", "1", EACCES},
-            {"absent", "1", ENOENT},
-    };
-    for (const auto& [leaf, text, error] : cases) {
-        const std::string before = error == ENOENT ? "" : get(leaf);
-        EXPECT_EQ(put(leaf, text), error) << leaf << ' ' << testing::PrintToString(text);
-        if (error != 0 && error != ENOENT) {
-            EXPECT_EQ(get(leaf), before);
-        }
-    }
     ASSERT_EQ(chmod((mDirectory.path() + path("intensity")).c_str(), 0200), 0);
     EXPECT_EQ(::open(path("intensity").c_str(), O_RDONLY), -1);
     EXPECT_EQ(errno, EACCES);
+    EXPECT_EQ(put("num_waves", "1"), EACCES);
+    EXPECT_EQ(put("absent", "1"), ENOENT);
 }
 
 TEST_F(SimulatedDriverTest, AtMostAPageIsTakenAtOnce) {
@@ -174,11 +286,31 @@ TEST_F(SimulatedDriverTest, TraceIsLimitedAndStaysInsideMarkedFolders) {
     }
 }
 
+TEST_F(SimulatedDriverTest, DirectoryIsLookedUpOnce) {
+    const std::string directory = mDirectory.path() + "/driver";
+    const std::string link = mDirectory.path() + "/link";
+    const std::string victim = mDirectory.path() + "/victim";
+    for (const std::string& each : {directory, victim, victim + "/precious"})
+        ASSERT_EQ(mkdir(each.c_str(), 0755), 0);
+    ASSERT_EQ(symlink(victim.c_str(), link.c_str()), 0);
+    // Somebody exchanges the directory for a link while it is made a driver's.
+    std::atomic<bool> isDone = false;
+    std::thread other([&] {
+        while (!isDone)
+            renameat2(AT_FDCWD, directory.c_str(), AT_FDCWD, link.c_str(), RENAME_EXCHANGE);
+    });
+    for (int i = 0; i < 2000; ++i)
+        simulator::createDriver(directory, Layout::kLedTrigger, {});
+    isDone = true;
+    other.join();
+    EXPECT_EQ(simulator::Folder(victim).names(), Lines{"precious"});
+}
+
 TEST_F(SimulatedDriverTest, NamesStayInTheirFolder) {
     const simulator::Folder folder(mDirectory.path());
     for (const char* name : {"a/b", ".", "..", "../x", ""}) {
         EXPECT_NE(folder.replace(name, "x", 0600), 0) << name;
-        EXPECT_LT(folder.open(name, O_RDONLY), 0) << name;
+        EXPECT_FALSE(folder.open(name, O_RDONLY).isOpen()) << name;
     }
     for (const char* path : {"..", "sys/../../x"})
         EXPECT_NE(simulator::Folder(folder, path, true).error(), 0) << path;
