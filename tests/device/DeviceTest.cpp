@@ -93,6 +93,13 @@ TEST(DeviceTest, EveryListOfNodesIsTheTables) {
     }
     EXPECT_NE(readFile(NODES_SCRIPT).find(given + "; do\n"), std::string::npos);
 
+    // Each string is logged under its own name.
+    const std::string table = readFile(kSource + "/vibrator/NodePathTable.cpp");
+    const std::regex row(R"re(&(THE_DEVICE_\w+),\s+"Vibrator \1 %s")re");
+    EXPECT_EQ(std::distance(std::sregex_iterator(table.begin(), table.end(), row), {}),
+              std::count_if(std::begin(NodePathTable), std::end(NodePathTable),
+                            [](const NodeInfo& node) { return node.path != nullptr; }));
+
     std::set<std::string> simulated;
     for (const model::Attribute& attribute : model::attributes()) {
         const auto* layout = std::get_if<model::Layout>(&attribute.origin);

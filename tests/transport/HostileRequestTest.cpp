@@ -225,7 +225,7 @@ TEST_P(HostileRequestTest, WrongTokensAndCodesAreRefused) {
     // Without its end, and without anything.
     EXPECT_EQ(call(RawMessage(token.substr(0, token.size() / 4 * 4)), GetParam().code), kBadType);
     EXPECT_EQ(call(RawMessage(""), GetParam().code), kBadType);
-    for (const uint32_t code : {0U, 26U, 0x0f000000U, 0x5f504e47U, UINT32_MAX})
+    for (const uint32_t code : {0U, 999U, 0x0f000000U, 0x5f504e47U, UINT32_MAX})
         EXPECT_EQ(call(right(), code), kUnknown) << code;
     EXPECT_EQ(call(right(), raw::kPing), kBadType);
 }

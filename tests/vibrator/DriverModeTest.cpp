@@ -11,22 +11,12 @@ constexpr char kNoDriver[] =
 
 /** The lines that show where the nodes are; an empty directory is for no driver. */
 std::string pathLines(const std::string& directory) {
-    const std::pair<const char*, const char*> nodes[] = {
-            {"INTENSITY", "intensity"},
-            {"FORCE_TOUCH_INTENSITY", "force_touch_intensity"},
-            {"MULTI_FREQ", "multi_freq"},
-            {"HAPTIC_ENGINE", "haptic_engine"},
-            {"HAPTIC_ENGINE_INDEX", "cp_trigger_index"},
-            {"HAPTIC_PLAYBACK_QUEUE", "cp_trigger_queue"},
-            {"HAPTIC_ENGINE_NUM_WAVES", "num_waves"},
-            {"MOTOR_TYPE", "motor_type"},
-            {"EVENT_CMD", "event_cmd"},
-            {"PATTERN_LENGTH", "pattern_length"},
-            {"EXT_CONTROL", "ext_control"}};
     std::string lines;
-    for (const auto& [name, leaf] : nodes) {
-        lines += std::string("; D Vibrator THE_DEVICE_") + name + " ";
-        if (!directory.empty()) lines += directory + leaf;
+    for (const NodeInfo& node : NodePathTable) {
+        if (node.path == nullptr) continue;
+        const std::string format = node.logFormat;
+        lines += "; D " + format.substr(0, format.find('%'));
+        if (!directory.empty()) lines += directory + node.leaf;
     }
     return lines;
 }

@@ -60,13 +60,18 @@ TEST_P(OperationsTest, NodeMayGetTheDescriptorOfStandardInput) {
 }
 
 TEST_P(OperationsTest, GateRefusesAllButSystemAndRoot) {
-    size_t gated = 0;
+    size_t others = 0;
     for (const Operation& operation : allOperations()) {
         for (const uid_t uid : {0U, 2000U, 1001U, 999U, 1U, 10123U, 4294967295U})
             expect(operation, uid);
-        if (operation.steps.find('@') != std::string::npos) ++gated;
+        const bool isGated = operation.steps.find('@') != std::string::npos;
+        if (operation.name().compare(0, 3, "dax") == 0) {
+            EXPECT_TRUE(isGated) << operation.name();
+        } else if (isGated) {
+            ++others;
+        }
     }
-    EXPECT_EQ(gated, 19U) << "fifteen, one of them in two ways, and three that call one of them";
+    EXPECT_EQ(others, 3U) << "those that call one that is gated";
 }
 
 TEST_P(OperationsTest, EverySystemCallMayFail) {
