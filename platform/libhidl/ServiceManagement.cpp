@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "LocalServiceManager.h"
+#include "SocketServiceManager.h"
 
 #include <android/hidl/manager/1.2/BpHwServiceManager.h>
 #include <android/log.h>
@@ -33,8 +33,8 @@ Driver& driver() {
 
 /** Asks once for the service manager. @return OK, or why none answers. */
 Error askForManager(sp<Manager>* manager) {
-    if (LocalDriver* sockets = driver().localDriver()) {
-        *manager = new LocalServiceManager(*sockets);
+    if (SocketDriver* sockets = driver().socketDriver()) {
+        *manager = new SocketServiceManager(*sockets);
         return {};
     }
     Error error = driver().check();
@@ -50,8 +50,8 @@ Error askForManager(sp<Manager>* manager) {
 
 /** Looks a name up once. @return OK, or why nothing has it. */
 Error lookUp(const std::string& interface, const std::string& instance, sp<IBase>* service) {
-    if (LocalDriver* sockets = driver().localDriver()) {
-        return LocalServiceManager::find(*sockets, interface, instance, service);
+    if (SocketDriver* sockets = driver().socketDriver()) {
+        return SocketServiceManager::find(*sockets, interface, instance, service);
     }
     sp<Manager> manager;
     Error error = askForManager(&manager);
@@ -207,7 +207,7 @@ status_t registerAsServiceInternal(const sp<IBase>& service, const std::string& 
     static auto* const registrations = new sp<Registrations>(new Registrations);
     const Error error = (*registrations)->add(service, instance);
     // Over sockets the server has said why, and goes on trying.
-    if (!error.isOk() && driver().localDriver() == nullptr) {
+    if (!error.isOk() && driver().socketDriver() == nullptr) {
         __android_log_print(ANDROID_LOG_ERROR, kLogTag, "not registered: %s", error.text().c_str());
     }
     return error.code();
@@ -226,7 +226,7 @@ void setCallTimeout(milliseconds limit) {
 }
 
 std::string serviceManagerDescription() {
-    if (driver().localDriver() != nullptr) return "none is needed";
+    if (driver().socketDriver() != nullptr) return "none is needed";
     sp<Manager> manager;
     const Error error = askForManager(&manager);
     return error.isOk() ? "answers" : error.text();

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "KernelDriver.h"
-#include "libhwbinder/LocalDriver.h"
+#include "libhwbinder/SocketDriver.h"
 
 #include <android/log.h>
 #include <hwbinder/BpHwBinder.h>
@@ -33,9 +33,9 @@ std::unique_ptr<Driver> chooseDriver(std::string* description) {
         }
         reason = ", because of " + kernel->check().text();
     }
-    auto local = std::make_unique<LocalDriver>();
-    *description = local->name() + reason;
-    return local;
+    auto sockets = std::make_unique<SocketDriver>();
+    *description = sockets->name() + reason;
+    return sockets;
 }
 
 std::atomic<int>& timeout() {

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "libhwbinder/KernelDriver.h"
-#include "libhwbinder/LocalConnection.h"
 #include "libhwbinder/Packet.h"
+#include "libhwbinder/SocketConnection.h"
 #include "support/LogCapture.h"
 #include "transport/TransportTest.h"
 
@@ -106,14 +106,14 @@ TEST_F(RuntimeTest, ObjectThatHasGoneIsNotGivenAgain) {
     EXPECT_EQ(android::hardware::getOrCreateCachedBinder(served.get()), stub);
 }
 
-TEST(LocalConnectionTest, WrongReplyIsAFailureAndAnEndOrOneThatIsTooLargeADeath) {
+TEST(SocketConnectionTest, WrongReplyIsAFailureAndAnEndOrOneThatIsTooLargeADeath) {
     android::hardware::Packet packet;
     packet.packStatus(android::OK);
     const std::string success(reinterpret_cast<const char*>(packet.bytes), packet.size);
     for (const std::string& last : {std::string(), std::string(packet.kMaxSize + 1, '\0')}) {
         int sockets[2];
         ASSERT_EQ(socketpair(AF_UNIX, SOCK_SEQPACKET, 0, sockets), 0);
-        android::hardware::LocalConnection connection(sockets[0], nullptr, 0);
+        android::hardware::SocketConnection connection(sockets[0], nullptr, 0);
         android::hardware::Parcel reply;
         for (const std::string& wrong : {success, std::string(17, '\0')}) {
             ASSERT_GT(send(sockets[1], wrong.data(), wrong.size(), 0), 0);

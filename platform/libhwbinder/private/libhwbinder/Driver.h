@@ -14,7 +14,7 @@
 
 namespace android::hardware {
 
-class LocalDriver;
+class SocketDriver;
 
 /** An object of another process, as its proxy sees it. It is given up when this ends. */
 class RemoteObject {
@@ -56,7 +56,7 @@ class Driver {
     virtual void serve() = 0;
 
     /** @return this as the driver that finds services itself; nullptr where a manager does that. */
-    virtual LocalDriver* localDriver() { return nullptr; }
+    virtual SocketDriver* socketDriver() { return nullptr; }
     /** Makes an object the service manager of every process. @return OK, or why not. */
     virtual status_t becomeContextManager(const sp<BHwBinder>& /* object */) {
         return INVALID_OPERATION;

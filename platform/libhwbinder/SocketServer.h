@@ -30,12 +30,12 @@ namespace android::hardware {
  * A child of the process must exec at once: while it holds a connection that is closed here, epoll
  * goes on reporting that.
  */
-class LocalServer {
+class SocketServer {
   public:
-    LocalServer();
-    ~LocalServer();
-    LocalServer(const LocalServer&) = delete;
-    LocalServer& operator=(const LocalServer&) = delete;
+    SocketServer();
+    ~SocketServer();
+    SocketServer(const SocketServer&) = delete;
+    SocketServer& operator=(const SocketServer&) = delete;
 
     /**
      * Makes an object known under a name: at once, or when the process that has it has gone.

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "LocalServiceManager.h"
+#include "SocketServiceManager.h"
 
 #include "libhwbinder/SocketDirectory.h"
 
@@ -118,8 +118,8 @@ class Notifications {
 
 }  // namespace
 
-Error LocalServiceManager::find(LocalDriver& driver, const std::string& interface,
-                                const std::string& instance, sp<IBase>* service) {
+Error SocketServiceManager::find(SocketDriver& driver, const std::string& interface,
+                                 const std::string& instance, sp<IBase>* service) {
     uint32_t handle = 0;
     Error error = driver.connect(interface, instance, &handle);
     if (error.isOk()) {
@@ -129,13 +129,13 @@ Error LocalServiceManager::find(LocalDriver& driver, const std::string& interfac
     return error;
 }
 
-Return<sp<IBase>> LocalServiceManager::get(const hidl_string& interface, const hidl_string& name) {
+Return<sp<IBase>> SocketServiceManager::get(const hidl_string& interface, const hidl_string& name) {
     sp<IBase> service;
     (void)find(mDriver, interface, name, &service);
     return service;
 }
 
-Return<void> LocalServiceManager::list(list_cb callback) {
+Return<void> SocketServiceManager::list(list_cb callback) {
     std::vector<hidl_string> names;
     for (const auto& [interface, instance] : listNames())
         names.emplace_back(interface + "/" + instance);
@@ -143,8 +143,8 @@ Return<void> LocalServiceManager::list(list_cb callback) {
     return Void();
 }
 
-Return<void> LocalServiceManager::listByInterface(const hidl_string& interface,
-                                                  listByInterface_cb callback) {
+Return<void> SocketServiceManager::listByInterface(const hidl_string& interface,
+                                                   listByInterface_cb callback) {
     std::vector<hidl_string> instances;
     for (const Name& name : listNames()) {
         if (interface == name.first) instances.emplace_back(name.second);
@@ -153,7 +153,7 @@ Return<void> LocalServiceManager::listByInterface(const hidl_string& interface,
     return Void();
 }
 
-Return<bool> LocalServiceManager::registerForNotifications(
+Return<bool> SocketServiceManager::registerForNotifications(
         const hidl_string& interface, const hidl_string& name,
         const sp<IServiceNotification>& callback) {
     if (callback == nullptr) return false;
@@ -161,13 +161,13 @@ Return<bool> LocalServiceManager::registerForNotifications(
     return true;
 }
 
-Return<bool> LocalServiceManager::unregisterForNotifications(
+Return<bool> SocketServiceManager::unregisterForNotifications(
         const hidl_string& interface, const hidl_string& name,
         const sp<IServiceNotification>& callback) {
     return Notifications::instance().remove({interface, name}, callback);
 }
 
-Return<void> LocalServiceManager::debugDump(debugDump_cb callback) {
+Return<void> SocketServiceManager::debugDump(debugDump_cb callback) {
     std::vector<InstanceDebugInfo> infos;
     for (const auto& [interface, instance] : listNames()) {
         InstanceDebugInfo info{};
@@ -180,8 +180,8 @@ Return<void> LocalServiceManager::debugDump(debugDump_cb callback) {
     return Void();
 }
 
-Return<bool> LocalServiceManager::addWithChain(const hidl_string& name, const sp<IBase>& service,
-                                               const hidl_vec<hidl_string>& chain) {
+Return<bool> SocketServiceManager::addWithChain(const hidl_string& name, const sp<IBase>& service,
+                                                const hidl_vec<hidl_string>& chain) {
     if (service == nullptr || service->isRemote() || chain.size() == 0) return false;
     const sp<IBinder> binder = getOrCreateCachedBinder(service.get());
     if (binder == nullptr) return false;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "LocalServer.h"
+#include "SocketServer.h"
 
 #include "libhwbinder/Driver.h"
 #include "libhwbinder/SocketDirectory.h"
@@ -87,7 +87,7 @@ bool receive(int socket, Packet* request, ucred* caller) {
 
 }  // namespace
 
-LocalServer::LocalServer()
+SocketServer::SocketServer()
     : mEpoll(epoll_create1(EPOLL_CLOEXEC)),
       mWake(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)),
       mSpare(openSpare()) {
@@ -100,7 +100,7 @@ LocalServer::LocalServer()
     mMostPerUid = std::clamp<size_t>(mMost / 4, 1, kMostConnectionsPerUid);
 }
 
-LocalServer::~LocalServer() {
+SocketServer::~SocketServer() {
     for (const Endpoint& listener : mListeners)
         close(listener.socket);
     for (const auto& [socket, client] : mClients)
@@ -109,8 +109,8 @@ LocalServer::~LocalServer() {
         close(descriptor);
 }
 
-bool LocalServer::publish(const sp<BHwBinder>& object, const std::vector<std::string>& chain,
-                          const std::string& instance) {
+bool SocketServer::publish(const sp<BHwBinder>& object, const std::vector<std::string>& chain,
+                           const std::string& instance) {
     std::string whyNot;
     const int socket = ::android::hardware::publish(chain, instance, &whyNot);
     if (socket >= 0) {
@@ -130,7 +130,7 @@ bool LocalServer::publish(const sp<BHwBinder>& object, const std::vector<std::st
     return false;
 }
 
-bool LocalServer::listen(int socket, const sp<BHwBinder>& object) {
+bool SocketServer::listen(int socket, const sp<BHwBinder>& object) {
     Endpoint& listener =
             mListeners.emplace_back(Endpoint{socket, object, nullptr, nullptr, false, 0});
     epoll_event event{};
@@ -139,7 +139,7 @@ bool LocalServer::listen(int socket, const sp<BHwBinder>& object) {
     return epoll_ctl(mEpoll, EPOLL_CTL_ADD, socket, &event) == 0;
 }
 
-int LocalServer::retryPending() {
+int SocketServer::retryPending() {
     const std::lock_guard<std::mutex> lock(mMutex);
     const auto isKnown = [&](const Pending& each) {
         std::string whyNot;
@@ -156,7 +156,7 @@ int LocalServer::retryPending() {
     return mHasPending ? mRetryAfter : -1;
 }
 
-bool LocalServer::watch(uint32_t handle, int connection) const {
+bool SocketServer::watch(uint32_t handle, int connection) const {
     epoll_event event{};
     // The death is news only once.
     event.events = EPOLLRDHUP | EPOLLONESHOT;
@@ -164,11 +164,11 @@ bool LocalServer::watch(uint32_t handle, int connection) const {
     return epoll_ctl(mEpoll, EPOLL_CTL_ADD, connection, &event) == 0;
 }
 
-void LocalServer::unwatch(int connection) const {
+void SocketServer::unwatch(int connection) const {
     epoll_ctl(mEpoll, EPOLL_CTL_DEL, connection, nullptr);
 }
 
-void LocalServer::serve() {
+void SocketServer::serve() {
     if (mEpoll < 0 || mWake < 0 || mSpare < 0 || descriptorLimit() < kLeastDescriptors) {
         __android_log_print(ANDROID_LOG_ERROR, kLogTag,
                             "too few descriptors to serve: the limit is %zu, at least %zu are "
@@ -185,7 +185,7 @@ void LocalServer::serve() {
     }
 }
 
-bool LocalServer::collect(int timeout) {
+bool SocketServer::collect(int timeout) {
     epoll_event events[1024];
     const int count = epoll_wait(mEpoll, events, 1024, timeout);
     if (count < 0) return errno == EINTR;
@@ -213,7 +213,7 @@ bool LocalServer::collect(int timeout) {
     return true;
 }
 
-void LocalServer::enqueue(Endpoint* client) {
+void SocketServer::enqueue(Endpoint* client) {
     if (client->isQueued) return;
     client->isQueued = true;
     Share* share = client->share;
@@ -221,7 +221,7 @@ void LocalServer::enqueue(Endpoint* client) {
     share->waiting.push(client);
 }
 
-void LocalServer::serveOneOfEach() {
+void SocketServer::serveOneOfEach() {
     const Share* const lastOfRound = mTurns.last();
     for (bool isLast = mTurns.isEmpty(); !isLast;) {
         Share* share = mTurns.pop();
@@ -234,7 +234,7 @@ void LocalServer::serveOneOfEach() {
     }
 }
 
-bool LocalServer::serveCall(Endpoint* client) {
+bool SocketServer::serveCall(Endpoint* client) {
     client->lastUsed = ++mClock;
     const int socket = client->socket;
     ucred caller{};
@@ -268,12 +268,12 @@ bool LocalServer::serveCall(Endpoint* client) {
     return isAlive;
 }
 
-bool LocalServer::reply(int socket) {
+bool SocketServer::reply(int socket) {
     // Never waits: a client that does not read its replies is dropped.
     return send(socket, mReply->bytes, mReply->size, MSG_DONTWAIT | MSG_NOSIGNAL) >= 0;
 }
 
-void LocalServer::acceptAll(Endpoint* listener) {
+void SocketServer::acceptAll(Endpoint* listener) {
     for (int i = 0; i < kMostAcceptedAtOnce; ++i) {
         const int socket =
                 accept4(listener->socket, nullptr, nullptr, SOCK_NONBLOCK | SOCK_CLOEXEC);
@@ -304,7 +304,7 @@ void LocalServer::acceptAll(Endpoint* listener) {
     }
 }
 
-bool LocalServer::makeRoom(const Endpoint* newcomer) {
+bool SocketServer::makeRoom(const Endpoint* newcomer) {
     const Share* share = newcomer->share;
     const size_t kept = isPrivileged(share->uid) ? 0 : std::min(mMost / 2, kReservedConnections);
     if (share->connections <= mMostPerUid) {
@@ -324,8 +324,8 @@ bool LocalServer::makeRoom(const Endpoint* newcomer) {
     return true;
 }
 
-LocalServer::Endpoint* LocalServer::oldestClient(const Share* share, const Endpoint* newcomer,
-                                                 bool onlyIdle) {
+SocketServer::Endpoint* SocketServer::oldestClient(const Share* share, const Endpoint* newcomer,
+                                                   bool onlyIdle) {
     const auto isIdle = [](const Endpoint& client) {
         return !client.isQueued && peek(client.socket) == 0;
     };
@@ -340,7 +340,7 @@ LocalServer::Endpoint* LocalServer::oldestClient(const Share* share, const Endpo
     return oldest;
 }
 
-void LocalServer::refuseOne(int listener) {
+void SocketServer::refuseOne(int listener) {
     // There is no descriptor left for it; waiting, it would be reported again and again.
     close(mSpare);
     const int socket = accept4(listener, nullptr, nullptr, SOCK_CLOEXEC);
@@ -348,7 +348,7 @@ void LocalServer::refuseOne(int listener) {
     mSpare = openSpare();
 }
 
-void LocalServer::drop(Endpoint* client) {
+void SocketServer::drop(Endpoint* client) {
     Share* share = client->share;
     if (client->isQueued) {
         share->waiting.remove(client);

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "libhidl/ServiceManagerBase.h"
-#include "libhwbinder/LocalDriver.h"
+#include "libhwbinder/SocketDriver.h"
 
 #include <string>
 
@@ -12,12 +12,12 @@ namespace android::hardware {
  * The service manager where calls go over sockets. It is no process of its own: each process looks
  * into the directories of sockets itself.
  */
-class LocalServiceManager : public ServiceManagerBase {
+class SocketServiceManager : public ServiceManagerBase {
   public:
-    explicit LocalServiceManager(LocalDriver& driver) : mDriver(driver) {}
+    explicit SocketServiceManager(SocketDriver& driver) : mDriver(driver) {}
 
     /** Finds a service. @return OK, or why it is not there. */
-    static Error find(LocalDriver& driver, const std::string& interface,
+    static Error find(SocketDriver& driver, const std::string& interface,
                       const std::string& instance, sp<::android::hidl::base::V1_0::IBase>* service);
 
     Return<sp<::android::hidl::base::V1_0::IBase>> get(const hidl_string& interface,
@@ -43,7 +43,7 @@ class LocalServiceManager : public ServiceManagerBase {
     }
 
   private:
-    LocalDriver& mDriver;
+    SocketDriver& mDriver;
 };
 
 }  // namespace android::hardware

@@ -11,17 +11,17 @@
 
 namespace android::hardware {
 
-class LocalServer;
+class SocketServer;
 
 /** Carries calls over sockets, on a machine whose kernel has no binder driver. */
-class LocalDriver : public Driver {
+class SocketDriver : public Driver {
   public:
-    LocalDriver();
-    ~LocalDriver() override;
+    SocketDriver();
+    ~SocketDriver() override;
 
     std::unique_ptr<RemoteObject> open(uint32_t handle) override;
     void serve() override;
-    LocalDriver* localDriver() override { return this; }
+    SocketDriver* socketDriver() override { return this; }
     std::string name() const override;
 
     /**
@@ -41,7 +41,7 @@ class LocalDriver : public Driver {
                  const std::string& instance);
 
   private:
-    const std::unique_ptr<LocalServer> mServer;
+    const std::unique_ptr<SocketServer> mServer;
     std::mutex mMutex;
     uint32_t mLastHandle = 0;
     /** Those that are not open yet. */

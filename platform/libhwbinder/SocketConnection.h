@@ -8,19 +8,19 @@
 
 namespace android::hardware {
 
-class LocalServer;
+class SocketServer;
 struct Packet;
 
 /**
  * A client's connection to an object. It may be shared between threads; their calls go one after
  * the other. Once it has failed it stays dead.
  */
-class LocalConnection : public RemoteObject {
+class SocketConnection : public RemoteObject {
   public:
     /** @param watcher sends the obituary of the handle, if asked to. */
-    LocalConnection(int socket, const LocalServer* watcher, uint32_t handle)
+    SocketConnection(int socket, const SocketServer* watcher, uint32_t handle)
         : mSocket(socket), mWatcher(watcher), mHandle(handle) {}
-    ~LocalConnection() override;
+    ~SocketConnection() override;
 
     status_t transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags) override;
     status_t requestDeathNotice() override;
@@ -30,7 +30,7 @@ class LocalConnection : public RemoteObject {
     status_t exchange(Packet* packet, bool oneway);
 
     const int mSocket;
-    const LocalServer* const mWatcher;
+    const SocketServer* const mWatcher;
     const uint32_t mHandle;
     std::mutex mMutex;
     bool mDead = false;

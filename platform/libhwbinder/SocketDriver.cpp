@@ -1,32 +1,32 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "libhwbinder/LocalDriver.h"
+#include "libhwbinder/SocketDriver.h"
 
-#include "LocalConnection.h"
-#include "LocalServer.h"
+#include "SocketConnection.h"
+#include "SocketServer.h"
 #include "libhwbinder/SocketDirectory.h"
 
 namespace android::hardware {
 
-LocalDriver::LocalDriver() : mServer(std::make_unique<LocalServer>()) {}
+SocketDriver::SocketDriver() : mServer(std::make_unique<SocketServer>()) {}
 
-LocalDriver::~LocalDriver() = default;
+SocketDriver::~SocketDriver() = default;
 
-std::unique_ptr<RemoteObject> LocalDriver::open(uint32_t handle) {
+std::unique_ptr<RemoteObject> SocketDriver::open(uint32_t handle) {
     const std::lock_guard<std::mutex> lock(mMutex);
     const auto found = mConnections.extract(handle);
     return found.empty() ? nullptr : std::move(found.mapped());
 }
 
-void LocalDriver::serve() {
+void SocketDriver::serve() {
     mServer->serve();
 }
 
-std::string LocalDriver::name() const {
+std::string SocketDriver::name() const {
     return "sockets in " + serverDirectory();
 }
 
-Error LocalDriver::connect(const std::string& interface, const std::string& instance,
-                           uint32_t* handle) {
+Error SocketDriver::connect(const std::string& interface, const std::string& instance,
+                            uint32_t* handle) {
     std::string whyNot;
     for (const std::string& directory : clientDirectories()) {
         std::string why;
@@ -35,7 +35,7 @@ Error LocalDriver::connect(const std::string& interface, const std::string& inst
             const std::lock_guard<std::mutex> lock(mMutex);
             *handle = ++mLastHandle;
             mConnections[*handle] =
-                    std::make_unique<LocalConnection>(socket, mServer.get(), *handle);
+                    std::make_unique<SocketConnection>(socket, mServer.get(), *handle);
             return {};
         }
         whyNot += (whyNot.empty() ? "" : "; ") + why;
@@ -43,8 +43,8 @@ Error LocalDriver::connect(const std::string& interface, const std::string& inst
     return {NAME_NOT_FOUND, whyNot};
 }
 
-bool LocalDriver::publish(const sp<BHwBinder>& object, const std::vector<std::string>& chain,
-                          const std::string& instance) {
+bool SocketDriver::publish(const sp<BHwBinder>& object, const std::vector<std::string>& chain,
+                           const std::string& instance) {
     return mServer->publish(object, chain, instance);
 }
 

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "LocalConnection.h"
+#include "SocketConnection.h"
 
-#include "LocalServer.h"
 #include "Packet.h"
+#include "SocketServer.h"
 
 #include <sys/socket.h>
 #include <unistd.h>
@@ -74,19 +74,19 @@ auto retry(Call call) {
 
 }  // namespace
 
-LocalConnection::~LocalConnection() {
+SocketConnection::~SocketConnection() {
     close(mSocket);
 }
 
-status_t LocalConnection::requestDeathNotice() {
+status_t SocketConnection::requestDeathNotice() {
     return mWatcher->watch(mHandle, mSocket) ? OK : DEAD_OBJECT;
 }
 
-void LocalConnection::clearDeathNotice() {
+void SocketConnection::clearDeathNotice() {
     mWatcher->unwatch(mSocket);
 }
 
-inline status_t LocalConnection::exchange(Packet* packet, bool oneway) {
+inline status_t SocketConnection::exchange(Packet* packet, bool oneway) {
     const std::lock_guard<std::mutex> lock(mMutex);
     if (mDead) return DEAD_OBJECT;
     // Until the exchange has succeeded: a late reply must not be taken for that of the next call.
@@ -105,8 +105,8 @@ inline status_t LocalConnection::exchange(Packet* packet, bool oneway) {
     return OK;
 }
 
-status_t LocalConnection::transact(uint32_t code, const Parcel& data, Parcel* reply,
-                                   uint32_t flags) {
+status_t SocketConnection::transact(uint32_t code, const Parcel& data, Parcel* reply,
+                                    uint32_t flags) {
     SparePacket* packet = takePacket();
     const bool oneway = (flags & IBinder::FLAG_ONEWAY) != 0;
     status_t status = packet->pack(code, flags, data);
