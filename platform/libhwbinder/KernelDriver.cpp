@@ -54,37 +54,35 @@ class KernelDriver::Object : public RemoteObject {
 };
 
 KernelDriver::KernelDriver(const std::string& device) : mName(device) {
-    mDevice = ::open(device.c_str(), O_RDWR | O_CLOEXEC);
-    if (mDevice < 0) {
+    mDevice.reset(::open(device.c_str(), O_RDWR | O_CLOEXEC));
+    if (!mDevice.isValid()) {
         mError = Error::ofErrno({device});
         return;
     }
     binder_version version{};
     uint32_t noFurtherThreads = 0;
-    if (ioctl(mDevice, BINDER_VERSION, &version) != 0) {
+    if (ioctl(mDevice.get(), BINDER_VERSION, &version) != 0) {
         mError = {NO_INIT, device + ": not a binder device"};
     } else if (version.protocol_version != BINDER_CURRENT_PROTOCOL_VERSION) {
         mError = {NO_INIT, device + ": speaks version " + std::to_string(version.protocol_version) +
                                    " of the protocol, not " +
                                    std::to_string(BINDER_CURRENT_PROTOCOL_VERSION)};
-    } else if (ioctl(mDevice, BINDER_SET_MAX_THREADS, &noFurtherThreads) != 0) {
+    } else if (ioctl(mDevice.get(), BINDER_SET_MAX_THREADS, &noFurtherThreads) != 0) {
         mError = Error::ofErrno({device});
     } else {
-        void* mapping =
-                mmap(nullptr, mappingSize(), PROT_READ, MAP_PRIVATE | MAP_NORESERVE, mDevice, 0);
+        void* mapping = mmap(nullptr, mappingSize(), PROT_READ, MAP_PRIVATE | MAP_NORESERVE,
+                             mDevice.get(), 0);
         if (mapping != MAP_FAILED) {
             mMapping = mapping;
             return;
         }
         mError = Error::ofErrno({device, ": mmap"});
     }
-    close(mDevice);
-    mDevice = -1;
+    mDevice.reset();
 }
 
 KernelDriver::~KernelDriver() {
     if (mMapping != nullptr) munmap(mMapping, mappingSize());
-    if (mDevice >= 0) close(mDevice);
 }
 
 std::unique_ptr<RemoteObject> KernelDriver::open(uint32_t handle) {
@@ -101,7 +99,7 @@ status_t KernelDriver::becomeContextManager(const sp<BHwBinder>& object) {
     // Without FLAT_BINDER_FLAG_ACCEPTS_FDS, as every object.
     flat_binder_object description{};
     description.hdr.type = BINDER_TYPE_BINDER;
-    if (ioctl(mDevice, BINDER_SET_CONTEXT_MGR_EXT, &description) == 0) return OK;
+    if (ioctl(mDevice.get(), BINDER_SET_CONTEXT_MGR_EXT, &description) == 0) return OK;
     return -errno;
 }
 

@@ -3,6 +3,8 @@
 
 #include "libhwbinder/Driver.h"
 
+#include <utils/UniqueFd.h>
+
 #include <cstddef>
 #include <cstdint>
 #include <string>
@@ -27,7 +29,7 @@ class KernelDriver : public Driver {
     friend class KernelThread;
 
     const std::string mName;
-    int mDevice = -1;
+    UniqueFd mDevice;
     void* mMapping = nullptr;
     Error mError;
     sp<BHwBinder> mContextManager;

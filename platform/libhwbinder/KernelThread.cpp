@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "KernelThread.h"
 
+#include "libutils/Uninterrupted.h"
+
 #include <android/log.h>
 #include <hwbinder/ProcessState.h>
 #include <sys/ioctl.h>
@@ -85,11 +87,11 @@ KernelThread& KernelThread::self() {
 
 KernelThread::~KernelThread() {
     flush();
-    ioctl(mDriver.mDevice, BINDER_THREAD_EXIT, 0);
+    ioctl(mDriver.mDevice.get(), BINDER_THREAD_EXIT, 0);
 }
 
 status_t KernelThread::exchange(bool receive) {
-    if (mDriver.mDevice < 0) {
+    if (!mDriver.mDevice.isValid()) {
         mOutSize = 0;
         return NO_INIT;
     }
@@ -100,18 +102,18 @@ status_t KernelThread::exchange(bool receive) {
         exchange.read_buffer = reinterpret_cast<binder_uintptr_t>(mIn);
         exchange.read_size = sizeof(mIn);
     }
-    while (ioctl(mDriver.mDevice, BINDER_WRITE_READ, &exchange) != 0) {
-        if (errno == EINTR && !(receive && mAlarm != nullptr && mAlarm->isOver())) continue;
-        const int error = errno;
-        mOutSize = 0;
-        if (error != EINTR) return -error;
-        // Makes the kernel forget this thread, and the call with it. With the next command it
-        // gets to know the thread anew.
-        ioctl(mDriver.mDevice, BINDER_THREAD_EXIT, 0);
-        return TIMED_OUT;
-    }
+    const int result = uninterrupted(
+            [&] { return ioctl(mDriver.mDevice.get(), BINDER_WRITE_READ, &exchange); },
+            [&] { return !(receive && mAlarm != nullptr && mAlarm->isOver()); });
     // Commands that the kernel has not taken are dropped: it did not understand one of them.
     mOutSize = 0;
+    if (result != 0) {
+        if (errno != EINTR) return -errno;
+        // Makes the kernel forget this thread, and the call with it. With the next command it
+        // gets to know the thread anew.
+        ioctl(mDriver.mDevice.get(), BINDER_THREAD_EXIT, 0);
+        return TIMED_OUT;
+    }
     if (receive) {
         mInSize = exchange.read_consumed;
         mInPosition = 0;

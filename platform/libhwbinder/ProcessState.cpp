@@ -60,7 +60,7 @@ ProcessState* ProcessState::self() {
 
 void ProcessState::setThreadPoolConfiguration(size_t maxThreads, bool callerJoins) {
     if (maxThreads != 1) {
-        __android_log_print(ANDROID_LOG_WARN, "hwbinder",
+        __android_log_print(ANDROID_LOG_WARN, kLogTag,
                             "a pool of %zu threads was asked for; one thread serves all calls",
                             maxThreads);
     }

@@ -3,11 +3,14 @@
 
 #include "Packet.h"
 #include "SocketServer.h"
+#include "SocketTimeLimit.h"
+#include "libutils/Uninterrupted.h"
 
 #include <sys/socket.h>
 #include <unistd.h>
 
 #include <cerrno>
+#include <cstring>
 #include <utility>
 
 namespace android::hardware {
@@ -20,7 +23,7 @@ struct SparePacket : Packet {
 
 /** Most calls need no memory from the heap. */
 thread_local SparePacket* spare = nullptr;
-/** What ends after the spare ones, at the end of a thread or of the process, may still call. */
+/** Set when this thread has deleted its spare packets: what is destroyed later may still call. */
 thread_local bool areSparesGone = false;
 
 struct SparesEnd {
@@ -64,44 +67,66 @@ status_t take(SparePacket* packet, Parcel* reply) {
     return read == OK && status != OK ? status : FAILED_TRANSACTION;
 }
 
-template <typename Call>
-auto retry(Call call) {
-    auto result = call();
-    while (result < 0 && errno == EINTR)
-        result = call();
-    return result;
+/**
+ * Sends a request in the name of the effective user, as over the kernel's binder. By itself the
+ * kernel names the real one; it allows this.
+ */
+ssize_t sendRequest(int socket, const Packet& packet) {
+    uid_t real = 0;
+    uid_t effective = 0;
+    uid_t saved = 0;
+    getresuid(&real, &effective, &saved);
+    if (real == effective) return send(socket, packet.bytes, packet.size, MSG_NOSIGNAL);
+
+    const ucred credentials{getpid(), effective, getegid()};
+    iovec place{const_cast<uint8_t*>(packet.bytes), packet.size};
+    alignas(cmsghdr) char control[CMSG_SPACE(sizeof(credentials))] = {};
+    msghdr message{};
+    message.msg_iov = &place;
+    message.msg_iovlen = 1;
+    message.msg_control = control;
+    message.msg_controllen = sizeof(control);
+    cmsghdr* header = CMSG_FIRSTHDR(&message);
+    header->cmsg_level = SOL_SOCKET;
+    header->cmsg_type = SCM_CREDENTIALS;
+    header->cmsg_len = CMSG_LEN(sizeof(credentials));
+    memcpy(CMSG_DATA(header), &credentials, sizeof(credentials));
+    return sendmsg(socket, &message, MSG_NOSIGNAL);
 }
 
 }  // namespace
 
-SocketConnection::~SocketConnection() {
-    close(mSocket);
-}
+SocketConnection::SocketConnection(UniqueFd socket, const SocketServer& watcher, uint32_t handle)
+    : mSocket(std::move(socket)), mWatcher(watcher), mHandle(handle), mTimeout(callTimeout()) {}
 
 status_t SocketConnection::requestDeathNotice() {
-    return mWatcher->watch(mHandle, mSocket) ? OK : DEAD_OBJECT;
+    return mWatcher.watch(mHandle, mSocket.get()) ? OK : DEAD_OBJECT;
 }
 
 void SocketConnection::clearDeathNotice() {
-    mWatcher->unwatch(mSocket);
+    mWatcher.unwatch(mSocket.get());
 }
 
 inline status_t SocketConnection::exchange(Packet* packet, bool oneway) {
     const std::lock_guard<std::mutex> lock(mMutex);
-    if (mDead) return DEAD_OBJECT;
+    if (mIsDead) return DEAD_OBJECT;
     // Until the exchange has succeeded: a late reply must not be taken for that of the next call.
-    mDead = true;
-    if (retry([&] { return send(mSocket, packet->bytes, packet->size, MSG_NOSIGNAL); }) < 0) {
-        return errno == EAGAIN ? TIMED_OUT : DEAD_OBJECT;
+    mIsDead = true;
+    SocketTimeLimit limit(mSocket.get(), mTimeout);
+    const auto isTimeLeft = [&] { return limit.shorten(); };
+    const auto error = [] { return errno == EAGAIN || errno == EINTR ? TIMED_OUT : DEAD_OBJECT; };
+    if (uninterrupted([&] { return sendRequest(mSocket.get(), *packet); }, isTimeLeft) < 0) {
+        return error();
     }
     if (!oneway) {
-        const ssize_t size =
-                retry([&] { return recv(mSocket, packet->bytes, Packet::kMaxSize, MSG_TRUNC); });
-        if (size < 0 && errno == EAGAIN) return TIMED_OUT;
-        if (size <= 0 || static_cast<size_t>(size) > Packet::kMaxSize) return DEAD_OBJECT;
+        const ssize_t size = uninterrupted(
+                [&] { return recv(mSocket.get(), packet->bytes, Packet::kMaxSize, MSG_TRUNC); },
+                isTimeLeft);
+        if (size < 0) return error();
+        if (size == 0 || static_cast<size_t>(size) > Packet::kMaxSize) return DEAD_OBJECT;
         packet->size = static_cast<size_t>(size);
     }
-    mDead = false;
+    mIsDead = false;
     return OK;
 }
 

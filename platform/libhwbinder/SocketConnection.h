@@ -3,6 +3,8 @@
 
 #include "libhwbinder/Driver.h"
 
+#include <utils/UniqueFd.h>
+
 #include <cstdint>
 #include <mutex>
 
@@ -17,10 +19,12 @@ struct Packet;
  */
 class SocketConnection : public RemoteObject {
   public:
-    /** @param watcher sends the obituary of the handle, if asked to. */
-    SocketConnection(int socket, const SocketServer* watcher, uint32_t handle)
-        : mSocket(socket), mWatcher(watcher), mHandle(handle) {}
-    ~SocketConnection() override;
+    /**
+     * Each call may take as long as callTimeout() says now.
+     *
+     * @param watcher sends the obituary of the handle, if asked to.
+     */
+    SocketConnection(UniqueFd socket, const SocketServer& watcher, uint32_t handle);
 
     status_t transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags) override;
     status_t requestDeathNotice() override;
@@ -29,11 +33,13 @@ class SocketConnection : public RemoteObject {
   private:
     status_t exchange(Packet* packet, bool oneway);
 
-    const int mSocket;
-    const SocketServer* const mWatcher;
+    const UniqueFd mSocket;
+    const SocketServer& mWatcher;
     const uint32_t mHandle;
+    /** How long a call may take, in ms; 0 without a limit. */
+    const int mTimeout;
     std::mutex mMutex;
-    bool mDead = false;
+    bool mIsDead = false;
 };
 
 }  // namespace android::hardware

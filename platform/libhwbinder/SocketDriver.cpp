@@ -28,24 +28,26 @@ std::string SocketDriver::name() const {
 Error SocketDriver::connect(const std::string& interface, const std::string& instance,
                             uint32_t* handle) {
     std::string whyNot;
-    for (const std::string& directory : clientDirectories()) {
-        std::string why;
-        const int socket = connectTo(directory, socketName(interface, instance), &why);
-        if (socket >= 0) {
+    for (const std::string& path : clientDirectories()) {
+        SocketDirectory directory;
+        UniqueFd socket;
+        Error error = directory.open(path, false);
+        if (error.isOk()) error = directory.connect(socketName(interface, instance), &socket);
+        if (error.isOk()) {
             const std::lock_guard<std::mutex> lock(mMutex);
             *handle = ++mLastHandle;
             mConnections[*handle] =
-                    std::make_unique<SocketConnection>(socket, mServer.get(), *handle);
-            return {};
+                    std::make_unique<SocketConnection>(std::move(socket), *mServer, *handle);
+            return error;
         }
-        whyNot += (whyNot.empty() ? "" : "; ") + why;
+        whyNot += (whyNot.empty() ? "" : "; ") + error.text();
     }
     return {NAME_NOT_FOUND, whyNot};
 }
 
 bool SocketDriver::publish(const sp<BHwBinder>& object, const std::vector<std::string>& chain,
                            const std::string& instance) {
-    return mServer->publish(object, chain, instance);
+    return mServer->add({object, chain, instance});
 }
 
 }  // namespace android::hardware

@@ -2,7 +2,6 @@
 #include "SocketServer.h"
 
 #include "libhwbinder/Driver.h"
-#include "libhwbinder/SocketDirectory.h"
 
 #include <android/log.h>
 #include <fcntl.h>
@@ -11,39 +10,18 @@
 #include <sys/eventfd.h>
 #include <sys/resource.h>
 #include <sys/socket.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
+#include <utility>
 
 namespace android::hardware {
 namespace {
 
-/** Descriptors that clients never get, so that the objects can always open their files. */
-constexpr size_t kReservedDescriptors = 32;
-/** Connections that only root and the system user get. */
-constexpr size_t kReservedConnections = 16;
-constexpr size_t kMostConnectionsPerUid = 128;
 /** New connections between two rounds of calls, so that a flood of them does not delay calls. */
-constexpr int kMostAcceptedAtOnce = 128;
-/** With fewer descriptors than this the process cannot serve anybody. */
-constexpr size_t kLeastDescriptors = 16;
-
-/** AID_SYSTEM of the platform's android_filesystem_config.h. */
-constexpr uid_t kSystemUid = 1000;
-
-/** Longest time between two tries to get a name that another process has, in ms. */
-constexpr int kLongestRetry = 256;
-
-/** Marks the handle of a watched connection, in the place of an endpoint's address. */
-constexpr uint64_t kWatched = uint64_t{1} << 63;
-/** Ends a wait; no handle is 0. */
-constexpr uint64_t kWake = kWatched;
-
-bool isPrivileged(uid_t uid) {
-    return uid == 0 || uid == kSystemUid;
-}
+constexpr int kMaxAcceptedAtOnce = 128;
+constexpr int kMaxEventsAtOnce = 1024;
 
 size_t descriptorLimit() {
     rlimit limit{};
@@ -51,37 +29,58 @@ size_t descriptorLimit() {
     return static_cast<size_t>(std::min<rlim_t>(limit.rlim_cur, 65536));
 }
 
-int openSpare() {
-    return open("/dev/null", O_RDONLY | O_CLOEXEC);
+UniqueFd openSpare() {
+    return UniqueFd(open("/dev/null", O_RDONLY | O_CLOEXEC));
 }
 
-/** @return 1 if a call waits, 0 if none has come, -1 if the client has closed and left none. */
-int peek(int socket) {
+/** What waits in a connection. */
+enum class Content { kNothing, kEnd, kMessage, kMessageWithDescriptors };
+
+/** A message from a connection, with room for who has sent it and for no descriptors. */
+struct Message {
+    Message(void* bytes, size_t size) : place{bytes, size} {
+        header.msg_iov = &place;
+        header.msg_iovlen = 1;
+        header.msg_control = control;
+        header.msg_controllen = sizeof(control);
+    }
+    ssize_t receive(int socket, int flags) {
+        return recvmsg(socket, &header, flags | MSG_DONTWAIT | MSG_CMSG_CLOEXEC);
+    }
+    /** @return the sender; nullptr if he is unknown. */
+    const ucred* sender() const {
+        const cmsghdr* credentials = CMSG_FIRSTHDR(&header);
+        const bool isKnown = credentials != nullptr && credentials->cmsg_level == SOL_SOCKET &&
+                             credentials->cmsg_type == SCM_CREDENTIALS;
+        return isKnown ? reinterpret_cast<const ucred*>(CMSG_DATA(credentials)) : nullptr;
+    }
+
+    iovec place;
+    alignas(cmsghdr) char control[CMSG_SPACE(sizeof(ucred))];
+    msghdr header{};
+};
+
+/** Looks into a connection. That closes none of the descriptors that a message brings. */
+Content look(int socket) {
     char byte = 0;
-    const ssize_t size = recv(socket, &byte, 1, MSG_PEEK | MSG_DONTWAIT);
-    if (size < 0 && errno == EAGAIN) return 0;
-    return size > 0 ? 1 : -1;
+    Message message(&byte, 1);
+    const ssize_t size = message.receive(socket, MSG_PEEK);
+    if (size < 0 && errno == EAGAIN) return Content::kNothing;
+    // Every message has a sender, also an empty one.
+    if (size < 0 || message.sender() == nullptr) return Content::kEnd;
+    return (message.header.msg_flags & MSG_CTRUNC) != 0 ? Content::kMessageWithDescriptors
+                                                        : Content::kMessage;
 }
 
 /** Receives a call and who makes it. @return whether there is one, whole. */
 bool receive(int socket, Packet* request, ucred* caller) {
-    iovec place{request->bytes, Packet::kMaxSize};
-    alignas(cmsghdr) char control[CMSG_SPACE(sizeof(ucred))];
-    msghdr message{};
-    message.msg_iov = &place;
-    message.msg_iovlen = 1;
-    message.msg_control = control;
-    message.msg_controllen = sizeof(control);
-    const ssize_t size = recvmsg(socket, &message, MSG_DONTWAIT | MSG_CMSG_CLOEXEC);
-    if (size <= 0 || (message.msg_flags & MSG_TRUNC) != 0) return false;
+    Message message(request->bytes, Packet::kMaxSize);
+    const ssize_t size = message.receive(socket, 0);
+    if (size <= 0 || (message.header.msg_flags & MSG_TRUNC) != 0) return false;
     request->size = static_cast<size_t>(size);
-    const cmsghdr* credentials = CMSG_FIRSTHDR(&message);
-    if (credentials == nullptr || credentials->cmsg_level != SOL_SOCKET ||
-        credentials->cmsg_type != SCM_CREDENTIALS) {
-        // The caller is unknown.
-        return false;
-    }
-    memcpy(caller, CMSG_DATA(credentials), sizeof(*caller));
+    const ucred* sender = message.sender();
+    if (sender == nullptr) return false;
+    *caller = *sender;
     return true;
 }
 
@@ -89,154 +88,135 @@ bool receive(int socket, Packet* request, ucred* caller) {
 
 SocketServer::SocketServer()
     : mEpoll(epoll_create1(EPOLL_CLOEXEC)),
-      mWake(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)),
-      mSpare(openSpare()) {
+      mDeathEpoll(epoll_create1(EPOLL_CLOEXEC)),
+      mWakeEvent(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)),
+      mSpare(openSpare()),
+      mClients(ConnectionLimits(descriptorLimit())),
+      mCloser(mWakeEvent.get()) {
+    waitFor(&mWake, mWakeEvent.get(), EPOLLIN | EPOLLET);
+    waitFor(&mDeaths, mDeathEpoll.get(), EPOLLIN);
+}
+
+bool SocketServer::waitFor(EventSource* source, int descriptor, uint32_t events) const {
     epoll_event event{};
-    event.events = EPOLLIN | EPOLLET;
-    event.data.u64 = kWake;
-    epoll_ctl(mEpoll, EPOLL_CTL_ADD, mWake, &event);
-    const size_t limit = descriptorLimit();
-    mMost = limit > 2 * kReservedDescriptors ? limit - kReservedDescriptors : limit / 2;
-    mMostPerUid = std::clamp<size_t>(mMost / 4, 1, kMostConnectionsPerUid);
+    event.events = events;
+    event.data.ptr = source;
+    return epoll_ctl(mEpoll.get(), EPOLL_CTL_ADD, descriptor, &event) == 0;
 }
 
-SocketServer::~SocketServer() {
-    for (const Endpoint& listener : mListeners)
-        close(listener.socket);
-    for (const auto& [socket, client] : mClients)
-        close(socket);
-    for (const int descriptor : {mSpare, mWake, mEpoll})
-        close(descriptor);
-}
-
-bool SocketServer::publish(const sp<BHwBinder>& object, const std::vector<std::string>& chain,
-                           const std::string& instance) {
-    std::string whyNot;
-    const int socket = ::android::hardware::publish(chain, instance, &whyNot);
-    if (socket >= 0) {
-        const std::lock_guard<std::mutex> lock(mMutex);
-        return listen(socket, object);
-    }
-    const bool isTaken = errno == EWOULDBLOCK;
+bool SocketServer::add(const SocketPublication& publication) {
+    ListeningSocket socket;
+    const Error error = listenUnderNames(publication, &socket);
+    if (error.isOk()) return listen(publication.object, std::move(socket));
+    const bool isTaken = error.code() == -EWOULDBLOCK;
     __android_log_print(ANDROID_LOG_ERROR, kLogTag, "%s is not registered%s: %s",
-                        socketName(chain.front(), instance).c_str(), isTaken ? " yet" : "",
-                        whyNot.c_str());
-    const std::lock_guard<std::mutex> lock(mMutex);
-    if (!isTaken) return false;
-    mPending.push_back({object, chain, instance});
-    mHasPending = true;
-    // The loop may be waiting without an end.
-    eventfd_write(mWake, 1);
+                        publication.name().c_str(), isTaken ? " yet" : "", error.text().c_str());
+    if (isTaken) {
+        mPending.add(publication);
+        // The loop may be waiting without an end.
+        eventfd_write(mWakeEvent.get(), 1);
+    }
     return false;
 }
 
-bool SocketServer::listen(int socket, const sp<BHwBinder>& object) {
-    Endpoint& listener =
-            mListeners.emplace_back(Endpoint{socket, object, nullptr, nullptr, false, 0});
-    epoll_event event{};
-    event.events = EPOLLIN;
-    event.data.ptr = &listener;
-    return epoll_ctl(mEpoll, EPOLL_CTL_ADD, socket, &event) == 0;
-}
-
-int SocketServer::retryPending() {
+bool SocketServer::listen(const sp<BHwBinder>& object, ListeningSocket socket) {
     const std::lock_guard<std::mutex> lock(mMutex);
-    const auto isKnown = [&](const Pending& each) {
-        std::string whyNot;
-        const int socket = ::android::hardware::publish(each.chain, each.instance, &whyNot);
-        if (socket < 0) return false;
-        __android_log_print(ANDROID_LOG_INFO, kLogTag, "%s is registered now",
-                            socketName(each.chain.front(), each.instance).c_str());
-        return listen(socket, each.object);
-    };
-    mPending.erase(std::remove_if(mPending.begin(), mPending.end(), isKnown), mPending.end());
-    // Soon at first: the process that has the name may be ending.
-    mRetryAfter = std::min(2 * mRetryAfter, kLongestRetry);
-    mHasPending = !mPending.empty();
-    return mHasPending ? mRetryAfter : -1;
+    if (socket.mayBringDescriptors()) {
+        mMayBringDescriptors = true;
+        mCloser.start();
+    }
+    Listener& listener = mListeners.emplace_back(
+            Listener{{EventSource::Kind::kListener}, std::move(socket), object});
+    return waitFor(&listener, listener.socket.socket.get(), EPOLLIN);
 }
 
 bool SocketServer::watch(uint32_t handle, int connection) const {
     epoll_event event{};
-    // The death is news only once.
+    // A death is news only once.
     event.events = EPOLLRDHUP | EPOLLONESHOT;
-    event.data.u64 = kWatched | handle;
-    return epoll_ctl(mEpoll, EPOLL_CTL_ADD, connection, &event) == 0;
+    event.data.u32 = handle;
+    return epoll_ctl(mDeathEpoll.get(), EPOLL_CTL_ADD, connection, &event) == 0;
 }
 
 void SocketServer::unwatch(int connection) const {
-    epoll_ctl(mEpoll, EPOLL_CTL_DEL, connection, nullptr);
+    epoll_ctl(mDeathEpoll.get(), EPOLL_CTL_DEL, connection, nullptr);
+}
+
+void SocketServer::sendObituaries() const {
+    epoll_event events[16];
+    const int count = epoll_wait(mDeathEpoll.get(), events, 16, 0);
+    for (int i = 0; i < count; ++i)
+        ProcessState::self()->sendObituary(events[i].data.u32);
 }
 
 void SocketServer::serve() {
-    if (mEpoll < 0 || mWake < 0 || mSpare < 0 || descriptorLimit() < kLeastDescriptors) {
+    if (!mEpoll.isValid() || !mDeathEpoll.isValid() || !mWakeEvent.isValid() || !mSpare.isValid() ||
+        descriptorLimit() < ConnectionLimits::kMinDescriptors) {
         __android_log_print(ANDROID_LOG_ERROR, kLogTag,
                             "too few descriptors to serve: the limit is %zu, at least %zu are "
                             "needed (ulimit -n)",
-                            descriptorLimit(), kLeastDescriptors);
+                            descriptorLimit(), ConnectionLimits::kMinDescriptors);
         return;
     }
     mRequest = std::make_unique<Packet>();
     mReply = std::make_unique<Packet>();
+    const auto start = [this](const SocketPublication& publication, ListeningSocket socket) {
+        listen(publication.object, std::move(socket));
+    };
     for (;;) {
-        const int timeout = mHasPending ? retryPending() : -1;
-        if (!collect(mTurns.isEmpty() ? timeout : 0)) return;
+        const int timeout = mPending.isEmpty() ? -1 : mPending.retry(start);
+        if (!collect(mClients.turns() == 0 ? timeout : 0)) return;
         serveOneOfEach();
     }
 }
 
 bool SocketServer::collect(int timeout) {
-    epoll_event events[1024];
-    const int count = epoll_wait(mEpoll, events, 1024, timeout);
+    epoll_event events[kMaxEventsAtOnce];
+    const int count = epoll_wait(mEpoll.get(), events, kMaxEventsAtOnce, timeout);
     if (count < 0) return errno == EINTR;
     // Clients first: accepting may drop an idle client, and one with an event here is not idle.
     int others = 0;
     for (int i = 0; i < count; ++i) {
-        auto* endpoint = static_cast<Endpoint*>(events[i].data.ptr);
-        if ((events[i].data.u64 & kWatched) != 0 || endpoint->share == nullptr) {
-            events[others++] = events[i];
-        } else if ((events[i].events & EPOLLRDHUP) != 0 && peek(endpoint->socket) < 0) {
-            drop(endpoint);
+        auto* source = static_cast<EventSource*>(events[i].data.ptr);
+        if (source->kind == EventSource::Kind::kClient) {
+            handle(static_cast<SocketClient*>(source), events[i].events);
         } else {
-            enqueue(endpoint);
+            events[others++] = events[i];
         }
     }
     for (int i = 0; i < others; ++i) {
-        const uint64_t word = events[i].data.u64;
-        if (word == kWake) continue;
-        if ((word & kWatched) != 0) {
-            ProcessState::self()->sendObituary(static_cast<uint32_t>(word));
+        auto* source = static_cast<EventSource*>(events[i].data.ptr);
+        if (source == &mDeaths) {
+            sendObituaries();
+        } else if (source == &mWake) {
+            for (SocketClient* client : mCloser.takeClosed())
+                mClients.remove(client);
         } else {
-            acceptAll(static_cast<Endpoint*>(events[i].data.ptr));
+            acceptAll(*static_cast<const Listener*>(source));
         }
     }
     return true;
 }
 
-void SocketServer::enqueue(Endpoint* client) {
-    if (client->isQueued) return;
-    client->isQueued = true;
-    Share* share = client->share;
-    if (share->waiting.isEmpty()) mTurns.push(share);
-    share->waiting.push(client);
+void SocketServer::handle(SocketClient* client, uint32_t events) {
+    if ((events & EPOLLRDHUP) != 0 && look(client->socket.get()) == Content::kEnd) {
+        drop(client);
+    } else {
+        mClients.wait(client);
+    }
 }
 
 void SocketServer::serveOneOfEach() {
-    const Share* const lastOfRound = mTurns.last();
-    for (bool isLast = mTurns.isEmpty(); !isLast;) {
-        Share* share = mTurns.pop();
-        isLast = share == lastOfRound;
-        Endpoint* client = share->waiting.pop();
-        client->isQueued = false;
-        if (!share->waiting.isEmpty()) mTurns.push(share);
+    for (size_t turn = mClients.turns(); turn > 0; --turn) {
+        SocketClient* client = mClients.next();
         // What else the client has sent is reported again, and waits behind its uid's other calls.
         if (!serveCall(client)) drop(client);
     }
 }
 
-bool SocketServer::serveCall(Endpoint* client) {
-    client->lastUsed = ++mClock;
-    const int socket = client->socket;
+bool SocketServer::serveCall(SocketClient* client) {
+    const int socket = client->socket.get();
+    if (mMayBringDescriptors && look(socket) != Content::kMessage) return false;
     ucred caller{};
     if (!receive(socket, mRequest.get(), &caller)) return false;
 
@@ -273,92 +253,54 @@ bool SocketServer::reply(int socket) {
     return send(socket, mReply->bytes, mReply->size, MSG_DONTWAIT | MSG_NOSIGNAL) >= 0;
 }
 
-void SocketServer::acceptAll(Endpoint* listener) {
-    for (int i = 0; i < kMostAcceptedAtOnce; ++i) {
-        const int socket =
-                accept4(listener->socket, nullptr, nullptr, SOCK_NONBLOCK | SOCK_CLOEXEC);
-        if (socket < 0) {
-            if (errno == EMFILE || errno == ENFILE) refuseOne(listener->socket);
+void SocketServer::acceptAll(const Listener& listener) {
+    for (int i = 0; i < kMaxAcceptedAtOnce; ++i) {
+        UniqueFd socket(accept4(listener.socket.socket.get(), nullptr, nullptr,
+                                SOCK_NONBLOCK | SOCK_CLOEXEC));
+        if (!socket.isValid()) {
+            if (errno == EMFILE || errno == ENFILE) refuseOne(listener.socket.socket.get());
             return;
         }
         ucred owner{};
         socklen_t size = sizeof(owner);
-        if (peek(socket) < 0 || getsockopt(socket, SOL_SOCKET, SO_PEERCRED, &owner, &size) != 0) {
-            close(socket);
-            continue;
-        }
-        Share& share = mShares[owner.uid];
-        share.uid = owner.uid;
-        ++share.connections;
-        ++mConnections;
-        Endpoint& client =
-                mClients[socket] = {socket, listener->object, &share, nullptr, false, ++mClock};
-        epoll_event event{};
-        event.events = EPOLLIN | EPOLLRDHUP;
-        event.data.ptr = &client;
-        if (!makeRoom(&client) || epoll_ctl(mEpoll, EPOLL_CTL_ADD, socket, &event) != 0) {
-            __android_log_print(ANDROID_LOG_WARN, kLogTag, "uid %u gets no further connection",
-                                owner.uid);
-            drop(&client);
+        if (look(socket.get()) != Content::kEnd &&
+            getsockopt(socket.get(), SOL_SOCKET, SO_PEERCRED, &owner, &size) == 0) {
+            admit(std::move(socket), owner.uid, listener.object);
         }
     }
 }
 
-bool SocketServer::makeRoom(const Endpoint* newcomer) {
-    const Share* share = newcomer->share;
-    const size_t kept = isPrivileged(share->uid) ? 0 : std::min(mMost / 2, kReservedConnections);
-    if (share->connections <= mMostPerUid) {
-        if (mConnections <= mMost - kept) return true;
-        // The uid that has most gives way; that may be the newcomer's own.
-        for (const auto& [uid, each] : mShares) {
-            if (!isPrivileged(uid) && each.connections > share->connections) share = &each;
-        }
+void SocketServer::admit(UniqueFd socket, uid_t uid, const sp<BHwBinder>& object) {
+    SocketClient* client = mClients.add(uid, std::move(socket), object);
+    SocketClient* leaving = mClients.surplus(client, [](const SocketClient& each) {
+        return look(each.socket.get()) == Content::kNothing;
+    });
+    if (!waitFor(client, client->socket.get(), EPOLLIN | EPOLLRDHUP)) leaving = client;
+    if (leaving == client) {
+        __android_log_print(ANDROID_LOG_WARN, kLogTag, "uid %u gets no further connection", uid);
     }
-    Endpoint* oldest = oldestClient(share, newcomer, true);
-    // Else a few users that are always busy could keep all others out.
-    if (oldest == nullptr && share != newcomer->share) {
-        oldest = oldestClient(share, newcomer, false);
-    }
-    if (oldest == nullptr) return false;
-    drop(oldest);
-    return true;
-}
-
-SocketServer::Endpoint* SocketServer::oldestClient(const Share* share, const Endpoint* newcomer,
-                                                   bool onlyIdle) {
-    const auto isIdle = [](const Endpoint& client) {
-        return !client.isQueued && peek(client.socket) == 0;
-    };
-    Endpoint* oldest = nullptr;
-    for (auto& [socket, client] : mClients) {
-        if (client.share == share && &client != newcomer &&
-            (oldest == nullptr || client.lastUsed < oldest->lastUsed) &&
-            (!onlyIdle || isIdle(client))) {
-            oldest = &client;
-        }
-    }
-    return oldest;
+    if (leaving != nullptr) drop(leaving);
 }
 
 void SocketServer::refuseOne(int listener) {
     // There is no descriptor left for it; waiting, it would be reported again and again.
-    close(mSpare);
-    const int socket = accept4(listener, nullptr, nullptr, SOCK_CLOEXEC);
-    if (socket >= 0) close(socket);
+    mSpare.reset();
+    UniqueFd(accept4(listener, nullptr, nullptr, SOCK_CLOEXEC));
     mSpare = openSpare();
 }
 
-void SocketServer::drop(Endpoint* client) {
-    Share* share = client->share;
-    if (client->isQueued) {
-        share->waiting.remove(client);
-        if (share->waiting.isEmpty()) mTurns.remove(share);
+void SocketServer::drop(SocketClient* client) {
+    const auto isEmpty = [](Content content) {
+        return content == Content::kNothing || content == Content::kEnd;
+    };
+    if (!mMayBringDescriptors || isEmpty(look(client->socket.get()))) {
+        mClients.remove(client);
+        return;
     }
-    const int socket = client->socket;
-    mClients.erase(socket);
-    close(socket);
-    --mConnections;
-    if (--share->connections == 0) mShares.erase(share->uid);
+    // Waiting messages are closed with it, and the descriptors in them.
+    epoll_ctl(mEpoll.get(), EPOLL_CTL_DEL, client->socket.get(), nullptr);
+    mClients.retire(client);
+    mCloser.close(client);
 }
 
 }  // namespace android::hardware

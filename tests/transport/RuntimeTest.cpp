@@ -2,6 +2,7 @@
 #include "libhwbinder/KernelDriver.h"
 #include "libhwbinder/Packet.h"
 #include "libhwbinder/SocketConnection.h"
+#include "libhwbinder/SocketServer.h"
 #include "support/LogCapture.h"
 #include "transport/TransportTest.h"
 
@@ -16,7 +17,6 @@
 #include <hwbinder/Parcel.h>
 #include <hwbinder/ProcessState.h>
 #include <sys/file.h>
-#include <sys/resource.h>
 #include <sys/socket.h>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -107,13 +107,14 @@ TEST_F(RuntimeTest, ObjectThatHasGoneIsNotGivenAgain) {
 }
 
 TEST(SocketConnectionTest, WrongReplyIsAFailureAndAnEndOrOneThatIsTooLargeADeath) {
+    const android::hardware::SocketServer server;
     android::hardware::Packet packet;
     packet.packStatus(android::OK);
     const std::string success(reinterpret_cast<const char*>(packet.bytes), packet.size);
     for (const std::string& last : {std::string(), std::string(packet.kMaxSize + 1, '\0')}) {
         int sockets[2];
         ASSERT_EQ(socketpair(AF_UNIX, SOCK_SEQPACKET, 0, sockets), 0);
-        android::hardware::SocketConnection connection(sockets[0], nullptr, 0);
+        android::hardware::SocketConnection connection(android::UniqueFd{sockets[0]}, server, 0);
         android::hardware::Parcel reply;
         for (const std::string& wrong : {success, std::string(17, '\0')}) {
             ASSERT_GT(send(sockets[1], wrong.data(), wrong.size(), 0), 0);
@@ -202,46 +203,6 @@ TEST_F(RuntimeTest, WhatIsWaitedForLongIsFoundSoonByAServerThatIsIdle) {
     const std::string waiting = std::string("): waiting; ") + Slow::descriptor + "/late is not";
     EXPECT_LT(text.find(waiting), text.size()) << text;
     EXPECT_EQ(text.find(waiting), text.rfind(waiting)) << "it is said once";
-}
-
-TEST_F(RuntimeTest, NamesOfFilesBesideTheSocketsAreRefused) {
-    LogCapture log;
-    for (const std::string& name : {"a/b"s, "x\0y"s, "x~"s, "x.lock"s}) {
-        EXPECT_NE((new Slow)->registerAsService(name), android::OK) << name;
-        EXPECT_EQ(IServiceNotification::tryGetService(name), nullptr);
-    }
-    const std::string text = log.takeText();
-    EXPECT_NE(
-            text.find("IServiceNotification.x.lock\": the name of a service must not end in \"~\" "
-                      "or \".lock\"\n"),
-            std::string::npos)
-            << text;
-}
-
-TEST_F(RuntimeTest, SocketThatCannotBeHadIsSaid) {
-    LogCapture log;
-    // What is opened once is open then.
-    ASSERT_EQ((new Slow)->registerAsService("first"), android::OK);
-    const int next = dup(STDERR_FILENO);
-    close(next);
-    rlimit before{};
-    getrlimit(RLIMIT_NOFILE, &before);
-    const auto allow = [&](int more) {
-        const rlimit limit{static_cast<rlim_t>(next + more), before.rlim_max};
-        setrlimit(RLIMIT_NOFILE, &limit);
-    };
-    allow(0);
-    EXPECT_EQ(IServiceNotification::tryGetService("second"), nullptr);
-    const std::string whyNot = host::lookupError(IServiceNotification::descriptor, "second");
-    // The lock's file takes it.
-    allow(1);
-    EXPECT_NE((new Slow)->registerAsService("second"), android::OK);
-    setrlimit(RLIMIT_NOFILE, &before);
-    const std::string complaint = "no socket for " + mDirectory.path() + "/" +
-                                  IServiceNotification::descriptor + ".second: Too many open files";
-    EXPECT_NE(whyNot.find(complaint), std::string::npos) << whyNot;
-    const std::string text = log.takeText();
-    EXPECT_NE(text.find(complaint), std::string::npos) << text;
 }
 
 TEST_F(RuntimeTest, WhatIsNoServiceIsNotRegistered) {

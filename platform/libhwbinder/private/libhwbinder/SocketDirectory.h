@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include <hwbinder/Binder.h>
+#include "libutils/Error.h"
+
+#include <sys/types.h>
 #include <sys/un.h>
-#include <utils/Errors.h>
+#include <utils/UniqueFd.h>
 
 #include <string>
 #include <vector>
@@ -23,22 +25,34 @@ std::vector<std::string> clientDirectories();
 
 /** @return the name of an interface's instance in the directory. */
 std::string socketName(const std::string& interface, const std::string& instance);
-/** Makes the address of a socket. @return false, with the reason, where the name is not usable. */
-bool socketAddress(const std::string& directory, const std::string& name, sockaddr_un* address,
-                   std::string* whyNot);
 
-/** Connects to a service. @return the socket; -1, with the reason, where there is none. */
-int connectTo(const std::string& directory, const std::string& name, std::string* whyNot);
+/** A directory of sockets, opened once: what was checked is what is used. */
+class SocketDirectory {
+  public:
+    /**
+     * Opens a directory that only root and its owner can write to.
+     *
+     * @param makes whether to make it if it is missing; not its parents.
+     */
+    Error open(const std::string& path, bool makes);
+    /** Opens or makes the directory for services of this process, which root or its user owns. */
+    Error openForServer();
 
-/**
- * Makes the socket of a service, and links to it for the interfaces that its own extends.
- *
- * @param chain its interface and those that it extends, the base last.
- * @param whyNot takes the reason of a failure.
- * @return the listening socket; -1, with errno, in the case of EWOULDBLOCK because another process
- *     has the name.
- */
-int publish(const std::vector<std::string>& chain, const std::string& instance,
-            std::string* whyNot);
+    /** Connects to a service of root's, of this process's user or of the directory's owner. */
+    Error connect(const std::string& name, UniqueFd* connection) const;
+    /** Makes the address of a socket in the directory. */
+    Error addressOf(const std::string& name, sockaddr_un* address) const;
+
+    /** @return the directory itself, for calls that take a name in it. */
+    int descriptor() const { return mDirectory.get(); }
+    const std::string& path() const { return mPath; }
+
+  private:
+    std::string mPath;
+    UniqueFd mDirectory;
+    uid_t mOwner = 0;
+    /** Whether nobody but root and this process's user could have put the directory there. */
+    bool mIsPlaceGuarded = false;
+};
 
 }  // namespace android::hardware

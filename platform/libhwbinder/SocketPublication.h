@@ -1,0 +1,65 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "libutils/Error.h"
+
+#include <hwbinder/Binder.h>
+#include <utils/FunctionRef.h>
+#include <utils/UniqueFd.h>
+
+#include <atomic>
+#include <mutex>
+#include <string>
+#include <vector>
+
+namespace android::hardware {
+
+/** An object, and the names that it is to have. */
+struct SocketPublication {
+    sp<BHwBinder> object;
+    /** Its interface and those that it extends, the base last. */
+    std::vector<std::string> chain;
+    std::string instance;
+
+    /** @return the name of its socket; the other names are links to it. */
+    std::string name() const;
+};
+
+/** The socket of an object, at which clients connect. */
+struct ListeningSocket {
+    UniqueFd socket;
+    /** The lock of its name, which is free again when this is closed. */
+    UniqueFd lock;
+
+    /** @return whether clients may send descriptors; a kernel from 6.16 on keeps them away. */
+    bool mayBringDescriptors() const;
+};
+
+/**
+ * Makes the socket of an object, and the links to it.
+ *
+ * @return OK; an error of the code -EWOULDBLOCK if another process has the name.
+ */
+Error listenUnderNames(const SocketPublication& publication, ListeningSocket* listener);
+
+/** Objects that wait until the processes that have their names have gone. */
+class PendingPublications {
+  public:
+    bool isEmpty() const { return mIsEmpty; }
+    void add(const SocketPublication& publication);
+    /**
+     * Tries again: soon at first, since the process that has a name may be ending.
+     *
+     * @param listen gets what has its names now.
+     * @return the time until the next try, in ms; -1 if there is nothing left.
+     */
+    int retry(FunctionRef<void(const SocketPublication&, ListeningSocket)> listen);
+
+  private:
+    std::mutex mMutex;
+    std::vector<SocketPublication> mPending;
+    std::atomic<bool> mIsEmpty = true;
+    int mRetryAfter = 1;
+};
+
+}  // namespace android::hardware
