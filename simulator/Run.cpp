@@ -13,6 +13,16 @@ namespace simulator {
 
 namespace fs = std::filesystem;
 
+namespace {
+
+constexpr char kBanner[] =
+        "A simulated vibrator driver, and the service on it. Try:\n"
+        "  vibratorctl click\n"
+        "  vibratorctl plot                  # draws what the driver was told\n"
+        "  vibrator-sim fault intensity write EIO --times 1; vibratorctl amplitude 128\n";
+
+}  // namespace
+
 void makeDriver(const std::string& directory, Layout layout, const Features& features) {
     const int error = createDriver(directory, layout, features);
     if (error == ENOTEMPTY) {
@@ -39,7 +49,8 @@ int runSession(const std::string& directory, Layout layout, const Features& feat
                             const std::string rest =
                                     others == nullptr ? "" : std::string(":") + others;
                             setenv("LD_PRELOAD", (preload + rest).c_str(), 1);
-                        }},
+                        },
+                        [] {}, kBanner},
                        command);
 }
 

@@ -2,7 +2,7 @@
 #include "Session.h"
 
 #include "Folder.h"
-#include "TraceFile.h"
+#include "SimulatedDriver.h"
 #include "text/Text.h"
 
 #include <fcntl.h>
@@ -42,14 +42,47 @@ sigset_t blockSignals() {
 }
 
 /** Prepares the daemon's process: its log, no signals of the terminal. */
-void becomeDaemon(const std::string& directory, pid_t parent) {
+void becomeDaemon(const Folder& directory, pid_t parent) {
     setpgid(0, 0);
+    umask(0022);
     prctl(PR_SET_PDEATHSIG, SIGKILL);
     if (getppid() != parent) _exit(1);
-    const int log = Folder(directory).open("log", O_WRONLY | O_APPEND).release();
+    const int log = directory.open("log", O_WRONLY | O_APPEND).release();
     dup2(open("/dev/null", O_RDONLY | O_CLOEXEC), STDIN_FILENO);
     dup2(log, STDOUT_FILENO);
     dup2(log, STDERR_FILENO);
+}
+
+/** Waits until nobody has the other end of a pipe; nobody waits for this process's output. */
+void awaitEnd(int pipe) {
+    const int nowhere = open("/dev/null", O_RDWR);
+    dup2(pipe, STDIN_FILENO);
+    dup2(nowhere, STDOUT_FILENO);
+    dup2(nowhere, STDERR_FILENO);
+    close_range(STDERR_FILENO + 1, ~0U, 0);
+    char byte;
+    while (read(STDIN_FILENO, &byte, 1) < 0 && errno == EINTR) {
+    }
+}
+
+/** Removes a directory and all in it. @return whether it is gone. */
+bool removeDirectory(const std::string& path) {
+    // A dying daemon may still add files.
+    for (int attempt = 0; attempt < 5; ++attempt) {
+        std::error_code error;
+        fs::remove_all(path, error);
+        if (!error) return true;
+        usleep(200'000);
+    }
+    return false;
+}
+
+/** @return a word that a shell reads as this text. */
+std::string quoteForShell(const std::string& text) {
+    std::string quoted = "'";
+    for (const char c : text)
+        quoted += c == '\'' ? "'\\''" : std::string(1, c);
+    return quoted + "'";
 }
 
 std::string lastLine(std::string text) {
@@ -113,15 +146,35 @@ int Child::wait() {
 // Not in $TMPDIR: a socket's path must be short, and a preloaded library's without blanks.
 PrivateDirectory::PrivateDirectory() {
     if (mkdtemp(mPath.data()) == nullptr) throw std::runtime_error(failure(mPath));
-    // Its input ends when this process does. A dying daemon may still add files, so it retries.
-    const std::string remover = "exec >/dev/null 2>&1; cat; for attempt in 1 2 3 4 5; do rm -rf " +
-                                mPath + " && break; sleep 0.2; done";
-    mRemover = popen(remover.c_str(), "we");
-    if (mRemover == nullptr) throw std::runtime_error(failure("sh"));
+    int ends[2];
+    if (chmod(mPath.c_str(), 0755) != 0 || pipe2(ends, O_CLOEXEC) != 0 || (mRemover = fork()) < 0) {
+        const std::string reason = failure(mPath);
+        rmdir(mPath.c_str());
+        throw std::runtime_error(reason);
+    }
+    if (mRemover == 0) {
+        awaitEnd(ends[0]);
+        _exit(removeDirectory(mPath) ? 0 : 1);
+    }
+    close(ends[0]);
+    mPipe = ends[1];
 }
 
 PrivateDirectory::~PrivateDirectory() {
-    pclose(mRemover);
+    close(mPipe);
+    waitpid(mRemover, nullptr, 0);
+}
+
+std::string exportLines() {
+    const char* driver = getenv("VIBRATOR_SIM_DIR");
+    const char* sockets = getenv("HWBINDER_DIR");
+    if (driver == nullptr || sockets == nullptr) return "";
+    const fs::path programs = fs::path(sockets).parent_path() / "bin";
+    if (!fs::exists(programs)) return "";
+    return "export VIBRATOR_SIM_DIR=" + quoteForShell(driver) +
+           " HWBINDER_DIR=" + quoteForShell(sockets) +
+           (getenv("HWBINDER_DEVICE") == nullptr ? "" : " HWBINDER_DEVICE=") +
+           "\nexport PATH=" + quoteForShell(programs) + ":\"$PATH\"\n";
 }
 
 Session::Session()
@@ -136,7 +189,7 @@ int Session::takeSignal(siginfo_t* info) const {
 }
 
 /** Waits until the daemon answers, and checks that it has probed the driver. */
-void Session::awaitDaemon(Child& daemon, const std::string& directory) const {
+void Session::awaitDaemon(Child& daemon, const Folder& directory) const {
     Child status({mClient, "status", "--wait", "10"}, [] {
         dup2(open("/dev/null", O_WRONLY | O_CLOEXEC), STDOUT_FILENO);
         dup2(STDOUT_FILENO, STDERR_FILENO);
@@ -148,12 +201,13 @@ void Session::awaitDaemon(Child& daemon, const std::string& directory) const {
         throw std::runtime_error(std::string("ended by ") + strsignal(number));
     }
     if (daemon.hasEnded() || status.wait() != 0) {
-        throw std::runtime_error(
-                std::string("the daemon ") + (daemon.hasEnded() ? "has ended" : "does not answer") +
-                "; the end of its log: " + lastLine(Folder(directory).read("log")));
+        throw std::runtime_error(std::string("the daemon ") +
+                                 (daemon.hasEnded() ? "has ended" : "does not answer") +
+                                 "; the end of its log: " + lastLine(directory.read("log")));
     }
-    struct stat trace;
-    if (stat(simulator::traceFile(directory).c_str(), &trace) != 0 || trace.st_size == 0) {
+    const simulator::Descriptor trace = directory.open("trace", O_RDONLY);
+    struct stat info;
+    if (fstat(trace.get(), &info) != 0 || info.st_size == 0) {
         throw std::runtime_error("the daemon does not use this driver");
     }
 }
@@ -182,33 +236,40 @@ int Session::awaitCommand(Child& command, Child& daemon, const Driver& driver) c
 
 int Session::run(const Driver& driver, std::vector<std::string> command) {
     const Folder folder(driver.directory);
+    if (!simulator::isMarked(folder)) {
+        throw std::runtime_error(cli::inQuotes(driver.directory) + " is no longer a driver's");
+    }
     folder.remove("trace");
     if (folder.replace("log", "", 0644) != 0) {
         throw std::runtime_error(failure(driver.directory + "/log"));
     }
     // Links, since a path in PATH may have no colons.
     fs::create_directory(mPlace / "bin");
+    fs::permissions(mPlace / "bin", static_cast<fs::perms>(0755));
     fs::create_symlink(mClient, mPlace / "bin/vibratorctl");
     fs::create_symlink(fs::read_symlink("/proc/self/exe"),
                        mPlace / "bin/" + program_invocation_short_name);
     setenv("VIBRATOR_SIM_DIR", driver.directory.c_str(), 1);
     setenv("HWBINDER_DIR", (mPlace / "sockets").c_str(), 1);
+    // It counts more than the directory of the sockets.
+    if (getenv("HWBINDER_DEVICE") != nullptr) setenv("HWBINDER_DEVICE", "", 1);
 
     const pid_t self = getpid();
     Child daemon({mDaemon}, [&] {
-        becomeDaemon(driver.directory, self);
+        becomeDaemon(folder, self);
         driver.prepare();
     });
-    awaitDaemon(daemon, driver.directory);
+    awaitDaemon(daemon, folder);
 
     const char* path = getenv("PATH");
     setenv("PATH", (mPlace / "bin:" + (path == nullptr ? "/usr/bin:/bin" : path)).c_str(), 1);
     if (command.empty()) {
         const char* shell = getenv("SHELL");
         command = {shell == nullptr || *shell == '\0' ? "/bin/sh" : shell};
-        std::cerr << program_invocation_short_name << ": the driver is in "
+        std::cerr << driver.banner << "The driver's trace and the daemon's log are in "
                   << cli::inQuotes(driver.directory)
-                  << ", and so is the daemon's log; \"exit\" ends the daemon\n";
+                  << ".\nIn a second terminal, to use them from there, too:\n"
+                  << exportLines() << "\"exit\" ends the daemon.\n";
     }
     Child child(command, [] { prctl(PR_SET_PDEATHSIG, SIGHUP); });
     return awaitCommand(child, daemon, driver);

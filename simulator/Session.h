@@ -1,10 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "Folder.h"
+
 #include <sys/types.h>
 
 #include <csignal>
-#include <cstdio>
 #include <functional>
 #include <string>
 #include <vector>
@@ -39,7 +40,10 @@ class Child {
     int mStatus = 0;
 };
 
-/** A directory in /tmp; a second process removes it when this one ends, even if it is killed. */
+/**
+ * A directory in /tmp, which other users may look into. A second process removes it when this one
+ * ends, even if it is killed.
+ */
 class PrivateDirectory {
   public:
     PrivateDirectory();
@@ -51,8 +55,16 @@ class PrivateDirectory {
 
   private:
     std::string mPath = "/tmp/vibrator-sim.XXXXXX";
-    std::FILE* mRemover;
+    /** The remover waits for the end of a pipe, of which this process has the other end. */
+    int mPipe;
+    pid_t mRemover;
 };
+
+/**
+ * @return two lines for another shell, with which it uses the driver and the service of the session
+ *     that this process is in; "" if it is in none.
+ */
+std::string exportLines();
 
 /** The service on a driver, and a command that uses both. */
 class Session {
@@ -71,6 +83,8 @@ class Session {
         std::function<void()> prepare = [] {};
         /** Called when the service has ended before the command. */
         std::function<void()> whenEnded = [] {};
+        /** What it is and what to try in a shell beside it, in lines. */
+        std::string banner = "";
     };
     /**
      * Starts the service, and runs a command when it answers. When the command or this process
@@ -84,7 +98,7 @@ class Session {
 
   private:
     int takeSignal(siginfo_t* info) const;
-    void awaitDaemon(Child& daemon, const std::string& directory) const;
+    void awaitDaemon(Child& daemon, const simulator::Folder& directory) const;
     int awaitCommand(Child& command, Child& daemon, const Driver& driver) const;
 
     std::string mDaemon;

@@ -32,6 +32,13 @@ Folder folderOf(const Node& node) {
     return openBelow(*node.directory, node.path.substr(0, node.path.rfind('/') + 1));
 }
 
+/** Makes a directory, and those above it, where there is none. @return an errno, 0 for success. */
+int makeDirectory(const std::string& directory) {
+    std::error_code error;
+    std::filesystem::create_directories(directory, error);
+    return error.value();
+}
+
 int64_t now() {
     timespec time{};
     clock_gettime(CLOCK_MONOTONIC, &time);
@@ -80,6 +87,11 @@ int claimDirectory(const Folder& directory) {
     return directory.replace(kMarkFile, "", 0644);
 }
 
+int claimDirectory(const std::string& directory) {
+    const int error = makeDirectory(directory);
+    return error != 0 ? error : claimDirectory(Folder(directory));
+}
+
 int createNodes(const Folder& directory, Layout layout, const Features& features) {
     const Folder nodes = openBelow(directory, model::sysfsDirectory(layout), true);
     // The driver that was there before may be running its motor.
@@ -96,9 +108,8 @@ int createNodes(const Folder& directory, Layout layout, const Features& features
 }
 
 int createDriver(const std::string& directory, Layout layout, const Features& features) {
-    std::error_code error;
-    std::filesystem::create_directories(directory, error);
-    return error ? error.value() : createDriver(Folder(directory), layout, features);
+    const int error = makeDirectory(directory);
+    return error != 0 ? error : createDriver(Folder(directory), layout, features);
 }
 
 int createDriver(const Folder& directory, Layout layout, const Features& features) {

@@ -2,6 +2,7 @@
 #include "Faults.h"
 #include "MotorType.h"
 #include "Run.h"
+#include "Session.h"
 #include "TraceFile.h"
 #include "TraceLine.h"
 #include "cli/CommandLine.h"
@@ -88,6 +89,7 @@ class Simulator : public cli::Program {
                 "Exit code: 0 done; 1 failed; 2 a mistake in the command line; run: that of its "
                 "command.");
         addRun();
+        addEnv();
         addCreate();
         addShow();
         addTrace();
@@ -195,8 +197,24 @@ class Simulator : public cli::Program {
         });
     }
 
+    void addEnv() {
+        command("A driver with the service", "env",
+                "print lines for a second terminal that is to use this driver and this service", "")
+                .note("In what \"run\" has started. The lines are for a shell to read.")
+                .run([] {
+                    const std::string lines = session::exportLines();
+                    if (lines.empty()) throw UsageError("this is not in a \"vibrator-sim run\"");
+                    std::cout << lines;
+                    return cli::kSuccess;
+                });
+    }
+
     void setFault(const std::string& leaf, const std::string& operation, const std::string& text,
                   unsigned times, unsigned after) const {
+        if (text.empty()) {
+            throw UsageError("what is to fail, and how? For example \"vibrator-sim fault " + leaf +
+                             " write EIO\"");
+        }
         require(operation, {"open", "read", "write", "close"},
                 cli::inQuotes(operation) + " is not open, read, write or close");
         auto fault = simulator::parseFault(text);

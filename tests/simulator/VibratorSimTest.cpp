@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "support/DaemonTest.h"
 
+#include <fcntl.h>
 #include <sys/wait.h>
 
 #include <csignal>
+#include <cstdio>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
@@ -55,6 +57,26 @@ TEST_F(VibratorSimTest, RunCleansUpWhateverEndsIt) {
         EXPECT_TRUE(eventually([&] { return !fs::exists(place); })) << place;
         fs::remove(ready);
     }
+}
+
+TEST_F(VibratorSimTest, DirectoryIsLookedUpOnce) {
+    const std::string directory = mDirectory.path() + "/driver";
+    const std::string link = mDirectory.path() + "/link";
+    const std::string victim = mDirectory.path() + "/victim";
+    for (const std::string& each : {directory, victim})
+        fs::create_directory(each);
+    std::ofstream(victim + "/log") << "precious";
+    fs::create_symlink(victim, link);
+    // Somebody exchanges the directory for a link while it is made a driver's.
+    ChildProcess other;
+    other.start([&] {
+        for (;;)
+            renameat2(AT_FDCWD, directory.c_str(), AT_FDCWD, link.c_str(), RENAME_EXCHANGE);
+    });
+    for (int i = 0; i < 40; ++i)
+        runProgram({VIBRATOR_SIM, "run", "--dir", directory, "true"});
+    EXPECT_EQ(readFile(victim + "/log"), "precious");
+    EXPECT_FALSE(fs::exists(victim + "/sys"));
 }
 
 }  // namespace
