@@ -27,7 +27,7 @@ sp<::android::hidl::manager::V1_2::IServiceManager> defaultServiceManager1_2();
 namespace details {
 
 /**
- * Finds a service.
+ * Finds a service, and asks it whether it has the interface.
  *
  * @param retry whether to wait for it, for at most 5 s.
  * @return nullptr if it is not there; host::lookupError says why.
@@ -43,14 +43,13 @@ sp<typename Proxy::Pure> getServiceInternal(const std::string& instance, bool re
     const sp<::android::hidl::base::V1_0::IBase> base =
             getRawServiceInternal(Interface::descriptor, instance, retry);
     if (base == nullptr) return nullptr;
-    // It was found by this name, so the interface is in its chain.
     if (base->isRemote()) return new Proxy(getOrCreateCachedBinder(base.get()));
-    return Interface::castFrom(base).withDefault(nullptr);
+    return static_cast<Interface*>(base.get());
 }
 
 /**
  * Registers an object under the names of all of its interfaces. Waits until the service manager
- * answers.
+ * answers. If that dies, a thread waits for the next one and registers the object again.
  *
  * @return OK; UNKNOWN_ERROR if the manager refuses it.
  */
