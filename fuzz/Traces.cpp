@@ -23,7 +23,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     for (const Timeline::Segment& segment : timeline.segments) {
         if (!(segment.start <= segment.end && segment.end <= timeline.end)) abort();
     }
-    if (plotText(timeline, 80).empty()) abort();
+    if (plotText(timeline, 80, size % 2 == 0).empty()) abort();
     cut(&timeline, timeline.end / 4, timeline.end / 2);
     if (plotScript(timeline, PictureFormat::kSvg).empty()) abort();
     return 0;

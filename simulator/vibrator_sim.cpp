@@ -38,6 +38,7 @@ std::set<std::string> featuresOf(const std::string& list) {
     std::set<std::string> features;
     std::istringstream words(list + ",");
     for (std::string name; std::getline(words, name, ',');) {
+        if (name == "prebaked") name = "pattern";  // As it was called before.
         require(name, all, "--features: no feature " + cli::inQuotes(name));
         features.insert(name);
     }
@@ -134,7 +135,7 @@ class Simulator : public cli::Program {
     void addCreate() {
         cli::Command& create =
                 command(kAlone, "create", "make a driver, and replace what was there",
-                        "--motor LINEAR_1030 --features intensity,prebaked");
+                        "--motor LINEAR_1030 --features intensity,pattern");
         const auto kind = addDriverOptions(create);
         create.note("The directory must be new, empty, or a driver's.");
         create.run([=] {

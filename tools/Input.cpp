@@ -10,16 +10,17 @@
 
 namespace vibratorctl {
 
-std::string readInput(const std::string& name) {
-    constexpr size_t kMost = 64 << 20;
+std::string readInput(const std::string& name, size_t mostMiB) {
+    const size_t most = mostMiB << 20U;
     errno = 0;
     std::ifstream file(name);
     std::istream& input = name == "-" ? std::cin : file;
     std::string text;
     char block[65536];
-    while (text.size() <= kMost && (input.read(block, sizeof(block)) || input.gcount() > 0))
+    while (text.size() <= most && (input.read(block, sizeof(block)) || input.gcount() > 0))
         text.append(block, static_cast<size_t>(input.gcount()));
-    if (text.size() > kMost) throw cli::UsageError(name + ": more than 64 MiB");
+    if (text.size() > most)
+        throw cli::UsageError(name + ": more than " + std::to_string(mostMiB) + " MiB");
     if (input.bad() || (name != "-" && !file.is_open())) {
         throw cli::UsageError(name + ": cannot be read: " + strerror(errno != 0 ? errno : EIO));
     }

@@ -1,11 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <cstddef>
 #include <string>
 
 namespace vibratorctl {
 
-/** @return what a file holds, or standard input for "-". @throw cli::UsageError */
-std::string readInput(const std::string& name);
+/**
+ * @param mostMiB the most that it may hold, in MiB.
+ * @return what a file holds, or standard input for "-". @throw cli::UsageError
+ */
+std::string readInput(const std::string& name, size_t mostMiB = 64);
 
 }  // namespace vibratorctl

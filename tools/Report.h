@@ -33,10 +33,14 @@ struct Subject {
     nlohmann::ordered_json members = nlohmann::ordered_json::object();
 };
 
-/** @return a server's process for a person: "process 812, /usr/sbin/PROGRAM". */
-std::string serverInWords(const std::optional<Process>& server);
-/** @return the same as a member of the JSON: pid, uid and program; null where it is not known. */
-nlohmann::ordered_json serverAsJson(const std::optional<Process>& server);
+/** Who serves the calls and how they get there: the lines for a person, and the members. */
+struct Served {
+    std::string server;
+    std::string transport;
+    std::string manager;
+    nlohmann::ordered_json members;
+};
+Served describe(const std::optional<Process>& server, const Route& route);
 
 /** @return a motor as a member of the JSON. */
 nlohmann::ordered_json asJson(const LocalDriver::Motor& motor);

@@ -31,7 +31,7 @@ int main(int argc, char** argv) {
                                      ? "only the kernel's binder driver has one"
                                      : strerror(-status);
         fprintf(stderr, "hwservicemanager: %s (calls go over %s)\n", reason,
-                host::transportDescription().c_str());
+                host::transport().inWords().c_str());
         return 1;
     }
     joinRpcThreadpool();

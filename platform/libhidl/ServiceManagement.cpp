@@ -202,7 +202,7 @@ sp<IBase> getRawServiceInternal(const std::string& interface, const std::string&
 
 status_t registerAsServiceInternal(const sp<IBase>& service, const std::string& instance) {
     __android_log_print(ANDROID_LOG_INFO, kLogTag, "calls go over %s",
-                        host::transportDescription().c_str());
+                        host::transport().inWords().c_str());
     // Never destroyed: the manager may die at any time.
     static auto* const registrations = new sp<Registrations>(new Registrations);
     const Error error = (*registrations)->add(service, instance);
@@ -217,19 +217,21 @@ status_t registerAsServiceInternal(const sp<IBase>& service, const std::string& 
 
 namespace host {
 
-std::string transportDescription() {
-    return ProcessState::self()->driverDescription();
+const Transport& transport() {
+    return ProcessState::self()->transport();
 }
 
 void setCallTimeout(milliseconds limit) {
     ::android::hardware::setCallTimeout(static_cast<int>(limit.count()));
 }
 
-std::string serviceManagerDescription() {
-    if (driver().socketDriver() != nullptr) return "none is needed";
+ManagerState managerState(std::string* whyNot) {
+    if (driver().socketDriver() != nullptr) return ManagerState::NOT_NEEDED;
     sp<Manager> manager;
     const Error error = askForManager(&manager);
-    return error.isOk() ? "answers" : error.text();
+    if (error.isOk()) return ManagerState::ANSWERS;
+    *whyNot = error.text();
+    return ManagerState::SILENT;
 }
 
 std::string lookupError(const std::string& interface, const std::string& instance) {

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "KernelDriver.h"
+#include "libhwbinder/SocketDirectory.h"
 #include "libhwbinder/SocketDriver.h"
 
 #include <android/log.h>
@@ -15,27 +16,27 @@ namespace {
 
 constexpr char kDevice[] = "/dev/hwbinder";
 
-/** Chooses the driver. @param description takes which one it is, and why. */
-std::unique_ptr<Driver> chooseDriver(std::string* description) {
+/** Chooses the driver. @param transport set to which one it is, and why. */
+std::unique_ptr<Driver> chooseDriver(Transport* transport) {
     const std::string device = environment("HWBINDER_DEVICE");
     if (!device.empty()) {
         auto kernel = std::make_unique<KernelDriver>(device);
         const Error error = kernel->check();
-        *description = (error.isOk() ? device : error.text()) + ", as HWBINDER_DEVICE says";
+        *transport = {"binder", device,
+                      "as HWBINDER_DEVICE says" + (error.isOk() ? "" : "; " + error.text())};
         return kernel;
     }
-    std::string reason = ", as HWBINDER_DIR says";
+    std::string why = "as HWBINDER_DIR says";
     if (environment("HWBINDER_DIR").empty()) {
         auto kernel = std::make_unique<KernelDriver>(kDevice);
         if (kernel->check().isOk()) {
-            *description = std::string(kDevice) + ", which is there";
+            *transport = {"binder", kDevice, "which is there"};
             return kernel;
         }
-        reason = ", because of " + kernel->check().text();
+        why = "because of " + kernel->check().text();
     }
-    auto sockets = std::make_unique<SocketDriver>();
-    *description = sockets->name() + reason;
-    return sockets;
+    *transport = {"sockets", serverDirectory(), why};
+    return std::make_unique<SocketDriver>();
 }
 
 std::atomic<int>& timeout() {
@@ -50,7 +51,7 @@ std::string environment(const char* name) {
     return value == nullptr ? "" : value;
 }
 
-ProcessState::ProcessState() : mDriver(chooseDriver(&mDescription)) {}
+ProcessState::ProcessState() : mDriver(chooseDriver(&mTransport)) {}
 
 ProcessState* ProcessState::self() {
     // Never destroyed: threads of the pool and objects with static lifetime use it to the end.

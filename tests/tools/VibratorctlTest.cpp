@@ -1,10 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "support/DaemonTest.h"
 
+#include <cctype>
 #include <chrono>
 #include <filesystem>
 #include <fstream>
 #include <nlohmann/json.hpp>
+#include <set>
 #include <sstream>
 #include <thread>
 
@@ -36,7 +38,7 @@ TEST_F(VibratorctlTest, DoctorAgreesWithTheService) {
     std::filesystem::create_directory(temporary);
     setenv("TMPDIR", temporary.c_str(), 1);
     for (const std::string motor : {"LINEAR_1040", "LINEAR_1030", "NONE"}) {
-        for (const std::string some : {"intensity,motor-name", "prebaked,haptic-engine", "none"}) {
+        for (const std::string some : {"intensity,motor-name", "pattern,haptic-engine", "none"}) {
             SCOPED_TRACE(motor + " " + some);
             createDriver({"--motor", motor, "--features", some});
             start();
@@ -54,6 +56,46 @@ TEST_F(VibratorctlTest, DoctorAgreesWithTheService) {
     }
     EXPECT_TRUE(std::filesystem::is_empty(temporary));
     unsetenv("TMPDIR");
+}
+
+/** Collects the names of an answer's members; those of features, queries and ladders are data. */
+void collectNames(const json& answer, std::set<std::string>* names) {
+    if (answer.is_array() && !answer.empty()) collectNames(answer[0], names);
+    if (!answer.is_object()) return;
+    for (const auto& [name, member] : answer.items()) {
+        names->insert(name);
+        if (name != "features" && name != "supports" && name != "ladders")
+            collectNames(member, names);
+    }
+}
+
+TEST_F(VibratorctlTest, TheManualNamesTheMembersOfTheJson) {
+    createDriver();
+    start();
+    const std::string score = mDirectory.path() + "/score";
+    std::ofstream(score) << "click";
+    std::set<std::string> printed;
+    for (const std::string command :
+         {"on 5", "intensity 0", "pattern count", "pattern play 13", "engine 1,2,3,4", "ladder",
+          "supports", "status", "motor", "doctor --instance none"}) {
+        collectNames(json::parse(run(command + " --json").output), &printed);
+    }
+    collectNames(json::parse(run("play --json " + score).output), &printed);
+    collectNames(json::parse(run("play --json --check " + score).output), &printed);
+    std::istringstream manual(readFile(SOURCE_DIRECTORY "/docs/man/vibratorctl.1"));
+    std::set<std::string> named;
+    bool isJson = false;
+    for (std::string line; std::getline(manual, line);) {
+        if (line.rfind(".Sh", 0) == 0) isJson = line == ".Sh JSON";
+        std::istringstream words(line);
+        std::string word;
+        while (words >> word && word != ".Li" && word != "Li") {
+        }
+        while (isJson && words >> word) {
+            if (std::isalpha(static_cast<unsigned char>(word[0])) != 0) named.insert(word);
+        }
+    }
+    EXPECT_EQ(printed, named);
 }
 
 TEST_F(VibratorctlTest, EveryCommandHasHelpAndAnExampleThatWorks) {

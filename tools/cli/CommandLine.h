@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <deque>
 #include <functional>
+#include <map>
 #include <memory>
 #include <optional>
 #include <stdexcept>
@@ -124,7 +125,7 @@ class Command {
     /** Says what the command does; it returns the exit code. */
     void run(std::function<int()> action) { mAction = std::move(action); }
 
-    /** The words that call it, like "prebaked play". */
+    /** The words that call it, like "pattern play". */
     const std::string& name() const { return mName; }
 
     /**
@@ -175,6 +176,10 @@ class Program {
      */
     Command& command(const std::string& group, const std::string& name, const std::string& help,
                      const std::string& example);
+    /** Takes a word that no help shows for the first word of a command. */
+    void addSecondName(const std::string& second, const std::string& first) {
+        mSecondNames[second] = first;
+    }
     /** Runs the command that a command line asks for. @return the program's exit code. */
     int run(int argc, char** argv);
     /** Says something on standard error, unless answers are JSON. */
@@ -212,6 +217,7 @@ class Program {
     /** The words behind "help". */
     Value<std::vector<std::string>> mTopic;
     std::deque<Command> mCommands;
+    std::map<std::string, std::string> mSecondNames;
     const Command* mCurrent = nullptr;
 };
 

@@ -148,7 +148,9 @@ class Line {
         give(*argument, word);
     }
 
-    void takeName(const std::string& word) {
+    void takeName(const std::string& given) {
+        const auto second = mProgram->mSecondNames.find(mTyped.empty() ? given : "");
+        const std::string word = second == mProgram->mSecondNames.end() ? given : second->second;
         const std::string name = mTyped + (mTyped.empty() ? "" : " ") + word;
         const std::vector<std::string> known = valuesOf(mProgram->commandsAfter(mTyped));
         if (std::find(known.begin(), known.end(), word) == known.end()) {

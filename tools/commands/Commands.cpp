@@ -8,6 +8,7 @@ void addCommands(Client& client) {
                            addWatch, addPlot}) {
         add(client);
     }
+    client.addSecondName("prebaked", "pattern");
 }
 
 void addCall(Client& client, cli::Command& command, const OneArgument& argument,

@@ -49,6 +49,9 @@ Call callOf(::android::hardware::Return<VibratorStatus> (Interface::*operation)(
     };
 }
 
+/** Waits, unless a play is interrupted. */
+void wait(uint32_t ms);
+
 /** Adds a command that makes one call with one argument, and that is also a step of scores. */
 void addCall(Client& client, cli::Command& command, const OneArgument& argument,
              Operation operation, const Call& call);

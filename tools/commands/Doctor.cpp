@@ -11,12 +11,9 @@ namespace {
 using nlohmann::ordered_json;
 
 ordered_json asJson(const Diagnosis& found) {
-    ordered_json json = {{"layout", found.layout},
-                         {"service", found.service},
-                         {"server", serverAsJson(found.server)},
-                         {"transport", found.route.transport},
-                         {"manager", found.route.manager},
-                         {"nodes", ordered_json::array()}};
+    ordered_json json = {{"layout", found.layout}, {"service", found.service}};
+    json.update(describe(found.server, found.route).members);
+    json["nodes"] = ordered_json::array();
     for (const auto& [path, serves, now] : found.nodes) {
         json["nodes"].push_back({{"path", path},
                                  {"exists", now.exists},
@@ -70,9 +67,10 @@ std::string inWords(const Diagnosis& found) {
     };
     line("layout", found.layout);
     line("service", found.answers ? "answers" : "cannot be reached");
-    if (found.answers) line("served by", serverInWords(found.server));
-    line("transport", found.route.transport);
-    line("manager", found.route.manager);
+    const Served served = describe(found.server, found.route);
+    if (found.answers) line("served by", served.server);
+    line("transport", served.transport);
+    line("manager", served.manager);
     if (found.motor) {
         line("motor", found.motor->inWords());
         line("ladder 0", ladderInWords(found.ladders[0]));

@@ -25,7 +25,7 @@ VibratorStatus countPatterns(const Client& client, uint32_t* count) {
 }
 
 void addCount(Client& client) {
-    cli::Command& command = client.command(kRestricted, "prebaked count",
+    cli::Command& command = client.command(kRestricted, "pattern count",
                                            "tell how many patterns the driver has stored", "");
     command.run([&client] {
         uint32_t count = 0;
@@ -60,8 +60,8 @@ int playPattern(const Client& client, uint32_t pattern, uint32_t amplitude, bool
 void addPattern(Client& client) {
     constexpr cli::Numbers kPatterns = {"the number of a pattern", 0, INT32_MAX};
     cli::Command& command =
-            client.command(kRestricted, "prebaked play",
-                           "play a pattern that the driver has stored", "3 --amplitude 5000");
+            client.command(kRestricted, "pattern play", "play a pattern that the driver has stored",
+                           "3 --amplitude 5000");
     const auto pattern = command.number("PATTERN", kPatterns, "0 selects without playing");
     const auto amplitude = command.number("--amplitude N", kIntensities,
                                           "how strong; 10000 is full", kIntensities.most);
@@ -79,7 +79,9 @@ Packets readPackets(const std::vector<std::string>& words, const std::string& fi
     for (const std::string& word : words) {
         if (!parsePacket(word, &packets, &error)) throw cli::UsageError(error);
     }
-    if (!file.empty() && !parsePackets(readInput(file), &packets, &error)) {
+    // Many times what a call may have; JSON takes 80 times as much memory.
+    constexpr size_t kMostMiB = 1;
+    if (!file.empty() && !parsePackets(readInput(file, kMostMiB), &packets, &error)) {
         throw cli::UsageError(file + ": " + error);
     }
     if (packets.empty()) {

@@ -3,6 +3,7 @@
 #include "Input.h"
 #include "text/Text.h"
 
+#include <algorithm>
 #include <chrono>
 #include <csignal>
 #include <iostream>
@@ -24,17 +25,6 @@ void catchInterruptions() {
         struct sigaction before = {};
         sigaction(signal, nullptr, &before);
         if (before.sa_handler != SIG_IGN) sigaction(signal, &action, nullptr);
-    }
-}
-
-/** Waits, unless interrupted. */
-void wait(uint32_t ms) {
-    constexpr auto kSlice = std::chrono::milliseconds(20);
-    const auto end = std::chrono::steady_clock::now() + std::chrono::milliseconds(ms);
-    while (interruption == 0) {
-        const auto left = end - std::chrono::steady_clock::now();
-        if (left.count() <= 0) return;
-        std::this_thread::sleep_for(std::min<std::chrono::nanoseconds>(left, kSlice));
     }
 }
 
@@ -61,33 +51,49 @@ int stop(const Client& client, const char* status, const std::string& why) {
     return cli::kFailed;
 }
 
-/** Plays the steps of a score, and reports each with its place in the file. */
-int playScore(Client& client, const std::string& file, const Score& score) {
+/** Plays one step, and reports it. @return the exit code. @throw Unreachable */
+int playReported(Client& client, const ScoreStep& step, const std::string& place) {
+    const Subject play = client.report().setSubject({step.name, step.argument(), step.place()});
+    try {
+        const int code = playStep(client, step);
+        client.report().setSubject(play);
+        std::cout.flush();
+        return code;
+    } catch (const Unreachable& error) {
+        throw Unreachable(std::string(error.what()) + ", at " + place);
+    }
+}
+
+/**
+ * Plays the steps of a score, and reports each with its place in the file.
+ *
+ * @param keepsGoing whether it passes over steps that fail, and names them at the end.
+ */
+int playScore(Client& client, const std::string& file, const Score& score, bool keepsGoing) {
+    std::vector<std::string> failed;
     catchInterruptions();
     for (const uint32_t index : score.order) {
         const ScoreStep& step = score.lines[index];
-        const std::string place =
-                file + ":" + std::to_string(step.line) + ":" + std::to_string(step.column);
-        int code = cli::kSuccess;
-        const Subject play = client.report().setSubject({step.name, step.argument(), step.place()});
-        try {
-            code = playStep(client, step);
-        } catch (const Unreachable& error) {
-            throw Unreachable(std::string(error.what()) + ", at " + place);
+        const std::string place = std::to_string(step.line) + ":" + std::to_string(step.column);
+        const int code = playReported(client, step, file + ":" + place);
+        if (code != cli::kSuccess && !keepsGoing) {
+            return stop(client, "FAILED", file + ":" + place + ": the step failed");
         }
-        client.report().setSubject(play);
-        if (code != cli::kSuccess) return stop(client, "FAILED", place + ": the step failed");
-        std::cout.flush();
+        const std::string name = step.name + " at " + place;
+        if (code != cli::kSuccess && std::count(failed.begin(), failed.end(), name) == 0)
+            failed.push_back(name);
         if (interruption != 0) {
-            stop(client, "INTERRUPTED", "interrupted at " + place);
+            stop(client, "INTERRUPTED", "interrupted at " + file + ":" + place);
             std::signal(interruption, SIG_DFL);
             return raise(interruption);
         }
     }
-    return cli::kSuccess;
+    if (failed.empty()) return cli::kSuccess;
+    client.complain("FAILED", file + ": passed over " + cli::join(failed, ", ", " and "));
+    return cli::kFailed;
 }
 
-int play(Client& client, const std::string& file, bool isCheck) {
+int play(Client& client, const std::string& file, bool isCheck, bool keepsGoing) {
     Score score;
     const auto errors = parseScore(readInput(file), client.steps, &score);
     for (const ScoreError& error : errors) {
@@ -98,7 +104,7 @@ int play(Client& client, const std::string& file, bool isCheck) {
         client.warn("play: " + file + ": only the first 20 mistakes are shown");
     }
     if (!errors.empty()) return cli::kUsage;
-    if (!isCheck) return playScore(client, file, score);
+    if (!isCheck) return playScore(client, file, score, keepsGoing);
     const size_t steps = score.order.size();
     return client.report().found("OK, " + std::to_string(steps) +
                                          (steps == 1 ? " step, " : " steps, ") +
@@ -108,18 +114,31 @@ int play(Client& client, const std::string& file, bool isCheck) {
 
 }  // namespace
 
+void wait(uint32_t ms) {
+    constexpr auto kSlice = std::chrono::milliseconds(20);
+    const auto end = std::chrono::steady_clock::now() + std::chrono::milliseconds(ms);
+    while (interruption == 0) {
+        const auto left = end - std::chrono::steady_clock::now();
+        if (left.count() <= 0) return;
+        std::this_thread::sleep_for(std::min<std::chrono::nanoseconds>(left, kSlice));
+    }
+}
+
 void addPlay(Client& client) {
     cli::Command& command =
             client.command(kTools, "play", "play a score", "docs/examples/clicks.score");
     const auto file = command.file("SCORE", "file with a step a line, - for standard input");
     const auto check = command.flag("--check", "only check the score, and print how long it takes");
+    const auto keepsGoing =
+            command.flag("--keep-going", "pass over steps that fail, and name them at the end");
     command.note(
-            "Steps: click [light|medium|strong], on MS, off, wait MS, amplitude N, intensity N, "
+            "Steps: click [light|medium|strong], on MS [wait], off, wait MS, amplitude N, "
+            "intensity N, "
             "pattern N [AMPLITUDE] [repeat], engine AMPLITUDE PACKET..., external on|off, "
             "frequency N, force-touch N, fold open|close; the steps between repeat N and end are "
             "played N times; # begins a comment. The whole score is checked before the first call. "
             "The motor is stopped when a step fails or the play is interrupted.");
-    command.run([=, &client] { return play(client, *file, *check); });
+    command.run([=, &client] { return play(client, *file, *check, *keepsGoing); });
 }
 
 }  // namespace vibratorctl

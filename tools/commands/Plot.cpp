@@ -10,8 +10,10 @@
 #include <sys/ioctl.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <iostream>
@@ -53,12 +55,37 @@ void writeWhole(const std::string& file, const std::string& bytes) {
     throw std::runtime_error(file + ": cannot be written: " + reason);
 }
 
+/** @return whether all that has times has times of day without a fraction. */
+bool hasWholeSeconds(const std::vector<NodeAccess>& accesses) {
+    return !accesses.empty() &&
+           std::all_of(accesses.begin(), accesses.end(), [](const NodeAccess& each) {
+               return each.clock.find(':') != std::string::npos &&
+                      each.clock.find('.') == std::string::npos;
+           });
+}
+
+/** @return whether the user's locale has only the characters of ASCII. */
+bool isAsciiLocale() {
+    for (const char* name : {"LC_ALL", "LC_CTYPE", "LANG"}) {
+        const char* value = getenv(name);
+        if (value == nullptr || *value == '\0') continue;
+        return strcmp(value, "C") == 0 || strcmp(value, "POSIX") == 0;
+    }
+    return false;
+}
+
 Timeline readTimeline(const std::string& file) {
     AccessReader reader;
     std::vector<NodeAccess> accesses;
     std::istringstream lines(readInput(file));
     for (std::string line; std::getline(lines, line);) {
         if (const auto access = reader.read(line)) accesses.push_back(*access);
+    }
+    if (hasWholeSeconds(accesses)) {
+        throw cli::UsageError(file +
+                              ": its times are whole seconds, in which calls cannot be told "
+                              "apart; plot what this prints: journalctl -u vibrator -o "
+                              "short-precise");
     }
     Timeline timeline = makeTimeline(accesses);
     if (!timeline.marks.empty()) return timeline;
@@ -102,9 +129,12 @@ void addPlot(Client& client) {
     const auto from = command.text("--from TIME", "start of the part to draw, like 10s or 2m", "");
     const auto to = command.text("--to TIME", "end of the part to draw", "");
     const auto last = command.text("--last TIME", "draw only the end, of this length", "");
+    const auto ascii = command.flag("--ascii", "draw the text with the characters of ASCII alone");
     command.note("Times count from the first call on.");
     command.withoutJson().run([=] {
         const bool isText = output->empty();
+        if (isText && *format != 0)
+            throw cli::UsageError("--format is of a picture; name its file with -o");
         const PictureFormat kind = isText ? PictureFormat::kSvg : formatOf(*output, *format);
         if (!isText && *output != "-") checkTarget(*output, traffic());
         Timeline timeline = readTimeline(traffic());
@@ -122,7 +152,8 @@ void addPlot(Client& client) {
         if (isText) {
             winsize window{};
             const bool isKnown = ioctl(STDOUT_FILENO, TIOCGWINSZ, &window) == 0;
-            std::cout << plotText(timeline, isKnown && window.ws_col > 0 ? window.ws_col : 80U);
+            std::cout << plotText(timeline, isKnown && window.ws_col > 0 ? window.ws_col : 80U,
+                                  *ascii || isAsciiLocale());
         } else if (*output == "-") {
             std::cout << drawPicture(timeline, kind);
         } else {

@@ -52,24 +52,21 @@ int supports(const Client& client) {
 
 int status(const Client& client, uint32_t seconds) {
     const auto vibrator = await(client, seconds);
-    const Route route = describeRoute();
-    const auto server = serverOf(*vibrator);
+    const Served served = describe(serverOf(*vibrator), findRoute());
     std::vector<std::string> interfaces;
     reached(vibrator->interfaceChain([&](const auto& chain) {
         for (const auto& descriptor : chain)
             interfaces.emplace_back(descriptor.c_str());
     }));
     const std::string indent = "\n            ";
+    ordered_json members = {{"instance", client.instance()}, {"answers", true}};
+    members.update(served.members);
+    members["interfaces"] = interfaces;
     return client.report().found(
-            "service:    " + client.instance() + ", answers\nserved by:  " + serverInWords(server) +
-                    "\ntransport:  " + route.transport + "\nmanager:    " + route.manager +
+            "service:    " + client.instance() + ", answers\nserved by:  " + served.server +
+                    "\ntransport:  " + served.transport + "\nmanager:    " + served.manager +
                     "\ninterfaces: " + cli::join(interfaces, indent, indent) + "\n",
-            {{"instance", client.instance()},
-             {"answers", true},
-             {"server", serverAsJson(server)},
-             {"transport", route.transport},
-             {"manager", route.manager},
-             {"interfaces", interfaces}});
+            members);
 }
 
 int ladder(const Client& client, uint32_t type) {

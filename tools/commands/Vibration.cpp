@@ -95,10 +95,15 @@ void addVibration(Client& client) {
     constexpr cli::Numbers kTimes = {"a time in ms", 0, INT32_MAX};
     cli::Command& on = client.command(kForAll, "on", "run the motor", "500");
     const auto ms = on.number("MS", kTimes, "how long, in ms");
-    on.run([&client, ms] {
-        return client.report().answer({"on"}, client.service()->on(*ms), {std::to_string(*ms)});
+    const auto waits = on.flag("--wait", "wait until the motor has stopped");
+    on.run([&client, ms, waits] {
+        const int code =
+                client.report().answer({"on"}, client.service()->on(*ms), {std::to_string(*ms)});
+        if (code == cli::kSuccess && *waits) wait(*ms);
+        return code;
     });
-    client.steps.push_back({"on", &on, [ms] { return *ms; }});
+    client.steps.push_back(
+            {"on", &on, [ms] { return *ms; }, [ms, waits] { return *waits ? *ms : 0; }});
 
     cli::Command& off = client.command(kForAll, "off", "stop the motor", "");
     off.run([&client] { return client.report().answer({"off"}, client.service()->off()); });

@@ -29,10 +29,19 @@ constexpr struct {
     const char* colour;
 } kKinds[] = {{"probe", "\033[2m"}, {"read", "\033[36m"}, {"write", "\033[32m"}, {"refused", kRed}};
 
-/** @return whether to use colours: on a terminal, unless NO_COLOR is set (no-color.org). */
-bool wantsColour() {
-    const char* no = getenv("NO_COLOR");
-    return isatty(STDOUT_FILENO) != 0 && (no == nullptr || *no == '\0');
+/** Values of --color. */
+enum { kAuto, kAlways };
+
+/** @return whether to use colours: by default on a terminal that has them, unless NO_COLOR is set
+ * (no-color.org). */
+bool wantsColour(size_t when) {
+    if (when != kAuto) return when == kAlways;
+    const auto is = [](const char* name, auto test) {
+        const char* value = getenv(name);
+        return value != nullptr && test(std::string(value));
+    };
+    return isatty(STDOUT_FILENO) != 0 && !is("NO_COLOR", [](auto text) { return !text.empty(); }) &&
+           !is("TERM", [](auto text) { return text == "dumb"; });
 }
 
 void print(const NodeAccess& access, bool isColoured) {
@@ -53,7 +62,8 @@ void print(const NodeAccess& access, bool isColoured) {
 /** Prints the access that each line ends; warns once if no line does. */
 class Printer {
   public:
-    Printer(const Client& client, std::string file) : mClient(client), mFile(std::move(file)) {}
+    Printer(const Client& client, std::string file, bool isColoured)
+        : mClient(client), mFile(std::move(file)), mIsColoured(isColoured) {}
 
     /** Takes what has come; an incomplete line is kept until the rest comes. */
     void take(const std::string& part) {
@@ -93,9 +103,9 @@ class Printer {
 
     const Client& mClient;
     const std::string mFile;
+    const bool mIsColoured;
     AccessReader mReader;
     std::string mLine;
-    bool mIsColoured = wantsColour();
     size_t mLines = 0;
     bool mIsKnown = false;
 };
@@ -143,16 +153,17 @@ class GrowingFile {
 };
 
 /** Shows accesses as they come, or only those that are there. @return the exit code. */
-int watch(const Client& client, const std::string& name, bool fromStart, bool once) {
+int watch(const Client& client, const std::string& name, bool fromStart, bool once,
+          bool isColoured) {
     const bool isInput = name == "-";
     GrowingFile file(name);
-    if (!isInput && !fromStart) file.skip();
+    if (!isInput && !fromStart && !once) file.skip();
     if (!once) {
         std::cerr << "Waiting for accesses in "
                   << (isInput ? "standard input" : cli::printable(name)) << "; Ctrl-C ends it."
                   << std::endl;
     }
-    Printer printer(client, name);
+    Printer printer(client, name, isColoured);
     while (std::cout) {
         const std::string part = file.read();
         printer.take(part);
@@ -170,14 +181,21 @@ int watch(const Client& client, const std::string& name, bool fromStart, bool on
 }  // namespace
 
 void addWatch(Client& client) {
-    cli::Command& command = client.command(
-            kTools, "watch", "show the service's node traffic as it comes", "--all --once");
+    cli::Command& command = client.command(kTools, "watch",
+                                           "show the service's node traffic as it comes", "--once");
     const auto traffic = addTraffic(command);
     const auto fromStart = command.flag("--all", "also show what is there already");
-    const auto once = command.flag("--once", "end instead of waiting for more");
+    const auto once = command.flag("--once", "show what is there, and end");
+    const auto colour = command.choice("--color WHEN",
+                                       {{"auto", "on a terminal that has colours"},
+                                        {"always", "also into a file or a pipe"},
+                                        {"never", "plain text"}},
+                                       "use colours", kAuto);
     command.note(
             "A trace does not show the calls that the service refused; the daemon's log does.");
-    command.withoutJson().run([=, &client] { return watch(client, traffic(), *fromStart, *once); });
+    command.withoutJson().run([=, &client] {
+        return watch(client, traffic(), *fromStart, *once, wantsColour(*colour));
+    });
 }
 
 }  // namespace vibratorctl

@@ -84,12 +84,13 @@ class ScoreParser {
             return;
         }
         const auto kind = std::find_if(mKinds.begin(), mKinds.end(), [&](const StepKind& each) {
-            return step->name == each.name;
+            return (step->name == "prebaked" ? "pattern" : step->name) == each.name;
         });
         if (kind == mKinds.end()) throw cli::UsageError(noStep(step->name));
         step->command = kind->command;
         step->command->readStep(step->words);
         step->runs = kind->runs();
+        step->pause = kind->waits();
     }
 
     std::string noStep(const std::string& name) const {
@@ -97,7 +98,7 @@ class ScoreParser {
         for (const StepKind& kind : mKinds)
             names.push_back(kind.name);
         names.insert(names.end(), {"wait", "repeat", "end"});
-        const std::string nearest = cli::suggestion(name, names);
+        const std::string nearest = cli::suggestion(name == "sleep" ? "wait" : name, names);
         return "no step " + cli::inQuotes(name) +
                (nearest.empty() ? "; there are " + cli::join(names, ", ", " and ") : nearest);
     }
@@ -147,8 +148,8 @@ double Score::seconds() const {
     double stop = 0;
     for (const uint32_t index : order) {
         const ScoreStep& step = lines[index];
-        now += step.pause;
         if (step.runs) stop = now + *step.runs;
+        now += step.pause;
     }
     return std::max(now, stop) / 1000;
 }
@@ -157,7 +158,10 @@ std::vector<ScoreError> parseScore(const std::string& text, const std::vector<St
                                    Score* score) {
     std::vector<ScoreError> errors;
     ScoreParser parser(kinds, score, &errors);
-    std::istringstream lines(text);
+    // Some editors begin a file with this mark, which nobody sees.
+    constexpr std::string_view kByteOrderMark = "\xEF\xBB\xBF";
+    const bool isMarked = text.compare(0, kByteOrderMark.size(), kByteOrderMark) == 0;
+    std::istringstream lines(text.substr(isMarked ? kByteOrderMark.size() : 0));
     for (std::string line; errors.size() < kMostScoreErrors && std::getline(lines, line);)
         parser.parseLine(line);
     parser.finish();

@@ -18,6 +18,8 @@ struct StepKind {
      * @throw cli::UsageError
      */
     std::function<std::optional<double>()> runs = [] { return std::nullopt; };
+    /** @return for how many ms the step that the command has read last waits. */
+    std::function<uint32_t()> waits = [] { return 0; };
 };
 
 /** One line of a score: a command, or a pause between two. */

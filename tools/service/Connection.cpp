@@ -26,8 +26,10 @@ std::optional<Process> serverOf(IDaxVibrator& vibrator) {
     return result.isOk() && pid > 0 ? readProcess(pid) : std::nullopt;
 }
 
-Route describeRoute() {
-    return {host::transportDescription(), host::serviceManagerDescription()};
+Route findRoute() {
+    Route route{host::transport(), {}, ""};
+    route.manager = host::managerState(&route.whyNoManager);
+    return route;
 }
 
 }  // namespace vibratorctl

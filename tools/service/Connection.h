@@ -3,6 +3,7 @@
 
 #include "service/Process.h"
 
+#include <hidl/Host.h>
 #include <hidl/Status.h>
 #include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
 
@@ -37,14 +38,14 @@ T reached(const ::android::hardware::Return<T>& result) {
 /** @return the process that serves the calls; nothing where /proc does not show it. */
 std::optional<Process> serverOf(IDaxVibrator& vibrator);
 
-/** How calls get to the service; in words for a person. */
+/** How calls get to the service. */
 struct Route {
-    /** What carries the calls. */
-    std::string transport;
-    /** Whether a service manager answers. */
-    std::string manager;
+    ::android::hardware::Transport transport;
+    ::android::hardware::host::ManagerState manager;
+    /** Why no service manager answers that is needed. */
+    std::string whyNoManager;
 };
 
-Route describeRoute();
+Route findRoute();
 
 }  // namespace vibratorctl

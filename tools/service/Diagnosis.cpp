@@ -38,7 +38,7 @@ class Examination {
   public:
     explicit Examination(const std::string& instance) {
         setCallTimeout(kPatience);
-        mFound.route = describeRoute();
+        mFound.route = findRoute();
         try {
             mVibrator = connect(instance);
             mFound.server = serverOf(*mVibrator);

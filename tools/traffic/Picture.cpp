@@ -51,25 +51,30 @@ void add(Bar bar, double pixel, std::vector<Bar>* bars) {
     }
 }
 
+/** @return the label of calls that stand close together; a setting does not stand first. */
+std::string labelOf(std::vector<Timeline::Mark> marks) {
+    constexpr size_t kLongest = 22;
+    const auto first = std::find_if(marks.begin(), marks.end(),
+                                    [](const auto& mark) { return !mark.isSetting; });
+    if (first != marks.end()) std::rotate(marks.begin(), first, first + 1);
+    std::string label = plain(marks[0].label);
+    for (size_t i = 1; i < marks.size(); ++i) {
+        if (label.size() + marks[i].label.size() + 2 > kLongest)
+            return label + " +" + std::to_string(marks.size() - i);
+        label += ", " + plain(marks[i].label);
+    }
+    return label;
+}
+
 /** @return the labels of the calls; labels that would overlap are merged into one, with a count. */
 std::vector<Timeline::Mark> labelsOf(const std::vector<Timeline::Mark>& marks, double pixel) {
     constexpr double kLineHeight = 21;
-    constexpr size_t kLongest = 22;
     std::vector<Timeline::Mark> labels;
-    size_t more = 0;
-    for (const Timeline::Mark& mark : marks) {
-        if (labels.empty() || mark.time - labels.back().time > kLineHeight * pixel) {
-            labels.push_back({mark.time, plain(mark.label)});
-            more = 0;
-            continue;
-        }
-        std::string& label = labels.back().label;
-        if (more == 0 && label.size() + mark.label.size() + 2 <= kLongest) {
-            label += ", " + plain(mark.label);
-            continue;
-        }
-        if (more > 0) label.erase(label.rfind(" +"));
-        label += " +" + std::to_string(++more);
+    for (size_t end = 0; end < marks.size();) {
+        const size_t start = end;
+        while (end < marks.size() && marks[end].time - marks[start].time <= kLineHeight * pixel)
+            ++end;
+        labels.push_back({marks[start].time, labelOf({&marks[start], &marks[end]}), false});
     }
     return labels;
 }

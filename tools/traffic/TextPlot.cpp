@@ -31,10 +31,31 @@ std::vector<double> strengths(const Timeline& timeline, size_t width, double per
     return columns;
 }
 
+/** @return the axis, with the numbers of the calls where there is room for them, and else a tick.
+ */
+std::string axisOf(const Timeline& timeline, size_t width, double perColumn) {
+    std::string axis(width, '-');
+    size_t free = 0;
+    for (size_t i = 0; i < timeline.marks.size(); ++i) {
+        const double place = (timeline.marks[i].time - timeline.start) / perColumn + kInexact;
+        const size_t column = std::min(width - 1, static_cast<size_t>(place));
+        if (column < free) continue;
+        std::string mark = std::to_string(i + 1);
+        // Numbers that touch would be read as one.
+        const bool hasRoom = column == 0 || axis[column - 1] == '-';
+        if (i >= kMostCalls || !hasRoom || column + mark.size() > width) mark = "|";
+        axis.replace(column, mark.size(), mark);
+        free = column + mark.size();
+    }
+    return axis;
+}
+
 }  // namespace
 
-std::string plotText(const Timeline& timeline, size_t columns) {
+std::string plotText(const Timeline& timeline, size_t columns, bool isAscii) {
     constexpr const char* kBlocks[] = {" ", "▁", "▂", "▃", "▄", "▅", "▆", "▇", "█"};
+    constexpr const char* kAscii[] = {" ", ".", ".", ":", ":", "+", "+", "#", "#"};
+    const char* const* const blocks = isAscii ? kAscii : kBlocks;
     const size_t width = std::max<size_t>(columns, kMargin + 20) - kMargin;
     const double length = std::max(timeline.end - timeline.start, 0.001);
     const double perColumn = length / static_cast<double>(width);
@@ -51,16 +72,11 @@ std::string plotText(const Timeline& timeline, size_t columns) {
         for (size_t i = 0; i < width; ++i) {
             const long eighths = std::lround(strong[i] * double{kRows * kEighths}) - row * kEighths;
             const bool isTop = row == kRows - 1 && strong[i] > 1;
-            text += isTop ? "!" : kBlocks[std::clamp<long>(eighths, 0, kEighths)];
+            text += isTop ? "!" : blocks[std::clamp<long>(eighths, 0, kEighths)];
         }
         text += '\n';
     }
-    std::string axis(width, '-');
-    for (const Timeline::Mark& mark : timeline.marks) {
-        const auto column =
-                static_cast<size_t>((mark.time - timeline.start) / perColumn + kInexact);
-        axis[std::min(width - 1, column)] = '|';
-    }
+    std::string axis = axisOf(timeline, width, perColumn);
     if (timeline.goesOn) axis.back() = '>';
     const std::string from = cli::durationInWords(timeline.start);
     const std::string to = cli::durationInWords(timeline.end);
@@ -72,7 +88,7 @@ std::string plotText(const Timeline& timeline, size_t columns) {
     if (!plotNote(timeline).empty()) text += indent + plotNote(timeline) + '\n';
     text += '\n';
     for (size_t i = 0; i < timeline.marks.size() && i < kMostCalls; ++i) {
-        snprintf(line, sizeof(line), "%12s  ",
+        snprintf(line, sizeof(line), "%4zu %11s  ", i + 1,
                  cli::durationInWords(timeline.marks[i].time).c_str());
         text += line + timeline.marks[i].label + '\n';
     }

@@ -5,7 +5,11 @@
 
 namespace vibratorctl {
 
-/** @return the timeline for a terminal of some columns. */
-std::string plotText(const Timeline& timeline, size_t columns);
+/**
+ * @param columns the width of the terminal.
+ * @param isAscii whether to draw with the characters of ASCII alone.
+ * @return the timeline, with numbers at the calls that are listed below it.
+ */
+std::string plotText(const Timeline& timeline, size_t columns, bool isAscii);
 
 }  // namespace vibratorctl

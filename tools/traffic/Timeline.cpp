@@ -128,11 +128,14 @@ class TimelineMaker {
         if (!mTimeline.isTimed && !mTimeline.marks.empty()) {
             mNow = std::clamp(mStop + kGap, mNow + kGap, mNow + latest);
         }
-        mTimeline.marks.push_back({mNow, label});
+        mTimeline.marks.push_back({mNow, label, false});
         mBegun = begun;
     }
     /** Adds a call that does not wait for the motor. */
-    void set(const std::string& label, Begun begun = kNoCall) { mark(label, begun, kGap); }
+    void set(const std::string& label, Begun begun = kNoCall) {
+        mark(label, begun, kGap);
+        mTimeline.marks.back().isSetting = true;
+    }
 
     void setIntensity(long long value) {
         const double strength = strengthOf(static_cast<double>(value));
@@ -178,6 +181,7 @@ class TimelineMaker {
         const std::string label = "pattern " + std::to_string(value);
         if (mBegun == kIntensity && isSoon()) {
             mTimeline.marks.back().label = label;
+            mTimeline.marks.back().isSetting = false;
         } else {
             mark(label);
         }

@@ -29,6 +29,8 @@ struct Timeline {
         double time;
         /** In the words of a score, like "click light"; letters, digits, blanks and commas. */
         std::string label;
+        /** Whether it only changes a setting of the motor or of the driver. */
+        bool isSetting = false;
     };
 
     /** In s from the first mark on, in order. */

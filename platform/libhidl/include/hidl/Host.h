@@ -1,17 +1,22 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <hwbinder/Transport.h>
+
 #include <chrono>
 #include <string>
 
 /** What only this platform offers, for programs that are not built for a device's runtime. */
 namespace android::hardware::host {
 
-/** @return the transport of this process's calls, and why it is used. */
-std::string transportDescription();
+/** @return the transport of this process's calls. */
+const Transport& transport();
 
-/** @return whether a service manager answers, in words. */
-std::string serviceManagerDescription();
+/** Whether calls over the transport need a service manager, and whether one answers. */
+enum class ManagerState { NOT_NEEDED, ANSWERS, SILENT };
+
+/** @param whyNot set to why none answers, in words. @return the state of the service manager. */
+ManagerState managerState(std::string* whyNot);
 
 /** Looks once for a service. @return why it is not there, in words. */
 std::string lookupError(const std::string& interface, const std::string& instance = "default");

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <hwbinder/IBinder.h>
+#include <hwbinder/Transport.h>
 
 #include <cstddef>
 #include <cstdint>
@@ -22,8 +23,8 @@ class ProcessState {
 
     /** @return the driver that calls of this process go over. */
     Driver& driver() { return *mDriver; }
-    /** @return the driver and why it is this one, in words. */
-    const std::string& driverDescription() const { return mDescription; }
+    /** @return which driver that is, and why. */
+    const Transport& transport() const { return mTransport; }
 
     /**
      * @param maxThreads the most threads that serve calls; this platform always has one.
@@ -48,7 +49,7 @@ class ProcessState {
   private:
     ProcessState();
 
-    std::string mDescription;
+    Transport mTransport;
     std::unique_ptr<Driver> mDriver;
     std::mutex mServing;
     std::mutex mMutex;
