@@ -27,10 +27,6 @@ using simulator::Folder;
 
 constexpr char kDaemon[] = "vendor.velmora.hardware.vibrator@2.1-service";
 
-std::string failure(const std::string& what) {
-    return what + ": " + strerror(errno);
-}
-
 /** Blocks the signals that end this program or report a child's end. @return them. */
 sigset_t blockSignals() {
     sigset_t signals;
@@ -39,6 +35,22 @@ sigset_t blockSignals() {
         sigaddset(&signals, number);
     sigprocmask(SIG_BLOCK, &signals, nullptr);
     return signals;
+}
+
+/** Begins the trace and the log of a driver. @param name the directory as the user knows it. */
+void beginLog(const Folder& directory, const std::string& name) {
+    if (!simulator::isMarked(directory)) {
+        throw std::runtime_error(cli::inQuotes(name) + " is no longer a driver's");
+    }
+    directory.remove("trace");
+    const int error = directory.replace("log", "", 0644);
+    if (error != 0) throw std::runtime_error(cli::inQuotes(name + "/log") + ": " + strerror(error));
+}
+
+/** @return the user's shell. */
+std::string shell() {
+    const char* name = getenv("SHELL");
+    return name == nullptr || *name == '\0' ? "/bin/sh" : name;
 }
 
 /** Prepares the daemon's process: its log, no signals of the terminal. */
@@ -51,30 +63,6 @@ void becomeDaemon(const Folder& directory, pid_t parent) {
     dup2(open("/dev/null", O_RDONLY | O_CLOEXEC), STDIN_FILENO);
     dup2(log, STDOUT_FILENO);
     dup2(log, STDERR_FILENO);
-}
-
-/** Waits until nobody has the other end of a pipe; nobody waits for this process's output. */
-void awaitEnd(int pipe) {
-    const int nowhere = open("/dev/null", O_RDWR);
-    dup2(pipe, STDIN_FILENO);
-    dup2(nowhere, STDOUT_FILENO);
-    dup2(nowhere, STDERR_FILENO);
-    close_range(STDERR_FILENO + 1, ~0U, 0);
-    char byte;
-    while (read(STDIN_FILENO, &byte, 1) < 0 && errno == EINTR) {
-    }
-}
-
-/** Removes a directory and all in it. @return whether it is gone. */
-bool removeDirectory(const std::string& path) {
-    // A dying daemon may still add files.
-    for (int attempt = 0; attempt < 5; ++attempt) {
-        std::error_code error;
-        fs::remove_all(path, error);
-        if (!error) return true;
-        usleep(200'000);
-    }
-    return false;
 }
 
 /** @return a word that a shell reads as this text. */
@@ -100,69 +88,6 @@ std::string findProgram(const std::string& name, const std::vector<const char*>&
     }
     throw std::runtime_error(name + " is neither beside " + own.filename().string() +
                              " nor where it is built or installed");
-}
-
-Child::Child(const std::vector<std::string>& command, const std::function<void()>& prepare) {
-    std::vector<char*> arguments;
-    arguments.reserve(command.size() + 1);
-    for (const std::string& word : command)
-        arguments.push_back(const_cast<char*>(word.c_str()));
-    arguments.push_back(nullptr);
-    mPid = fork();
-    if (mPid < 0) throw std::runtime_error(failure("fork"));
-    if (mPid != 0) return;
-    prepare();
-    sigset_t none;
-    sigemptyset(&none);
-    sigprocmask(SIG_SETMASK, &none, nullptr);
-    execvp(arguments[0], arguments.data());
-    const int error = errno;
-    std::cerr << program_invocation_short_name << ": run: " << cli::inQuotes(command[0]) << ": "
-              << strerror(error) << std::endl;
-    _exit(error == ENOENT ? 127 : 126);
-}
-
-Child::~Child() {
-    signal(SIGKILL);
-    wait();
-}
-
-void Child::signal(int number) const {
-    if (mPid > 0) kill(mPid, number);
-}
-
-bool Child::hasEnded() {
-    if (mPid > 0 && waitpid(mPid, &mStatus, WNOHANG) == mPid) mPid = -1;
-    return mPid < 0;
-}
-
-int Child::wait() {
-    while (mPid > 0) {
-        if (waitpid(mPid, &mStatus, 0) == mPid || errno != EINTR) mPid = -1;
-    }
-    return WIFSIGNALED(mStatus) ? 128 + WTERMSIG(mStatus) : WEXITSTATUS(mStatus);
-}
-
-// Not in $TMPDIR: a socket's path must be short, and a preloaded library's without blanks.
-PrivateDirectory::PrivateDirectory() {
-    if (mkdtemp(mPath.data()) == nullptr) throw std::runtime_error(failure(mPath));
-    int ends[2];
-    if (chmod(mPath.c_str(), 0755) != 0 || pipe2(ends, O_CLOEXEC) != 0 || (mRemover = fork()) < 0) {
-        const std::string reason = failure(mPath);
-        rmdir(mPath.c_str());
-        throw std::runtime_error(reason);
-    }
-    if (mRemover == 0) {
-        awaitEnd(ends[0]);
-        _exit(removeDirectory(mPath) ? 0 : 1);
-    }
-    close(ends[0]);
-    mPipe = ends[1];
-}
-
-PrivateDirectory::~PrivateDirectory() {
-    close(mPipe);
-    waitpid(mRemover, nullptr, 0);
 }
 
 std::string exportLines() {
@@ -234,25 +159,31 @@ int Session::awaitCommand(Child& command, Child& daemon, const Driver& driver) c
     return command.wait();
 }
 
-int Session::run(const Driver& driver, std::vector<std::string> command) {
-    const Folder folder(driver.directory);
-    if (!simulator::isMarked(folder)) {
-        throw std::runtime_error(cli::inQuotes(driver.directory) + " is no longer a driver's");
-    }
-    folder.remove("trace");
-    if (folder.replace("log", "", 0644) != 0) {
-        throw std::runtime_error(failure(driver.directory + "/log"));
-    }
-    // Links, since a path in PATH may have no colons.
-    fs::create_directory(mPlace / "bin");
-    fs::permissions(mPlace / "bin", static_cast<fs::perms>(0755));
-    fs::create_symlink(mClient, mPlace / "bin/vibratorctl");
+/** Makes links to the programs, since a path in PATH may have no colons. */
+void Session::linkPrograms() const {
+    const fs::path programs = mPlace / "bin";
+    fs::create_directory(programs);
+    fs::permissions(programs, static_cast<fs::perms>(0755));
+    fs::create_symlink(mClient, programs / "vibratorctl");
     fs::create_symlink(fs::read_symlink("/proc/self/exe"),
-                       mPlace / "bin/" + program_invocation_short_name);
-    setenv("VIBRATOR_SIM_DIR", driver.directory.c_str(), 1);
+                       programs / program_invocation_short_name);
+}
+
+/** Leads this process's children to the driver, the sockets and, if they look, the programs. */
+void Session::setEnvironment(const std::string& directory) const {
+    setenv("VIBRATOR_SIM_DIR", directory.c_str(), 1);
     setenv("HWBINDER_DIR", (mPlace / "sockets").c_str(), 1);
     // It counts more than the directory of the sockets.
     if (getenv("HWBINDER_DEVICE") != nullptr) setenv("HWBINDER_DEVICE", "", 1);
+    const char* path = getenv("PATH");
+    setenv("PATH", (mPlace / "bin:" + (path == nullptr ? "/usr/bin:/bin" : path)).c_str(), 1);
+}
+
+int Session::run(const Driver& driver, std::vector<std::string> command) {
+    const Folder folder(driver.directory);
+    beginLog(folder, driver.directory);
+    linkPrograms();
+    setEnvironment(driver.directory);
 
     const pid_t self = getpid();
     Child daemon({mDaemon}, [&] {
@@ -261,11 +192,8 @@ int Session::run(const Driver& driver, std::vector<std::string> command) {
     });
     awaitDaemon(daemon, folder);
 
-    const char* path = getenv("PATH");
-    setenv("PATH", (mPlace / "bin:" + (path == nullptr ? "/usr/bin:/bin" : path)).c_str(), 1);
     if (command.empty()) {
-        const char* shell = getenv("SHELL");
-        command = {shell == nullptr || *shell == '\0' ? "/bin/sh" : shell};
+        command = {shell()};
         std::cerr << driver.banner << "The driver's trace and the daemon's log are in "
                   << cli::inQuotes(driver.directory)
                   << ".\nIn a second terminal, to use them from there, too:\n"

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "Child.h"
 #include "Folder.h"
-
-#include <sys/types.h>
+#include "PrivateDirectory.h"
 
 #include <csignal>
 #include <functional>
@@ -19,46 +19,6 @@ namespace session {
  * @throw std::runtime_error
  */
 std::string findProgram(const std::string& name, const std::vector<const char*>& places);
-
-/** A program that this one starts; the destructor kills it. */
-class Child {
-  public:
-    /** @param prepare called in the child before it runs the program. */
-    Child(const std::vector<std::string>& command, const std::function<void()>& prepare);
-    Child(const Child&) = delete;
-    Child& operator=(const Child&) = delete;
-    ~Child();
-
-    void signal(int number) const;
-    /** @return whether the program has ended. */
-    bool hasEnded();
-    /** Waits for the program's end. @return its exit code, as a shell gives it. */
-    int wait();
-
-  private:
-    pid_t mPid;
-    int mStatus = 0;
-};
-
-/**
- * A directory in /tmp, which other users may look into. A second process removes it when this one
- * ends, even if it is killed.
- */
-class PrivateDirectory {
-  public:
-    PrivateDirectory();
-    PrivateDirectory(const PrivateDirectory&) = delete;
-    PrivateDirectory& operator=(const PrivateDirectory&) = delete;
-    ~PrivateDirectory();
-
-    std::string operator/(const std::string& name) const { return mPath + "/" + name; }
-
-  private:
-    std::string mPath = "/tmp/vibrator-sim.XXXXXX";
-    /** The remover waits for the end of a pipe, of which this process has the other end. */
-    int mPipe;
-    pid_t mRemover;
-};
 
 /**
  * @return two lines for another shell, with which it uses the driver and the service of the session
@@ -97,6 +57,8 @@ class Session {
     int run(const Driver& driver, std::vector<std::string> command);
 
   private:
+    void linkPrograms() const;
+    void setEnvironment(const std::string& directory) const;
     int takeSignal(siginfo_t* info) const;
     void awaitDaemon(Child& daemon, const simulator::Folder& directory) const;
     int awaitCommand(Child& command, Child& daemon, const Driver& driver) const;

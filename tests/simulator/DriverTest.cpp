@@ -11,10 +11,8 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include <atomic>
 #include <cerrno>
 #include <chrono>
-#include <cstdio>
 #include <fstream>
 #include <thread>
 
@@ -129,35 +127,6 @@ TEST(ModelTest, ValuesAreCheckedAsTheKernelDoes) {
     state.mTimeLeft = 12;
     EXPECT_EQ(model::store(state, "activate", "1"), 1);
     EXPECT_EQ(state.takeSaid(), "") << "it runs already";
-}
-
-/** @return lines that tell in what layouts an attribute can be, and whether it is only read. */
-template <typename Attributes, typename IsIn, typename IsOnlyRead>
-std::set<std::string> inWords(const Attributes& attributes, IsIn isIn, IsOnlyRead isOnlyRead) {
-    std::set<std::string> lines;
-    for (const auto& each : attributes) {
-        lines.insert(std::string(each.leaf) + (isIn(each, Layout::kTimedOutput) ? " timed" : "") +
-                     (isIn(each, Layout::kLedTrigger) ? " led" : "") +
-                     (isOnlyRead(each) ? " read" : ""));
-    }
-    return lines;
-}
-
-TEST(ModelTest, AttributesAreTheNodesThatTheServiceUses) {
-    const std::vector<std::string> names = model::featureNames();
-    const model::Features features{{names.begin(), names.end()}};
-    const auto known = inWords(
-            model::attributes(),
-            [&](const auto& each, Layout layout) { return each.isIn(layout, features); },
-            [](const auto& each) { return (each.mode & 0222) == 0; });
-    const auto used = inWords(
-            NodePathTable,
-            [](const NodeInfo& each, Layout layout) {
-                return each.isIn(layout == Layout::kTimedOutput ? kTimedOutputMode
-                                                                : kLedTriggerMode);
-            },
-            [](const NodeInfo& each) { return each.isOnlyRead; });
-    EXPECT_EQ(known, used);
 }
 
 class SimulatedDriverTest : public VibratorTest {
@@ -284,26 +253,6 @@ TEST_F(SimulatedDriverTest, TraceIsLimitedAndStaysInsideMarkedFolders) {
         get("intensity");
         EXPECT_EQ(access((isMarked ? victim : file).c_str(), F_OK), -1) << isMarked;
     }
-}
-
-TEST_F(SimulatedDriverTest, DirectoryIsLookedUpOnce) {
-    const std::string directory = mDirectory.path() + "/driver";
-    const std::string link = mDirectory.path() + "/link";
-    const std::string victim = mDirectory.path() + "/victim";
-    for (const std::string& each : {directory, victim, victim + "/precious"})
-        ASSERT_EQ(mkdir(each.c_str(), 0755), 0);
-    ASSERT_EQ(symlink(victim.c_str(), link.c_str()), 0);
-    // Somebody exchanges the directory for a link while it is made a driver's.
-    std::atomic<bool> isDone = false;
-    std::thread other([&] {
-        while (!isDone)
-            renameat2(AT_FDCWD, directory.c_str(), AT_FDCWD, link.c_str(), RENAME_EXCHANGE);
-    });
-    for (int i = 0; i < 2000; ++i)
-        simulator::createDriver(directory, Layout::kLedTrigger, {});
-    isDone = true;
-    other.join();
-    EXPECT_EQ(simulator::Folder(victim).names(), Lines{"precious"});
 }
 
 TEST_F(SimulatedDriverTest, NamesStayInTheirFolder) {
