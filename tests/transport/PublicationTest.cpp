@@ -85,25 +85,6 @@ TEST_F(PublicationTest, NameGoesToTheNextWhenItsHolderHasGone) {
     EXPECT_EQ(fs::read_symlink(inherited), kName);
 }
 
-TEST_F(PublicationTest, OfManyStartsOneHasTheName) {
-    constexpr int kMany = 20;
-    std::vector<ChildProcess> daemons(kMany);
-    for (int i = 0; i < kMany; ++i) {
-        daemons[static_cast<size_t>(i)].startProgram(
-                {SERVICE}, mDirectory.path() + "/" + std::to_string(i), {});
-    }
-    EXPECT_TRUE(eventually(answers));
-    EXPECT_TRUE(eventually([&] {
-        int waiting = 0;
-        for (int i = 0; i < kMany; ++i) {
-            const std::string text = readFile(mDirectory.path() + "/" + std::to_string(i));
-            waiting += text.find("is not registered yet") != std::string::npos ? 1 : 0;
-        }
-        return waiting == kMany - 1;
-    }));
-    EXPECT_TRUE(answers());
-}
-
 TEST_F(PublicationTest, EverybodyMayConnectWhateverTheUmask) {
     if (geteuid() != 0) GTEST_SKIP() << "only root can become somebody else";
     ASSERT_EQ(chmod(mDirectory.path().c_str(), 0755), 0);
@@ -111,33 +92,6 @@ TEST_F(PublicationTest, EverybodyMayConnectWhateverTheUmask) {
     setenv("HWBINDER_DIR", directory.c_str(), 1);
     serve("umask 0077");
     EXPECT_EQ(runAs(2000, [] { return answers() ? 0 : 1; }), 0);
-    // Over a link of root's or of his own, and where root serves in another user's directory.
-    const std::string link = mDirectory.path() + "/link";
-    fs::create_symlink(directory, link);
-    setenv("HWBINDER_DIR", link.c_str(), 1);
-    for (const uid_t uid : {0U, 2000U}) {
-        ASSERT_EQ(lchown(link.c_str(), uid, uid), 0);
-        EXPECT_EQ(runAs(2000, [] { return answers() ? 0 : 1; }), 0) << uid;
-    }
-    ASSERT_EQ(chown(directory.c_str(), 2001, 2001), 0);
-    EXPECT_EQ(runAs(2000, [] { return answers() ? 0 : 1; }), 0);
-}
-
-TEST_F(PublicationTest, FileSystemThatTakesNothingIsSaid) {
-    const std::string directory = mDirectory.path() + "/mounted";
-    fs::create_directory(directory);
-    const auto mounted = [&](const std::string& options, const std::string& program) {
-        return std::vector<std::string>{"/usr/bin/unshare", "-m", "/bin/sh", "-c",
-                                        "mount -t tmpfs -o mode=755," + options + " none " +
-                                                directory + " && exec " + program};
-    };
-    if (runProgram(mounted("ro", "true")).exitCode != 0) GTEST_SKIP() << "no mount is allowed";
-    setenv("HWBINDER_DIR", directory.c_str(), 1);
-    for (const auto& [options, complaint] : {std::pair("ro", "Read-only file system"),
-                                             std::pair("nr_inodes=1", "No space left on device")})
-        expectLog(
-                kName + (" is not registered: " + directory) + "/" + kName + ".lock: " + complaint,
-                mounted(options, SERVICE));
 }
 
 TEST_F(PublicationTest, LogSaysWhatTheCallsGoOver) {

@@ -6,7 +6,7 @@
 #include <gtest/gtest.h>
 #include <sys/socket.h>
 #include <sys/un.h>
-#include <unistd.h>
+#include <utils/UniqueFd.h>
 
 #include <cerrno>
 #include <cstring>
@@ -175,20 +175,16 @@ class RawClient {
         const std::string path = directory + "/" + raw::kV21 + ".default";
         memcpy(address.sun_path, path.c_str(), path.size());
         const timeval tenSeconds{10, 0};
-        setsockopt(mSocket, SOL_SOCKET, SO_RCVTIMEO, &tenSeconds, sizeof(tenSeconds));
+        setsockopt(mSocket.get(), SOL_SOCKET, SO_RCVTIMEO, &tenSeconds, sizeof(tenSeconds));
         // Of one that is refused, the first call fails.
-        static_cast<void>(connect(mSocket, reinterpret_cast<sockaddr*>(&address), sizeof(address)));
-    }
-    RawClient(RawClient&& other) noexcept : mSocket(std::exchange(other.mSocket, -1)) {}
-    RawClient(const RawClient&) = delete;
-    RawClient& operator=(const RawClient&) = delete;
-    ~RawClient() {
-        if (mSocket >= 0) close(mSocket);
+        static_cast<void>(
+                connect(socketNumber(), reinterpret_cast<sockaddr*>(&address), sizeof(address)));
     }
 
-    int socketNumber() const { return mSocket; }
+    int socketNumber() const { return mSocket.get(); }
     bool send(const void* bytes, size_t size, int flags = 0) const {
-        return ::send(mSocket, bytes, size, flags | MSG_NOSIGNAL) == static_cast<ssize_t>(size);
+        return ::send(mSocket.get(), bytes, size, flags | MSG_NOSIGNAL) ==
+               static_cast<ssize_t>(size);
     }
     bool send(const std::unique_ptr<Packet>& packet) const {
         return send(packet->bytes, packet->size);
@@ -196,7 +192,7 @@ class RawClient {
     Received receive() const {
         Received answer;
         answer.packet.resize(Packet::kMaxSize);
-        const ssize_t size = recv(mSocket, answer.packet.data(), Packet::kMaxSize, 0);
+        const ssize_t size = recv(mSocket.get(), answer.packet.data(), Packet::kMaxSize, 0);
         // Reset: closed by the server with a request still unread.
         if (size < 0 && errno != ECONNRESET) ADD_FAILURE() << "no reply: " << strerror(errno);
         answer.isClosed = size <= 0;
@@ -219,7 +215,7 @@ class RawClient {
     }
 
   private:
-    int mSocket;
+    android::UniqueFd mSocket;
 };
 
 /** @return a request with numbers as arguments. */
