@@ -31,6 +31,13 @@ Driver& driver() {
     return ProcessState::self()->driver();
 }
 
+/** @return why a call has failed. */
+Error errorOf(const details::return_status& call) {
+    // That of an exception has no status.
+    const status_t error = call.status().transactionError();
+    return {error == OK ? UNKNOWN_ERROR : error, call.description()};
+}
+
 /** Asks once for the service manager. @return OK, or why none answers. */
 Error askForManager(sp<Manager>* manager) {
     if (SocketDriver* sockets = driver().socketDriver()) {
@@ -57,7 +64,7 @@ Error lookUp(const std::string& interface, const std::string& instance, sp<IBase
     Error error = askForManager(&manager);
     if (!error.isOk()) return error;
     const Return<sp<IBase>> found = manager->get(interface, instance);
-    if (!found.isOk()) return {UNKNOWN_ERROR, found.description()};
+    if (!found.isOk()) return errorOf(found);
     *service = found;
     if (*service != nullptr) return {};
     return {NAME_NOT_FOUND, driver().name() + ": the service manager does not know it"};
@@ -70,9 +77,7 @@ Error askForService(const std::string& interface, const std::string& instance, s
     if (!error.isOk()) return error;
     // Whoever has registered it has said so, but may be wrong.
     const Return<bool> hasInterface = details::hasInterface(found.get(), interface.c_str());
-    if (!hasInterface.isOk()) {
-        return {hasInterface.status().transactionError(), hasInterface.description()};
-    }
+    if (!hasInterface.isOk()) return errorOf(hasInterface);
     if (!hasInterface) return {BAD_TYPE, "what has the name does not have the interface"};
     *service = found;
     return {};
@@ -138,7 +143,7 @@ class Registrations : public hidl_death_recipient {
             if (!error.isOk()) return error;
         }
         const Return<bool> added = hardware::add(*mManager, service, instance);
-        if (!added.isOk()) return {added.status().transactionError(), added.description()};
+        if (!added.isOk()) return errorOf(added);
         if (!added) return {UNKNOWN_ERROR, "the service manager refuses it"};
         mServices.emplace_back(service, instance);
         return {};

@@ -128,6 +128,18 @@ TEST_F(CallsTest, ObjectIsFoundUnderEveryInterfaceOfItsChain) {
     ASSERT_NE(manager, nullptr);
     EXPECT_EQ(sp<IDaxVibrator>(IDaxVibrator::castFrom(sp<IBase>(manager))), nullptr);
 
+    // Under the name of an interface that it does not have.
+    using Other = android::hidl::manager::V1_0::IServiceNotification;
+    std::filesystem::create_symlink(kChain[0] + ".default",
+                                    mDirectory.path() + "/" + Other::descriptor + ".wrong");
+    if (isKernel()) {
+        EXPECT_TRUE(android::hardware::defaultServiceManager1_2()->addWithChain(
+                "wrong", mClient, {Other::descriptor}));
+    }
+    EXPECT_EQ(Other::tryGetService("wrong"), nullptr);
+    const std::string whyNot = host::lookupError(Other::descriptor, "wrong");
+    EXPECT_NE(whyNot.find("does not have the interface"), std::string::npos) << whyNot;
+
     // What a daemon that died in its start has left.
     std::filesystem::create_symlink(kChain[0] + ".default",
                                     mDirectory.path() + "/" + kChain[5] + ".default~");
