@@ -139,12 +139,4 @@ TEST_F(KernelTest, ClickLightsTheLine) {
     EXPECT_EQ(getNode(kLed + "duration"), "20\n");
 }
 
-TEST_F(KernelTest, ValuesAtTheEdgesAreTheKernelsToJudge) {
-    EXPECT_EQ(run({"on", "0"}).exitCode, 0);
-    EXPECT_EQ(getNode(kLed + "activate"), "0\n");
-    EXPECT_EQ(run({"on", "2147483647"}).exitCode, 0);
-    EXPECT_EQ(getNode(kLed + "activate"), "1\n");
-    EXPECT_EQ(run({"off"}).exitCode, 0);
-}
-
 }  // namespace

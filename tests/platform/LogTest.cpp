@@ -16,8 +16,12 @@
 
 static int otherWriter = -1;
 
-/** Takes the room that poll has promised, as another process that writes to the same pipe could. */
-extern "C" int poll(pollfd* descriptors, nfds_t count, int milliseconds) {
+/**
+ * Is called for poll, and takes the room that this has promised, as another process that writes to
+ * the same pipe could. It has a name of its own since fortified headers define the other.
+ */
+int pollAndFill(pollfd* descriptors, nfds_t count, int milliseconds) __asm__("poll");
+int pollAndFill(pollfd* descriptors, nfds_t count, int milliseconds) {
     const timespec limit{milliseconds / 1000, milliseconds % 1000 * 1'000'000L};
     const int result = ppoll(descriptors, count, milliseconds < 0 ? nullptr : &limit, nullptr);
     const std::string page(4096, 'x');

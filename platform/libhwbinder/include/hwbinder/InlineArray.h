@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <cstddef>
+#include <cstdint>
 #include <cstdlib>
 #include <cstring>
 #include <type_traits>
@@ -43,14 +44,12 @@ class InlineArray {
         mData = const_cast<T*>(data);
         mSize = size;
         mRoom = 0;
-        mCanGrow = false;
     }
     void clear() {
         freeHeap();
         mData = mInline;
         mSize = 0;
         mRoom = kInlineCapacity;
-        mCanGrow = true;
     }
 
   private:
@@ -60,7 +59,8 @@ class InlineArray {
     }
     bool reserve(size_t count) {
         constexpr size_t kMaxSize = SIZE_MAX / sizeof(T) / 2;
-        if (!mCanGrow || count > kMaxSize || mSize > kMaxSize) return false;
+        const bool isAnothers = !mIsHeap && mData != mInline;
+        if (isAnothers || count > kMaxSize || mSize > kMaxSize) return false;
         const size_t capacity = std::max(mSize + count, 2 * (mSize + mRoom));
         auto* larger = static_cast<T*>(realloc(mIsHeap ? mData : nullptr, capacity * sizeof(T)));
         if (larger == nullptr) return false;
@@ -78,7 +78,6 @@ class InlineArray {
     /** How many more elements have a place. */
     size_t mRoom = kInlineCapacity;
     bool mIsHeap = false;
-    bool mCanGrow = true;
 };
 
 }  // namespace android::hardware
