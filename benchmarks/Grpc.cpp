@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 
 /** The same call over gRPC on a Unix socket. */
-#include "Child.h"
+#include "support/Child.h"
 #include "support/TemporaryDirectory.h"
 #include "vibrator.grpc.pb.h"
 

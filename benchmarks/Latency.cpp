@@ -4,8 +4,8 @@
  * How long a client that makes few calls waits for the answer while clients of other users send as
  * much as the daemon takes. Prints a row for each set of such flooders.
  */
-#include "Child.h"
 #include "libhwbinder/Packet.h"
+#include "support/Child.h"
 #include "support/TemporaryDirectory.h"
 
 #include <hwbinder/Parcel.h>

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 
 /** The same call over sd-bus, peer to peer. */
-#include "Child.h"
+#include "support/Child.h"
 
 #include <benchmark/benchmark.h>
 #include <sys/socket.h>

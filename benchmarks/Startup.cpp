@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 
 /** The real daemon, from exec to its first answer, beside the same by bare system calls. */
-#include "Child.h"
+#include "support/Child.h"
 #include "support/TemporaryDirectory.h"
 
 #include <benchmark/benchmark.h>

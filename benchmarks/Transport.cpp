@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 
 /** A call from one process to another, compared with the least that any transport takes. */
-#include "Child.h"
+#include "support/Child.h"
 #include "support/TemporaryDirectory.h"
 
 #include <benchmark/benchmark.h>

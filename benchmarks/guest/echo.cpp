@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 
 /** The least that a call takes over each of the two transports: a message in each direction. */
-#include "../Child.h"
+#include "../../tests/support/Child.h"
 #include "RoundTrip.h"
 
 #include <fcntl.h>

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 
 /** Calls over sd-bus, peer to peer: one without arguments, and one with a number each way. */
-#include "../Child.h"
+#include "../../tests/support/Child.h"
 #include "RoundTrip.h"
 
 #include <sys/socket.h>

@@ -7,7 +7,6 @@
 #include <chrono>
 #include <csignal>
 #include <fstream>
-#include <iostream>
 #include <map>
 #include <random>
 #include <thread>
@@ -17,7 +16,6 @@ namespace {
 using ::android::hardware::hidl_vec;
 using Status = ::android::hardware::vibrator::V1_0::Status;
 using ::vendor::velmora::hardware::vibrator::V2_1::DaxAmplitudeType;
-using Clock = std::chrono::steady_clock;
 
 constexpr uint32_t kClients = 64;
 constexpr uint32_t kKilled = kClients / 3;
@@ -85,7 +83,6 @@ TEST_F(LoadTest, ManyClientsGetTheirOwnAnswersInTheirOwnOrder) {
     const size_t memory = mService.residentKiB();
     std::ofstream(mDirectory.path() + "/trace", std::ios::trunc).flush();
 
-    const auto begin = Clock::now();
     std::vector<pid_t> survivors;
     std::vector<pid_t> doomed;
     for (uint32_t client = 1; client <= kSurvivors; ++client)
@@ -105,13 +102,7 @@ TEST_F(LoadTest, ManyClientsGetTheirOwnAnswersInTheirOwnOrder) {
         waitpid(pid, &status, 0);
         EXPECT_EQ(status, 0) << "a call got another answer than its own";
     }
-    const std::chrono::duration<double> time = Clock::now() - begin;
-    std::cout << kSurvivors * kCallsEach << " calls of " << kSurvivors << " clients in "
-              << time.count() << " s, beside " << kKilled << " killed ones\n";
-
     EXPECT_TRUE(eventually([&] { return mService.descriptors() <= descriptors; }));
-    std::cout << "memory before: " << memory << " KiB, after: " << mService.residentKiB()
-              << " KiB\n";
 #ifndef SANITIZED  // a sanitizer keeps what has been freed
     EXPECT_LE(mService.residentKiB(), memory + 256);
 #endif

@@ -85,46 +85,31 @@ int runAs(uid_t uid, const std::function<int()>& function) {
     return exitCodeOf(pid);
 }
 
-void ChildProcess::start(const std::function<void()>& function) {
-    mPid = fork();
-    if (mPid != 0) return;
-    function();
-    _exit(0);
-}
-
 void ChildProcess::startProgram(const std::vector<std::string>& command, const std::string& logFile,
                                 const std::vector<std::string>& environment, uid_t uid) {
     const int log = open(logFile.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0644);
-    mPid = fork();
-    if (mPid == 0) {
+    start([&] {
         dup2(log, STDERR_FILENO);
         for (const std::string& each : environment)
             putenv(const_cast<char*>(each.c_str()));
         execute(command, uid);
-    }
+    });
     close(log);
-}
-
-void ChildProcess::kill() {
-    if (mPid < 0) return;
-    ::kill(mPid, SIGKILL);
-    exitCodeOf(mPid);
-    mPid = -1;
 }
 
 bool ChildProcess::isAlive() const {
     siginfo_t info{};
-    return waitid(P_PID, static_cast<id_t>(mPid), &info, WEXITED | WNOHANG | WNOWAIT) == 0 &&
+    return waitid(P_PID, static_cast<id_t>(pid()), &info, WEXITED | WNOHANG | WNOWAIT) == 0 &&
            info.si_pid == 0;
 }
 
 size_t ChildProcess::descriptors() const {
-    const std::filesystem::directory_iterator files("/proc/" + std::to_string(mPid) + "/fd");
+    const std::filesystem::directory_iterator files("/proc/" + std::to_string(pid()) + "/fd");
     return static_cast<size_t>(std::distance(begin(files), end(files)));
 }
 
 size_t ChildProcess::residentKiB() const {
-    std::ifstream sizes("/proc/" + std::to_string(mPid) + "/statm");
+    std::ifstream sizes("/proc/" + std::to_string(pid()) + "/statm");
     size_t pages = 0;
     // The second number, after the size of all.
     sizes >> pages >> pages;

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include <sys/types.h>
-#include <unistd.h>
+#include "support/Child.h"
 
 #include <functional>
 #include <string>
@@ -23,11 +22,9 @@ Outcome runProgram(const std::vector<std::string>& command, uid_t uid = geteuid(
 /** Runs a function in a process of its own and another uid. @return its exit code. */
 int runAs(uid_t uid, const std::function<int()>& function);
 
-/** A process that goes on until it is killed, in the destructor at the latest. */
-class ChildProcess {
+/** A child process with a look at what it uses. */
+class ChildProcess : public Child {
   public:
-    /** Runs a function. */
-    void start(const std::function<void()>& function);
     /**
      * Runs a program with standard error in a file, and more environment, as NAME=VALUE; as another
      * user where asked for.
@@ -35,21 +32,11 @@ class ChildProcess {
     void startProgram(const std::vector<std::string>& command, const std::string& logFile,
                       const std::vector<std::string>& environment, uid_t uid = geteuid());
 
-    ChildProcess() = default;
-    ChildProcess(const ChildProcess&) = delete;
-    ChildProcess& operator=(const ChildProcess&) = delete;
-    ~ChildProcess() { kill(); }
-
-    void kill();
     bool isAlive() const;
-    pid_t pid() const { return mPid; }
     /** @return how many descriptors the process has open. */
     size_t descriptors() const;
     /** @return the memory that the process has, in KiB. */
     size_t residentKiB() const;
-
-  private:
-    pid_t mPid = -1;
 };
 
 /** Waits up to ten seconds for something to become true. @return whether it has. */

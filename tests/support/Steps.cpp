@@ -116,8 +116,8 @@ class Player {
     bool make(const Step& step) {
         switch (step.kind) {
             case Step::kLine:
-                log(replaced(replaced(step.text, "{result}", mResult), "{error}",
-                             "(" + std::to_string(mError) + "): " + strerror(mError)));
+                log(replaced(replaced(replaced(step.text, "{name}", mName), "{result}", mResult),
+                             "{error}", "(" + std::to_string(mError) + "): " + strerror(mError)));
                 return true;
             case Step::kAnswer:
                 mShown.answer = step.text;
@@ -143,7 +143,11 @@ class Player {
         if (step.isPrimitive) logBegin(step);
         bool isDone = call(step, "open", step.readsOnly ? " O_RDONLY" : " O_RDWR", "0");
         mIsOpen = isDone;
-        if (mIsOpen && step.kind != Step::kProbe) isDone = transfer(step);
+        const std::string text = " \"" + step.text + "\"";
+        const std::string size = std::to_string(step.bytes().size());
+        if (mIsOpen && step.kind == Step::kRead)
+            isDone = call(step, "read", " " + std::to_string(step.size), size, text);
+        if (mIsOpen && step.kind == Step::kWrite) isDone = call(step, "write", text, size);
         logEnd(step, isDone);
         const auto last = std::pair(mResult, mError);
         if (mIsOpen) call(step, "close", "", "0");
@@ -156,14 +160,6 @@ class Player {
         const bool isTimed = leaf == "enable" || (!isLeds && mLayout == Layout::kTimedOutput);
         mNode = (isTimed ? "timed_output/" : "leds/") + leaf;
         mPath = sysfsDirectory(isTimed ? Layout::kTimedOutput : Layout::kLedTrigger) + leaf;
-    }
-
-    bool transfer(const Step& step) {
-        const bool reads = step.kind == Step::kRead;
-        const std::string quoted = " \"" + step.text + "\"";
-        const std::string size = std::to_string(step.bytes().size());
-        return call(step, step.transfer(), reads ? " " + std::to_string(step.size) : quoted, size,
-                    reads ? quoted : "");
     }
 
     /** Makes a system call. @return whether it does all that it should. */
@@ -184,14 +180,13 @@ class Player {
     }
 
     void logBegin(const Step& step) {
-        if (step.kind == Step::kRead) {
-            log("D >> readNode node:" + mPath + " ");
-        } else if (step.kind == Step::kProbe) {
-            log((step.readsOnly ? "D isNodeExistForRead node:" : "D isNodeExist node:") + mPath +
-                " ");
+        const std::string node = " node:" + mPath + " ";
+        if (step.kind == Step::kProbe) {
+            log((step.readsOnly ? "D isNodeExistForRead" : "D isNodeExist") + node);
+        } else if (step.kind == Step::kRead) {
+            log("D >> readNode" + node);
         } else {
-            log("D >> writeNode node:" + mPath +
-                " val:" + step.text.substr(0, step.text.size() - strlen("\\n")));
+            log("D >> writeNode" + node + "val:" + replaced(step.text, "\\n", ""));
         }
     }
 

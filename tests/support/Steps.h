@@ -17,7 +17,7 @@ struct Operation;
  * The notation for what an operation does: its steps in their true order, one a line, or several
  * with "; " between them. Text stands as the trace and the log show it, "\n" for a newline.
  *
- *     D text, E text         a line of the log
+ *     D text, E text         a line of the log; {name} is what is called
  *     @                      the caller is judged; for one who is refused, the step fails
  *     intensity?             a probe that opens a node for reading and writing; ?r for reading
  *     intensity=500          a number is written

@@ -139,50 +139,23 @@ TEST(PlotTest, CrowdsAreThinnedAndNothingLeavesItsQuotes) {
 }
 
 TEST(PlotTest, GnuplotIsGivenEverythingInItsPlace) {
-    const std::string script =
+    std::string script =
             plotScript(timelineOf("0 enable 100; 120 haptic_engine 8 3 20000 0 0 100 5000 0 0; "
                                   "120 enable 1; 243 cp_trigger_index 4; 263 enable 300; "
                                   "583 enable 20; 605 intensity 20000; 623 enable 90000"),
                        PictureFormat::kSvg);
-    EXPECT_EQ(script.substr(0, script.find("# ")), R"(terminal = 'svg'
-title = 'What the driver was told: 7 calls in 1.623 s'
-note = ''
-start = 0
-length = 1.63923
-columns = 796
-going_on = 100
-$calls << END
-0
-0.12
-0.243
-0.263
-0.583
-0.605
-0.623
-END
-$labels << END
-0 on 100
-0.12 engine, 2 packets
-0.243 pattern 4, on 300
-0.583 on 20, intensity 20000 +1
-END
-$run << END
-0 0.0989703329 0 100
-0.583 0.601970333 0 100
-0.623 1.62197033 0 100
-END
-$packet << END
-0.12 0.123 0 100
-0.123 0.221970333 0 50
-END
-$pattern << END
-0.263 0.561970333 0 100
-END
-$beyond << END
-0.12 0.123 96 100
-0.623 1.62197033 96 100
-END
-)");
+    script.erase(script.find("# "));
+    std::replace(script.begin(), script.end(), '\n', ';');
+    EXPECT_EQ(script,
+              "terminal = 'svg';title = 'What the driver was told: 7 calls in 1.623 s';note = '';"
+              "start = 0;length = 1.63923;columns = 796;going_on = 100;"
+              "$calls << END;0;0.12;0.243;0.263;0.583;0.605;0.623;END;"
+              "$labels << END;0 on 100;0.12 engine, 2 packets;0.243 pattern 4, on 300;"
+              "0.583 on 20, intensity 20000 +1;END;"
+              "$run << END;0 0.0989703329 0 100;0.583 0.601970333 0 100;0.623 1.62197033 0 100;END;"
+              "$packet << END;0.12 0.123 0 100;0.123 0.221970333 0 50;END;"
+              "$pattern << END;0.263 0.561970333 0 100;END;"
+              "$beyond << END;0.12 0.123 96 100;0.623 1.62197033 96 100;END;");
     const std::string other = plotScript(timelineOf("-1 enable 100"), PictureFormat::kPng);
     EXPECT_EQ(other.find("terminal = 'pngcairo f"), 0U) << other;
     EXPECT_NE(other.find("\nnote = 'The log has no times: "), std::string::npos) << other;

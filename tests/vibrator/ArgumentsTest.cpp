@@ -40,22 +40,19 @@ TEST_P(ArgumentsTest, OfSetAmplitude) {
 }
 
 TEST_P(ArgumentsTest, OfEffects) {
-    const std::string start = "D perform start effect : ";
-    const std::string end = "; D perform end effect";
-    row(CALL(perform)(0, 0), "(OK, 20)",
-        start + "0, strength : 0; on=20; intensity?; D Setting amplitude to: 1379; intensity=1379" +
-                end);
-    row(CALL(perform)(0, 2), "(OK, 20)",
-        start +
-                "0, strength : 2; on=20; intensity?; D Setting amplitude to: 10000; "
-                "intensity=10000" +
-                end);
-    row(CALL(perform)(0, 3), kNone, start + "0, strength : 3");
-    row(CALL(perform)(0, 255), kNone, start + "0, strength : 255");
-    row(CALL(perform)(1, 0), kNone, start + "1, strength : 0" + end);
-    row(CALL(perform)(1, 3), kNone, start + "1, strength : 3" + end);
-    row(CALL(perform)(4294967295U, 1), kNone, start + "-1, strength : 1" + end);
-    row(CALL(perform_1_3)(21, 9), kNone, "D perform_1_3 start effect : 21, strength : 9");
+    const auto clicks = [&](int strength, const std::string& intensity) {
+        row(CALL(perform)(0, strength), "(OK, 20)",
+            "D {name} start effect : 0, strength : " + std::to_string(strength) +
+                    "; on=20; intensity?; D Setting amplitude to: " + intensity +
+                    "; intensity=" + intensity + "; D {name} end effect");
+    };
+    clicks(0, "1379");
+    clicks(2, "10000");
+    row(CALL(perform)(0, 3), kNone, "D {name} start effect : 0, strength : 3");
+    row(CALL(perform)(1, 3), kNone, "D {name} start effect : 1, strength : 3; D {name} end effect");
+    row(CALL(perform)(4294967295U, 1), kNone,
+        "D {name} start effect : -1, strength : 1; D {name} end effect");
+    row(CALL(perform_1_3)(21, 9), kNone, "D {name} start effect : 21, strength : 9");
 }
 
 TEST_P(ArgumentsTest, OfExternalControl) {
@@ -77,78 +74,72 @@ TEST_P(ArgumentsTest, OfExternalControl) {
 }
 
 TEST_P(ArgumentsTest, OfSettings) {
-    row(CALL(daxSetAmplitude)(1), kOk, "intensity=1");
-    row(CALL(daxSetAmplitude)(10000), kOk, "intensity=10000");
-    row(CALL(daxSetForceTouchAmplitude)(1), kOk, "force_touch_intensity=1");
-    row(CALL(daxSetForceTouchAmplitude)(10000), kOk, "force_touch_intensity=10000");
+    for (const uint32_t amplitude : {1U, 10000U}) {
+        const std::string number = std::to_string(amplitude);
+        row(CALL(daxSetAmplitude)(amplitude), kOk, "intensity=" + number);
+        row(CALL(daxSetForceTouchAmplitude)(amplitude), kOk, "force_touch_intensity=" + number);
+    }
     for (const uint32_t amplitude : {0U, 10001U, 4294967295U}) {
-        const std::string end = " amplitude is abnormal " + std::to_string(amplitude);
-        row(CALL(daxSetAmplitude)(amplitude), kBad, "E daxSetAmplitude" + end);
-        row(CALL(daxSetForceTouchAmplitude)(amplitude), kBad, "E daxSetForceTouchAmplitude" + end);
+        const std::string line = "E {name} amplitude is abnormal " + std::to_string(amplitude);
+        row(CALL(daxSetAmplitude)(amplitude), kBad, line);
+        row(CALL(daxSetForceTouchAmplitude)(amplitude), kBad, line);
     }
     row(CALL(daxSetFrequencyType)(0), kOk, "multi_freq=0");
     row(CALL(daxSetFrequencyType)(4), kOk, "multi_freq=4");
-    row(CALL(daxSetFrequencyType)(5), kBad, "E daxSetFrequencyType is abnormal 5");
-    row(CALL(daxSetFrequencyType)(4294967295U), kBad, "E daxSetFrequencyType is abnormal -1");
+    row(CALL(daxSetFrequencyType)(5), kBad, "E {name} is abnormal 5");
+    row(CALL(daxSetFrequencyType)(4294967295U), kBad, "E {name} is abnormal -1");
     row(CALL(daxSetFolderStatus)(0), kOk, R"(
-        D daxSetFolderStatus starts
+        D {name} starts
         D FOLDER_OPEN\n
         D length : 12
         event_cmd="FOLDER_OPEN\n"
         D ret : 12
-        D daxSetFolderStatus end)");
-    for (const uint32_t status : {2U, 4294967295U}) {
-        row(CALL(daxSetFolderStatus)(status), kBad,
-            "D daxSetFolderStatus starts; D daxSetFolderStatus BAD_VALUE");
-    }
+        D {name} end)");
+    for (const uint32_t status : {2U, 4294967295U})
+        row(CALL(daxSetFolderStatus)(status), kBad, "D {name} starts; D {name} BAD_VALUE");
 }
 
 TEST_P(ArgumentsTest, OfStoredPatterns) {
-    const std::string prefix = "D daxPerformPrebakedHapticPattern ";
+    const auto play = CALL(daxPerformPrebakedHapticPattern);
     const auto entry = [&](uint32_t pattern, uint32_t amplitude) {
-        return prefix + "pattern : " + std::to_string(static_cast<int>(pattern)) +
+        return "D {name} pattern : " + std::to_string(static_cast<int>(pattern)) +
                ", amplitude : " + std::to_string(static_cast<int>(amplitude)) + "; ";
     };
-    const auto play = CALL(daxPerformPrebakedHapticPattern);
     row(play(0, 1, false), kOk,
-        entry(0, 1) + prefix + "one shoot starts; intensity=1; cp_trigger_index=0");
+        entry(0, 1) + "D {name} one shoot starts; intensity=1; cp_trigger_index=0");
     row(play(1, 10000, false), kOk,
-        entry(1, 10000) + prefix +
-                "one shoot starts; intensity=10000; cp_trigger_index=1; on=1000; " + prefix +
-                "one shoot end");
+        entry(1, 10000) +
+                "D {name} one shoot starts; intensity=10000; cp_trigger_index=1; "
+                "on=1000; D {name} one shoot end");
     for (const uint32_t amplitude : {0U, 10001U, 4294967295U}) {
-        for (const bool repeat : {false, true}) {
+        for (const bool repeat : {false, true})
             row(play(1, amplitude, repeat), kBad,
-                entry(1, amplitude) + "E daxPerformPrebakedHapticPattern amplitude is abnormal " +
+                entry(1, amplitude) + "E {name} amplitude is abnormal " +
                         std::to_string(amplitude));
-        }
     }
     // The percent is not padded with zeros, and the number is shown as a signed one.
     const std::tuple<uint32_t, uint32_t, std::string> queued[] = {
-            {3, 505, "3.5"}, {3, 10000, "3.100"},
-            {7, 99, "7.0"},  {2147483647, 9999, "2147483647.99"},
-            {0, 100, "0.1"}, {4294967295U, 1, "-1.0"},
-            {3, 199, "3.1"}, {2147483648U, 10000, "-2147483648.100"}};
+            {3, 505, "3.5"},         {3, 10000, "3.100"}, {7, 99, "7.0"},
+            {0, 100, "0.1"},         {3, 199, "3.1"},     {2147483647, 9999, "2147483647.99"},
+            {4294967295U, 1, "-1.0"}};
     for (const auto& [pattern, amplitude, start] : queued) {
         const std::string text = start + ", 10, 0~";
         row(play(pattern, amplitude, true), kOk,
-            entry(pattern, amplitude) + prefix + "repeat starts; " + prefix + ": " + text + " , " +
+            entry(pattern, amplitude) + "D {name} repeat starts; D {name} : " + text + " , " +
                     std::to_string(text.size()) + "; cp_trigger_index=65534; cp_trigger_queue=\"" +
-                    text + "\\0\"; D ret : " + std::to_string(text.size() + 1) + "; on=1000; " +
-                    prefix + "end");
+                    text + "\\0\"; D ret : " + std::to_string(text.size() + 1) +
+                    "; on=1000; D {name} end");
     }
 }
 
 TEST_P(ArgumentsTest, OfHapticEnginePackets) {
     const auto engine = CALL(daxPerformHapticEngine);
-    const std::string prefix = "D daxPerformHapticEngine ";
     const auto plays = [&](const Packets& packets, uint32_t amplitude, const std::string& text) {
         row(engine(packets, amplitude), kOk,
-            prefix + ": " + text + "\\n; haptic_engine=\"" + text + "\\n\"; on=1; " + prefix +
-                    "OK");
+            "D {name} : " + text + "\\n; haptic_engine=\"" + text + "\\n\"; on=1; D {name} OK");
     };
     const auto refuses = [&](const Packets& packets, uint32_t amplitude, const std::string& why) {
-        row(engine(packets, amplitude), kBad, "E daxPerformHapticEngine " + why);
+        row(engine(packets, amplitude), kBad, "E {name} " + why);
     };
     plays({}, 10000, "0");
     plays({{1, 429496, 2, 3}}, 10000, "4 1 429496 2 3");
@@ -174,9 +165,10 @@ TEST_P(ArgumentsTest, OfHapticEnginePackets) {
     std::string longest = "1356";
     for (int i = 0; i < 339; ++i)
         longest += " -9999999 429496 99999999 -9999999";
-    const std::string shown = (prefix + ": " + longest).substr(0, strlen("D ") + 1023);
+    const std::string shown =
+            ("D daxPerformHapticEngine : " + longest).substr(0, strlen("D ") + 1023);
     row(engine(Packets(339, {-9999999, 429496, 99999999, -9999999}), 10000), "UNKNOWN_ERROR",
-        shown + "; haptic_engine=\"" + longest + "\\n\"!4096; " + prefix + "UNKNOWN_ERROR");
+        shown + "; haptic_engine=\"" + longest + "\\n\"!4096; D {name} UNKNOWN_ERROR");
 }
 
 TEST_P(ArgumentsTest, AreNotLookedAtBeforeTheCaller) {

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "support/VibratorTest.h"
 
-#include <algorithm>
+#include <map>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 namespace {

@@ -10,60 +10,46 @@ class NodeTextsTest : public BothLayoutsTest {};
 INSTANTIATE_FOR_BOTH_LAYOUTS(NodeTextsTest);
 
 TEST_P(NodeTextsTest, LeadingNumberOfSevenBytesIsTheCount) {
-    const auto expectCount = [&](const std::string& text, const std::string& answer,
-                                 const std::string& value) {
+    const auto counts = [&](const std::string& text, const std::string& answer,
+                            const std::string& value) {
         row(CALL(daxGetNumberOfPrebakedHapticPattern)(), answer,
-            "num_waves?r; num_waves:7=\"" + text +
-                    "\"; D daxGetNumberOfPrebakedHapticPattern value : " + value);
+            "num_waves?r; num_waves:7=\"" + text + "\"; D {name} value : " + value);
     };
     const std::pair<const char*, std::string> numbers[] = {
-            {R"(  42\n)", "42"},
-            {R"(7\n)", "7"},
-            {"-5", "4294967291"},
-            {"+3", "3"},
-            {R"(\n 8 9\n)", "8"},
-            {R"(12ms\n)", "12"},
-            {"00012", "12"},
-            {"1234567", "1234567"},
-            {"-999999", "4293967297"},
-            {"1 2", "1"},
-            {"0x1F", "0"},
-            {"5.7", "5"},
-            {R"(0\n)", "0"},
-            {R"(-1\n)", "4294967295"},
-    };
+            {R"(  42\n)", "42"}, {R"(7\n)", "7"},        {"-5", "4294967291"},
+            {"+3", "3"},         {R"(\n 8 9\n)", "8"},   {R"(12ms\n)", "12"},
+            {"00012", "12"},     {"1234567", "1234567"}, {"-999999", "4293967297"},
+            {"0x1F", "0"},       {"5.7", "5"},           {R"(-1\n)", "4294967295"}};
     for (const auto& [text, number] : numbers)
-        expectCount(text, "(OK, " + number + ")", number);
+        counts(text, "(OK, " + number + ")", number);
     for (const char* text : {"", R"(\n)", R"(word\n)", "-", "+", "+-5", "- 5", "       ", R"(\05)"})
-        expectCount(text, "(UNKNOWN_ERROR, 0)", "4294967295");
+        counts(text, "(UNKNOWN_ERROR, 0)", "4294967295");
 }
 
 TEST_P(NodeTextsTest, OneOfFourLettersMeansFoldEvents) {
-    const std::pair<const char*, bool> cases[] = {
-            {"OFF", true},    {R"(ON\n)", true},   {"D", true},        {R"(xFx\n)", true},
-            {"00L00", true},  {R"(0\n)", false},   {"1", false},       {R"(fold\n)", false},
-            {R"(\n)", false}, {R"(GEN\n)", false}, {R"(a\0D)", false}, {R"(0\nD\n)", true},
-    };
-    for (const auto& [text, supported] : cases) {
+    const auto expectEvents = [&](const std::string& text, bool supported) {
         row(CALL(daxSupportsFolderStatusSetting)(), supported ? "true" : "false",
-            std::string("D daxSupportsFolderStatusSetting starts; event_cmd:511=\"") + text +
-                    "\"; D daxSupportsFolderStatusSetting " + (supported ? "TRUE" : "FALSE"));
-    }
+            "D {name} starts; event_cmd:511=\"" + text + "\"; D {name} " +
+                    (supported ? "TRUE" : "FALSE"));
+    };
+    for (const char* text : {"OFF", R"(ON\n)", "D", R"(xFx\n)", "00L00", R"(0\nD\n)"})
+        expectEvents(text, true);
+    for (const char* text : {R"(0\n)", "1", R"(fold\n)", R"(\n)", R"(GEN\n)", R"(a\0D)"})
+        expectEvents(text, false);
 }
 
 TEST_P(NodeTextsTest, OnlyTheExactNameMeansEnhancedPatterns) {
-    const std::string prefix = "D daxSupportsEnhancedVelmoraHapticPattern ";
-    row(CALL(daxSupportsEnhancedVelmoraHapticPattern)(), "true",
-        R"(motor_type?r; motor_type:31r="LINEAR_1040"; )" + prefix + "LINEAR_1040");
+    const auto expectVerdict = [&](const std::string& name, bool supported) {
+        row(CALL(daxSupportsEnhancedVelmoraHapticPattern)(), supported ? "true" : "false",
+            "motor_type?r; motor_type:31r=\"" + name + "\"; D {name} " +
+                    (supported ? name : "can not supports. Out of capability"));
+    };
+    expectVerdict("LINEAR_1040", true);
     for (const char* name : {R"(LINEAR_1040\n\n)", R"(linear_1040\n)", R"(LINEAR_1040 \n)",
-                             R"(LINEAR_0832RC\n)", R"(LINEAR_104\n)", R"(\n)", "LINEAR_10400"}) {
-        row(CALL(daxSupportsEnhancedVelmoraHapticPattern)(), "false",
-            std::string("motor_type?r; motor_type:31r=\"") + name + "\"; " + prefix +
-                    "can not supports. Out of capability");
-    }
+                             R"(LINEAR_0832RC\n)", R"(LINEAR_104\n)", R"(\n)", "LINEAR_10400"})
+        expectVerdict(name, false);
     row(CALL(daxSupportsEnhancedVelmoraHapticPattern)(), "false",
-        "motor_type?r!ENOENT; haptic_engine?!ENOENT; "
-        "E daxSupportsEnhancedVelmoraHapticPattern not supports");
+        "motor_type?r!ENOENT; haptic_engine?!ENOENT; E {name} not supports");
 }
 
 class LaddersTest : public BothLayoutsTest {
@@ -77,15 +63,14 @@ class LaddersTest : public BothLayoutsTest {
     /** Expects a list, after the steps that find out the motor. */
     void expectList(const std::string& finding, int motor, int type, const std::string& list,
                     bool hasIndex = true) {
-        const std::string prefix = "; D daxGetAmplitudeList ";
         const auto size = std::to_string(std::count(list.begin(), list.end(), ' ') - 2);
         row(CALL(daxGetAmplitudeList)(type), list,
-            finding + prefix + "type: " + std::to_string(type) + " : " + std::to_string(motor) +
-                    "; cp_trigger_index?" + (hasIndex ? "" : "!ENOENT") + prefix +
-                    (hasIndex ? "support" : "NOT support") + " index method" +
-                    (list == kNoList ? prefix + "false"
-                                     : prefix + "list size: " + size + prefix +
-                                               "list_outputsize size: " + size));
+            finding + "; D {name} type: " + std::to_string(type) + " : " + std::to_string(motor) +
+                    "; cp_trigger_index?" + (hasIndex ? "; D {name} " : "!ENOENT; D {name} NOT ") +
+                    "support index method; D {name} " +
+                    (list == kNoList
+                             ? "false"
+                             : "list size: " + size + "; D {name} list_outputsize size: " + size));
     }
     static std::string named(const std::string& text, int motor) {
         return "(getMotorIndex; D getMotorIndex return motor type >>; motor_type:31=\"" + text +
@@ -149,8 +134,8 @@ TEST_P(LaddersTest, UnknownTypeIsRefusedAfterTheMotorIsKnown) {
     for (const int type : {2, -1}) {
         const std::string number = std::to_string(type);
         row(CALL(daxGetAmplitudeList)(type), kNoList,
-            named("LINEAR_1040", 7) + "; D daxGetAmplitudeList type: " + number +
-                    " : 7; E daxGetAmplitudeList is abnormal " + number);
+            named("LINEAR_1040", 7) + "; D {name} type: " + number + " : 7; E {name} is abnormal " +
+                    number);
     }
 }
 
