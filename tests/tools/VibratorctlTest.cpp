@@ -2,13 +2,11 @@
 #include "support/DaemonTest.h"
 
 #include <cctype>
-#include <chrono>
 #include <filesystem>
 #include <fstream>
 #include <nlohmann/json.hpp>
 #include <set>
 #include <sstream>
-#include <thread>
 
 namespace {
 
@@ -34,9 +32,6 @@ class VibratorctlTest : public DaemonTest {
 };
 
 TEST_F(VibratorctlTest, DoctorAgreesWithTheService) {
-    const std::string temporary = mDirectory.path() + "/tmp";
-    std::filesystem::create_directory(temporary);
-    setenv("TMPDIR", temporary.c_str(), 1);
     for (const std::string motor : {"LINEAR_1040", "LINEAR_1030", "NONE"}) {
         for (const std::string some : {"intensity,motor-name", "pattern,haptic-engine", "none"}) {
             SCOPED_TRACE(motor + " " + some);
@@ -54,8 +49,6 @@ TEST_F(VibratorctlTest, DoctorAgreesWithTheService) {
             mService.kill();
         }
     }
-    EXPECT_TRUE(std::filesystem::is_empty(temporary));
-    unsetenv("TMPDIR");
 }
 
 /** Collects the names of an answer's members; those of features, queries and ladders are data. */
