@@ -30,12 +30,11 @@ std::string expanded(Layout layout, const std::string& step) {
     if (step == "off")
         return isTimed ? "enable=0" : "activate=0; !E THE_DEVICE_ACTIVATE is impossible";
     if (step == "running?") return isTimed ? R"(~enable:7="0\n")" : R"(~duration:7="0\n")";
-    const size_t number = step.find("on=") + strlen("on=");
-    if (step.compare(0, number, "on=") != 0 && step.compare(0, number, "~on=") != 0) return step;
-    const std::string mark = step.substr(0, step.find("on="));
-    if (isTimed) return mark + "enable=" + step.substr(number);
-    return mark +
-           "(on; state=1; !E THE_DEVICE_STATE is impossible; duration=" + step.substr(number) +
+    const std::string mark = step[0] == '~' ? "~" : "";
+    if (step.compare(mark.size(), strlen("on="), "on=") != 0) return step;
+    const std::string number = step.substr(mark.size() + strlen("on="));
+    if (isTimed) return mark + "enable=" + number;
+    return mark + "(on; state=1; !E THE_DEVICE_STATE is impossible; duration=" + number +
            "; !E THE_DEVICE_DURATION is impossible; activate=1; "
            "!E THE_DEVICE_ACTIVATE is impossible; )";
 }
