@@ -131,7 +131,7 @@ int storeQueue(State& state, const std::string& leaf, std::string_view text) {
     sscanf(std::string(text).c_str(), "%d.%d, %d, %d~%n", &queue.pattern, &queue.percent,
            &queue.repeats, &queue.delay, &end);
     const bool isWhole =
-            end > 0 && text.substr(static_cast<size_t>(end)) == std::string_view("", 1);
+            end > 0 && text.substr(static_cast<size_t>(end)) == std::string_view("\0", 1);
     return isWhole ? accept(state, leaf, text, queue) : -EINVAL;
 }
 

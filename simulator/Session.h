@@ -44,7 +44,7 @@ class Session {
         /** Called when the service has ended before the command. */
         std::function<void()> whenEnded = [] {};
         /** What it is and what to try in a shell beside it, in lines. */
-        std::string banner = "";
+        std::string banner = {};
     };
     /**
      * Starts the service, and runs a command when it answers. When the command or this process
