@@ -45,6 +45,14 @@ std::set<std::string> featuresOf(const std::string& list) {
     return features;
 }
 
+/** @return names as choices. */
+std::vector<cli::Choice> choicesOf(const Names& names) {
+    std::vector<cli::Choice> choices;
+    for (const std::string& name : names)
+        choices.push_back({name, ""});
+    return choices;
+}
+
 /** What driver to make. */
 struct DriverKind {
     Layout layout;
@@ -57,22 +65,20 @@ std::function<DriverKind()> addDriverOptions(cli::Command& command) {
             "--layout LAYOUT",
             {{"led", "the nodes of the LED trigger"}, {"timed", "the nodes of the timed output"}},
             "layout of the nodes", 0);
-    std::vector<cli::Choice> motors;
-    for (const std::string& name : product::MotorTypeNames)
-        motors.push_back({name, ""});
+    const Names motors(std::begin(product::MotorTypeNames), std::end(product::MotorTypeNames));
     constexpr auto kUsual = static_cast<size_t>(product::kMotorLinear1040);
-    const auto motor = command.choice("--motor NAME", motors, "name of the motor", kUsual);
+    const auto motor =
+            command.choice("--motor NAME", choicesOf(motors), "name of the motor", kUsual);
     const auto waves = command.number("--waves N", {"a number of stored patterns", 0, 65535},
                                       "number of stored patterns", 12);
     const auto features =
             command.text("--features LIST",
                          "features of the driver, separated by commas; all, none, or of " +
                                  cli::join(model::featureNames(), ", ", " and "),
-                         "all");
+                         "all", choicesOf(model::featureNames()));
     return [=] {
-        return DriverKind{
-                *layout == 0 ? Layout::kLedTrigger : Layout::kTimedOutput,
-                {featuresOf(*features), product::MotorTypeNames[*motor], static_cast<int>(*waves)}};
+        return DriverKind{*layout == 0 ? Layout::kLedTrigger : Layout::kTimedOutput,
+                          {featuresOf(*features), motors[*motor], static_cast<int>(*waves)}};
     };
 }
 
@@ -175,13 +181,18 @@ class Simulator : public cli::Program {
         cli::Command& fault = command(
                 kAlone, "fault", "make accesses of a node fail; without arguments, list the faults",
                 "intensity write EIO --times 1");
-        const auto leaf = fault.text("NODE", "the node, like intensity", "");
-        const auto operation = fault.text("OPERATION", "open, read, write or close", "");
-        const auto text = fault.text("FAULT", "an errno like EINVAL; short=BYTES; none", "");
+        Names leaves;
+        for (const model::Attribute& each : model::attributes())
+            leaves.push_back(each.leaf);
+        const auto leaf = fault.text("NODE", "the node, like intensity", "", choicesOf(leaves));
+        const auto operation =
+                fault.text("OPERATION", "open, read, write or close", "", choicesOf(kOperations));
+        const auto text = fault.text("FAULT", "an errno like EINVAL; short=BYTES; none", "",
+                                     choicesOf({"EACCES", "EINVAL", "EIO", "short=", "none"}));
         constexpr uint32_t kMost = 1'000'000;
         const auto times = fault.number(
-                "--times N", {"a number of accesses", 1, kMost, 0},
-                "how many accesses fail; without it, all until the fault is set to none", 0);
+                "--times N", {"a number of accesses", 1, kMost},
+                "how many accesses fail; without it, all until the fault is set to none");
         const auto after = fault.number("--after N", {"a number of accesses", 0, kMost},
                                         "how many accesses succeed first", 0);
         const auto clear = fault.flag("--clear", "remove all faults");
@@ -216,7 +227,7 @@ class Simulator : public cli::Program {
             throw UsageError("what is to fail, and how? For example \"vibrator-sim fault " + leaf +
                              " write EIO\"");
         }
-        require(operation, {"open", "read", "write", "close"},
+        require(operation, kOperations,
                 cli::inQuotes(operation) + " is not open, read, write or close");
         auto fault = simulator::parseFault(text);
         if (!fault && text != "none") {
@@ -236,6 +247,7 @@ class Simulator : public cli::Program {
     }
 
     static constexpr char kAlone[] = "A driver alone";
+    const Names kOperations = {"open", "read", "write", "close"};
 
     cli::Value<std::string> mDirectory;
 };

@@ -14,7 +14,7 @@ Client::Client()
     : Program("vibratorctl", VERSION,
               "Calls the vibrator service, and shows what the driver was told."),
       mInstance(shared().text("--instance NAME", "name of the service's instance", "default")),
-      mTimeout(shared().number("--timeout SECONDS", {"a time in s", 0, 3600},
+      mTimeout(shared().number("--timeout SECONDS", {"a time like 10, 500ms or 2m", 0, 3600, "s"},
                                "the longest that a call may take; 0: no limit", 10)),
       mReport(shared().flag("--json", "print each answer as a line of JSON"),
               shared().flag("-v,--verbose", "also print the interface's operation and its status"),
@@ -28,7 +28,7 @@ Client::Client()
 }
 
 int Client::perform(const cli::Command& command) {
-    setCallTimeout(*mTimeout);
+    setCallTimeout(std::chrono::milliseconds(*mTimeout));
     mReport.setSubject({command.name()});
     try {
         return Program::perform(command);

@@ -9,32 +9,17 @@
 #include <iostream>
 
 namespace cli {
-namespace {
-
-/** @return what stands in brackets behind a help: "1 to 255; default: 7". */
-std::string bracketed(const std::string& range, const std::string& initial) {
-    const std::string between = range.empty() || initial.empty() ? "" : "; ";
-    const std::string all = range + between + (initial.empty() ? "" : "default: " + initial);
-    return all.empty() ? "" : " (" + all + ")";
-}
-
-}  // namespace
-
-std::string Numbers::range() const {
-    return std::to_string(least) + " to " + std::to_string(most);
-}
-
 std::vector<std::string> valuesOf(const std::vector<Choice>& choices) {
     std::vector<std::string> values;
-    values.reserve(choices.size());
     for (const Choice& choice : choices)
         values.push_back(choice.value);
     return values;
 }
 
+/** @param shown the initial value, in words. @param read sets a value from a word. */
 template <typename T, typename Read>
-Value<T> Command::add(const std::string& name, const std::string& help,
-                      const std::optional<T>& initial, const Read& read) {
+Value<T> Command::add(const std::string& name, const std::string& help, const std::string& range,
+                      const std::optional<T>& initial, const std::string& shown, const Read& read) {
     const T first = initial.value_or(T());
     auto value = std::make_shared<T>(first);
     Argument& argument = mArguments.emplace_back();
@@ -44,69 +29,68 @@ Value<T> Command::add(const std::string& name, const std::string& help,
     argument.name = name.substr(start, end - start);
     argument.letter = start == 0 ? '\0' : name[1];
     argument.placeholder = name.substr(std::min(end + 1, name.size()));
-    argument.help = help;
-    argument.isRequired = !initial;
+    const std::string between = range.empty() || shown.empty() ? "" : "; ";
+    const std::string more = range + between + (shown.empty() ? "" : "default: " + shown);
+    argument.help = help + (more.empty() ? "" : " (" + more + ")");
+    argument.isRequired = !initial && !argument.isOption();
     argument.reset = [=] { *value = first; };
-    argument.read = [=](const std::string& word, bool isStrict) {
-        read(value.get(), word, isStrict);
-    };
+    argument.read = [=](const std::string& word) { read(*value, word); };
     return value;
 }
 
 Value<uint32_t> Command::number(const std::string& name, const Numbers& numbers,
                                 const std::string& help, std::optional<uint32_t> initial) {
     const std::string shown = initial ? std::to_string(*initial) : "";
-    return add(name, help + bracketed(numbers.range(), shown), initial,
-               [numbers](uint32_t* value, const std::string& word, bool isStrict) {
-                   const bool passes = numbers.passed != 0 && !isStrict;
-                   const auto number = parseNumber(word, passes ? 0 : numbers.least,
-                                                   passes ? numbers.passed : numbers.most);
+    return add(name, help, numbers.range(), numbers.parse(shown), shown,
+               [numbers](uint32_t& value, const std::string& word) {
+                   const auto number = numbers.parse(word);
                    if (!number) {
                        throw UsageError(inQuotes(word) + " is not " + numbers.what + " (" +
                                         numbers.range() + ")");
                    }
-                   *value = *number;
+                   value = *number;
                });
 }
 
-Value<size_t> Command::choice(const std::string& name, std::vector<Choice> choices,
+Value<size_t> Command::choice(const std::string& name, const std::vector<Choice>& choices,
                               const std::string& help, std::optional<size_t> initial) {
     const std::vector<std::string> values = valuesOf(choices);
-    const std::string list = join(values, ", ", " or ");
-    auto value = add(
-            name, help + bracketed(list, initial ? values[*initial] : ""), initial,
-            [=](size_t* index, const std::string& word, bool /* isStrict */) {
-                const auto found = std::find(values.begin(), values.end(), word);
-                if (found == values.end()) {
-                    throw UsageError(inQuotes(word) + " is not " + list + suggestion(word, values));
-                }
-                *index = static_cast<size_t>(found - values.begin());
-            });
-    mArguments.back().choices = std::move(choices);
+    const std::string range = join(values, ", ", " or ");
+    auto value = add(name, help, range, initial, initial ? values[*initial] : "",
+                     [values, range](size_t& index, const std::string& word) {
+                         const auto found = std::find(values.begin(), values.end(), word);
+                         if (found == values.end()) {
+                             throw UsageError(inQuotes(word) + " is not " + range +
+                                              suggestion(word, values));
+                         }
+                         index = static_cast<size_t>(found - values.begin());
+                     });
+    mArguments.back().choices = choices;
     return value;
 }
 
 Value<std::string> Command::text(const std::string& name, const std::string& help,
-                                 std::optional<std::string> initial) {
-    return add(name, help + bracketed("", initial.value_or("")), initial,
-               [](std::string* value, const std::string& word, bool) { *value = word; });
+                                 std::optional<std::string> initial, std::vector<Choice> offered) {
+    auto value = add(name, help, "", initial, initial.value_or(""),
+                     [](std::string& text, const std::string& word) { text = word; });
+    mArguments.back().choices = std::move(offered);
+    return value;
 }
 
 Value<std::vector<std::string>> Command::words(const std::string& name, const std::string& help,
                                                std::function<void(const std::string&)> check) {
-    using Words = std::vector<std::string>;
-    auto value = add(name, help, std::optional<Words>(Words()),
-                     [=](Words* words, const std::string& word, bool /* isStrict */) {
+    auto value = add(name, help, "", std::optional(std::vector<std::string>()), "",
+                     [check](std::vector<std::string>& words, const std::string& word) {
                          if (check) check(word);
-                         words->push_back(word);
+                         words.push_back(word);
                      });
     mArguments.back().isMany = true;
     return value;
 }
 
 Value<bool> Command::flag(const std::string& name, const std::string& help) {
-    return add(name, help, std::optional<bool>(false),
-               [](bool* value, const std::string& /* word */, bool) { *value = true; });
+    return add(name, help, "", std::optional(false), "",
+               [](bool& value, const std::string& /* word */) { value = true; });
 }
 
 Program::Program(std::string name, std::string version, const std::string& about)

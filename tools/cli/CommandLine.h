@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "text/Numbers.h"
+
 #include <cstdint>
 #include <deque>
 #include <functional>
@@ -18,7 +20,10 @@ enum ExitCode {
     kSuccess = 0,
     /** The command has failed, or the output could not be written. */
     kFailed = 1,
-    /** The command line, or a file that it names, has a mistake. */
+    /**
+     * The command line, or a file that it names, has a mistake: also a number that is outside the
+     * range in the help, whether or not somebody else would have refused it, too.
+     */
     kUsage = 2,
 };
 
@@ -29,19 +34,6 @@ class UsageError : public std::runtime_error {
         : runtime_error(what), index(word) {}
     /** Index of the word with the mistake; how many words there are, where one is missing. */
     const std::optional<size_t> index;
-};
-
-/** The whole decimal numbers that an argument may be. */
-struct Numbers {
-    /** In words, with the article: "a time in ms". */
-    const char* what;
-    uint32_t least;
-    uint32_t most;
-    /** The greatest that is passed on, where somebody else judges; 0: most. */
-    uint32_t passed = 0;
-
-    /** @return the range in words: "1 to 255". */
-    std::string range() const;
 };
 
 struct Choice {
@@ -74,32 +66,30 @@ struct Argument {
     bool isGiven = false;
     /** Goes back to the initial value. */
     std::function<void()> reset;
-    /** Reads a word. @param isStrict whether nobody else judges it. @throw UsageError */
-    std::function<void(const std::string& word, bool isStrict)> read;
+    /** Reads a word. @throw UsageError */
+    std::function<void(const std::string& word)> read;
 
     bool isOption() const { return name[0] == '-'; }
     bool isFlag() const { return isOption() && placeholder.empty(); }
-    /** @return the name as a help shows it: "-o, --output FILE". */
-    std::string title() const {
-        return (letter == 0 ? "" : std::string{'-', letter, ',', ' '}) + name +
-               (placeholder.empty() ? "" : " " + placeholder);
-    }
 };
 
 /**
  * A command with its arguments and options. An argument's name is in capitals, an option's begins
- * with dashes and is followed by what stands for its value: "MS", "--wait SECONDS". Without an
- * initial value it must be given.
+ * with dashes and is followed by what stands for its value: "MS", "--wait SECONDS". An argument
+ * without an initial value must be given; an option without one has the value 0, or no text.
  */
 class Command {
   public:
+    /** A number, a time or a strength. @param initial in the unit of a number alone. */
     Value<uint32_t> number(const std::string& name, const Numbers& numbers, const std::string& help,
                            std::optional<uint32_t> initial = {});
     /** @return the index of what was chosen. */
-    Value<size_t> choice(const std::string& name, std::vector<Choice> choices,
+    Value<size_t> choice(const std::string& name, const std::vector<Choice>& choices,
                          const std::string& help, std::optional<size_t> initial = {});
+    /** @param offered what completions offer, behind a comma again. */
     Value<std::string> text(const std::string& name, const std::string& help,
-                            std::optional<std::string> initial = {});
+                            std::optional<std::string> initial = {},
+                            std::vector<Choice> offered = {});
     /** Like text, for the name of a file. */
     Value<std::string> file(const std::string& name, const std::string& help,
                             std::optional<std::string> initial = {}) {
@@ -143,8 +133,8 @@ class Command {
     friend class Line;
 
     template <typename T, typename Read>
-    Value<T> add(const std::string& name, const std::string& help, const std::optional<T>& initial,
-                 const Read& read);
+    Value<T> add(const std::string& name, const std::string& help, const std::string& range,
+                 const std::optional<T>& initial, const std::string& shown, const Read& read);
 
     std::string mName;
     std::string mGroup;

@@ -30,7 +30,10 @@ void printList(const std::string& heading, const std::vector<Choice>& list) {
 void printList(const std::string& heading, const std::deque<Argument>& arguments, bool isOptions) {
     std::vector<Choice> list;
     for (const Argument& each : arguments) {
-        if (each.isOption() == isOptions) list.push_back({each.title(), each.help});
+        if (each.isOption() != isOptions) continue;
+        const std::string letter = each.letter == 0 ? "" : std::string{'-', each.letter, ',', ' '};
+        const std::string placeholder = (each.placeholder.empty() ? "" : " ") + each.placeholder;
+        list.push_back({letter + each.name + placeholder, each.help});
     }
     printList(heading, list);
 }

@@ -39,7 +39,8 @@ class Line {
         int code = 0;
         while (mTaking == nullptr && code != -1) {
             code = getopt_long(count, argv.data(), mLetters.c_str(), mTable.data(), nullptr);
-            mIndex = static_cast<size_t>(optind) - 2;
+            // In the middle of several letters it stands at the word itself.
+            mIndex = static_cast<size_t>(std::max(optind, 2)) - 2;
             if (code != -1) take(code, optarg == nullptr ? "" : optarg, words[mIndex]);
         }
         mHaveOptionsEnded = code == -1 && optind > 1 && words[mIndex] == "--";
@@ -65,20 +66,37 @@ class Line {
         if (mProblem) throw UsageError(*mProblem);
     }
 
-    /** @return what a further word may be; ":files" for the name of a file. */
+    /**
+     * @return what a further word may be; alone, ":files" for the name of a file, or ":command N"
+     *     for a part of a command that begins with the word N.
+     */
     std::vector<Choice> answers(const std::string& word) const {
         if (mProblem) return {};
-        if (mTaking == nullptr && !mHaveOptionsEnded && word[0] == '-') {
-            std::vector<Choice> options;
-            for (const Argument* each : mOptions)
-                options.push_back({each->name, each->help});
-            return options;
+        const Argument* next = mTaking;
+        // Choices replace what stands behind "--name=", or behind a comma.
+        size_t start = 0;
+        if (next == nullptr && !mHaveOptionsEnded && word[0] == '-') {
+            start = word.find('=') + 1;
+            std::vector<Choice> list;
+            for (const Argument* each : mOptions) {
+                if (start > 0 && word.substr(0, start - 1) == each->name) next = each;
+                list.push_back({each->name, each->help});
+            }
+            if (start == 0) return list;
+        } else if (next == nullptr) {
+            if (mCommand == nullptr) return mProgram->commandsAfter(mTyped);
+            if (mTyped == "help") return mProgram->commandsAfter(join(*mProgram->mTopic, " ", " "));
+            next = argumentFor(word);
         }
-        if (mTaking == nullptr && mCommand == nullptr) return mProgram->commandsAfter(mTyped);
-        if (mTyped == "help") return mProgram->commandsAfter(join(*mProgram->mTopic, " ", " "));
-        const Argument* next = mTaking != nullptr ? mTaking : argumentFor(word);
         if (next == nullptr) return {};
-        return next->isFile ? std::vector<Choice>{{":files", ""}} : next->choices;
+        if (next->isFile) return {{":files", ""}};
+        if (next->takesOptions)
+            return {{":command " + std::to_string(mRest.value_or(mIndex) + 1), ""}};
+        start = std::max(start, word.rfind(',') + 1);
+        std::vector<Choice> list = next->choices;
+        for (Choice& each : list)
+            each.value.insert(0, word, 0, start);
+        return list;
     }
 
   private:
@@ -129,14 +147,27 @@ class Line {
             give(*optionOf(code), value);
         } else if (const Argument* flag = optionOf(optopt)) {
             complain(flag->name + ": takes no value");
+        } else if (optopt != 0) {
+            refuse(std::string{'-', static_cast<char>(optopt)});
         } else {
-            std::vector<std::string> known;
-            for (const Argument* each : mOptions)
-                known.push_back(each->name);
-            const std::string name = optopt == 0 ? word.substr(0, word.find('='))
-                                                 : std::string{'-', static_cast<char>(optopt)};
-            complain("no option " + inQuotes(name) + suggestion(name, known));
+            refuse(word.substr(0, word.find('=')));
         }
+    }
+
+    /** Says what is wrong with an option that is not known here. */
+    void refuse(const std::string& name) {
+        std::vector<std::string> known;
+        for (const Argument* each : mOptions)
+            known.push_back(each->name);
+        if (mCommand == nullptr) {
+            for (const Command& command : mProgram->mCommands) {
+                for (const Argument& each : command.mArguments)
+                    known.push_back(each.name);
+            }
+        }
+        const bool isKnown = std::find(known.begin(), known.end(), name) != known.end();
+        complain(isKnown ? inQuotes(name) + " stands behind the command that it is for"
+                         : "no option " + inQuotes(name) + suggestion(name, known));
     }
 
     void takeWord(const std::string& word) {
@@ -144,7 +175,10 @@ class Line {
         if (mCommand == nullptr) return takeName(word);
         Argument* argument = argumentFor(word);
         if (argument == nullptr) return complain(inQuotes(word) + " is one argument too many");
-        if (argument->takesOptions) mTaking = argument;
+        if (argument->takesOptions) {
+            mTaking = argument;
+            if (!mRest) mRest = mIndex;
+        }
         give(*argument, word);
     }
 
@@ -174,7 +208,7 @@ class Line {
     void give(Argument& argument, const std::string& word) {
         argument.isGiven = true;
         try {
-            argument.read(word, isStep());
+            argument.read(word);
         } catch (const UsageError& error) {
             const bool isNamed = argument.isOption() && !isStep();
             complain((isNamed ? argument.name + ": " : "") + error.what());
@@ -191,6 +225,8 @@ class Line {
     std::string mTyped;
     /** What takes the next word, whatever it is: an option without its value yet, or a rest. */
     Argument* mTaking = nullptr;
+    /** The index of the first word of a rest. */
+    std::optional<size_t> mRest;
     bool mHaveOptionsEnded = false;
     std::optional<UsageError> mProblem;
     /** The index of the word that is read. */

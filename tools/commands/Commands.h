@@ -26,9 +26,8 @@ inline constexpr char kForAll[] = "For everybody";
 inline constexpr char kRestricted[] = "For root and system";
 inline constexpr char kTools[] = "Tools";
 
-/** The driver's own scale, up to full strength; numbers out of range go to the service, too. */
-inline constexpr cli::Numbers kIntensities = {"an intensity", 1, product::kMaxAmplitude,
-                                              UINT32_MAX};
+/** The driver's own scale, up to full strength. */
+inline constexpr cli::Numbers kIntensities = {"an intensity", 1, product::kMaxAmplitude, "%"};
 
 /** The only argument of a command: a number, or one of some words. */
 struct OneArgument {

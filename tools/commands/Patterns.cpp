@@ -97,7 +97,7 @@ Packets readPackets(const std::vector<std::string>& words, const std::string& fi
  * @throw cli::UsageError
  */
 void checkScaling(const Packets& packets, uint32_t amplitude) {
-    const uint32_t most = UINT32_MAX / std::max(amplitude, 1U);
+    const uint32_t most = UINT32_MAX / amplitude;
     for (const auto& packet : packets) {
         if (packet.intensity >= 0 && static_cast<uint32_t>(packet.intensity) <= most) continue;
         throw cli::UsageError("intensity " + std::to_string(packet.intensity) +

@@ -93,14 +93,6 @@ Timeline readTimeline(const std::string& file) {
                           ": no write to the driver in it; is it a trace, or the daemon's log?");
 }
 
-/** @return the time that an option gives, in s, or what holds without it. */
-double timeOf(const char* option, const std::string& text, double without) {
-    if (text.empty()) return without;
-    if (const auto time = cli::parseDuration(text)) return *time;
-    throw cli::UsageError(option + (": " + cli::inQuotes(text)) +
-                          " is not a time like 10s, 500ms, 2m or 1h");
-}
-
 /** @return the format of the picture, where the name of its file or an option says it. */
 PictureFormat formatOf(const std::string& name, size_t format) {
     const std::string ending = fs::path(name).extension();
@@ -126,9 +118,10 @@ void addPlot(Client& client) {
                                         {"svg", "lines that stay sharp"},
                                         {"png", "pixels"}},
                                        "format of the picture", 0);
-    const auto from = command.text("--from TIME", "start of the part to draw, like 10s or 2m", "");
-    const auto to = command.text("--to TIME", "end of the part to draw", "");
-    const auto last = command.text("--last TIME", "draw only the end, of this length", "");
+    constexpr cli::Numbers kTimes = {"a time like 500, 500ms or 2s", 1, UINT32_MAX, "ms"};
+    const auto from = command.number("--from TIME", kTimes, "start of the part to draw");
+    const auto to = command.number("--to TIME", kTimes, "end of the part to draw");
+    const auto last = command.number("--last TIME", kTimes, "draw only the end, of this length");
     const auto ascii = command.flag("--ascii", "draw the text with the characters of ASCII alone");
     command.note("Times count from the first call on.");
     command.withoutJson().run([=] {
@@ -139,12 +132,11 @@ void addPlot(Client& client) {
         if (!isText && *output != "-") checkTarget(*output, traffic());
         Timeline timeline = readTimeline(traffic());
         const double length = timeline.end;
-        const double start = last->empty() ? 0 : length - timeOf("--last", *last, 0);
-        if (!last->empty() && !(from->empty() && to->empty())) {
+        if (*last != 0 && (*from != 0 || *to != 0)) {
             throw cli::UsageError("--last goes with neither --from nor --to");
         }
-        cut(&timeline, timeOf("--from", *from, start),
-            timeOf("--to", *to, std::numeric_limits<double>::max()));
+        cut(&timeline, *last != 0 ? length - *last / 1000.0 : *from / 1000.0,
+            *to != 0 ? *to / 1000.0 : std::numeric_limits<double>::max());
         if (timeline.marks.empty() && timeline.segments.empty()) {
             throw cli::UsageError("nothing in that time; all of it lies within " +
                                   cli::durationInWords(length) + " from the first call on");

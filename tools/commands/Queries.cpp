@@ -36,10 +36,10 @@ int supports(const Client& client) {
     return client.report().found(words, members);
 }
 
-/** @return the service, waited for up to some seconds. @throw Unreachable */
-::android::sp<IDaxVibrator> await(const Client& client, uint32_t seconds) {
+/** @return the service, waited for up to some ms. @throw Unreachable */
+::android::sp<IDaxVibrator> await(const Client& client, uint32_t ms) {
     using Clock = std::chrono::steady_clock;
-    const auto deadline = Clock::now() + std::chrono::seconds(seconds);
+    const auto deadline = Clock::now() + std::chrono::milliseconds(ms);
     for (;;) {
         try {
             return client.service();
@@ -50,8 +50,8 @@ int supports(const Client& client) {
     }
 }
 
-int status(const Client& client, uint32_t seconds) {
-    const auto vibrator = await(client, seconds);
+int status(const Client& client, uint32_t waitMs) {
+    const auto vibrator = await(client, waitMs);
     const Served served = describe(serverOf(*vibrator), findRoute());
     std::vector<std::string> interfaces;
     reached(vibrator->interfaceChain([&](const auto& chain) {
@@ -118,14 +118,14 @@ void addQueries(Client& client) {
         return supports(client);
     });
 
-    constexpr cli::Numbers kWaits = {"a time in s", 0, 3600};
+    constexpr cli::Numbers kWaits = {"a time like 10, 500ms or 2m", 0, 3600, "s"};
     cli::Command& waiting = client.command(
             kForAll, "status", "say whether the service answers, and who serves it", "--wait 10");
     const auto wait =
             waiting.number("--wait SECONDS", kWaits, "how long to wait for the service", 0);
     waiting.run([&client, wait] { return status(client, *wait); });
 
-    constexpr cli::Numbers kTypes = {"the type of a ladder", 0, 1, UINT32_MAX};
+    constexpr cli::Numbers kTypes = {"the type of a ladder", 0, 1};
     cli::Command& typed =
             client.command(kRestricted, "ladder",
                            "print the ladder of intensities that suits the motor", "--type 1");

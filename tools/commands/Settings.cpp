@@ -4,8 +4,8 @@
 namespace vibratorctl {
 
 void addSettings(Client& client) {
-    constexpr cli::Numbers kAmplitudes = {"an amplitude", 1, 255, UINT8_MAX};
-    constexpr cli::Numbers kFrequencyTypes = {"a frequency type", 0, 4, UINT32_MAX};
+    constexpr cli::Numbers kAmplitudes = {"an amplitude", 1, 255, "%"};
+    constexpr cli::Numbers kFrequencyTypes = {"a frequency type", 0, 4};
     const auto add = [&](const char* name, const char* help, const char* example,
                          const OneArgument& argument, const Operation& operation,
                          const Call& call) {

@@ -92,9 +92,9 @@ void addEffect(Client& client) {
 }  // namespace
 
 void addVibration(Client& client) {
-    constexpr cli::Numbers kTimes = {"a time in ms", 0, INT32_MAX};
+    constexpr cli::Numbers kTimes = {"a time like 500, 500ms or 2s", 0, INT32_MAX, "ms"};
     cli::Command& on = client.command(kForAll, "on", "run the motor", "500");
-    const auto ms = on.number("MS", kTimes, "how long, in ms");
+    const auto ms = on.number("MS", kTimes, "how long");
     const auto waits = on.flag("--wait", "wait until the motor has stopped");
     on.run([&client, ms, waits] {
         const int code =

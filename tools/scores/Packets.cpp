@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <charconv>
 #include <nlohmann/json.hpp>
+#include <optional>
 #include <sstream>
 
 namespace vibratorctl {

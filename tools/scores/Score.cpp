@@ -123,7 +123,7 @@ class ScoreParser {
     std::vector<ScoreError>& mErrors;
     cli::Command mWait;
     cli::Value<uint32_t> mPause =
-            mWait.number("MS", {"a time in ms", 0, 3'600'000}, "how long, in ms");
+            mWait.number("MS", {"a time like 500, 500ms or 2s", 0, 3'600'000, "ms"}, "how long");
     cli::Command mRepeat;
     cli::Value<uint32_t> mTimes =
             mRepeat.number("N", {"a number of times", 1, kMostSteps}, "how often");

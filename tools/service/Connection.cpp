@@ -16,8 +16,8 @@ namespace vibratorctl {
     return vibrator;
 }
 
-void setCallTimeout(uint32_t seconds) {
-    host::setCallTimeout(std::chrono::seconds(seconds));
+void setCallTimeout(std::chrono::milliseconds limit) {
+    host::setCallTimeout(limit);
 }
 
 std::optional<Process> serverOf(IDaxVibrator& vibrator) {

@@ -7,7 +7,7 @@
 #include <hidl/Status.h>
 #include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
 
-#include <cstdint>
+#include <chrono>
 #include <stdexcept>
 #include <string>
 
@@ -25,8 +25,8 @@ class Unreachable : public std::runtime_error {
 /** Finds the service, without waiting for it. @throw Unreachable */
 ::android::sp<IDaxVibrator> connect(const std::string& instance);
 
-/** Limits the time that a call may take from now on. @param seconds 0 for no limit. */
-void setCallTimeout(uint32_t seconds);
+/** Limits the time that a call may take from now on. @param limit 0 for no limit. */
+void setCallTimeout(std::chrono::milliseconds limit);
 
 /** @return the result of a call that reached the service. @throw Unreachable */
 template <typename T>

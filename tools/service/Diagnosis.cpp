@@ -13,8 +13,8 @@ using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
 namespace {
 
-/** The longest that a service that works needs to answer, in s. */
-constexpr uint32_t kPatience = 3;
+/** The longest that a service that works needs to answer. */
+constexpr std::chrono::seconds kPatience(3);
 
 /** What each node serves, in the order of NodePathTable. */
 constexpr const char* kServes[] = {"on, off, is it running",

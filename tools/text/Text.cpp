@@ -2,12 +2,9 @@
 #include "Text.h"
 
 #include <algorithm>
-#include <charconv>
 #include <clocale>
 #include <cmath>
 #include <cstdio>
-#include <cstdlib>
-#include <cstring>
 #include <cwchar>
 #include <cwctype>
 #include <numeric>
@@ -58,14 +55,6 @@ std::string printable(std::string_view text, bool hasLines) {
 
 std::string inQuotes(std::string_view text) {
     return '"' + printable(text) + '"';
-}
-
-std::optional<uint32_t> parseNumber(std::string_view text, uint32_t least, uint32_t most) {
-    uint32_t number = 0;
-    const char* end = text.data() + text.size();
-    const auto [stop, error] = std::from_chars(text.data(), end, number);
-    if (error != std::errc() || stop != end || number < least || number > most) return {};
-    return number;
 }
 
 std::string suggestion(std::string_view typed, const std::vector<std::string>& known) {
@@ -123,22 +112,6 @@ std::string durationInWords(double seconds) {
                  whole % 60);
     }
     return text;
-}
-
-std::optional<double> parseDuration(const std::string& text) {
-    constexpr struct {
-        const char* unit;
-        double seconds;
-    } kUnits[] = {{"ms", 0.001}, {"s", 1}, {"m", 60}, {"h", 3600}};
-    const size_t digits = strspn(text.c_str(), "0123456789.");
-    char* end = nullptr;
-    const std::string written = text.substr(0, digits);
-    const double number = strtod(written.c_str(), &end);
-    if (digits == 0 || *end != '\0' || !(number < 1e9)) return std::nullopt;
-    for (const auto& [unit, seconds] : kUnits) {
-        if (text.substr(digits) == unit) return number * seconds;
-    }
-    return std::nullopt;
 }
 
 }  // namespace cli

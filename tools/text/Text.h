@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include <cstdint>
-#include <optional>
+#include <cstddef>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -20,9 +19,6 @@ std::string printable(std::string_view text, bool hasLines = false);
 /** @return the text between quotation marks, printable. */
 std::string inQuotes(std::string_view text);
 
-/** @return the number, if the text is a whole decimal one from least to most. */
-std::optional<uint32_t> parseNumber(std::string_view text, uint32_t least, uint32_t most);
-
 /** @return `; did you mean "WORD"?` for the known word nearest to a mistyped one, or nothing. */
 std::string suggestion(std::string_view typed, const std::vector<std::string>& known);
 
@@ -38,8 +34,5 @@ std::string wrap(const std::string& text, size_t indent);
 
 /** @return seconds for people: "20 ms", "3.4 s", "2:05 min", "1:02:03 h". */
 std::string durationInWords(double seconds);
-
-/** @return the seconds that a text like "500ms", "1.5s", "2m" or "1h" stands for. */
-std::optional<double> parseDuration(const std::string& text);
 
 }  // namespace cli
