@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "CommandLine.h"
 
+#include "text/Output.h"
 #include "text/Text.h"
 
 #include <algorithm>
-#include <cerrno>
 #include <cstring>
 #include <iostream>
 
@@ -135,6 +135,8 @@ std::vector<Choice> Program::commandsAfter(const std::string& typed) const {
 }
 
 int Program::run(int argc, char** argv) {
+    Output output;
+    std::streambuf* const before = std::cout.rdbuf(&output);
     int code = kFailed;
     addHelp();
     try {
@@ -145,11 +147,11 @@ int Program::run(int argc, char** argv) {
     } catch (const std::exception& error) {
         complain("FAILED", error.what());
     }
-    errno = 0;
-    if (std::cout.flush()) return code;
+    std::cout.flush();
+    std::cout.rdbuf(before);
+    if (output.error() == 0) return code;
     std::cerr << mName
-              << ": standard output cannot be written: " << strerror(errno != 0 ? errno : EIO)
-              << '\n';
+              << ": standard output cannot be written: " << strerror(output.error()) << '\n';
     return kFailed;
 }
 
