@@ -6,7 +6,10 @@
 #include <algorithm>
 #include <chrono>
 #include <csignal>
+#include <filesystem>
 #include <iostream>
+#include <string>
+#include <system_error>
 #include <thread>
 
 namespace vibratorctl {
@@ -112,6 +115,16 @@ int play(Client& client, const std::string& file, bool isCheck, bool keepsGoing)
                                  {{"steps", steps}, {"seconds", score.seconds()}});
 }
 
+/** @return where a score is: beside the installed client, or else in the source. */
+std::string exampleScore() {
+    constexpr char kScore[] = "docs/examples/clicks.score";
+    std::error_code error;
+    const auto program = std::filesystem::read_symlink("/proc/self/exe", error);
+    const auto prefix = program.parent_path().parent_path();
+    const std::string installed = prefix / "share/doc/vibrator-service" / kScore;
+    return std::filesystem::exists(installed, error) ? installed : kScore;
+}
+
 }  // namespace
 
 void wait(uint32_t ms) {
@@ -125,8 +138,7 @@ void wait(uint32_t ms) {
 }
 
 void addPlay(Client& client) {
-    cli::Command& command =
-            client.command(kTools, "play", "play a score", "docs/examples/clicks.score");
+    cli::Command& command = client.command(kTools, "play", "play a score", exampleScore());
     const auto file = command.file("SCORE", "file with a step a line, - for standard input");
     const auto check = command.flag("--check", "only check the score, and print how long it takes");
     const auto keepsGoing =
