@@ -61,14 +61,12 @@ Device ask(const std::string& path, const libevdev* events, int effects) {
                              libevdev_get_id_product(events)})
         device.identity += std::to_string(number) + ":";
     device.identity += device.name + ":" + (serial == nullptr ? "" : serial);
-    device.effect = has(FF_RUMBLE)                     ? Effect::kRumble
-                    : has(FF_PERIODIC) && has(FF_SINE) ? Effect::kSine
-                    : has(FF_CONSTANT)                 ? Effect::kConstant
-                                                       : Effect::kNone;
+    // The kernel also offers rumble for a device that plays sine waves, and turns it into those.
+    device.effect = has(FF_RUMBLE) ? FF_RUMBLE : has(FF_CONSTANT) ? FF_CONSTANT : 0;
     device.hasGain = has(FF_GAIN);
     device.effects = effects;
-    if (device.effect == Effect::kNone) {
-        device.problem = "it plays neither rumble, nor sine waves, nor constant forces";
+    if (device.effect == 0) {
+        device.problem = "it plays neither rumble nor constant forces";
     } else if (effects == 0) {
         device.problem = "it holds no effects";
     }
@@ -95,8 +93,7 @@ std::optional<Device> examine(const std::string& path) {
 
 std::string Device::inWords() const {
     if (!problem.empty()) return problem;
-    constexpr const char* kEffects[] = {"rumble", "sine waves", "constant forces"};
-    return std::string(kEffects[static_cast<size_t>(effect)]) + ", " +
+    return std::string(effect == FF_RUMBLE ? "rumble, " : "constant forces, ") +
            (hasGain ? "gain, " : "no gain, ") + std::to_string(effects) +
            (effects == 1 ? " effect" : " effects");
 }
@@ -137,11 +134,14 @@ Device chooseDevice(const std::string& path) {
     const auto isUsable = [](const Device& device) { return device.problem.empty(); };
     const auto usable = std::find_if(devices.begin(), devices.end(), isUsable);
     if (std::count_if(devices.begin(), devices.end(), isUsable) == 1) return *usable;
-    std::string complaint =
-            usable == devices.end() ? "no motor can be used:" : "choose a motor with --device:";
-    for (const Device& device : devices)
-        complaint += "\n  " + device.path + "  " + device.name + ": " + device.inWords();
-    throw std::runtime_error(complaint);
+    std::string devicesInWords;
+    for (const Device& device : devices) {
+        devicesInWords += (devicesInWords.empty() ? "" : "; ") + device.path + ", \"" +
+                          device.name + "\" (" + device.inWords() + ")";
+    }
+    throw std::runtime_error((usable == devices.end() ? "no motor can be used: "
+                                                      : "choose a motor with --device: ") +
+                             devicesInWords);
 }
 
 }  // namespace driver

@@ -6,16 +6,14 @@
 
 namespace driver {
 
-/** The kinds of effects that a motor may play, the preferred one first. */
-enum class Effect { kRumble, kSine, kConstant, kNone };
-
 /** An input device that offers force feedback. */
 struct Device {
     std::string path;
     std::string name;
     /** Its bus, numbers, name and serial number, which stay when it is plugged in again. */
     std::string identity;
-    Effect effect = Effect::kNone;
+    /** The effect that is used: FF_RUMBLE, else FF_CONSTANT; 0: none. */
+    int effect = 0;
     /** Whether it has a setting for the strength of all its effects. */
     bool hasGain = false;
     /** How many effects it holds at a time. */

@@ -68,11 +68,17 @@ std::string LocalDriver::path(const std::string& leaf) const {
 }
 
 LocalDriver::Node LocalDriver::look(const std::string& name) const {
-    const std::string path = name[0] == '/' ? name : this->path(name);
+    std::string path = name[0] == '/' ? name : this->path(name);
     simulator::Node simulated;
     const std::string simulation = simulator::inheritedDirectory();
     const bool isSimulated =
             !simulation.empty() && simulator::findNode(simulation, path.c_str(), &simulated);
+    // The packaged service sees those of vibrator-driver there.
+    constexpr std::string_view kClasses = "/sys/class";
+    const std::string driver = "/run/vibrator-driver/class";
+    if (!isSimulated && path.find(kClasses) == 0 && access(driver.c_str(), F_OK) == 0) {
+        path.replace(0, kClasses.size(), driver);
+    }
     struct stat info {};
     Node node;
     if (stat(isSimulated ? simulated.file.c_str() : path.c_str(), &info) != 0) return node;
@@ -127,7 +133,7 @@ LocalDriver::Motor LocalDriver::motor() const {
         number = motorOfFeatures(*this);
         found = "by the features of the driver";
     }
-    return {number, MotorTypeNames[number], found};
+    return {number, MotorTypeNames[number], found, look("input_device").firstLine()};
 }
 
 std::vector<uint32_t> LocalDriver::ladder(uint32_t type) const {

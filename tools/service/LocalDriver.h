@@ -58,9 +58,12 @@ class LocalDriver {
         std::string name;
         /** How it is known. */
         std::string found;
+        /** Path and name of the input device that vibrator-driver moves; empty for the kernel's. */
+        std::string device;
 
         std::string inWords() const {
-            return name + ", number " + std::to_string(number) + ", found " + found;
+            return name + ", number " + std::to_string(number) + ", found " + found +
+                   (device.empty() ? "" : "; through vibrator-driver, " + device);
         }
     };
     /** @return the motor of a usable driver. */

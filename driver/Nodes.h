@@ -1,0 +1,59 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "Attributes.h"
+#include "Loop.h"
+
+#include <sys/stat.h>
+
+#include <functional>
+#include <map>
+#include <string>
+
+struct fuse;
+
+namespace driver {
+
+/**
+ * Opens the device over which the kernel asks for what is in a file system. @return its descriptor.
+ * @throw std::runtime_error that says what the machine lacks.
+ */
+int openFileSystem();
+
+/**
+ * Mounts a file system that is served over a descriptor, for root so that all users see it.
+ *
+ * @throw std::runtime_error
+ */
+void mountFileSystem(int file, const std::string& directory);
+
+/**
+ * Serves attributes as files of a file system that takes the place of /sys/class. Lives as long as
+ * its process.
+ */
+class Nodes {
+  public:
+    /** Gets each access, as model::traceLine does. */
+    using Trace =
+            std::function<void(const std::string& access, long result, const std::string& shown)>;
+    /** @param file where the kernel asks. @throw std::runtime_error */
+    Nodes(int file, model::Layout layout, model::State& state, Loop& loop, Trace trace);
+
+    /** Adds a file for an attribute. */
+    void add(const std::string& leaf, mode_t mode);
+
+  private:
+    struct Requests;
+
+    void addFile(const std::string& path, mode_t mode);
+
+    model::State& mState;
+    Trace mTrace;
+    /** The attributes' directory, with a slash at its end. */
+    std::string mDirectory;
+    /** By path; directories, too. */
+    std::map<std::string, struct stat> mFiles;
+    struct fuse* mFuse;
+};
+
+}  // namespace driver

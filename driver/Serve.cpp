@@ -1,0 +1,154 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Serve.h"
+
+#include "MotorState.h"
+#include "Nodes.h"
+#include "Session.h"
+#include "SimulatedDriver.h"
+#include "TraceFile.h"
+
+#include <fcntl.h>
+#include <poll.h>
+#include <sched.h>
+#include <sys/mount.h>
+#include <sys/prctl.h>
+#include <sys/syscall.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <csignal>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <iostream>
+#include <stdexcept>
+
+namespace driver {
+namespace {
+
+namespace fs = std::filesystem;
+
+constexpr char kClasses[] = "/sys/class";
+constexpr char kBanner[] =
+        "The service on a motor. Try:\n"
+        "  vibratorctl click\n"
+        "  vibratorctl pattern play 4\n"
+        "  vibratorctl plot                  # draws what the driver was told\n";
+
+[[noreturn]] void fail(const std::string& what) {
+    throw std::runtime_error(what + ": " + strerror(errno));
+}
+
+void writeFile(const std::string& path, const std::string& text) {
+    if (!(std::ofstream(path) << text << std::flush)) fail(path);
+}
+
+/** Gives this process mounts of its own; one that is not root becomes able to mount by that. */
+void leaveMounts() {
+    const std::string user = std::to_string(geteuid());
+    const std::string group = std::to_string(getegid());
+    const bool isRoot = geteuid() == 0;
+    if (unshare(isRoot ? CLONE_NEWNS : CLONE_NEWNS | CLONE_NEWUSER) != 0) {
+        fail("this system lets only root do that, as it has no user namespaces for others "
+             "(sysctl user.max_user_namespaces, kernel.unprivileged_userns_clone)");
+    }
+    if (!isRoot) {
+        writeFile("/proc/self/setgroups", "deny");
+        writeFile("/proc/self/uid_map", user + " " + user + " 1");
+        writeFile("/proc/self/gid_map", group + " " + group + " 1");
+    }
+    if (mount("none", "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0) fail("mount");
+}
+
+/** @return the descriptor over which another process serves files, as one of this process. */
+int takeFileSystem(pid_t process) {
+    const fs::path files = "/proc/" + std::to_string(process) + "/fd";
+    const auto handle = static_cast<int>(syscall(SYS_pidfd_open, process, 0));
+    // A process that has just begun has not opened it yet: five seconds.
+    for (int attempt = 0; attempt < 250; ++attempt) {
+        for (const auto& entry : fs::directory_iterator(files)) {
+            std::error_code error;
+            if (fs::read_symlink(entry.path(), error) != "/dev/fuse") continue;
+            const int number = std::stoi(entry.path().filename());
+            const auto file = static_cast<int>(syscall(SYS_pidfd_getfd, handle, number, 0));
+            if (file >= 0) return file;
+            fail("pidfd_getfd");
+        }
+        usleep(20'000);
+    }
+    throw std::runtime_error("process " + std::to_string(process) + " serves no nodes");
+}
+
+/** Serves the nodes until they are unmounted. @param traceDirectory empty for no trace. */
+void serve(const Setup& setup, int file, const std::string& traceDirectory) {
+    const auto patterns = parsePatterns(setup.patterns);
+    model::Features features;
+    for (const std::string& name : model::featureNames())
+        features.names.insert(name);
+    features.waves = static_cast<int>(patterns.size());
+    Loop loop;
+    Player player(setup.device, loop);
+    MotorState state(player, patterns);
+    const simulator::Folder folder(traceDirectory);
+    Nodes nodes(file, setup.layout, state, loop,
+                [&](const std::string& access, long result, const std::string& shown) {
+                    if (!traceDirectory.empty()) simulator::trace(folder, access, result, shown);
+                });
+    for (const model::Attribute& attribute : model::attributes()) {
+        if (!attribute.isIn(setup.layout, features)) continue;
+        state.setText(attribute.leaf, attribute.initialText(features));
+        nodes.add(attribute.leaf, attribute.mode);
+    }
+    // Not of the kernel's drivers: says through what the motor is reached.
+    state.setText("input_device", setup.device.path + " " + setup.device.name + "\n");
+    nodes.add("input_device", 0444);
+    loop.run();
+}
+
+}  // namespace
+
+void serveMounted(const Setup& setup) {
+    const int file = openFileSystem();
+    // The kernel says nothing when it is mounted.
+    for (pollfd each{file, POLLIN, 0}; poll(&each, 1, -1) >= 0 && (each.revents & POLLERR) != 0;)
+        usleep(10'000);
+    serve(setup, file, "");
+}
+
+void mountNodes(pid_t process, const std::string& directory) {
+    fs::create_directories(directory);
+    mountFileSystem(takeFileSystem(process), directory);
+}
+
+int runSession(const Setup& setup, const std::vector<std::string>& command) {
+    // Its helper removes the directory, and must see it without what is mounted there.
+    session::Session session;
+    const std::string directory = session / "driver";
+    simulator::claimDirectory(directory);
+    const std::string nodes = directory + kClasses;
+    fs::create_directories(nodes);
+    leaveMounts();
+    const int file = openFileSystem();
+    mountFileSystem(file, kClasses);
+    if (mount(kClasses, nodes.c_str(), nullptr, MS_BIND, nullptr) != 0) fail(nodes);
+    const session::Child server({"vibrator-driver"}, [&] {
+        // Not reached by the terminal's signals, and not outliving this process.
+        setpgid(0, 0);
+        prctl(PR_SET_PDEATHSIG, SIGKILL);
+        prctl(PR_SET_NAME, "vibrator-motor");
+        serve(setup, file, directory);
+        _exit(0);
+    });
+    // Without the server the nodes are gone.
+    close(file);
+    const auto stop = [&] {
+        const bool isLed = setup.layout == model::Layout::kLedTrigger;
+        std::ofstream(model::sysfsDirectory(setup.layout) +
+                      std::string(isLed ? "activate" : "enable"))
+                << "0\n";
+        std::cerr << "vibrator-driver: the service has ended" << std::endl;
+    };
+    return session.run({directory, [] {}, stop, kBanner}, command);
+}
+
+}  // namespace driver

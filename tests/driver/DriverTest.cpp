@@ -1,0 +1,313 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "driver/RecordedMotor.h"
+#include "support/Operations.h"
+#include "support/Process.h"
+
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <linux/input.h>
+#include <sys/ioctl.h>
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <chrono>
+#include <csignal>
+#include <cstdlib>
+#include <cstring>
+#include <iostream>
+#include <memory>
+#include <sstream>
+
+/**
+ * The daemon, unmodified, on motors of the kernel's real input core, as a program of a virtual
+ * machine. Each motor writes down what it was told, and when.
+ */
+namespace tests {
+namespace {
+
+using Kind = RecordedMotor::Kind;
+using Packets = std::vector<::vendor::velmora::hardware::vibrator::V2_0::DaxHapticEnginePacket>;
+
+constexpr char kDriver[] = "/bin/vibrator-driver";
+constexpr char kLog[] = "/tmp/driver.log";
+constexpr char kEnvironment[] = "/tmp/environment";
+
+const Kind kPad{"rumble", {FF_RUMBLE, FF_PERIODIC, FF_SINE, FF_GAIN}, 16};
+const Kind kKinds[] = {kPad,
+                       {"sine", {FF_PERIODIC, FF_SINE, FF_GAIN}, 16},
+                       {"constant", {FF_CONSTANT}, 16},
+                       {"one slot", {FF_RUMBLE, FF_GAIN}, 1},
+                       {"no gain", {FF_RUMBLE}, 4}};
+
+void wait(int milliseconds) {
+    std::this_thread::sleep_for(std::chrono::milliseconds(milliseconds));
+}
+
+/** A run at one strength, of the service's 10000, or a rest. */
+struct Movement {
+    int strength;
+    double length;
+};
+
+class DriverTest : public ::testing::Test {
+  protected:
+    /** Plugs a motor in, and has the service run on it. */
+    void serve(const Kind& kind, const char* layout, uid_t uid = 0) {
+        mKind = kind;
+        plugIn();
+        unlink(kEnvironment);
+        const std::string script =
+                "echo $HWBINDER_DIR >" + std::string(kEnvironment) + "; exec sleep 1000";
+        mSession.startProgram({kDriver, "run", "--layout", layout, "/bin/sh", "-c", script}, kLog,
+                              {}, uid);
+        ASSERT_TRUE(eventually([] { return !readFile(kEnvironment).empty(); })) << readFile(kLog);
+        std::string directory = readFile(kEnvironment);
+        directory.pop_back();
+        setenv("HWBINDER_DIR", directory.c_str(), 1);
+        mVibrator = IDaxVibrator::getService();
+        ASSERT_NE(mVibrator, nullptr);
+        mMotor->takeChanges();
+    }
+    void plugIn() {
+        mMotor.reset();
+        mMotor = std::make_unique<RecordedMotor>(mKind);
+    }
+
+    /** @return the process of the session that has a name: the driver's server, or the service. */
+    pid_t find(const std::string& name) const {
+        const std::string pid = std::to_string(mSession.pid());
+        std::istringstream children(readFile("/proc/" + pid + "/task/" + pid + "/children"));
+        for (pid_t child = 0; children >> child;) {
+            if (readFile("/proc/" + std::to_string(child) + "/comm").find(name) == 0) return child;
+        }
+        return -1;
+    }
+
+    /** Compares what the motor did with runs that began at a time and end in rest. */
+    void expectRuns(double start, const std::vector<Movement>& runs) {
+        double end = start;
+        for (const Movement& run : runs)
+            end += run.length;
+        wait(static_cast<int>(end - nowInMs()) + 30);
+        const auto changes = mMotor->takeChanges();
+        ASSERT_EQ(changes.size(), runs.size() + 1);
+        EXPECT_LT(changes[0].time - start, 5);
+        EXPECT_EQ(changes.back().strength, 0);
+        for (size_t i = 0; i < runs.size(); ++i) {
+            EXPECT_EQ(changes[i].strength, inItsUnits(runs[i].strength)) << i;
+            EXPECT_NEAR(changes[i + 1].time - changes[i].time, runs[i].length, 10) << i;
+        }
+    }
+    /** @return a strength as the motor is told it. */
+    int inItsUnits(int strength) const {
+        const bool isConstant = mKind.bits[0] == FF_CONSTANT;
+        const int scaled = (strength * (isConstant ? 0x7fff : 0xffff) + 5000) / 10000;
+        // The kernel makes a sine wave of a rumble.
+        return mKind.bits[0] == FF_PERIODIC ? scaled / 3 + scaled / 6 : scaled;
+    }
+    template <typename Result>
+    static std::string inWords(const ::android::hardware::Return<Result>& result) {
+        return answerOf(result).inWords();
+    }
+
+    Kind mKind;
+    std::unique_ptr<RecordedMotor> mMotor;
+    ChildProcess mSession;
+    ::android::sp<IDaxVibrator> mVibrator;
+};
+
+class MovementTest : public DriverTest,
+                     public ::testing::WithParamInterface<std::tuple<Kind, const char*>> {};
+
+TEST_P(MovementTest, MovesAsItWasAsked) {
+    const auto& [kind, layout] = GetParam();
+    ASSERT_NO_FATAL_FAILURE(serve(kind, layout));
+    IDaxVibrator& vibrator = *mVibrator;
+    EXPECT_EQ(mMotor->gain(), kind.bits.back() == FF_GAIN ? 0xffff : -1);
+
+    EXPECT_EQ(inWords(vibrator.daxSetAmplitude(5000)), "OK");
+    double start = nowInMs();
+    EXPECT_EQ(inWords(vibrator.on(300)), "OK");
+    expectRuns(start, {{5000, 300}});
+
+    // A change of the strength goes on without a gap, and off ends it.
+    start = nowInMs();
+    vibrator.on(60000);
+    wait(100);
+    EXPECT_EQ(inWords(vibrator.setAmplitude(255)), "OK");
+    wait(100);
+    EXPECT_EQ(inWords(vibrator.off()), "OK");
+    expectRuns(start, {{5000, 100}, {10000, 100}});
+
+    start = nowInMs();
+    vibrator.perform({}, ::android::hardware::vibrator::V1_0::EffectStrength::STRONG,
+                     [](auto status, uint32_t) { EXPECT_EQ(status, VibratorStatus::OK); });
+    expectRuns(start, {{10000, 20}});
+
+    start = nowInMs();
+    vibrator.daxPerformHapticEngine(
+            Packets{{40, 4000, 150, 0}, {60, 10000, 0, 0}, {50, 0, 0, 0}, {30, 6000, -1, 7}}, 5000);
+    expectRuns(start, {{2000, 40}, {5000, 60}, {0, 50}, {3000, 30}});
+
+    // The third of the shipped patterns, once and again and again; packets take its place.
+    start = nowInMs();
+    vibrator.daxPerformPrebakedHapticPattern(3, 5000, false);
+    expectRuns(start, {{5000, 60}, {3000, 60}, {1500, 60}});
+    start = nowInMs();
+    vibrator.daxPerformPrebakedHapticPattern(3, 5050, true);
+    wait(330);
+    vibrator.daxPerformHapticEngine(Packets{{40, 900, 0, 0}}, 10000);
+    expectRuns(start,
+               {{5000, 60}, {3000, 60}, {1500, 60}, {5000, 60}, {3000, 60}, {1500, 30}, {900, 40}});
+    EXPECT_EQ(inWords(vibrator.daxPerformPrebakedHapticPattern(13, 5000, false)), "UNKNOWN_ERROR");
+    EXPECT_EQ(inWords(vibrator.daxPerformPrebakedHapticPattern(13, 5000, true)), "UNKNOWN_ERROR");
+
+    // The time is longer than the kernel counts in one effect.
+    start = nowInMs();
+    vibrator.on(70000);
+    expectRuns(start, {{5000, 70000}});
+
+    // What only is set moves nothing, and something else has the motor while it is asked to.
+    vibrator.on(0);
+    EXPECT_EQ(inWords(vibrator.setExternalControl(true)), "OK");
+    EXPECT_EQ(inWords(vibrator.on(50)), "UNKNOWN_ERROR");
+    EXPECT_EQ(inWords(vibrator.setExternalControl(false)),
+              layout[0] == 'l' ? "UNSUPPORTED_OPERATION" : "OK");
+    EXPECT_EQ(inWords(vibrator.daxSetForceTouchAmplitude(1)), "OK");
+    EXPECT_EQ(inWords(vibrator.daxSetFrequencyType({})), "OK");
+    EXPECT_EQ(mMotor->takeChanges().size(), 0U);
+    EXPECT_EQ(mMotor->effects(), 1U);
+}
+
+INSTANTIATE_TEST_SUITE_P(, MovementTest,
+                         ::testing::Combine(::testing::ValuesIn(kKinds),
+                                            ::testing::Values("timed", "led")));
+
+TEST_F(DriverTest, AnswersEveryOperation) {
+    for (const char* layout : {"led", "timed"}) {
+        ASSERT_NO_FATAL_FAILURE(serve(kPad, layout));
+        for (const Operation& operation : allOperations()) {
+            // The table's motor has another name.
+            if (operation.name() == "daxGetAmplitudeList") continue;
+            EXPECT_EQ(operation.call(*mVibrator).inWords(), operation.answer) << operation.name();
+            mVibrator->off();
+            mVibrator->on(0);
+            mVibrator->setExternalControl(false);
+        }
+        mSession.kill();
+    }
+}
+
+TEST_F(DriverTest, StopsWhenAnyProcessIsKilled) {
+    for (const char* name : {"vibrator-motor", "vendor"}) {
+        ASSERT_NO_FATAL_FAILURE(serve(kPad, "timed"));
+        mVibrator->on(60000);
+        EXPECT_TRUE(eventually([&] { return mMotor->isMoving(); }));
+        ::kill(find(name), SIGKILL);
+        wait(100);
+        EXPECT_FALSE(mMotor->isMoving()) << name;
+        mSession.kill();
+    }
+    ASSERT_NO_FATAL_FAILURE(serve(kPad, "timed"));
+    mVibrator->on(60000);
+    mSession.kill();
+    wait(100);
+    EXPECT_FALSE(mMotor->isMoving());
+}
+
+TEST_F(DriverTest, WorksAgainWhenTheMotorIsBack) {
+    ASSERT_NO_FATAL_FAILURE(serve(kPad, "timed"));
+    for (int i = 0; i < 3; ++i) {
+        mVibrator->on(60000);
+        EXPECT_TRUE(eventually([&] { return mMotor->isMoving(); }));
+        mMotor.reset();
+        wait(50);
+        EXPECT_EQ(inWords(mVibrator->on(50)), "UNKNOWN_ERROR");
+        EXPECT_EQ(inWords(mVibrator->off()), "OK");
+        plugIn();
+        EXPECT_TRUE(eventually([&] { return answerOf(mVibrator->on(50)).inWords() == "OK"; }));
+        wait(100);
+        EXPECT_EQ(mMotor->takeChanges().size(), 2U);
+    }
+}
+
+TEST_F(DriverTest, SharesItsMotor) {
+    // The only place for an effect is another program's.
+    ASSERT_NO_FATAL_FAILURE(serve({"one slot", {FF_RUMBLE}, 1}, "timed"));
+    const int file = open(mMotor->path().c_str(), O_RDWR | O_CLOEXEC);
+    ff_effect effect{};
+    effect.type = FF_RUMBLE;
+    effect.id = -1;
+    ASSERT_EQ(ioctl(file, EVIOCSFF, &effect), 0);
+    EXPECT_EQ(inWords(mVibrator->on(50)), "UNKNOWN_ERROR");
+    EXPECT_NE(readFile(kLog).find("\"one slot\": other programs use all of its effects"),
+              std::string::npos)
+            << readFile(kLog);
+    EXPECT_EQ(ioctl(file, EVIOCRMFF, effect.id), 0);
+    // A program that has grabbed it gets all its events, and does not keep anybody from playing.
+    EXPECT_EQ(ioctl(file, EVIOCGRAB, 1), 0);
+    const double start = nowInMs();
+    EXPECT_EQ(inWords(mVibrator->on(50)), "OK");
+    expectRuns(start, {{10000, 50}});
+    close(file);
+}
+
+TEST_F(DriverTest, RunsForAnOrdinaryUser) {
+    const RecordedMotor motor(kPad);
+    const auto run = [](std::vector<std::string> words) {
+        words.insert(words.begin(), {kDriver, "run"});
+        return runProgram(words, 1000);
+    };
+    EXPECT_EQ(run({"vibratorctl", "on", "50"}).output, "on 50: OK\n");
+    EXPECT_EQ(run({"vibratorctl", "intensity", "5000"}).exitCode, 0);
+    EXPECT_EQ(run({"sh", "-c", "exit 7"}).exitCode, 7);
+    const RecordedMotor second({"second", {FF_RUMBLE}, 1});
+    EXPECT_NE(run({"true"}).errors.find("choose a motor with --device: " + motor.path()),
+              std::string::npos);
+    EXPECT_EQ(run({"--device", second.path(), "true"}).exitCode, 0);
+    chmod(second.path().c_str(), 0600);
+    EXPECT_NE(run({"--device", second.path(), "true"}).errors.find("Permission denied; log in at"),
+              std::string::npos);
+    EXPECT_EQ(run({"vibratorctl", "on", "50"}).output, "on 50: OK\n");
+
+    chmod("/dev/fuse", 0600);
+    EXPECT_EQ(run({"true"}).errors,
+              "vibrator-driver: run: /dev/fuse: Permission denied; give this user access to it, or "
+              "run this as root\n");
+    chmod("/dev/fuse", 0666);
+    runProgram({"/bin/sh", "-c", "echo 0 >/proc/sys/user/max_user_namespaces"});
+    EXPECT_NE(run({"true"}).errors.find("user.max_user_namespaces"), std::string::npos);
+    EXPECT_EQ(runProgram({kDriver, "run", "--device", motor.path(), "true"}).exitCode, 0);
+    runProgram({"/bin/sh", "-c", "echo 700 >/proc/sys/user/max_user_namespaces"});
+}
+
+TEST_F(DriverTest, RestsWithTheMotor) {
+    ASSERT_NO_FATAL_FAILURE(serve(kPad, "timed"));
+    mVibrator->on(50);
+    wait(200);
+    const std::string status = "/proc/" + std::to_string(find("vibrator-motor")) + "/status";
+    const auto switches = [&] {
+        const std::string text = readFile(status);
+        const auto count = [&](const char* label) {
+            return atoi(text.c_str() + text.find(label) + strlen(label));
+        };
+        return count("\nvoluntary_ctxt_switches:") + count("nonvoluntary_ctxt_switches:");
+    };
+    const int before = switches();
+    wait(10000);
+    EXPECT_LE(switches() - before, 2);
+
+    std::vector<double> times;
+    for (int i = 0; i < 200; ++i) {
+        const double start = nowInMs();
+        mVibrator->on(3);
+        wait(6);
+        times.push_back((mMotor->takeChanges().at(0).time - start) * 1000);
+    }
+    std::sort(times.begin(), times.end());
+    std::cout << "from the call of on to the motor's event: median " << times[100]
+              << " us, greatest " << times.back() << " us\n";
+}
+
+}  // namespace
+}  // namespace tests
