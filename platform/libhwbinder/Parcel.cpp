@@ -139,10 +139,13 @@ bool Parcel::isPointer(size_t index, binder_buffer_object* object) const {
 }
 
 bool Parcel::isParent(size_t index) const {
-    // Both drivers let the first child follow its parent at once.
-    binder_buffer_object next;
-    return isPointer(index + 1, &next) && (next.flags & BINDER_BUFFER_FLAG_HAS_PARENT) != 0 &&
-           next.parent == index;
+    // Both drivers refuse a child when another buffer, that is no child, has come before.
+    for (size_t i = index + 1; i < offsetCount(); ++i) {
+        binder_buffer_object next;
+        if (!isPointer(i, &next)) continue;
+        return (next.flags & BINDER_BUFFER_FLAG_HAS_PARENT) != 0 && next.parent == index;
+    }
+    return false;
 }
 
 status_t Parcel::readPointer(size_t length, size_t* index, binder_buffer_object* object) const {

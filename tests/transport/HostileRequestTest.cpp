@@ -75,6 +75,21 @@ constexpr status_t kBadValue = -22;
 constexpr status_t kFailed = INT32_MIN + 2;
 constexpr status_t kUnknown = -74;
 
+/** @return what refers to an object of this process. */
+flat_binder_object ownObject() {
+    static const sp<Peer> peer = new Peer;
+    flat_binder_object object{};
+    object.hdr.type = BINDER_TYPE_BINDER;
+    object.binder = reinterpret_cast<binder_uintptr_t>(peer->getWeakRefs());
+    object.cookie = reinterpret_cast<binder_uintptr_t>(static_cast<BHwBinder*>(peer.get()));
+    return object;
+}
+
+/** @return what refers to an empty buffer whose address is written into another one. */
+binder_buffer_object childOf(binder_size_t parent) {
+    return {{BINDER_TYPE_PTR}, BINDER_BUFFER_FLAG_HAS_PARENT, 0, 0, parent, 0};
+}
+
 const struct {
     const char* name;
     /** Makes the right request wrong. */
@@ -119,13 +134,18 @@ const struct {
          kFailed},
         {"address written over", [](auto& m) { m.add("short", true); }, kFailed},
         // Else an address of the receiver's is taken for what the sender says.
-        {"address in the elements",
-         [](auto& m) { m.addLast(BINDER_BUFFER_FLAG_HAS_PARENT, m.objects.size() - 1); },
+        {"address in the elements", [](auto& m) { m.addLast(childOf(m.objects.size() - 1)); },
          kBadValue},
-        {"address in the elements, late",
+        {"address in the elements, behind an object",
          [](auto& m) {
-             m.addLast(0, 0);
-             m.addLast(BINDER_BUFFER_FLAG_HAS_PARENT, 1);
+             m.addLast(ownObject());
+             m.addLast(childOf(m.objects.size() - 1));
+         },
+         kFailed, kBadValue},
+        {"address in the elements, behind a buffer",
+         [](auto& m) {
+             m.addLast(binder_buffer_object{{BINDER_TYPE_PTR}, 0, 0, 0, 0, 0});
+             m.addLast(childOf(1));
          },
          kFailed},
         {"odd offset", [](auto& m) { m.offsets[0] += 1; }, kFailed},
@@ -137,15 +157,7 @@ const struct {
         // Addresses of the sender's choice, if anybody takes them for objects.
         {"objects not listed", [](auto& m) { m.offsets.clear(); }, kFailed, kBadType},
         {"elements not listed", [](auto& m) { m.offsets.resize(1); }, kFailed, kBadType},
-        {"object for a buffer",
-         [](auto& m) {
-             static const sp<Peer> peer = new Peer;
-             flat_binder_object object{};
-             object.binder = reinterpret_cast<binder_uintptr_t>(peer->getWeakRefs());
-             object.cookie =
-                     reinterpret_cast<binder_uintptr_t>(static_cast<BHwBinder*>(peer.get()));
-             m.replace(1, BINDER_TYPE_BINDER, object);
-         },
+        {"object for a buffer", [](auto& m) { m.replace(1, BINDER_TYPE_BINDER, ownObject()); },
          kFailed, kBadType},
         {"handle of nothing",
          [](auto& m) { m.replace(0, BINDER_TYPE_HANDLE, flat_binder_object{}); }, kFailed},

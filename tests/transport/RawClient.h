@@ -66,10 +66,10 @@ struct RawMessage {
         memory.emplace_back();
         set(objects.size() - 1, content);
     }
-    /** Adds an object without memory behind everything else. */
-    void addLast(uint32_t flags, binder_size_t parent) {
-        const binder_buffer_object object{{BINDER_TYPE_PTR}, flags, 0, 0, parent, 0};
-        offsets.push_back(objects.size() * sizeof(object) + tail.size());
+    /** Adds an object, without memory of its own, behind everything else. */
+    template <typename Object>
+    void addLast(const Object& object) {
+        offsets.push_back(objects.size() * sizeof(objects[0]) + tail.size());
         tail += bytesOf(object);
     }
     void set(size_t i, const std::string& content) {
