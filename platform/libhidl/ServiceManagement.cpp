@@ -143,10 +143,10 @@ class Registrations : public hidl_death_recipient {
             if (!error.isOk()) return error;
         }
         const Return<bool> added = hardware::add(*mManager, service, instance);
-        if (!added.isOk()) return errorOf(added);
-        if (!added) return {UNKNOWN_ERROR, "the service manager refuses it"};
+        if (added.isOk() && !added) return {UNKNOWN_ERROR, "the service manager refuses it"};
+        // A manager that has died meanwhile has a successor.
         mServices.emplace_back(service, instance);
-        return {};
+        return added.isOk() ? Error() : errorOf(added);
     }
 
     void serviceDied(uint64_t /* cookie */, const wp<IBase>& /* who */) override {
