@@ -68,13 +68,24 @@ TEST_F(VibratorctlTest, TheManualNamesTheMembersOfTheJson) {
     const std::string score = mDirectory.path() + "/score";
     std::ofstream(score) << "click";
     std::set<std::string> printed;
-    for (const std::string command :
-         {"on 5", "intensity 0", "pattern count", "pattern play 13", "engine 1,2,3,4", "ladder",
-          "supports", "status", "motor", "doctor --instance none"}) {
-        collectNames(json::parse(run(command + " --json").output), &printed);
+    const std::vector<std::string> commands = {"on 5",
+                                               "intensity 0",
+                                               "pattern count",
+                                               "pattern play 13",
+                                               "engine 1,2,3,4",
+                                               "ladder",
+                                               "supports",
+                                               "status",
+                                               "motor",
+                                               "doctor --instance none",
+                                               "selftest --quiet",
+                                               "play " + score,
+                                               "play --check " + score};
+    for (const std::string& command : commands) {
+        std::istringstream lines(run("--json " + command).output);
+        for (std::string line; std::getline(lines, line);)
+            collectNames(json::parse(line), &printed);
     }
-    collectNames(json::parse(run("play --json " + score).output), &printed);
-    collectNames(json::parse(run("play --json --check " + score).output), &printed);
     std::istringstream manual(readFile(SOURCE_DIRECTORY "/docs/man/vibratorctl.1"));
     std::set<std::string> named;
     bool isJson = false;

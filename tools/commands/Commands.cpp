@@ -4,8 +4,8 @@
 namespace vibratorctl {
 
 void addCommands(Client& client) {
-    for (const auto add : {addVibration, addSettings, addPatterns, addQueries, addDoctor, addPlay,
-                           addWatch, addPlot}) {
+    for (const auto add : {addVibration, addSettings, addPatterns, addQueries, addDoctor,
+                           addSelftest, addPlay, addWatch, addPlot}) {
         add(client);
     }
     client.addSecondName("prebaked", "pattern");

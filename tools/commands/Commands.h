@@ -17,6 +17,7 @@ void addSettings(Client& client);
 void addPatterns(Client& client);
 void addQueries(Client& client);
 void addDoctor(Client& client);
+void addSelftest(Client& client);
 void addPlay(Client& client);
 void addWatch(Client& client);
 void addPlot(Client& client);

@@ -1,0 +1,294 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Commands.h"
+#include "service/Queries.h"
+#include "service/Reasons.h"
+#include "text/Text.h"
+
+#include <hidl/HidlSupport.h>
+#include <private/android_filesystem_config.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <cstdlib>
+#include <iostream>
+#include <map>
+#include <thread>
+
+namespace vibratorctl {
+
+namespace {
+
+using ::android::hardware::vibrator::V1_0::EffectStrength;
+using ::vendor::velmora::hardware::vibrator::V2_0::DaxFolderStatus;
+using ::vendor::velmora::hardware::vibrator::V2_0::DaxFrequencyType;
+using Ask = VibratorStatus (*)(IDaxVibrator&);
+
+/** A call that sets something, and what the driver's node holds after it. */
+struct Trial {
+    const char* name;
+    bool isRestricted;
+    const char* node;
+    Ask call;
+    const char* text;
+    /** Whether it moves the motor. */
+    bool moves = false;
+};
+
+template <auto Operation, auto... Given>
+VibratorStatus ask(IDaxVibrator& vibrator) {
+    return reached((vibrator.*Operation)(Given...));
+}
+
+VibratorStatus playPacket(IDaxVibrator& vibrator) {
+    return reached(vibrator.daxPerformHapticEngine({{20, 5000, 150, 0}}, product::kMaxAmplitude));
+}
+
+using I = IDaxVibrator;
+using Clock = std::chrono::steady_clock;
+
+struct Recipient : ::android::hardware::hidl_death_recipient {
+    void serviceDied(uint64_t /* cookie */,
+                     const ::android::wp<::android::hidl::base::V1_0::IBase>& /* who */) override {}
+};
+
+const Trial kTrials[] = {
+        {"setAmplitude 128", true, "intensity", ask<&I::setAmplitude, 128>, "5001"},
+        {"daxSetAmplitude 7000", true, "intensity", ask<&I::daxSetAmplitude, 7000U>, "7000"},
+        {"daxSetForceTouchAmplitude 6000", true, "force_touch_intensity",
+         ask<&I::daxSetForceTouchAmplitude, 6000U>, "6000"},
+        {"daxSetFrequencyType 1", true, "multi_freq",
+         ask<&I::daxSetFrequencyType, DaxFrequencyType::TYPE_1>, "1"},
+        {"daxSetFolderStatus open", true, "event_cmd",
+         ask<&I::daxSetFolderStatus, DaxFolderStatus::FOLDER_OPEN>, "FOLDER_OPEN"},
+        {"setExternalControl on", false, "ext_control", ask<&I::setExternalControl, true>, "1"},
+        {"setExternalControl off", false, "ext_control", ask<&I::setExternalControl, false>, "0"},
+        {"daxPerformPrebakedHapticPattern 0", true, "cp_trigger_index",
+         ask<&I::daxPerformPrebakedHapticPattern, 0U, 5000U, false>, "0"},
+        {"daxPerformPrebakedHapticPattern 1", true, "cp_trigger_index",
+         ask<&I::daxPerformPrebakedHapticPattern, 1U, 5000U, false>, "1", true},
+        {"daxPerformHapticEngine", true, "haptic_engine", playPacket, "4 20 5000 150 0", true},
+};
+
+/** Calls with arguments out of range, which touch no node. */
+const std::pair<const char*, Ask> kRefused[] = {
+        {"daxSetAmplitude 10001", ask<&I::daxSetAmplitude, 10001U>},
+        {"daxSetForceTouchAmplitude 0", ask<&I::daxSetForceTouchAmplitude, 0U>},
+        {"daxSetFrequencyType 5", ask<&I::daxSetFrequencyType, static_cast<DaxFrequencyType>(5)>},
+        {"daxSetFolderStatus 2", ask<&I::daxSetFolderStatus, static_cast<DaxFolderStatus>(2)>},
+};
+
+/** Checks a board: each operation, by what the driver offers. */
+class Selftest {
+  public:
+    Selftest(Client& client, bool isQuiet, bool asks)
+        : mClient(client),
+          mVibrator(client.service()),
+          mDriver(driverOf(*mVibrator)),
+          mIsQuiet(isQuiet),
+          mAsks(asks) {}
+
+    /** @return the exit code. */
+    int run() {
+        mBefore = look();
+        checkInterfaces();
+        checkQueries();
+        // The LED trigger keeps its duration, and then counts as running.
+        ask<&I::on, 0>(*mVibrator);
+        for (const Trial& trial : kTrials)
+            tryOut(trial);
+        for (const auto& [name, call] : kRefused) {
+            if (mayCallRestricted()) expect(name, "BAD_VALUE", toString(call(*mVibrator)));
+        }
+        checkMotor();
+        checkCallers();
+        restore();
+        return mClient.report().found(std::to_string(mCounts["passed"]) + " passed, " +
+                                              std::to_string(mCounts["failed"]) + " failed, " +
+                                              std::to_string(mCounts["skipped"]) + " skipped\n",
+                                      mCounts, mCounts["failed"] == 0);
+    }
+
+  private:
+    /** What is told of a check. */
+    void tell(const std::string& result, const std::string& name, const std::string& details) {
+        ++mCounts[result];
+        mClient.report().found(result + std::string(9 - result.size(), ' ') + name +
+                                       (details.empty() ? "" : ": " + details) + "\n",
+                               {{"ok", result != "failed"},
+                                {"check", name},
+                                {"result", result},
+                                {"details", details}});
+    }
+    void expect(const std::string& name, const std::string& wanted, const std::string& got) {
+        tell(wanted == got ? "passed" : "failed", name,
+             wanted == got ? "" : got + ", not " + wanted);
+    }
+
+    void checkInterfaces();
+    void checkQueries();
+    /** @return what each node of the driver holds, by its leaf. */
+    std::map<std::string, std::string> look() const;
+    void tryOut(const Trial& trial);
+    void checkMotor();
+    void checkCallers();
+    void restore();
+
+    Client& mClient;
+    const ::android::sp<IDaxVibrator> mVibrator;
+    const LocalDriver mDriver;
+    const bool mIsQuiet;
+    const bool mAsks;
+    /** How many checks passed, failed and were skipped. */
+    std::map<std::string, size_t> mCounts = {{"passed", 0}, {"failed", 0}, {"skipped", 0}};
+    /** What the nodes held at first. */
+    std::map<std::string, std::string> mBefore;
+};
+
+void Selftest::checkInterfaces() {
+    namespace platform = ::android::hardware::vibrator;
+    const std::vector<std::string> wanted = {
+            IDaxVibrator::descriptor,
+            ::vendor::velmora::hardware::vibrator::V2_0::IDaxVibrator::descriptor,
+            platform::V1_3::IVibrator::descriptor,
+            platform::V1_2::IVibrator::descriptor,
+            platform::V1_1::IVibrator::descriptor,
+            platform::V1_0::IVibrator::descriptor,
+            ::android::hidl::base::V1_0::IBase::descriptor};
+    std::vector<std::string> got;
+    reached(mVibrator->interfaceChain(
+            [&](const auto& chain) { got.assign(chain.begin(), chain.end()); }));
+    expect("interface chain", cli::join(wanted, " ", " "), cli::join(got, " ", " "));
+    size_t hashes = 0;
+    reached(mVibrator->getHashChain([&](const auto& chain) { hashes = chain.size(); }));
+    expect("a hash of each interface", std::to_string(wanted.size()), std::to_string(hashes));
+    const bool isNamed = platform::V1_0::IVibrator::tryGetService(mClient.instance()) != nullptr;
+    expect("found by the platform's interface", "yes", isNamed ? "yes" : "no");
+    const ::android::sp<::android::hardware::hidl_death_recipient> recipient = new Recipient;
+    expect("death notice", "yes", reached(mVibrator->linkToDeath(recipient, 0)) ? "yes" : "no");
+}
+
+void Selftest::checkQueries() {
+    const bool isPermitted = mayCallRestricted();
+    for (const Query& query : kQueries) {
+        const bool wanted = (isPermitted || query.isForAll) && (mDriver.*query.expect)();
+        expect(query.operation, wanted ? "yes" : "no",
+               reached((*mVibrator.*query.ask)()) ? "yes" : "no");
+    }
+    if (!isPermitted || !mDriver.isUsable()) return;
+    std::string count;
+    reached(mVibrator->daxGetNumberOfPrebakedHapticPattern([&](auto status, uint32_t patterns) {
+        if (status == VibratorStatus::OK) count = std::to_string(patterns);
+    }));
+    expect("number of patterns", mDriver.look("num_waves").firstLine(), count);
+    for (const uint32_t type : {0U, 1U}) {
+        expect("ladder " + std::to_string(type), ladderInWords(mDriver.ladder(type)),
+               ladderInWords(askLadder(*mVibrator, type)));
+    }
+}
+
+std::map<std::string, std::string> Selftest::look() const {
+    std::map<std::string, std::string> values;
+    for (const product::NodeInfo& node : product::NodePathTable)
+        values[node.leaf] = mDriver.look(node.leaf).firstLine();
+    return values;
+}
+
+void Selftest::tryOut(const Trial& trial) {
+    if (trial.isRestricted && !mayCallRestricted())
+        return tell("skipped", trial.name, notPermitted());
+    if (trial.moves && mIsQuiet) return tell("skipped", trial.name, "it moves the motor");
+    const auto before = look();
+    const VibratorStatus status = trial.call(*mVibrator);
+    if (!mDriver.look(trial.node).exists && status != VibratorStatus::OK)
+        return tell("skipped", trial.name, std::string("this driver has no node ") + trial.node);
+    expect(trial.name, "OK", toString(status));
+    const auto after = look();
+    if (status == VibratorStatus::OK)
+        expect(std::string(trial.node) + " after it", trial.text, after.at(trial.node));
+    for (const product::NodeInfo& node : product::NodePathTable) {
+        // A pattern also sets the intensity, and starts the motor.
+        const bool mayChange = node.onlyMode || node.leaf == std::string("intensity") ||
+                               node.leaf == std::string(trial.node);
+        if (!mayChange && after.at(node.leaf) != before.at(node.leaf))
+            tell("failed", trial.name, std::string("it changes ") + node.leaf + ", too");
+    }
+    if (trial.moves) ask<&I::off>(*mVibrator);
+}
+
+void Selftest::checkMotor() {
+    constexpr int kMs = 300;
+    // A timer of the kernel is late by some ms, and so is the look at it.
+    constexpr int kLate = 60;
+    if (mIsQuiet) return tell("skipped", "on", "it moves the motor");
+    const char* const node = mDriver.mode() == product::kTimedOutputMode ? "enable" : "activate";
+    const auto runs = [&] { return atoi(mDriver.look(node).value.c_str()) > 0; };
+    const auto start = Clock::now();
+    expect("on 300", "OK", toString(ask<&I::on, kMs>(*mVibrator)));
+    const auto elapsed = [&] {
+        return std::chrono::duration_cast<std::chrono::milliseconds>(Clock::now() - start).count();
+    };
+    while (runs() && elapsed() < 2 * kMs)
+        std::this_thread::sleep_for(std::chrono::milliseconds(1));
+    const bool isRight = elapsed() >= kMs - 1 && elapsed() <= kMs + kLate;
+    tell(isRight ? "passed" : "failed", "it ran for 300 ms", std::to_string(elapsed()) + " ms");
+    ask<&I::on, 1000>(*mVibrator);
+    expect("off", "OK", toString(ask<&I::off>(*mVibrator)));
+    expect(std::string(node) + " after it", "0", mDriver.look(node).firstLine());
+    std::string click;
+    reached(mVibrator->perform(::android::hardware::vibrator::V1_0::Effect::CLICK,
+                               EffectStrength::STRONG, [&](VibratorStatus status, uint32_t ms) {
+                                   click = toString(status) + ", " + std::to_string(ms) + " ms";
+                               }));
+    expect("click", "OK, 20 ms", click);
+    if (!mAsks) return;
+    std::cerr << "did it move? [y/N] ";
+    std::string answer;
+    std::getline(std::cin, answer);
+    expect("the motor moved", "y", answer.substr(0, 1));
+}
+
+/** Calls as the system user and as one who may do little. */
+void Selftest::checkCallers() {
+    if (geteuid() != 0) return tell("skipped", "callers", "only root can be another user");
+    const bool hasIntensity = mDriver.daxSupportsAmplitudeControl();
+    for (const uid_t uid : {AID_SYSTEM, AID_SHELL}) {
+        if (seteuid(uid) != 0) continue;
+        const bool mayAsk = uid == AID_SYSTEM && hasIntensity;
+        const std::string user = "uid " + std::to_string(uid) + ": ";
+        expect(user + "daxSupportsAmplitudeControl", mayAsk ? "yes" : "no",
+               reached(mVibrator->daxSupportsAmplitudeControl()) ? "yes" : "no");
+        expect(user + "daxSetAmplitude", mayAsk ? "OK" : "UNKNOWN_ERROR",
+               toString(ask<&I::daxSetAmplitude, 5000U>(*mVibrator)));
+        expect(user + "on 0", "OK", toString(ask<&I::on, 0>(*mVibrator)));
+        if (seteuid(0) != 0) std::abort();
+    }
+}
+
+void Selftest::restore() {
+    const auto number = [&](const char* node) {
+        return static_cast<uint32_t>(atoi(mBefore[node].c_str()));
+    };
+    ask<&I::on, 0>(*mVibrator);
+    ask<&I::off>(*mVibrator);
+    mVibrator->daxSetAmplitude(number("intensity"));
+    mVibrator->daxSetForceTouchAmplitude(number("force_touch_intensity"));
+    mVibrator->daxSetFrequencyType(static_cast<DaxFrequencyType>(number("multi_freq")));
+    const bool isClosed = mBefore["event_cmd"] + "\n" == product::FOLDER_CLOSE_COMMAND;
+    mVibrator->daxSetFolderStatus(isClosed ? DaxFolderStatus::FOLDER_CLOSE
+                                           : DaxFolderStatus::FOLDER_OPEN);
+    mVibrator->setExternalControl(number("ext_control") == 1);
+}
+
+}  // namespace
+
+void addSelftest(Client& client) {
+    cli::Command& command = client.command(
+            kTools, "selftest", "check each operation on this board, and restore what was set",
+            "--quiet");
+    const auto quiet = command.flag("--quiet", "do not move the motor; otherwise for 3 s at most");
+    const auto asks = command.flag("--ask", "ask whether the motor moved");
+    command.note("Root checks the most: it also calls as uid 1000 and uid 2000.");
+    command.run([=, &client] { return Selftest(client, *quiet, *asks).run(); });
+}
+
+}  // namespace vibratorctl
