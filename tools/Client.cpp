@@ -18,7 +18,7 @@ Client::Client()
                                "the longest that a call may take; 0: no limit", 10)),
       // In braces, so that the options are added in this order.
       mReport{shared().flag("--json", "print each answer as a line of JSON"),
-              shared().flag("-v,--verbose", "also print the interface's operation and its status"),
+              shared().flag("-v, --verbose", "also print the interface's operation and its status"),
               [this] { return serverOf(*service()).value_or(thisProcess()); }} {
     shared().note("Exit code: 0 done; 1 the service refused, doctor found a problem, or the output "
                   "could not be written; 2 a mistake in the command line or in a file; 3 the "

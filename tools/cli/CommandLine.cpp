@@ -9,6 +9,7 @@
 #include <iostream>
 
 namespace cli {
+
 std::vector<std::string> valuesOf(const std::vector<Choice>& choices) {
     std::vector<std::string> values;
     for (const Choice& choice : choices)
@@ -23,12 +24,13 @@ Value<T> Command::add(const std::string& name, const std::string& help, const st
     const T first = initial.value_or(T());
     auto value = std::make_shared<T>(first);
     Argument& argument = mArguments.emplace_back();
-    // "-v,--verbose"; without a comma npos + 1 is 0.
-    const size_t start = name.find(',') + 1;
-    const size_t end = std::min(name.find(' '), name.size());
-    argument.name = name.substr(start, end - start);
-    argument.letter = start == 0 ? '\0' : name[1];
-    argument.placeholder = name.substr(std::min(end + 1, name.size()));
+    argument.title = name;
+    // In "-o, --output FILE" the name stands in the middle.
+    const size_t start = name[0] == '-' ? name.find("--") : 0;
+    const size_t blank = name.find(' ', start);
+    argument.name = name.substr(start, blank - start);
+    argument.letter = start > 0 ? name[1] : '\0';
+    argument.isFlag = argument.isOption() && blank == std::string::npos;
     const std::string between = range.empty() || shown.empty() ? "" : "; ";
     const std::string more = range + between + (shown.empty() ? "" : "default: " + shown);
     argument.help = help + (more.empty() ? "" : " (" + more + ")");
@@ -96,25 +98,16 @@ Value<bool> Command::flag(const std::string& name, const std::string& help) {
 Program::Program(std::string name, std::string version, const std::string& about)
     : mName(std::move(name)), mVersion(std::move(version)) {
     mShared.mHelp = about;
-    mWantsHelp = mShared.flag("-h,--help", "print the help of the command, or this one");
+    mWantsHelp = mShared.flag("-h, --help", "print the help of the command, or this one");
     mWantsVersion = mShared.flag("--version", "print the version");
 }
 
-Command& Program::command(const std::string& group, const std::string& name,
-                          const std::string& help, const std::string& example) {
-    Command& added = mCommands.emplace_back();
-    added.mName = name;
-    added.mGroup = group;
-    added.mHelp = help;
-    added.mExample = example;
-    return added;
-}
-
-Command* Program::find(const std::string& name) {
+std::vector<Command*> Program::named(const std::string& name) {
+    std::vector<Command*> found;
     for (Command& each : mCommands) {
-        if (each.mName == name) return &each;
+        if ((each.mName + " ").compare(0, name.size() + 1, name + " ") == 0) found.push_back(&each);
     }
-    return nullptr;
+    return found;
 }
 
 std::vector<Choice> Program::commandsAfter(const std::string& typed) const {
@@ -150,8 +143,8 @@ int Program::run(int argc, char** argv) {
     std::cout.flush();
     std::cout.rdbuf(before);
     if (output.error() == 0) return code;
-    std::cerr << mName
-              << ": standard output cannot be written: " << strerror(output.error()) << '\n';
+    std::cerr << mName << ": standard output cannot be written: " << strerror(output.error())
+              << '\n';
     return kFailed;
 }
 

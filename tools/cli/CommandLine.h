@@ -50,12 +50,13 @@ using Value = std::shared_ptr<const T>;
 
 /** An argument or an option. */
 struct Argument {
-    /** "MS", or "--strength" for an option. */
+    /** As helps show it: "MS", or "-o, --output FILE" for an option. */
+    std::string title;
+    /** "MS", or "--output". */
     std::string name;
-    /** The option's letter; most have none. */
+    /** The option's letter, if it has one. */
     char letter = 0;
-    /** What stands for the option's value; empty for a flag. */
-    std::string placeholder;
+    bool isFlag = false;
     std::string help;
     std::vector<Choice> choices;
     bool isFile = false;
@@ -70,16 +71,24 @@ struct Argument {
     std::function<void(const std::string& word)> read;
 
     bool isOption() const { return name[0] == '-'; }
-    bool isFlag() const { return isOption() && placeholder.empty(); }
 };
 
 /**
  * A command with its arguments and options. An argument's name is in capitals, an option's begins
- * with dashes and is followed by what stands for its value: "MS", "--wait SECONDS". An argument
- * without an initial value must be given; an option without one has the value 0, or no text.
+ * with dashes and is followed by what stands for its value: "MS", "--wait SECONDS",
+ * "-o, --output FILE". An argument without an initial value must be given; an option without one
+ * has the value 0, or no text.
  */
 class Command {
   public:
+    Command() = default;
+    /** For Program::command(). */
+    Command(std::string group, std::string name, std::string help, std::string example)
+        : mGroup(std::move(group)),
+          mName(std::move(name)),
+          mHelp(std::move(help)),
+          mExample(std::move(example)) {}
+
     /** A number, a time or a strength. @param initial in the unit of a number alone. */
     Value<uint32_t> number(const std::string& name, const Numbers& numbers, const std::string& help,
                            std::optional<uint32_t> initial = {});
@@ -136,8 +145,8 @@ class Command {
     Value<T> add(const std::string& name, const std::string& help, const std::string& range,
                  const std::optional<T>& initial, const std::string& shown, const Read& read);
 
-    std::string mName;
     std::string mGroup;
+    std::string mName;
     std::string mHelp;
     std::string mExample;
     std::vector<std::string> mNotes;
@@ -165,7 +174,9 @@ class Program {
      * @param example arguments that make sense.
      */
     Command& command(const std::string& group, const std::string& name, const std::string& help,
-                     const std::string& example);
+                     const std::string& example) {
+        return mCommands.emplace_back(group, name, help, example);
+    }
     /** Takes a word that no help shows for the first word of a command. */
     void addSecondName(const std::string& second, const std::string& first) {
         mSecondNames[second] = first;
@@ -191,13 +202,14 @@ class Program {
     void addHelp();
     /** Does what a command line asks for. */
     int obey(const std::vector<std::string>& words);
-    Command* find(const std::string& name);
+    /** @return the command with a name, or all whose names begin with its words. */
+    std::vector<Command*> named(const std::string& name);
     /** @return the words that may follow those of a command, with what they mean. */
     std::vector<Choice> commandsAfter(const std::string& typed) const;
     /** Prints the help of the commands with a name, or of the program. */
     void help(const std::string& name);
-    void helpProgram() const;
-    void helpCommand(const Command& command) const;
+    void help() const;
+    void help(const Command& command) const;
 
     std::string mName;
     std::string mVersion;

@@ -30,10 +30,7 @@ void printList(const std::string& heading, const std::vector<Choice>& list) {
 void printList(const std::string& heading, const std::deque<Argument>& arguments, bool isOptions) {
     std::vector<Choice> list;
     for (const Argument& each : arguments) {
-        if (each.isOption() != isOptions) continue;
-        const std::string letter = each.letter == 0 ? "" : std::string{'-', each.letter, ',', ' '};
-        const std::string placeholder = (each.placeholder.empty() ? "" : " ") + each.placeholder;
-        list.push_back({letter + each.name + placeholder, each.help});
+        if (each.isOption() == isOptions) list.push_back({each.title, each.help});
     }
     printList(heading, list);
 }
@@ -72,18 +69,16 @@ void Program::addHelp() {
 }
 
 void Program::help(const std::string& name) {
-    if (name.empty()) return helpProgram();
-    if (const Command* command = find(name)) return helpCommand(*command);
-    const std::vector<Choice> commands = commandsAfter(name);
-    if (commands.empty()) {
-        throw UsageError("no command " + inQuotes(name) +
-                         suggestion(name, valuesOf(commandsAfter(""))));
-    }
-    for (const Choice& each : commands)
-        helpCommand(*find(name + " " + each.value));
+    if (name.empty()) return help();
+    const std::vector<Command*> commands = named(name);
+    for (const Command* each : commands)
+        help(*each);
+    if (!commands.empty()) return;
+    throw UsageError("no command " + inQuotes(name) +
+                     suggestion(name, valuesOf(commandsAfter(""))));
 }
 
-void Program::helpProgram() const {
+void Program::help() const {
     std::cout << "Usage: " << mName << " [OPTION...] COMMAND [ARGUMENT...]\n"
               << wrap(mShared.mHelp, 0);
     std::vector<std::pair<std::string, std::vector<Choice>>> groups;
@@ -100,7 +95,7 @@ void Program::helpProgram() const {
         std::cout << '\n' << wrap(note, 0);
 }
 
-void Program::helpCommand(const Command& command) const {
+void Program::help(const Command& command) const {
     const auto& arguments = command.mArguments;
     const bool hasOptions = std::any_of(arguments.begin(), arguments.end(),
                                         [](const Argument& each) { return each.isOption(); });

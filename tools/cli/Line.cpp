@@ -14,16 +14,10 @@ namespace cli {
 class Line {
   public:
     explicit Line(Program& program) : mProgram(&program) { begin(nullptr); }
-    explicit Line(Command& step) {
-        for (Argument& each : step.mArguments) {
-            each.reset();
-            each.isGiven = false;
-        }
-        begin(&step);
-    }
+    explicit Line(Command& step) { begin(&step); }
 
+    /** @return the command that was recognised, or nullptr; and its words, as far as they go. */
     Command* command() const { return mCommand; }
-    /** @return the words of the command, as far as they go. */
     const std::string& typed() const { return mTyped; }
 
     /** Reads words, as far as they make sense. */
@@ -104,6 +98,10 @@ class Line {
 
     /** Goes on with the options of a command; of nullptr, with those that stand before it. */
     void begin(Command* command) {
+        for (Argument& each : (command != nullptr ? *command : mProgram->mShared).mArguments) {
+            each.reset();
+            each.isGiven = false;
+        }
         mCommand = command;
         mOptions.clear();
         mTable.clear();
@@ -119,11 +117,11 @@ class Line {
         for (Argument& each : command.mArguments) {
             if (!each.isOption() || (isStep() && each.isFile)) continue;
             const int number = kBehindLetters + static_cast<int>(mOptions.size());
-            const int takes = each.isFlag() ? no_argument : required_argument;
+            const int takes = each.isFlag ? no_argument : required_argument;
             mTable.push_back({each.name.c_str() + 2, takes, nullptr,
                               each.letter != 0 ? each.letter : number});
             mOptions.push_back(&each);
-            if (each.letter != 0) mLetters += each.letter + std::string(each.isFlag() ? "" : ":");
+            if (each.letter != 0) mLetters += each.letter + std::string(each.isFlag ? "" : ":");
         }
     }
 
@@ -186,20 +184,21 @@ class Line {
         const auto second = mProgram->mSecondNames.find(mTyped.empty() ? given : "");
         const std::string word = second == mProgram->mSecondNames.end() ? given : second->second;
         const std::string name = mTyped + (mTyped.empty() ? "" : " ") + word;
-        const std::vector<std::string> known = valuesOf(mProgram->commandsAfter(mTyped));
-        if (std::find(known.begin(), known.end(), word) == known.end()) {
-            return complain("no command " + inQuotes(name) + suggestion(word, known));
+        const std::vector<Command*> found = mProgram->named(name);
+        if (found.empty()) {
+            return complain("no command " + inQuotes(name) +
+                            suggestion(word, valuesOf(mProgram->commandsAfter(mTyped))));
         }
         mTyped = name;
-        if (Command* found = mProgram->find(name)) begin(found);
+        if (found[0]->name() == name) begin(found[0]);
     }
 
     /** @return the argument that a word is for which is no option; nullptr for none. */
     Argument* argumentFor(const std::string& word) const {
         Argument* found = nullptr;
         for (Argument& each : mCommand->mArguments) {
-            if (isStep() && each.isFlag() && each.name == "--" + word) return &each;
-            const bool isNamed = isStep() ? each.isFlag() || each.isFile : each.isOption();
+            if (isStep() && each.isFlag && each.name == "--" + word) return &each;
+            const bool isNamed = isStep() ? each.isFlag || each.isFile : each.isOption();
             if (found == nullptr && !isNamed && (each.isMany || !each.isGiven)) found = &each;
         }
         return found;

@@ -109,7 +109,7 @@ void addPlot(Client& client) {
     cli::Command& command = client.command(kTools, "plot", "draw what the driver was told",
                                            "--last 10s -o plot.svg");
     const auto traffic = addTraffic(command);
-    const auto output = command.file("-o,--output FILE",
+    const auto output = command.file("-o, --output FILE",
                                      "picture to draw, .svg or .png, by gnuplot; - for standard "
                                      "output; without it, text",
                                      "");
