@@ -40,12 +40,21 @@ std::string expanded(Layout layout, const std::string& step) {
 }
 
 Step parseAccess(const std::string& text) {
-    // The node, a fault of its opening, the kind, a read's size, its mode, the number or the text,
-    // and a fault of the transfer.
+    // The text is taken out first: the pattern would need stack for each of its characters.
+    const size_t first = text.find('"');
+    const size_t last = text.rfind('"');
+    std::string quoted;
+    std::string rest = text;
+    if (first != last) {
+        quoted = text.substr(first + 1, last - first - 1);
+        rest.erase(first + 1, quoted.size());
+    }
+    // The node, a fault of its opening, the kind, a read's size, its mode, the number or the text's
+    // marks, and a fault of the transfer.
     static const std::regex pattern(
-            R"re((\w+)(?:!(\w+))?(\?r?|=|:(\d+)(r?)=)(-?\d+)?(?:"([^"]*)")?(?:!(\w+))?)re");
+            R"re((\w+)(?:!(\w+))?(\?r?|=|:(\d+)(r?)=)(-?\d+)?("")?(?:!(\w+))?)re");
     std::smatch parts;
-    if (!std::regex_match(text, parts, pattern)) {
+    if (!std::regex_match(rest, parts, pattern)) {
         std::cerr << "\"" << text << "\" is no step\n";
         abort();
     }
@@ -56,7 +65,7 @@ Step parseAccess(const std::string& text) {
     step.size = kind == ':' ? std::stoul(parts[4]) : 0;
     step.isPrimitive = kind == '?' || (kind == '=' ? !parts[7].matched : step.size == 7);
     step.readsOnly = parts[3] == "?r" || parts[5] == "r" || step.size == 7;
-    step.text = parts[7].matched ? parts.str(7) : parts.str(6) + "\\n";
+    step.text = parts[7].matched ? quoted : parts.str(6) + "\\n";
     if (parts[2].matched) step.faults["open"] = parts[2];
     if (parts[8].matched) {
         const std::string fault = parts[8];
