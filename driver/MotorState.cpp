@@ -35,24 +35,20 @@ int MotorState::perform(const model::Action& action) {
 
 int MotorState::act(const model::RunMotor& action) {
     constexpr uint64_t kMost = std::numeric_limits<int32_t>::max();
-    Choice choice{{{static_cast<uint32_t>(std::min(action.milliseconds, kMost)), kFullStrength}},
-                  {}};
-    if (mChoice) choice = std::move(*mChoice);
+    const auto milliseconds = static_cast<uint32_t>(std::min(action.milliseconds, kMost));
+    Performance performance{{{milliseconds, kFullStrength}}};
+    if (mChoice) performance = std::move(*mChoice);
     mChoice.reset();
-    if (action.milliseconds == 0) return mPlayer.stop(), 0;
-    if (mIsExternal) return -EBUSY;
-    mFollows = !choice.scale;
-    return mPlayer.start(std::move(choice.segments), choice.scale.value_or(mStrength),
-                         choice.repeats);
+    if (milliseconds == 0) return mPlayer.stop(), 0;
+    return mIsExternal ? -EBUSY : mPlayer.start(std::move(performance));
 }
 
 int MotorState::act(const model::SetIntensity& action) {
-    mStrength = static_cast<uint32_t>(action.value);
-    return mFollows ? mPlayer.setScale(mStrength) : 0;
+    return mPlayer.setStrength(static_cast<uint32_t>(action.value));
 }
 
 int MotorState::act(const model::SetPackets& action) {
-    mChoice = Choice{{}, kFullStrength};
+    mChoice = Performance{{}, kFullStrength};
     for (const model::Packet& packet : action.packets) {
         mChoice->segments.push_back(segmentOf(packet));
     }
@@ -73,7 +69,7 @@ int MotorState::act(const model::SetQueue& action) {
 
 int MotorState::choosePattern(int number, std::optional<uint32_t> scale, bool repeats) {
     if (number < 1 || static_cast<size_t>(number) > mPatterns.size()) return -EINVAL;
-    mChoice = Choice{mPatterns[static_cast<size_t>(number) - 1], scale, repeats};
+    mChoice = Performance{mPatterns[static_cast<size_t>(number) - 1], scale, repeats};
     return 0;
 }
 

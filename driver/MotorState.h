@@ -23,14 +23,6 @@ class MotorState : public model::State {
     int perform(const model::Action& action) override;
 
   private:
-    /** What a start of the motor plays. */
-    struct Choice {
-        std::vector<Segment> segments;
-        /** nullopt: the strength of the motor, also when it changes meanwhile. */
-        std::optional<uint32_t> scale;
-        bool repeats = false;
-    };
-
     int act(std::monostate) { return 0; }
     int act(const model::RunMotor& action);
     int act(const model::SetIntensity& action);
@@ -44,10 +36,7 @@ class MotorState : public model::State {
     const std::vector<std::vector<Segment>> mPatterns;
     std::map<std::string, std::string> mTexts;
     /** For the next start; without it the motor just runs. */
-    std::optional<Choice> mChoice;
-    uint32_t mStrength = kFullStrength;
-    /** Whether what is played follows the strength of the motor. */
-    bool mFollows = true;
+    std::optional<Performance> mChoice;
     bool mIsExternal = false;
 };
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Nodes.h"
 
+#include "TraceFile.h"
 #include "TraceLine.h"
 
 #define FUSE_USE_VERSION 35
@@ -25,7 +26,7 @@ struct Nodes::Requests {
     static long trace(const char* path, const std::string& access, long result,
                       const std::string& shown = {}) {
         const std::string name = model::traceName("/sys/class" + std::string(path));
-        nodes().mTrace(name + ' ' + access, result, shown);
+        simulator::trace(nodes().mTrace, name + ' ' + access, result, shown);
         return result;
     }
 
@@ -40,10 +41,6 @@ struct Nodes::Requests {
         const auto found = nodes().mFiles.find(path);
         if (found == nodes().mFiles.end()) return -ENOENT;
         *info = found->second;
-        return 0;
-    }
-    static int setMode(const char* path, mode_t mode, fuse_file_info* /* file */) {
-        nodes().mFiles[path].st_mode = mode;
         return 0;
     }
     static int setOwner(const char* path, uid_t owner, gid_t group, fuse_file_info* /* file */) {
@@ -95,16 +92,16 @@ struct Nodes::Requests {
     }
 };
 
-Nodes::Nodes(int file, model::Layout layout, model::State& state, Loop& loop, Trace trace)
+Nodes::Nodes(int file, model::Layout layout, model::State& state, Loop& loop,
+             const std::string& trace)
     : mState(state),
-      mTrace(std::move(trace)),
+      mTrace(trace),
       mDirectory(std::string(model::sysfsDirectory(layout)).substr(strlen("/sys/class"))) {
     for (size_t end = 0; end != std::string::npos; end = mDirectory.find('/', end + 1))
         addFile(mDirectory.substr(0, std::max<size_t>(end, 1)), S_IFDIR | 0755);
     fuse_operations requests{};
     requests.init = Requests::begin;
     requests.getattr = Requests::getAttributes;
-    requests.chmod = Requests::setMode;
     requests.chown = Requests::setOwner;
     requests.truncate = Requests::setSize;
     requests.readdir = Requests::list;

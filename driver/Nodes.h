@@ -2,11 +2,11 @@
 #pragma once
 
 #include "Attributes.h"
+#include "Folder.h"
 #include "Loop.h"
 
 #include <sys/stat.h>
 
-#include <functional>
 #include <map>
 #include <string>
 
@@ -36,8 +36,13 @@ class Nodes {
     /** Gets each access, as model::traceLine does. */
     using Trace =
             std::function<void(const std::string& access, long result, const std::string& shown)>;
-    /** @param file where the kernel asks. @throw std::runtime_error */
-    Nodes(int file, model::Layout layout, model::State& state, Loop& loop, Trace trace);
+    /**
+     * @param file where the kernel asks.
+     * @param trace gets each access; a directory that is no driver's for no trace.
+     * @throw std::runtime_error
+     */
+    Nodes(int file, model::Layout layout, model::State& state, Loop& loop,
+          const std::string& trace);
 
     /** Adds a file for an attribute. */
     void add(const std::string& leaf, mode_t mode);
@@ -48,7 +53,7 @@ class Nodes {
     void addFile(const std::string& path, mode_t mode);
 
     model::State& mState;
-    Trace mTrace;
+    const simulator::Folder mTrace;
     /** The attributes' directory, with a slash at its end. */
     std::string mDirectory;
     /** By path; directories, too. */

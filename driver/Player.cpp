@@ -37,42 +37,43 @@ Player::Player(Device device, Loop& loop)
     });
 }
 
-int Player::start(std::vector<Segment> segments, uint32_t scale, bool repeats) {
+int Player::start(Performance performance) {
     if (!mMotor.isThere()) return -ENODEV;
-    mSegments = std::move(segments);
-    mScale = scale;
+    mPlayed = std::move(performance);
     mIndex = 0;
     mNext = mEnd = now();
-    for (const Segment& segment : mSegments)
+    for (const Segment& segment : mPlayed.segments)
         mEnd += segment.milliseconds * kMillisecond;
-    mRepeats = repeats && mEnd > mNext;
-    if (!mSegments.empty()) mNext += mSegments[0].milliseconds * kMillisecond;
+    mPlayed.repeats = mPlayed.repeats && mEnd > mNext;
+    if (!mPlayed.segments.empty()) mNext += mPlayed.segments[0].milliseconds * kMillisecond;
     return advance();
 }
 
-int Player::setScale(uint32_t scale) {
-    mScale = scale;
-    return mIndex < mSegments.size() ? apply() : 0;
+int Player::setStrength(uint32_t strength) {
+    mStrength = strength;
+    return mIndex < mPlayed.segments.size() && !mPlayed.scale ? apply() : 0;
 }
 
 void Player::stop() {
-    mSegments.clear();
+    mPlayed = {};
     mIndex = 0;
     mMotor.stop();
     setTimer(0);
 }
 
 int64_t Player::remaining() const {
-    if (mIndex >= mSegments.size()) return 0;
-    if (mRepeats) return std::numeric_limits<int32_t>::max();
+    if (mIndex >= mPlayed.segments.size()) return 0;
+    if (mPlayed.repeats) return std::numeric_limits<int32_t>::max();
     return std::max<int64_t>(0, (mEnd - now() + kMillisecond - 1) / kMillisecond);
 }
 
 /** Has the motor do what the current segment says. @return 0, or a negative errno. */
 int Player::apply() {
-    if (mIndex >= mSegments.size()) return stop(), 0;
-    const Segment& segment = mSegments[mIndex];
-    const uint32_t strength = (segment.strength * mScale + kFullStrength / 2) / kFullStrength;
+    if (mIndex >= mPlayed.segments.size()) return stop(), 0;
+    const Segment& segment = mPlayed.segments[mIndex];
+    const uint32_t strength =
+            (segment.strength * mPlayed.scale.value_or(mStrength) + kFullStrength / 2) /
+            kFullStrength;
     const int64_t left = std::min(remaining(), kLongestEffect);
     int error = 0;
     if (strength == 0) {
@@ -91,10 +92,11 @@ int Player::apply() {
 /** Goes on to the segment whose time it is. @return 0, or a negative errno. */
 int Player::advance() {
     const int64_t time = now();
-    while (mIndex < mSegments.size() && mNext <= time) {
+    while (mIndex < mPlayed.segments.size() && mNext <= time) {
         ++mIndex;
-        if (mIndex == mSegments.size() && mRepeats) mIndex = 0;
-        if (mIndex < mSegments.size()) mNext += mSegments[mIndex].milliseconds * kMillisecond;
+        if (mIndex == mPlayed.segments.size() && mPlayed.repeats) mIndex = 0;
+        if (mIndex < mPlayed.segments.size())
+            mNext += mPlayed.segments[mIndex].milliseconds * kMillisecond;
     }
     return apply();
 }

@@ -3,6 +3,7 @@
 
 #include "Motor.h"
 
+#include <optional>
 #include <vector>
 
 namespace driver {
@@ -14,6 +15,15 @@ struct Segment {
     uint32_t strength;
 };
 
+/** What to play. */
+struct Performance {
+    std::vector<Segment> segments;
+    /** What kFullStrength of the segments stands for; none: the strength of the motor. */
+    std::optional<uint32_t> scale = {};
+    /** Whether it begins again until it is stopped. */
+    bool repeats = false;
+};
+
 /**
  * Plays strengths one after the other on a motor. It wakes up only when one follows another. Lives
  * as long as its process.
@@ -23,16 +33,10 @@ class Player {
     /** @throw std::system_error if the device cannot be used. */
     Player(Device device, Loop& loop);
 
-    /**
-     * Plays from now on, in place of what it played.
-     *
-     * @param scale what kFullStrength stands for.
-     * @param repeats whether it begins again until it is stopped.
-     * @return 0, or a negative errno.
-     */
-    int start(std::vector<Segment> segments, uint32_t scale, bool repeats = false);
-    /** Changes the scale of what is playing. @return 0, or a negative errno. */
-    int setScale(uint32_t scale);
+    /** Plays from now on, in place of what it played. @return 0, or a negative errno. */
+    int start(Performance performance);
+    /** Sets the strength of the motor, for what plays, too. @return 0, or a negative errno. */
+    int setStrength(uint32_t strength);
     void stop();
     /** @return the time left in ms, rounded up; of what repeats the most that there is. */
     int64_t remaining() const;
@@ -44,9 +48,8 @@ class Player {
 
     int mTimer;
     Motor mMotor;
-    std::vector<Segment> mSegments;
-    bool mRepeats = false;
-    uint32_t mScale = 0;
+    Performance mPlayed;
+    uint32_t mStrength = kFullStrength;
     /** The segment that is played; past the end: none. */
     size_t mIndex = 0;
     /** When that one ends, and when the last one does, in ns. */

@@ -5,7 +5,6 @@
 #include "Nodes.h"
 #include "Session.h"
 #include "SimulatedDriver.h"
-#include "TraceFile.h"
 
 #include <fcntl.h>
 #include <poll.h>
@@ -79,8 +78,9 @@ int takeFileSystem(pid_t process) {
     throw std::runtime_error("process " + std::to_string(process) + " serves no nodes");
 }
 
-/** Serves the nodes until they are unmounted. @param traceDirectory empty for no trace. */
-void serve(const Setup& setup, int file, const std::string& traceDirectory) {
+/** Serves the nodes until they are unmounted. @param trace the directory of the trace; empty for
+ * none. */
+void serve(const Setup& setup, int file, const std::string& trace) {
     const auto patterns = parsePatterns(setup.patterns);
     model::Features features;
     for (const std::string& name : model::featureNames())
@@ -89,11 +89,7 @@ void serve(const Setup& setup, int file, const std::string& traceDirectory) {
     Loop loop;
     Player player(setup.device, loop);
     MotorState state(player, patterns);
-    const simulator::Folder folder(traceDirectory);
-    Nodes nodes(file, setup.layout, state, loop,
-                [&](const std::string& access, long result, const std::string& shown) {
-                    if (!traceDirectory.empty()) simulator::trace(folder, access, result, shown);
-                });
+    Nodes nodes(file, setup.layout, state, loop, trace);
     for (const model::Attribute& attribute : model::attributes()) {
         if (!attribute.isIn(setup.layout, features)) continue;
         state.setText(attribute.leaf, attribute.initialText(features));

@@ -296,17 +296,72 @@ TEST_F(DriverTest, RestsWithTheMotor) {
     const int before = switches();
     wait(10000);
     EXPECT_LE(switches() - before, 2);
+}
 
-    std::vector<double> times;
+/** Prints rows for scripts/bench. */
+TEST_F(DriverTest, CostsLittle) {
+    ASSERT_NO_FATAL_FAILURE(serve(kPad, "timed"));
+    const std::string root = "/proc/" + std::to_string(find("vibrator-motor")) + "/root";
+    double times[2];
+    for (const bool isNode : {true, false}) {
+        const std::string path =
+                isNode ? root + "/sys/class/timed_output/vibrator/intensity" : "/dev/shm/file";
+        const double start = nowInMs();
+        for (int i = 0; i < 1000; ++i) {
+            const int file = open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0600);
+            EXPECT_EQ(write(file, "5000\n", 5), 5);
+            close(file);
+        }
+        times[isNode ? 0 : 1] = (nowInMs() - start) * 1000;
+    }
+    printf("%-49s %9.0f ns  %9.0f ns  %6.2f\n", "write of a motor's node : of a file on tmpfs",
+           times[0], times[1], times[0] / times[1]);
+    std::vector<double> calls;
     for (int i = 0; i < 200; ++i) {
         const double start = nowInMs();
         mVibrator->on(3);
         wait(6);
-        times.push_back((mMotor->takeChanges().at(0).time - start) * 1000);
+        calls.push_back((mMotor->takeChanges().at(0).time - start) * 1e6);
     }
-    std::sort(times.begin(), times.end());
-    std::cout << "from the call of on to the motor's event: median " << times[100]
-              << " us, greatest " << times.back() << " us\n";
+    std::sort(calls.begin(), calls.end());
+    printf("%-49s %9.0f ns  %9.0f ns\n", "call of on to the motor's event: median, greatest",
+           calls[100], calls.back());
+}
+
+/** As the units do: the driver has no rights, root mounts, and the service sees the mount alone. */
+TEST_F(DriverTest, ServesAnotherUsersService) {
+    mKind = kPad;
+    plugIn();
+    ChildProcess driver;
+    driver.startProgram({kDriver, "serve", "--device", mMotor->path()}, kLog, {}, 1500);
+    const Outcome mounted =
+            runProgram({kDriver, "mount", std::to_string(driver.pid()), "/run/driver/class"});
+    ASSERT_EQ(mounted.exitCode, 0) << mounted.errors;
+    runProgram({"/bin/sh", "-c",
+                "chown 1000 /run/driver/class/timed_output/vibrator/*; "
+                "mkdir -p /run/sockets; chown 1000:1000 /run/sockets"});
+    setenv("HWBINDER_DIR", "/run/sockets", 1);
+    mSession.startProgram(
+            {"/bin/unshare", "-m", "/bin/sh", "-c",
+             "mount --bind /run/driver/class /sys/class; exec start-stop-daemon -S -c system "
+             "-x /sbin/vendor.velmora.hardware.vibrator@2.1-service"},
+            kLog, {});
+    mVibrator = IDaxVibrator::getService();
+    ASSERT_NE(mVibrator, nullptr) << readFile(kLog);
+    mMotor->takeChanges();
+    const double start = nowInMs();
+    EXPECT_EQ(inWords(mVibrator->on(50)), "OK");
+    expectRuns(start, {{10000, 50}});
+    // Others may read the nodes.
+    const std::string write = "echo 5 >/run/driver/class/timed_output/vibrator/enable";
+    EXPECT_EQ(runProgram({"/bin/sh", "-c", write}, 1000).exitCode, 0);
+    EXPECT_EQ(runProgram({"/bin/sh", "-c", write}, 2000).exitCode, 1);
+    EXPECT_EQ(runProgram({"/bin/cat", "/run/driver/class/timed_output/vibrator/input_device"}, 2000)
+                      .output,
+              mMotor->path() + " rumble\n");
+    mSession.kill();
+    EXPECT_EQ(runProgram({"/bin/umount", "/run/driver/class"}).exitCode, 0);
+    EXPECT_TRUE(eventually([&] { return !driver.isAlive(); })) << "without files to serve it ends";
 }
 
 }  // namespace
