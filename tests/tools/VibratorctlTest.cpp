@@ -68,7 +68,7 @@ TEST_F(VibratorctlTest, TheManualNamesTheMembersOfTheJson) {
     const std::string score = mDirectory.path() + "/score";
     std::ofstream(score) << "click";
     std::set<std::string> printed;
-    const std::vector<std::string> commands = {"on 5",
+    const std::vector<std::string> commands = {"on 5 --strength 7",
                                                "intensity 0",
                                                "pattern count",
                                                "pattern play 13",

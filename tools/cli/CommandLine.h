@@ -177,7 +177,7 @@ class Program {
                      const std::string& example) {
         return mCommands.emplace_back(group, name, help, example);
     }
-    /** Takes a word that no help shows for the first word of a command. */
+    /** Takes a name that no help shows for the first word of a command, or for an option. */
     void addSecondName(const std::string& second, const std::string& first) {
         mSecondNames[second] = first;
     }

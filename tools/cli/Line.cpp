@@ -109,6 +109,7 @@ class Line {
         mLetters = "-:0::1::2::3::4::5::6::7::8::9::";
         if (mCommand != nullptr) addOptionsOf(*mCommand);
         if (!isStep()) addOptionsOf(mProgram->mShared);
+        if (!isStep()) addSecondNames();
         mTable.push_back({});
     }
 
@@ -122,6 +123,16 @@ class Line {
                               each.letter != 0 ? each.letter : number});
             mOptions.push_back(&each);
             if (each.letter != 0) mLetters += each.letter + std::string(each.isFlag ? "" : ":");
+        }
+    }
+
+    void addSecondNames() {
+        for (const auto& [second, first] : mProgram->mSecondNames) {
+            for (size_t i = 0; i < mOptions.size(); ++i) {
+                if (mOptions[i]->name != first) continue;
+                mTable.push_back(mTable[i]);
+                mTable.back().name = second.c_str() + 2;
+            }
         }
     }
 

@@ -9,14 +9,14 @@ void addCommands(Client& client) {
         add(client);
     }
     client.addSecondName("prebaked", "pattern");
+    client.addSecondName("--amplitude", "--intensity");
 }
 
 void addCall(Client& client, cli::Command& command, const OneArgument& argument,
-             Operation operation, const Call& call) {
+             const Operation& operation, const Call& call) {
     std::function<uint32_t()> number;
     if (argument.choices.empty()) {
         const auto value = command.number(argument.name, argument.numbers, argument.help);
-        operation.range = std::string(argument.numbers.what) + " is " + argument.numbers.range();
         number = [value] { return *value; };
     } else {
         const auto value = command.choice(argument.name, argument.choices, argument.help);

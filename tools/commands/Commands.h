@@ -54,6 +54,6 @@ void wait(uint32_t ms);
 
 /** Adds a command that makes one call with one argument, and that is also a step of scores. */
 void addCall(Client& client, cli::Command& command, const OneArgument& argument,
-             Operation operation, const Call& call);
+             const Operation& operation, const Call& call);
 
 }  // namespace vibratorctl

@@ -40,11 +40,10 @@ void addCount(Client& client) {
     });
 }
 
-int playPattern(const Client& client, uint32_t pattern, uint32_t amplitude, bool isRepeated) {
+int playPattern(const Client& client, uint32_t pattern, uint32_t intensity, bool isRepeated) {
     const Operation operation = {"daxPerformPrebakedHapticPattern",
                                  true,
-                                 {"cp_trigger_index", "intensity", "cp_trigger_queue"},
-                                 "an amplitude is " + kIntensities.range()};
+                                 {"cp_trigger_index", "intensity", "cp_trigger_queue"}};
     Answer answer{std::to_string(pattern)};
     uint32_t count = 0;
     if (countPatterns(client, &count) == VibratorStatus::OK && pattern > count) {
@@ -53,7 +52,7 @@ int playPattern(const Client& client, uint32_t pattern, uint32_t amplitude, bool
     }
     return client.report().answer(
             operation,
-            client.service()->daxPerformPrebakedHapticPattern(pattern, amplitude, isRepeated),
+            client.service()->daxPerformPrebakedHapticPattern(pattern, intensity, isRepeated),
             answer);
 }
 
@@ -61,12 +60,12 @@ void addPattern(Client& client) {
     constexpr cli::Numbers kPatterns = {"the number of a pattern", 0, INT32_MAX};
     cli::Command& command =
             client.command(kRestricted, "pattern play", "play a pattern that the driver has stored",
-                           "3 --amplitude 5000");
+                           "3 --intensity 5000");
     const auto pattern = command.number("PATTERN", kPatterns, "0 selects without playing");
-    const auto amplitude = command.number("--amplitude N", kIntensities,
+    const auto intensity = command.number("--intensity N", kIntensities,
                                           "how strong; 10000 is full", kIntensities.most);
     const auto isRepeated = command.flag("--repeat", "play it through the driver's queue");
-    command.run([=, &client] { return playPattern(client, *pattern, *amplitude, *isRepeated); });
+    command.run([=, &client] { return playPattern(client, *pattern, *intensity, *isRepeated); });
     client.steps.push_back({"pattern", &command, [=]() -> std::optional<double> {
                                 if (*pattern == 0) return std::nullopt;
                                 return product::kPatternMs;
@@ -91,41 +90,29 @@ Packets readPackets(const std::vector<std::string>& words, const std::string& fi
     return packets;
 }
 
-/**
- * Checks that no intensity overflows 32 bits, in which the service multiplies it by the amplitude.
- *
- * @throw cli::UsageError
- */
-void checkScaling(const Packets& packets, uint32_t amplitude) {
-    const uint32_t most = UINT32_MAX / amplitude;
-    for (const auto& packet : packets) {
-        if (packet.intensity >= 0 && static_cast<uint32_t>(packet.intensity) <= most) continue;
-        throw cli::UsageError("intensity " + std::to_string(packet.intensity) +
-                              " cannot be scaled by amplitude " + std::to_string(amplitude) +
-                              "; it is 0 to " + std::to_string(most));
-    }
-}
-
-/** @return the limit that packets, or their amplitude, go beyond; empty if they keep to all. */
-std::string limitOf(const Packets& packets, uint32_t amplitude) {
+/** Refuses what the service would refuse, or what would overflow in it. @throw cli::UsageError */
+void checkPackets(const Packets& packets, uint32_t intensity) {
     if (packets.size() > kMaxPackets) {
-        return std::to_string(packets.size()) + " packets are more than " +
-               std::to_string(kMaxPackets);
+        throw cli::UsageError(std::to_string(packets.size()) + " packets are more than " +
+                              std::to_string(kMaxPackets));
     }
-    if (!product::isAmplitude(amplitude)) return "an amplitude is " + kIntensities.range();
+    // The service multiplies in 32 bits.
+    const uint32_t most = UINT32_MAX / intensity;
     for (const auto& packet : packets) {
+        if (packet.intensity < 0 || static_cast<uint32_t>(packet.intensity) > most) {
+            throw cli::UsageError("intensity " + std::to_string(packet.intensity) +
+                                  " cannot be scaled by " + std::to_string(intensity) +
+                                  "; it is 0 to " + std::to_string(most));
+        }
         for (const int32_t value : {packet.param0, packet.param2, packet.param3}) {
             if (!product::isEngineValue(value))
-                return std::to_string(value) + " has more than 8 characters";
+                throw cli::UsageError(std::to_string(value) + " has more than 8 characters");
         }
     }
-    return "";
 }
 
-/** Refuses what the service would refuse. @return how long the packets last, in ms. */
-double judgePackets(const Packets& packets, uint32_t amplitude) {
-    if (const std::string limit = limitOf(packets, amplitude); !limit.empty())
-        throw cli::UsageError(limit);
+/** @return how long packets are taken to last, in ms. */
+double lengthOf(const Packets& packets) {
     double length = 0;
     for (const auto& packet : packets)
         length += std::max(0, packet.param0);
@@ -135,32 +122,30 @@ double judgePackets(const Packets& packets, uint32_t amplitude) {
 void addEngine(Client& client) {
     cli::Command& command =
             client.command(kRestricted, "engine", "play a waveform packet by packet",
-                           "10,5000,150,0 20,10000,200,1 --amplitude 5000");
+                           "10,5000,150,0 20,10000,200,1 --intensity 5000");
     const auto file =
             command.file("--file FILE", "CSV or JSON file of packets; - is standard input", "");
-    const auto amplitude =
-            command.number("--amplitude N", kIntensities,
+    const auto intensity =
+            command.number("--intensity N", kIntensities,
                            "scales the intensities; 10000 leaves them", kIntensities.most);
     const auto words = command.words("PACKET", "PARAM0,INTENSITY,PARAM2,PARAM3, whole numbers",
                                      [](const std::string& word) { readPackets({word}, ""); });
     const auto packets = [=] {
         Packets read = readPackets(*words, *file);
-        checkScaling(read, *amplitude);
+        checkPackets(read, *intensity);
         return read;
     };
     command.run([=, &client] {
         const Packets read = packets();
-        const Operation operation = {
-                "daxPerformHapticEngine", true, {"haptic_engine"}, limitOf(read, *amplitude)};
+        const Operation operation = {"daxPerformHapticEngine", true, {"haptic_engine"}};
         const std::string count = std::to_string(read.size());
         return client.report().answer(operation,
-                                      client.service()->daxPerformHapticEngine(read, *amplitude),
+                                      client.service()->daxPerformHapticEngine(read, *intensity),
                                       {"",
                                        count + (read.size() == 1 ? " packet" : " packets"),
                                        {{"packets", read.size()}}});
     });
-    client.steps.push_back(
-            {"engine", &command, [=] { return judgePackets(packets(), *amplitude); }});
+    client.steps.push_back({"engine", &command, [packets] { return lengthOf(packets()); }});
 }
 
 }  // namespace

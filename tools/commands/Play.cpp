@@ -144,9 +144,10 @@ void addPlay(Client& client) {
     const auto keepsGoing =
             command.flag("--keep-going", "pass over steps that fail, and name them at the end");
     command.note(
-            "Steps: click [light|medium|strong], on MS [wait], off, wait MS, amplitude N, "
+            "Steps: click [light|medium|strong], on MS [STRENGTH] [wait], off, wait MS, amplitude "
+            "N, "
             "intensity N, "
-            "pattern N [AMPLITUDE] [repeat], engine AMPLITUDE PACKET..., external on|off, "
+            "pattern N [INTENSITY] [repeat], engine INTENSITY PACKET..., external on|off, "
             "frequency N, force-touch N, fold open|close; the steps between repeat N and end are "
             "played N times; # begins a comment. The whole score is checked before the first call. "
             "The motor is stopped when a step fails or the play is interrupted.");

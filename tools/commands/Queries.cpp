@@ -13,7 +13,7 @@ using nlohmann::ordered_json;
 
 namespace {
 
-const Operation kLadder = {"daxGetAmplitudeList", true, {}, "the type is 0 or 1"};
+const Operation kLadder = {"daxGetAmplitudeList", true};
 
 int supports(const Client& client) {
     const auto vibrator = client.service();
@@ -76,7 +76,6 @@ int ladder(const Client& client, uint32_t type) {
         return client.report().answer(kLadder, VibratorStatus::OK,
                                       {"", ladderInWords(steps), {{"ladder", steps}}});
     }
-    if (type > 1) return client.report().answer(kLadder, VibratorStatus::BAD_VALUE);
     Answer answer;
     if (mayCallRestricted()) {
         const LocalDriver driver = driverOf(*vibrator);

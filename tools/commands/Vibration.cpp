@@ -4,6 +4,8 @@
 #include "Strengths.h"
 #include "service/Queries.h"
 
+#include <cstdlib>
+
 namespace vibratorctl {
 
 namespace platform = ::android::hardware::vibrator;
@@ -89,16 +91,34 @@ void addEffect(Client& client) {
     });
 }
 
+/** Runs the motor. @param intensity set before; 0 for the one that is set. @return the exit code.
+ */
+int runMotor(const Client& client, uint32_t ms, uint32_t intensity) {
+    const ::android::sp<IDaxVibrator> vibrator = client.service();
+    Answer answer{std::to_string(ms)};
+    if (intensity != 0) {
+        const VibratorStatus status = reached(vibrator->daxSetAmplitude(intensity));
+        if (status != VibratorStatus::OK) {
+            return client.report().answer({"daxSetAmplitude", true, {"intensity"}}, status, answer);
+        }
+        const int made = atoi(driverOf(*vibrator).look("intensity").value.c_str());
+        answer.words = "intensity " + std::to_string(made);
+        answer.members["intensity"] = made;
+    }
+    return client.report().answer({"on"}, vibrator->on(ms), answer);
+}
+
 }  // namespace
 
 void addVibration(Client& client) {
     constexpr cli::Numbers kTimes = {"a time like 500, 500ms or 2s", 0, INT32_MAX, "ms"};
-    cli::Command& on = client.command(kForAll, "on", "run the motor", "500");
+    cli::Command& on = client.command(kForAll, "on", "run the motor", "500 --strength 50%");
     const auto ms = on.number("MS", kTimes, "how long");
+    const auto strength = on.number("--strength N", kIntensities,
+                                    "sets the intensity first, for root and system");
     const auto waits = on.flag("--wait", "wait until the motor has stopped");
-    on.run([&client, ms, waits] {
-        const int code =
-                client.report().answer({"on"}, client.service()->on(*ms), {std::to_string(*ms)});
+    on.run([=, &client] {
+        const int code = runMotor(client, *ms, *strength);
         if (code == cli::kSuccess && *waits) wait(*ms);
         return code;
     });

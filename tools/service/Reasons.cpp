@@ -38,10 +38,7 @@ std::string howToStop(const LocalDriver& driver) {
 
 std::string reasonOf(const Operation& operation, VibratorStatus status, const Process& service) {
     if (operation.isRestricted && !mayCallRestricted()) return notPermitted();
-    if (status == VibratorStatus::BAD_VALUE) {
-        return operation.range.empty() ? "the service does not take the value"
-                                       : "out of range: " + operation.range;
-    }
+    if (status == VibratorStatus::BAD_VALUE) return "the service does not take the value";
     if (status != VibratorStatus::UNKNOWN_ERROR &&
         status != VibratorStatus::UNSUPPORTED_OPERATION) {
         return "the service answered with a status that this client does not know: " +

@@ -18,8 +18,6 @@ struct Operation {
     bool isRestricted = false;
     /** The nodes that it needs besides those that run the motor. */
     std::vector<std::string> nodes = {};
-    /** What its arguments may be: "an amplitude is 1 to 255". */
-    std::string range = {};
 };
 
 /** @return whether this process's user may make the restricted calls. */
