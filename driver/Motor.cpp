@@ -11,6 +11,7 @@
 #include <cstring>
 #include <iostream>
 #include <system_error>
+#include <utility>
 
 namespace driver {
 namespace {
@@ -42,7 +43,7 @@ Motor::Motor(Device device, Loop& loop, std::function<void()> whenLost)
 int Motor::open(const std::string& path) {
     mFile = ::open(path.c_str(), O_RDWR | O_CLOEXEC | O_NONBLOCK);
     if (mFile < 0) return errno;
-    mEffect.id = -1;
+    mEffect = -1;
     // What another program has set stays until somebody sets it again.
     if (mDevice.hasGain) send(FF_GAIN, 0xffff);
     mLoop.watch(mFile, 0, [this] { lose(); });
@@ -96,7 +97,8 @@ bool Motor::send(uint16_t code, int32_t value) const {
 
 int Motor::run(uint32_t strength, int64_t milliseconds) {
     if (!isThere()) return -ENODEV;
-    ff_effect effect = mEffect;
+    ff_effect effect{};
+    effect.id = mEffect;
     effect.type = static_cast<uint16_t>(mDevice.effect);
     if (effect.type == FF_RUMBLE) {
         const auto magnitude = static_cast<uint16_t>(scaled(strength, 0xffff));
@@ -108,16 +110,16 @@ int Motor::run(uint32_t strength, int64_t milliseconds) {
             static_cast<uint16_t>(std::clamp<int64_t>(milliseconds, 1, kLongestEffect));
     if (ioctl(mFile, EVIOCSFF, &effect) != 0) return fail(errno);
     // A change of the strength goes on without a gap. Only a length that is renewed needs a start.
-    const bool isSame = memcmp(&effect.u, &mEffect.u, sizeof(effect.u)) == 0;
-    mEffect = effect;
-    if (mRuns && !isSame) return 0;
-    if (!send(static_cast<uint16_t>(mEffect.id), 1)) return fail(errno);
+    mEffect = effect.id;
+    const uint32_t before = std::exchange(mStrength, strength);
+    if (mRuns && before != strength) return 0;
+    if (!send(static_cast<uint16_t>(mEffect), 1)) return fail(errno);
     mRuns = true;
     return 0;
 }
 
 void Motor::stop() {
-    if (mRuns && !send(static_cast<uint16_t>(mEffect.id), 0)) fail(errno);
+    if (mRuns && !send(static_cast<uint16_t>(mEffect), 0)) fail(errno);
     mRuns = false;
 }
 

@@ -49,7 +49,9 @@ class Motor {
     std::function<void()> mWhenLost;
     int mChanges;
     int mFile = -1;
-    ff_effect mEffect{};
+    /** The number of the effect; -1 until the kernel has given one. */
+    int16_t mEffect = -1;
+    uint32_t mStrength = 0;
     bool mRuns = false;
 };
 

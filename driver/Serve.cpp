@@ -78,8 +78,7 @@ int takeFileSystem(pid_t process) {
     throw std::runtime_error("process " + std::to_string(process) + " serves no nodes");
 }
 
-/** Serves the nodes until they are unmounted. @param trace the directory of the trace; empty for
- * none. */
+/** Serves nodes until they are unmounted. @param trace directory of the trace; empty for none. */
 void serve(const Setup& setup, int file, const std::string& trace) {
     const auto patterns = parsePatterns(setup.patterns);
     model::Features features;
@@ -132,8 +131,12 @@ int runSession(const Setup& setup, const std::vector<std::string>& command) {
         setpgid(0, 0);
         prctl(PR_SET_PDEATHSIG, SIGKILL);
         prctl(PR_SET_NAME, "vibrator-motor");
-        serve(setup, file, directory);
-        _exit(0);
+        try {
+            serve(setup, file, directory);
+        } catch (const std::exception& error) {
+            std::cerr << "vibrator-driver: run: " << error.what() << std::endl;
+        }
+        _exit(1);
     });
     // Without the server the nodes are gone.
     close(file);

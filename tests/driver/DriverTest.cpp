@@ -260,6 +260,8 @@ TEST_F(DriverTest, RunsForAnOrdinaryUser) {
     };
     EXPECT_EQ(run({"vibratorctl", "on", "50"}).output, "on 50: OK\n");
     EXPECT_EQ(run({"vibratorctl", "intensity", "5000"}).exitCode, 0);
+    const std::string plot = run({"sh", "-c", "vibratorctl on 50; vibratorctl plot"}).output;
+    EXPECT_NE(plot.find("  on 50\n"), std::string::npos) << plot;
     EXPECT_EQ(run({"sh", "-c", "exit 7"}).exitCode, 7);
     const RecordedMotor second({"second", {FF_RUMBLE}, 1});
     EXPECT_NE(run({"true"}).errors.find("choose a motor with --device: " + motor.path()),
@@ -334,33 +336,38 @@ TEST_F(DriverTest, ServesAnotherUsersService) {
     plugIn();
     ChildProcess driver;
     driver.startProgram({kDriver, "serve", "--device", mMotor->path()}, kLog, {}, 1500);
-    const Outcome mounted =
-            runProgram({kDriver, "mount", std::to_string(driver.pid()), "/run/driver/class"});
+    const Outcome mounted = runProgram(
+            {kDriver, "mount", std::to_string(driver.pid()), "/run/vibrator-driver/class"});
     ASSERT_EQ(mounted.exitCode, 0) << mounted.errors;
     runProgram({"/bin/sh", "-c",
-                "chown 1000 /run/driver/class/timed_output/vibrator/*; "
+                "chown 1000 /run/vibrator-driver/class/timed_output/vibrator/*; "
                 "mkdir -p /run/sockets; chown 1000:1000 /run/sockets"});
     setenv("HWBINDER_DIR", "/run/sockets", 1);
-    mSession.startProgram(
-            {"/bin/unshare", "-m", "/bin/sh", "-c",
-             "mount --bind /run/driver/class /sys/class; exec start-stop-daemon -S -c system "
-             "-x /sbin/vendor.velmora.hardware.vibrator@2.1-service"},
-            kLog, {});
+    mSession.startProgram({"/bin/unshare", "-m", "/bin/sh", "-c",
+                           "mount --bind /run/vibrator-driver/class /sys/class; exec "
+                           "start-stop-daemon -S -c system "
+                           "-x /sbin/vendor.velmora.hardware.vibrator@2.1-service"},
+                          kLog, {});
     mVibrator = IDaxVibrator::getService();
     ASSERT_NE(mVibrator, nullptr) << readFile(kLog);
     mMotor->takeChanges();
     const double start = nowInMs();
     EXPECT_EQ(inWords(mVibrator->on(50)), "OK");
     expectRuns(start, {{10000, 50}});
+    EXPECT_NE(runProgram({"/bin/vibratorctl", "doctor"})
+                      .output.find("vibrator-driver, " + mMotor->path()),
+              std::string::npos);
     // Others may read the nodes.
-    const std::string write = "echo 5 >/run/driver/class/timed_output/vibrator/enable";
+    const std::string write = "echo 5 >/run/vibrator-driver/class/timed_output/vibrator/enable";
     EXPECT_EQ(runProgram({"/bin/sh", "-c", write}, 1000).exitCode, 0);
     EXPECT_EQ(runProgram({"/bin/sh", "-c", write}, 2000).exitCode, 1);
-    EXPECT_EQ(runProgram({"/bin/cat", "/run/driver/class/timed_output/vibrator/input_device"}, 2000)
+    EXPECT_EQ(runProgram(
+                      {"/bin/cat", "/run/vibrator-driver/class/timed_output/vibrator/input_device"},
+                      2000)
                       .output,
               mMotor->path() + " rumble\n");
     mSession.kill();
-    EXPECT_EQ(runProgram({"/bin/umount", "/run/driver/class"}).exitCode, 0);
+    EXPECT_EQ(runProgram({"/bin/umount", "/run/vibrator-driver/class"}).exitCode, 0);
     EXPECT_TRUE(eventually([&] { return !driver.isAlive(); })) << "without files to serve it ends";
 }
 
