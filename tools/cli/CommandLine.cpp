@@ -12,6 +12,7 @@ namespace cli {
 
 std::vector<std::string> valuesOf(const std::vector<Choice>& choices) {
     std::vector<std::string> values;
+    values.reserve(choices.size());
     for (const Choice& choice : choices)
         values.push_back(choice.value);
     return values;

@@ -5,7 +5,6 @@
 #include <getopt.h>
 
 #include <algorithm>
-#include <cctype>
 #include <iostream>
 
 namespace cli {
@@ -148,7 +147,7 @@ class Line {
     void take(int code, const std::string& value, const std::string& word) {
         if (code == 1) {
             takeWord(value);
-        } else if (isdigit(code) != 0) {
+        } else if (code >= '0' && code <= '9') {
             takeWord(std::string{'-', static_cast<char>(code)} + value);
         } else if (code == ':') {
             mTaking = optionOf(optopt);
