@@ -62,9 +62,12 @@ int status(const Client& client, uint32_t waitMs) {
     ordered_json members = {{"instance", client.instance()}, {"answers", true}};
     members.update(served.members);
     members["interfaces"] = interfaces;
+    const std::string device = driverOf(*vibrator).look("input_device").firstLine();
+    members["device"] = device.empty() ? ordered_json() : ordered_json(device);
     return client.report().found(
             "service:    " + client.instance() + ", answers\nserved by:  " + served.server +
                     "\ntransport:  " + served.transport + "\nmanager:    " + served.manager +
+                    (device.empty() ? "" : "\nmotor:      through vibrator-driver, " + device) +
                     "\ninterfaces: " + cli::join(interfaces, indent, indent) + "\n",
             members);
 }
