@@ -40,6 +40,7 @@ class ConnectionLimits {
 /** What a loop waits for. */
 struct EventSource {
     enum class Kind { kWake, kDeaths, kListener, kClient };
+    explicit EventSource(Kind what) : kind(what) {}
     const Kind kind;
 };
 
@@ -47,7 +48,7 @@ struct SocketUser;
 
 /** A client's connection. */
 struct SocketClient : EventSource {
-    SocketClient() : EventSource{Kind::kClient} {}
+    SocketClient() : EventSource(Kind::kClient) {}
 
     UniqueFd socket;
     /** What it is connected to. */

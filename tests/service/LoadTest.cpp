@@ -80,7 +80,7 @@ TEST_F(LoadTest, ManyClientsGetTheirOwnAnswersInTheirOwnOrder) {
     const pid_t first = spawn(0, 1000);
     waitpid(first, nullptr, 0);
     const size_t descriptors = mService.descriptors();
-    const size_t memory = mService.residentKiB();
+    [[maybe_unused]] const size_t memory = mService.residentKiB();
     std::ofstream(mDirectory.path() + "/trace", std::ios::trunc).flush();
 
     std::vector<pid_t> survivors;
