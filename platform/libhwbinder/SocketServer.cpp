@@ -126,7 +126,7 @@ bool SocketServer::listen(const sp<BHwBinder>& object, ListeningSocket socket) {
         mCloser.start();
     }
     Listener& listener = mListeners.emplace_back(
-            Listener{{EventSource::Kind::kListener}, std::move(socket), object});
+            Listener{EventSource(EventSource::Kind::kListener), std::move(socket), object});
     return waitFor(&listener, listener.socket.socket.get(), EPOLLIN);
 }
 
