@@ -58,7 +58,11 @@ class Examination {
         if (!mDriver.isThere()) examineMissingDriver();
         if (mDriver.isThere()) examineNodes();
         if (mDriver.isUsable()) examineMotor();
-        if (mFound.answers && mDriver.isUsable()) examineAnswers();
+        try {
+            if (mFound.answers && mDriver.isUsable()) examineAnswers();
+        } catch (const Unreachable& error) {
+            find(service() + " answers no more: " + error.what(), mSystem.restart);
+        }
         if (!mFound.server && mDriver.isThere()) {
             note("the service's user is not known; what it may open is judged for uid " +
                  std::to_string(mOpener.uid));
@@ -124,7 +128,7 @@ void Examination::examineMissingDriver() {
              "feedback " +
                      cli::join(motors, ", ", " and "),
              "run \"vibrator-driver run\", which offers such a motor as a vibrator driver; "
-             "docs/linux.md says how");
+             "docs/motors.md says how");
     } else {
         find("the kernel offers no vibrator driver in /sys/class",
              "build the motor's driver in, or load it; docs/device.md tells how for a GPIO");
@@ -145,6 +149,8 @@ void Examination::examineNodes() {
         const std::string path = mDriver.path(info.leaf);
         const LocalDriver::Node node = mDriver.look(path);
         mFound.nodes.push_back({path, kServes[i], node});
+        // What somebody else may not open is no fault.
+        if (!mFound.server && !mOpener.overridesModes) continue;
         if (!node.exists || (node.reads && (info.isOnlyRead || node.writes))) continue;
         find(service() + " cannot " + (node.reads ? "write " : "read ") + path + " (owner " +
                      node.owner + ", " + node.mode + ")",
