@@ -66,23 +66,22 @@ size_t threadCount() {
     return static_cast<size_t>(std::distance(begin(tasks), end(tasks)));
 }
 
-TEST_F(RuntimeTest, DeviceThatCannotBeOpenedServesNothingHoweverOften) {
-    android::hardware::KernelDriver driver("/dev/null");
-    EXPECT_EQ(driver.check().text(), "/dev/null: not a binder device");
-    EXPECT_EQ(driver.becomeContextManager(nullptr), android::NO_INIT);
-    std::thread([&] {
-        for (int i = 0; i < 300; ++i)
-            driver.serve();
-    }).join();
-}
+TEST(RuntimeDeathTest, NothingIsServedOrWaitedForOnADeviceThatCannotBeUsed) {
+    EXPECT_EQ(android::hardware::KernelDriver("/dev/null").check().text(),
+              "/dev/null: not a binder device");
 
-TEST(RuntimeDeathTest, ServiceIsNotWaitedForOnADeviceThatCannotBeUsed) {
     // In a program that is started anew: this one may have chosen its transport already.
     GTEST_FLAG_SET(death_test_style, "threadsafe");
     setenv("HWBINDER_DEVICE", "/dev/null", 1);
     EXPECT_EXIT(
             {
                 alarm(3);  // Less than the patience with a device that can be used.
+                auto& driver = android::hardware::ProcessState::self()->driver();
+                if (driver.becomeContextManager(nullptr) != android::NO_INIT) _exit(3);
+                std::thread([&] {
+                    for (int i = 0; i < 300; ++i)
+                        driver.serve();
+                }).join();
                 if (IDaxVibrator::getService() != nullptr) _exit(1);
                 _exit((new Slow)->registerAsService("x") == android::NO_INIT ? 0 : 2);
             },
