@@ -93,6 +93,19 @@ Timeline readTimeline(const std::string& file) {
                           ": no write to the driver in it; is it a trace, or the daemon's log?");
 }
 
+/** @return the part of a file's timeline between two times in ms, or the last ms of it. */
+Timeline readPart(const std::string& file, uint32_t from, uint32_t to, uint32_t last) {
+    if (last != 0 && (from != 0 || to != 0))
+        throw cli::UsageError("--last goes with neither --from nor --to");
+    Timeline timeline = readTimeline(file);
+    const double length = timeline.end;
+    cut(&timeline, last != 0 ? length - last / 1000.0 : from / 1000.0,
+        to != 0 ? to / 1000.0 : std::numeric_limits<double>::max());
+    if (!timeline.marks.empty() || !timeline.segments.empty()) return timeline;
+    throw cli::UsageError("nothing in that time; all of it lies within " +
+                          cli::durationInWords(length) + " from the first call on");
+}
+
 /** @return the format of the picture, where the name of its file or an option says it. */
 PictureFormat formatOf(const std::string& name, size_t format) {
     const std::string ending = fs::path(name).extension();
@@ -130,17 +143,7 @@ void addPlot(Client& client) {
             throw cli::UsageError("--format is of a picture; name its file with -o");
         const PictureFormat kind = isText ? PictureFormat::kSvg : formatOf(*output, *format);
         if (!isText && *output != "-") checkTarget(*output, traffic());
-        Timeline timeline = readTimeline(traffic());
-        const double length = timeline.end;
-        if (*last != 0 && (*from != 0 || *to != 0)) {
-            throw cli::UsageError("--last goes with neither --from nor --to");
-        }
-        cut(&timeline, *last != 0 ? length - *last / 1000.0 : *from / 1000.0,
-            *to != 0 ? *to / 1000.0 : std::numeric_limits<double>::max());
-        if (timeline.marks.empty() && timeline.segments.empty()) {
-            throw cli::UsageError("nothing in that time; all of it lies within " +
-                                  cli::durationInWords(length) + " from the first call on");
-        }
+        const Timeline timeline = readPart(traffic(), *from, *to, *last);
         if (isText) {
             winsize window{};
             const bool isKnown = ioctl(STDOUT_FILENO, TIOCGWINSZ, &window) == 0;
