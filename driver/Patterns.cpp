@@ -34,6 +34,7 @@ std::vector<std::vector<Segment>> parsePatterns(const std::string& text) {
             patterns.back().push_back(segmentOf(packet));
         }
     }
+    if (patterns.empty()) throw cli::UsageError("there is no pattern in it");
     return patterns;
 }
 

@@ -50,10 +50,14 @@ class VibratorDriver : public cli::Program {
     }
     static std::string readPatterns(std::string path) {
         if (path.empty() && std::filesystem::exists(kPatternFile)) path = kPatternFile;
-        std::ifstream file(path);
         std::string text = kShippedPatterns;
-        if (!path.empty()) text.assign(std::istreambuf_iterator<char>(file), {});
-        if (!path.empty() && !file) throw cli::UsageError(cli::inQuotes(path) + " cannot be read");
+        if (!path.empty()) {
+            std::ifstream file(path);
+            if (!file || std::filesystem::is_directory(path)) {
+                throw cli::UsageError(cli::inQuotes(path) + " cannot be read");
+            }
+            text.assign(std::istreambuf_iterator<char>(file), {});
+        }
         try {
             driver::parsePatterns(text);
         } catch (const cli::UsageError& error) {

@@ -14,6 +14,7 @@
 #include <csignal>
 #include <cstdlib>
 #include <cstring>
+#include <fstream>
 #include <memory>
 #include <sstream>
 
@@ -262,6 +263,22 @@ TEST_F(DriverTest, RunsForAnOrdinaryUser) {
     const std::string plot = run({"sh", "-c", "vibratorctl on 50; vibratorctl plot"}).output;
     EXPECT_NE(plot.find("  on 50\n"), std::string::npos) << plot;
     EXPECT_EQ(run({"sh", "-c", "exit 7"}).exitCode, 7);
+    const auto count = [&](const std::string& patterns) {
+        std::ofstream("/tmp/patterns") << patterns;
+        const Outcome outcome =
+                run({"--patterns", "/tmp/patterns", "vibratorctl", "pattern", "count"});
+        return outcome.output + outcome.errors;
+    };
+    EXPECT_EQ(count("# Mine.\n[short]\n30,5000,0,0  20,0,0,0\n[long]\n"),
+              "pattern count: OK, 2 patterns\n");
+    EXPECT_EQ(count("[bad]\n30,5000,0,0 30,x,0,0\n"),
+              "vibrator-driver: run: \"/tmp/patterns\": line 2: \"30,x,0,0\" is not a packet of a "
+              "pattern, "
+              "PARAM0,INTENSITY,PARAM2,PARAM3\n");
+    EXPECT_EQ(count("# None.\n"),
+              "vibrator-driver: run: \"/tmp/patterns\": there is no pattern in it\n");
+    EXPECT_NE(run({"--patterns", "/", "true"}).errors.find("\"/\" cannot be read"),
+              std::string::npos);
     const RecordedMotor second({"second", {FF_RUMBLE}, 1});
     EXPECT_NE(run({"true"}).errors.find("choose a motor with --device: " + motor.path()),
               std::string::npos);
