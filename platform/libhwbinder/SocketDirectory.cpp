@@ -63,7 +63,7 @@ class Walk {
 
     std::string takeName() {
         mRest.erase(0, mRest.find_first_not_of('/'));
-        const std::string name = mRest.substr(0, mRest.find('/'));
+        std::string name = mRest.substr(0, mRest.find('/'));
         mRest.erase(0, name.size());
         mRest.erase(0, mRest.find_first_not_of('/'));
         return name;

@@ -285,7 +285,8 @@ void SocketServer::admit(UniqueFd socket, uid_t uid, const sp<BHwBinder>& object
 void SocketServer::refuseOne(int listener) {
     // There is no descriptor left for it; waiting, it would be reported again and again.
     mSpare.reset();
-    UniqueFd(accept4(listener, nullptr, nullptr, SOCK_CLOEXEC));
+    mSpare.reset(accept4(listener, nullptr, nullptr, SOCK_CLOEXEC));
+    mSpare.reset();
     mSpare = openSpare();
 }
 

@@ -16,7 +16,7 @@ class SocketTimeLimit {
      * @param milliseconds what the socket's own limit is, too; 0 for none.
      */
     SocketTimeLimit(int socket, int milliseconds) : mSocket(socket), mLimit(milliseconds) {
-        if (mLimit != mLimit.zero()) mEnd = Clock::now() + mLimit;
+        if (mLimit.count() != 0) mEnd = Clock::now() + mLimit;
     }
     ~SocketTimeLimit() {
         if (mIsShortened) set(mSocket, mLimit);
@@ -26,10 +26,10 @@ class SocketTimeLimit {
 
     /** Has the socket wait no longer than what is left. @return whether anything is. */
     bool shorten() {
-        if (mLimit == mLimit.zero()) return true;
+        if (mLimit.count() == 0) return true;
         const auto left =
                 std::chrono::duration_cast<std::chrono::microseconds>(mEnd - Clock::now());
-        if (left <= left.zero()) return false;
+        if (left.count() <= 0) return false;
         set(mSocket, left);
         mIsShortened = true;
         return true;
