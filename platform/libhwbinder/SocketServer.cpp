@@ -291,6 +291,8 @@ void SocketServer::refuseOne(int listener) {
 }
 
 void SocketServer::drop(SocketClient* client) {
+    // Closing is not enough where a child of this process has the connection, too.
+    epoll_ctl(mEpoll.get(), EPOLL_CTL_DEL, client->socket.get(), nullptr);
     const auto isEmpty = [](Content content) {
         return content == Content::kNothing || content == Content::kEnd;
     };
@@ -299,7 +301,6 @@ void SocketServer::drop(SocketClient* client) {
         return;
     }
     // Waiting messages are closed with it, and the descriptors in them.
-    epoll_ctl(mEpoll.get(), EPOLL_CTL_DEL, client->socket.get(), nullptr);
     mClients.retire(client);
     mCloser.close(client);
 }

@@ -23,9 +23,6 @@ namespace android::hardware {
  * SocketClients says whose turn it is and who gives way. The server never waits for a client: one
  * that does not read its replies loses its connection. What a client has closed itself is gone
  * before new ones are let in, and takes no turn.
- *
- * A child of the process must exec at once: while it holds a connection that is closed here, epoll
- * goes on reporting that.
  */
 class SocketServer {
   public:

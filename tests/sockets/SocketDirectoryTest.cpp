@@ -6,10 +6,12 @@
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
+#include <sys/prctl.h>
 #include <sys/resource.h>
 #include <sys/socket.h>
 #include <sys/stat.h>
 
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -129,29 +131,28 @@ TEST_F(SocketDirectoryTest, FilesThatAreInTheWayAreSaid) {
 }
 
 TEST_F(SocketDirectoryTest, MissingDescriptorsAreSaid) {
-    const int next = dup(STDERR_FILENO);
-    close(next);
     rlimit before{};
     getrlimit(RLIMIT_NOFILE, &before);
-    const auto tryWith = [&](rlim_t more, const auto& call) {
-        const rlimit limit{static_cast<rlim_t>(next) + more, before.rlim_max};
-        setrlimit(RLIMIT_NOFILE, &limit);
-        const Error error = call();
-        setrlimit(RLIMIT_NOFILE, &before);
-        EXPECT_TRUE(error.isOk() || error.text().find(": Too many open files") < 200U)
-                << error.text();
-        return error.isOk();
+    /** Allows ever more descriptors, until a call succeeds. */
+    const auto expectComplaints = [&](const auto& call) {
+        int complaints = 0;
+        for (rlimit limit{3, before.rlim_max}; limit.rlim_cur < 1000; ++limit.rlim_cur) {
+            setrlimit(RLIMIT_NOFILE, &limit);
+            const Error error = call();
+            setrlimit(RLIMIT_NOFILE, &before);
+            if (error.isOk()) break;
+            EXPECT_LT(error.text().find(": Too many open files"), 200U) << error.text();
+            ++complaints;
+        }
+        EXPECT_GT(complaints, 0);
+        EXPECT_LT(complaints, 900);
     };
     ListeningSocket listener;
-    rlim_t needed = 0;
-    while (needed < 8 && !tryWith(needed, [&] { return publish(&listener); }))
-        ++needed;
-    EXPECT_EQ(needed, 3U) << "for the directory, the lock and the socket";
+    expectComplaints([&] { return publish(&listener); });
     SocketDirectory directory;
     UniqueFd connection;
     ASSERT_TRUE(directory.open(mDirectory, false).isOk());
-    EXPECT_FALSE(tryWith(3, [&] { return directory.connect("a@1.0::IA.x", &connection); }));
-    EXPECT_TRUE(tryWith(4, [&] { return directory.connect("a@1.0::IA.x", &connection); }));
+    expectComplaints([&] { return directory.connect("a@1.0::IA.x", &connection); });
 }
 
 TEST_F(SocketDirectoryTest, LockThatOthersCouldHoldIsRefused) {
@@ -217,8 +218,8 @@ TEST_F(SocketDirectoryTest, ExchangeOfTheDirectoryLeadsNobodyElsewhere) {
     const std::string link = make("link", 0, kStranger, "victim");
     ChildProcess attacker;
     attacker.start([&] {
-        if (setuid(kStranger) != 0) _exit(1);
-        for (;;) {
+        if (setuid(kStranger) != 0 || prctl(PR_SET_PDEATHSIG, SIGKILL) != 0) _exit(1);
+        while (getppid() != 1) {
             for (const std::string& other : {his, link}) {
                 for (int i = 0; i < 2; ++i)
                     renameat2(AT_FDCWD, roots.c_str(), AT_FDCWD, other.c_str(), RENAME_EXCHANGE);
@@ -226,12 +227,16 @@ TEST_F(SocketDirectoryTest, ExchangeOfTheDirectoryLeadsNobodyElsewhere) {
         }
     });
     int published = 0;
-    for (int i = 0; i < 1000; ++i) {
-        ListeningSocket listener;
-        published += publish(&listener).isOk() ? 1 : 0;
-    }
+    int refused = 0;
+    const auto isDone = [&] {
+        for (int i = 0; i < 200; ++i) {
+            ListeningSocket listener;
+            ++(publish(&listener).isOk() ? published : refused);
+        }
+        return published >= 100 && refused >= 100;
+    };
+    EXPECT_TRUE(eventually(isDone)) << published << " and " << refused;
     attacker.kill();
-    EXPECT_GT(published, 0);
     // Whichever names they have now.
     for (const fs::directory_entry& each : fs::directory_iterator(mParent.path())) {
         struct stat info;
