@@ -60,7 +60,7 @@ Return<bool> hasInterface(IBase* object, const char* interface) {
 }
 
 Return<bool> canCastInterface(IBase* object, const char* interface, bool emitError) {
-    const Return<bool> result = hasInterface(object, interface);
+    Return<bool> result = hasInterface(object, interface);
     if (result.isOk()) return result;
     if (!emitError) return false;
     __android_log_print(ANDROID_LOG_ERROR, kLogTag, "no cast to %s: %s", interface,
