@@ -8,11 +8,14 @@
 #include <private/android_filesystem_config.h>
 #include <unistd.h>
 
+#include <algorithm>
+#include <atomic>
 #include <chrono>
 #include <cstdlib>
 #include <iostream>
 #include <map>
 #include <thread>
+#include <utility>
 
 namespace vibratorctl {
 
@@ -48,8 +51,21 @@ using Clock = std::chrono::steady_clock;
 
 struct Recipient : ::android::hardware::hidl_death_recipient {
     void serviceDied(uint64_t /* cookie */,
-                     const ::android::wp<::android::hidl::base::V1_0::IBase>& /* who */) override {}
+                     const ::android::wp<::android::hidl::base::V1_0::IBase>& /* who */) override {
+        isNotified = true;
+    }
+    std::atomic<bool> isNotified = false;
 };
+
+/** @return whether something is so within 10 s. */
+template <typename Condition>
+bool comes(Condition condition) {
+    for (const auto end = Clock::now() + std::chrono::seconds(10); Clock::now() < end;) {
+        if (condition()) return true;
+        std::this_thread::sleep_for(std::chrono::milliseconds(20));
+    }
+    return condition();
+}
 
 const Trial kTrials[] = {
         {"setAmplitude 128", "intensity", ask<&I::setAmplitude, 128>, "5001"},
@@ -64,10 +80,11 @@ const Trial kTrials[] = {
          false},
         {"setExternalControl off", "ext_control", ask<&I::setExternalControl, false>, "0", false,
          false},
-        {"daxPerformPrebakedHapticPattern 0", "cp_trigger_index",
-         ask<&I::daxPerformPrebakedHapticPattern, 0U, 5000U, false>, "0"},
         {"daxPerformPrebakedHapticPattern 1", "cp_trigger_index",
          ask<&I::daxPerformPrebakedHapticPattern, 1U, 5000U, false>, "1", true},
+        // The last of these, since 0 is what the node holds at first.
+        {"daxPerformPrebakedHapticPattern 0", "cp_trigger_index",
+         ask<&I::daxPerformPrebakedHapticPattern, 0U, 5000U, false>, "0"},
         {"daxPerformHapticEngine", "haptic_engine", playPacket, "4 20 5000 150 0", true},
 };
 
@@ -82,12 +99,13 @@ const std::pair<const char*, Ask> kRefused[] = {
 /** Checks a board: each operation, by what the driver offers. */
 class Selftest {
   public:
-    Selftest(Client& client, bool isQuiet, bool asks)
+    Selftest(Client& client, bool isQuiet, bool asks, std::string restart)
         : mClient(client),
           mVibrator(client.service()),
           mDriver(driverOf(*mVibrator)),
           mIsQuiet(isQuiet),
-          mAsks(asks) {}
+          mAsks(asks),
+          mRestart(std::move(restart)) {}
 
     /** @return the exit code. */
     int run() {
@@ -104,6 +122,7 @@ class Selftest {
         checkMotor();
         checkCallers();
         restore();
+        checkRestart();
         return mClient.report().found(std::to_string(mCounts["passed"]) + " passed, " +
                                               std::to_string(mCounts["failed"]) + " failed, " +
                                               std::to_string(mCounts["skipped"]) + " skipped\n",
@@ -127,6 +146,7 @@ class Selftest {
     }
 
     void checkInterfaces();
+    void checkHashes(size_t interfaces);
     void checkQueries();
     /** @return what each node of the driver holds, by its leaf. */
     std::map<std::string, std::string> look() const;
@@ -135,12 +155,16 @@ class Selftest {
     void checkMotor();
     void checkCallers();
     void restore();
+    void checkRestart();
 
     Client& mClient;
     const ::android::sp<IDaxVibrator> mVibrator;
     const LocalDriver mDriver;
     const bool mIsQuiet;
     const bool mAsks;
+    /** A command that restarts the service; empty if nobody has given one. */
+    const std::string mRestart;
+    const ::android::sp<Recipient> mRecipient = new Recipient;
     /** How many checks passed, failed and were skipped. */
     std::map<std::string, size_t> mCounts = {{"passed", 0}, {"failed", 0}, {"skipped", 0}};
     /** What the nodes held at first. */
@@ -161,13 +185,28 @@ void Selftest::checkInterfaces() {
     reached(mVibrator->interfaceChain(
             [&](const auto& chain) { got.assign(chain.begin(), chain.end()); }));
     expect("interface chain", cli::join(wanted, " ", " "), cli::join(got, " ", " "));
-    size_t hashes = 0;
-    reached(mVibrator->getHashChain([&](const auto& chain) { hashes = chain.size(); }));
-    expect("a hash of each interface", std::to_string(wanted.size()), std::to_string(hashes));
+    checkHashes(wanted.size());
     const bool isNamed = platform::V1_0::IVibrator::tryGetService(mClient.instance()) != nullptr;
     expect("found by the platform's interface", "yes", isNamed ? "yes" : "no");
-    const ::android::sp<::android::hardware::hidl_death_recipient> recipient = new Recipient;
-    expect("death notice", "yes", reached(mVibrator->linkToDeath(recipient, 0)) ? "yes" : "no");
+    expect("death notice", "yes", reached(mVibrator->linkToDeath(mRecipient, 0)) ? "yes" : "no");
+}
+
+/** Compares the hashes that the service reports with those of the interfaces that this was built
+ * with. */
+void Selftest::checkHashes(size_t interfaces) {
+    // A device has the platform's own packages; these two are the service's.
+    constexpr size_t kOurs = 2;
+    using Hashes = ::android::hardware::hidl_vec<::android::hardware::hidl_array<uint8_t, 32>>;
+    Hashes built;
+    Hashes reported;
+    mVibrator->IDaxVibrator::getHashChain([&](const Hashes& chain) { built = chain; });
+    reached(mVibrator->getHashChain([&](const Hashes& chain) { reported = chain; }));
+    expect("a hash of each interface", std::to_string(interfaces), std::to_string(reported.size()));
+    size_t same = 0;
+    while (same < std::min({kOurs, built.size(), reported.size()}) && built[same] == reported[same])
+        ++same;
+    expect("hashes of the service's own interfaces", "as built",
+           same == kOurs ? "as built" : "others");
 }
 
 void Selftest::checkQueries() {
@@ -289,6 +328,24 @@ void Selftest::restore() {
     mVibrator->setExternalControl(number("ext_control") == 1);
 }
 
+/** Checks that the service's end is heard of, and that it comes back. */
+void Selftest::checkRestart() {
+    constexpr char kName[] = "the service restarts";
+    if (mRestart.empty()) return tell("skipped", kName, "--restart COMMAND says how");
+    if (system(mRestart.c_str()) != 0)
+        return tell("failed", kName, "this failed: " + cli::printable(mRestart));
+    expect("death notice of it", "yes",
+           comes([&] { return mRecipient->isNotified.load(); }) ? "yes" : "no");
+    const auto isBack = [&] {
+        try {
+            return ask<&I::off>(*mClient.service()) == VibratorStatus::OK;
+        } catch (const Unreachable&) {
+            return false;
+        }
+    };
+    expect(kName, "yes", comes(isBack) ? "yes" : "no");
+}
+
 }  // namespace
 
 void addSelftest(Client& client) {
@@ -297,8 +354,10 @@ void addSelftest(Client& client) {
             "--quiet");
     const auto quiet = command.flag("--quiet", "do not move the motor; otherwise for 3 s at most");
     const auto asks = command.flag("--ask", "ask whether the motor moved");
+    const auto restart = command.text(
+            "--restart COMMAND", "restarts the service with it, and checks that it comes back", "");
     command.note("Root checks the most: it also calls as uid 1000 and uid 2000.");
-    command.run([=, &client] { return Selftest(client, *quiet, *asks).run(); });
+    command.run([=, &client] { return Selftest(client, *quiet, *asks, *restart).run(); });
 }
 
 }  // namespace vibratorctl
