@@ -40,7 +40,8 @@ std::string Status::description() const {
         case NOT_ENOUGH_DATA:
             return "the message does not hold what the operation takes";
         case FAILED_TRANSACTION:
-            return "the message could not be delivered; it may be too large";
+            return "the message could not be delivered; it may be too large: over sockets, more "
+                   "than 64 KiB";
         case UNKNOWN_ERROR:
             return "unknown error";
         default:

@@ -18,7 +18,7 @@ namespace android::hardware {
  * addresses in their parents changed to where they lie in the receiver.
  */
 struct Packet {
-    /** Size of the largest packet, in bytes. */
+    /** Size of the largest packet, in bytes; Status::description() names it. */
     static constexpr size_t kMaxSize = 65536;
 
     struct Header {

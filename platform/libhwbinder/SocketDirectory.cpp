@@ -151,7 +151,8 @@ Error SocketDirectory::openForServer() {
     Error error = open(serverDirectory(), true);
     umask(before);
     if (error.isOk() && !isOurs(mOwner)) {
-        return {-EPERM, mPath + ": belongs to uid " + std::to_string(mOwner)};
+        return {-EPERM, mPath + ": belongs to uid " + std::to_string(mOwner) +
+                                "; serve as that user, or in another directory (HWBINDER_DIR)"};
     }
     return error;
 }

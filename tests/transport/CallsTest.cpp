@@ -60,7 +60,9 @@ TEST_F(CallsTest, MessageThatIsTooLargeCostsOnlyItself) {
         const Return<VibratorStatus> result = mClient->daxPerformHapticEngine(packets, 1);
         EXPECT_FALSE(result.isOk());
         EXPECT_FALSE(result.isDeadObject());
-        EXPECT_EQ(result.description(), "the message could not be delivered; it may be too large");
+        EXPECT_EQ(result.description(),
+                  "the message could not be delivered; it may be too large: over sockets, more "
+                  "than 64 KiB");
     }
     EXPECT_TRUE(mClient->ping().isOk());
 }
