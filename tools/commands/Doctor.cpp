@@ -11,7 +11,7 @@ namespace {
 using nlohmann::ordered_json;
 
 ordered_json asJson(const Diagnosis& found) {
-    ordered_json json = {{"layout", found.layout}, {"service", found.service}};
+    ordered_json json = {{"layout", found.layout}, {"answers", found.answers}};
     json.update(describe(found.server, found.route).members);
     json["nodes"] = ordered_json::array();
     for (const auto& [path, serves, now] : found.nodes) {

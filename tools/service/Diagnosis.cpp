@@ -7,6 +7,9 @@
 
 #include <unistd.h>
 
+#include <array>
+#include <map>
+
 namespace vibratorctl {
 
 using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
@@ -88,7 +91,7 @@ class Examination {
     void examineSilence();
     void examineMissingDriver();
     void examineNodes();
-    std::string howToGive(const std::string& path, const LocalDriver::Node& node) const;
+    std::string howToGive(const std::string& paths, const LocalDriver::Node& node) const;
     void examineControl();
     void examineMotor();
     void examineAnswers();
@@ -107,6 +110,7 @@ void Examination::examineSilence() {
     if (mFound.server) servers = {*mFound.server};
     for (const Process& server : servers) {
         if (server.state != 'T') continue;
+        mFound.server = server;
         return find("the service (" + server.inWords() + ") is stopped, and answers nobody",
                     "let it go on: kill -CONT " + std::to_string(server.pid));
     }
@@ -135,14 +139,17 @@ void Examination::examineMissingDriver() {
     }
 }
 
-std::string Examination::howToGive(const std::string& path, const LocalDriver::Node& node) const {
+std::string Examination::howToGive(const std::string& paths, const LocalDriver::Node& node) const {
     const bool isOwner = mOpener.overridesModes || node.uid == mOpener.uid;
-    if (isOwner) return "chmod 0644 " + path;
-    return mSystem.give.empty() ? "chown " + std::to_string(mOpener.uid) + " " + path
+    if (isOwner) return "chmod 0644 " + paths;
+    return mSystem.give.empty() ? "chown " + std::to_string(mOpener.uid) + " " + paths
                                 : mSystem.give;
 }
 
 void Examination::examineNodes() {
+    // What is closed in the same way has one cause, and is said once.
+    std::map<std::array<std::string, 3>, std::pair<LocalDriver::Node, std::vector<std::string>>>
+            closed;
     for (size_t i = 0; i < std::size(NodePathTable); ++i) {
         const NodeInfo& info = NodePathTable[i];
         if (!info.isIn(mDriver.mode())) continue;
@@ -152,9 +159,17 @@ void Examination::examineNodes() {
         // What somebody else may not open is no fault.
         if (!mFound.server && !mOpener.overridesModes) continue;
         if (!node.exists || (node.reads && (info.isOnlyRead || node.writes))) continue;
-        find(service() + " cannot " + (node.reads ? "write " : "read ") + path + " (owner " +
-                     node.owner + ", " + node.mode + ")",
-             howToGive(path, node));
+        auto& [sample, leaves] = closed[{node.reads ? "write " : "read ", node.owner, node.mode}];
+        sample = node;
+        leaves.emplace_back(info.leaf);
+    }
+    for (const auto& [how, which] : closed) {
+        const auto& [access, owner, mode] = how;
+        const auto& [sample, leaves] = which;
+        const std::string names = cli::join(leaves, ",", ",");
+        const std::string paths = mDriver.path(leaves.size() == 1 ? names : "{" + names + "}");
+        find(service() + " cannot " + access + paths + " (owner " + owner + ", " + mode + ")",
+             howToGive(paths, sample));
     }
     if (mDriver.mode() == kTimedOutputMode && mDriver.look(THE_DEVICE_ACTIVATE).exists) {
         find("the kernel has both layouts, and the service takes the timed output",
@@ -208,9 +223,9 @@ void Examination::examineAnswers() {
         if (!mayCallRestricted() && !query.isForAll) continue;
         compare(query.operation, reached((*mVibrator.*query.ask)()) == (mDriver.*query.expect)());
     }
-    for (const uint32_t type : {0U, 1U}) {
-        if (!mayCallRestricted()) break;
-        compare("daxGetAmplitudeList", askLadder(*mVibrator, type) == mFound.ladders[type]);
+    if (mayCallRestricted()) {
+        compare("daxGetAmplitudeList", askLadder(*mVibrator, 0) == mFound.ladders[0] &&
+                                               askLadder(*mVibrator, 1) == mFound.ladders[1]);
     }
     if (wrong.empty()) return;
     find(service() + " does not answer as the driver is: " + cli::join(wrong, ", ", " and ") +
