@@ -24,7 +24,7 @@ double msIn(const std::string& unit) {
 
 std::string Numbers::range() const {
     const std::string numbers = std::to_string(least) + " to " + std::to_string(most);
-    if (*unit == '%') return numbers + ", or 1% to 100%";
+    if (*unit == '%') return numbers + ", or up to 100%";
     return numbers + (*unit == '\0' ? "" : " ") + unit;
 }
 
