@@ -27,9 +27,11 @@ std::string whatClickLacks(const LocalDriver& driver) {
     if (!driver.isUsable()) {
         return R"(the service has no driver, nothing moved; "vibratorctl doctor" says what to do)";
     }
-    // The LED trigger keeps the time that it was told.
-    if (driver.mode() == product::kLedTriggerMode && !driver.isVibrating()) {
-        return R"(the service does not use the driver, nothing moved; "vibratorctl doctor" says what to do)";
+    // The LED trigger keeps the time that it was told. Who may not read it does not know.
+    if (driver.mode() == product::kLedTriggerMode && driver.look("duration").firstLine() == "0") {
+        return "the service does not use the driver, nothing moved; \"vibratorctl doctor\" says "
+               "what "
+               "to do";
     }
     if (!mayCallRestricted()) {
         return "the strength is the one that was set before; only " + permittedUsers() +
