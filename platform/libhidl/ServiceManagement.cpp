@@ -98,7 +98,8 @@ Error waitFor(milliseconds patience, const std::string& what, Ask ask) {
     for (;;) {
         Error error = ask();
         if (error.isOk()) return error;
-        error = {error.code(), what + " is not there: " + error.text()};
+        const bool isSilent = error.code() == TIMED_OUT;
+        error = {error.code(), what + (isSilent ? ": " : " is not there: ") + error.text()};
         if (patience != kForEver && steady_clock::now() - start >= patience) return error;
         if (pause == milliseconds(1)) {
             __android_log_print(ANDROID_LOG_INFO, kLogTag, "waiting; %s", error.text().c_str());
@@ -239,10 +240,9 @@ ManagerState managerState(std::string* whyNot) {
     return ManagerState::SILENT;
 }
 
-std::string lookupError(const std::string& interface, const std::string& instance) {
-    sp<IBase> service;
-    const Error error = findService(milliseconds(0), interface, instance, &service);
-    return error.isOk() ? interface + "/" + instance + " is there now" : error.text();
+std::string findService(const std::string& interface, const std::string& instance,
+                        sp<IBase>* service) {
+    return hardware::findService(milliseconds(0), interface, instance, service).text();
 }
 
 }  // namespace host

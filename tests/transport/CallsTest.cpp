@@ -138,8 +138,9 @@ TEST_F(CallsTest, ObjectIsFoundUnderEveryInterfaceOfItsChain) {
         EXPECT_TRUE(android::hardware::defaultServiceManager1_2()->addWithChain(
                 "wrong", mClient, {Other::descriptor}));
     }
-    EXPECT_EQ(Other::tryGetService("wrong"), nullptr);
-    const std::string whyNot = host::lookupError(Other::descriptor, "wrong");
+    sp<IBase> found;
+    const std::string whyNot = host::findService(Other::descriptor, "wrong", &found);
+    EXPECT_EQ(found, nullptr);
     EXPECT_NE(whyNot.find("does not have the interface"), std::string::npos) << whyNot;
 
     // What a daemon that died in its start has left.
@@ -298,14 +299,16 @@ TEST_F(CallsTest, SearchWaitsForAServiceThatIsToCome) {
     const std::string whyNot = kChain[0] + "/default is not there: " +
                                (isKernel() ? "/dev/hwbinder: the service manager does not know it"
                                            : mDirectory.path());
-    EXPECT_EQ(host::lookupError(kChain[0]).find(whyNot), 0U) << host::lookupError(kChain[0]);
+    sp<IBase> base;
+    const std::string said = host::findService(kChain[0], "default", &base);
+    EXPECT_EQ(said.find(whyNot), 0U) << said;
     std::thread later([&] {
         std::this_thread::sleep_for(milliseconds(100));
         startDaemon(mServer);
     });
     const sp<IDaxVibrator> found = IDaxVibrator::getService();
     later.join();
-    ASSERT_NE(found, nullptr) << host::lookupError(kChain[0]);
+    ASSERT_NE(found, nullptr);
     EXPECT_TRUE(found->ping().isOk());
 }
 

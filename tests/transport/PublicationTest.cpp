@@ -22,9 +22,8 @@ class PublicationTest : public TransportTest {
     }
     /** @return why a client finds no service. */
     static std::string whyNot() {
-        return IDaxVibrator::tryGetService() == nullptr
-                       ? host::lookupError(IDaxVibrator::descriptor)
-                       : "found";
+        ::android::sp<::android::hidl::base::V1_0::IBase> found;
+        return host::findService(IDaxVibrator::descriptor, "default", &found);
     }
     /** Expects that a daemon that is started, as somebody, has a text in its log. */
     void expectLog(const std::string& text, const std::vector<std::string>& command = {SERVICE},

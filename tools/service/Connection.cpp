@@ -10,9 +10,11 @@ namespace host = ::android::hardware::host;
 namespace vibratorctl {
 
 ::android::sp<IDaxVibrator> connect(const std::string& instance) {
-    ::android::sp<IDaxVibrator> vibrator = IDaxVibrator::tryGetService(instance);
-    if (vibrator == nullptr)
-        throw Unreachable(host::lookupError(IDaxVibrator::descriptor, instance));
+    ::android::sp<::android::hidl::base::V1_0::IBase> found;
+    const std::string whyNot = host::findService(IDaxVibrator::descriptor, instance, &found);
+    if (!whyNot.empty()) throw Unreachable(whyNot);
+    ::android::sp<IDaxVibrator> vibrator = IDaxVibrator::castFrom(found).withDefault(nullptr);
+    if (vibrator == nullptr) throw Unreachable("the service has just ended");
     return vibrator;
 }
 

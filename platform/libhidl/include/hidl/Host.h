@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <android/hidl/base/1.0/IBase.h>
 #include <hwbinder/Transport.h>
 
 #include <chrono>
@@ -18,8 +19,9 @@ enum class ManagerState { NOT_NEEDED, ANSWERS, SILENT };
 /** @param whyNot set to why none answers, in words. @return the state of the service manager. */
 ManagerState managerState(std::string* whyNot);
 
-/** Looks once for a service. @return why it is not there, in words. */
-std::string lookupError(const std::string& interface, const std::string& instance = "default");
+/** Looks once for a service. @param service set to it. @return "", or why it is not there. */
+std::string findService(const std::string& interface, const std::string& instance,
+                        sp<::android::hidl::base::V1_0::IBase>* service);
 
 /**
  * Limits how long a call may take; one that takes longer fails with TIMED_OUT. Over sockets its

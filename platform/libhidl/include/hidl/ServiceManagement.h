@@ -30,7 +30,7 @@ namespace details {
  * Finds a service, and asks it whether it has the interface.
  *
  * @param retry whether to wait for it, for at most 5 s.
- * @return nullptr if it is not there; host::lookupError says why.
+ * @return nullptr if it is not there; host::findService says why.
  */
 sp<::android::hidl::base::V1_0::IBase> getRawServiceInternal(const std::string& interface,
                                                              const std::string& instance,
