@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Device.h"
 
+#include "text/Text.h"
+
 #include <fcntl.h>
 #include <libevdev/libevdev.h>
 #include <sys/ioctl.h>
@@ -14,6 +16,7 @@
 #include <filesystem>
 #include <fstream>
 #include <optional>
+#include <set>
 #include <stdexcept>
 
 namespace driver {
@@ -30,10 +33,37 @@ std::string firstLine(const std::string& path) {
     return line;
 }
 
-/** @return what can be known of a device that cannot be opened; nothing if it has no motor. */
-std::optional<Device> describe(const std::string& path, int error) {
+/** Asks a device that could be opened what it can do. */
+void ask(int file, Device& device) {
+    int effects = 0;
+    ioctl(file, EVIOCGEFFECTS, &effects);
+    libevdev* events = nullptr;
+    if (const int error = libevdev_new_from_fd(file, &events); error != 0) {
+        device.problem = strerror(-error);
+        return;
+    }
+    const auto has = [&](unsigned code) {
+        return libevdev_has_event_code(events, EV_FF, code) != 0;
+    };
+    // The kernel also offers rumble for a device that plays sine waves, and turns it into those.
+    device.effect = has(FF_RUMBLE) ? FF_RUMBLE : has(FF_CONSTANT) ? FF_CONSTANT : 0;
+    device.hasGain = has(FF_GAIN);
+    libevdev_free(events);
+    device.abilities = std::string(device.effect == FF_RUMBLE ? "rumble, " : "constant forces, ") +
+                       (device.hasGain ? "gain, " : "no gain, ") + std::to_string(effects) +
+                       (effects == 1 ? " effect" : " effects");
+    if (device.effect == 0) {
+        device.problem = "it plays neither rumble nor constant forces";
+    } else if (effects == 0) {
+        device.problem = "it holds no effects";
+    }
+}
+
+/** @return the device with a path, if it has a motor. */
+std::optional<Device> examine(const std::string& path) {
     struct stat info {};
     if (stat(path.c_str(), &info) != 0) return std::nullopt;
+    // What can be known without opening it.
     const std::string properties = "/sys/dev/char/" + std::to_string(major(info.st_rdev)) + ":" +
                                    std::to_string(minor(info.st_rdev)) + "/device/";
     const std::string bits = firstLine(properties + "capabilities/ff");
@@ -41,50 +71,18 @@ std::optional<Device> describe(const std::string& path, int error) {
     Device device;
     device.path = path;
     device.name = firstLine(properties + "name");
-    device.problem = strerror(error);
-    if (error == EACCES) {
-        device.problem += "; log in at the seat that it belongs to, or join the group \"input\"";
-    }
-    return device;
-}
-
-/** Asks an open device. */
-Device ask(const std::string& path, const libevdev* events, int effects) {
-    const auto has = [&](unsigned code) {
-        return libevdev_has_event_code(events, EV_FF, code) != 0;
-    };
-    Device device;
-    device.path = path;
-    device.name = libevdev_get_name(events);
-    const char* serial = libevdev_get_uniq(events);
-    for (const int number : {libevdev_get_id_bustype(events), libevdev_get_id_vendor(events),
-                             libevdev_get_id_product(events)})
-        device.identity += std::to_string(number) + ":";
-    device.identity += device.name + ":" + (serial == nullptr ? "" : serial);
-    // The kernel also offers rumble for a device that plays sine waves, and turns it into those.
-    device.effect = has(FF_RUMBLE) ? FF_RUMBLE : has(FF_CONSTANT) ? FF_CONSTANT : 0;
-    device.hasGain = has(FF_GAIN);
-    device.effects = effects;
-    if (device.effect == 0) {
-        device.problem = "it plays neither rumble nor constant forces";
-    } else if (effects == 0) {
-        device.problem = "it holds no effects";
-    }
-    return device;
-}
-
-/** @return the device with a path, if it has a motor. */
-std::optional<Device> examine(const std::string& path) {
+    device.identity =
+            firstLine(properties + "modalias") + device.name + firstLine(properties + "uniq");
     const int file = open(path.c_str(), O_RDWR | O_CLOEXEC | O_NONBLOCK);
-    if (file < 0) return describe(path, errno);
-    std::optional<Device> device;
-    libevdev* events = nullptr;
-    if (libevdev_new_from_fd(file, &events) == 0) {
-        int effects = 0;
-        ioctl(file, EVIOCGEFFECTS, &effects);
-        if (libevdev_has_event_type(events, EV_FF) != 0) device = ask(path, events, effects);
-        libevdev_free(events);
+    if (file < 0) {
+        const int error = errno;
+        device.problem = strerror(error);
+        if (error == EACCES)
+            device.problem +=
+                    "; log in at the seat that it belongs to, or join the group \"input\"";
+        return device;
     }
+    ask(file, device);
     close(file);
     return device;
 }
@@ -92,23 +90,20 @@ std::optional<Device> examine(const std::string& path) {
 }  // namespace
 
 std::string Device::inWords() const {
-    if (!problem.empty()) return problem;
-    return std::string(effect == FF_RUMBLE ? "rumble, " : "constant forces, ") +
-           (hasGain ? "gain, " : "no gain, ") + std::to_string(effects) +
-           (effects == 1 ? " effect" : " effects");
+    return path + " " + cli::inQuotes(name) + ": " + (problem.empty() ? abilities : problem);
 }
 
 std::vector<Device> listDevices() {
-    std::vector<std::string> paths;
+    // By the length first, for event10 comes after event9.
+    std::set<std::pair<size_t, std::string>> paths;
     std::error_code error;
     for (const auto& entry : fs::directory_iterator(kDirectory, error)) {
-        if (entry.path().filename().string().rfind("event", 0) == 0) paths.push_back(entry.path());
+        const std::string path = entry.path();
+        if (entry.path().filename().string().rfind("event", 0) == 0)
+            paths.emplace(path.size(), path);
     }
-    std::sort(paths.begin(), paths.end(), [](const std::string& a, const std::string& b) {
-        return a.size() != b.size() ? a.size() < b.size() : a < b;
-    });
     std::vector<Device> devices;
-    for (const std::string& path : paths) {
+    for (const auto& [size, path] : paths) {
         if (std::optional<Device> device = examine(path)) devices.push_back(std::move(*device));
     }
     return devices;
@@ -135,10 +130,8 @@ Device chooseDevice(const std::string& path) {
     const auto usable = std::find_if(devices.begin(), devices.end(), isUsable);
     if (std::count_if(devices.begin(), devices.end(), isUsable) == 1) return *usable;
     std::string devicesInWords;
-    for (const Device& device : devices) {
-        devicesInWords += (devicesInWords.empty() ? "" : "; ") + device.path + ", \"" +
-                          device.name + "\" (" + device.inWords() + ")";
-    }
+    for (const Device& device : devices)
+        devicesInWords += (devicesInWords.empty() ? "" : "; ") + device.inWords();
     throw std::runtime_error((usable == devices.end() ? "no motor can be used: "
                                                       : "choose a motor with --device: ") +
                              devicesInWords);

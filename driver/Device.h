@@ -10,18 +10,18 @@ namespace driver {
 struct Device {
     std::string path;
     std::string name;
-    /** Its bus, numbers, name and serial number, which stay when it is plugged in again. */
+    /** Its kind, name and serial number, which stay when it is plugged in again. */
     std::string identity;
     /** The effect that is used: FF_RUMBLE, else FF_CONSTANT; 0: none. */
     int effect = 0;
     /** Whether it has a setting for the strength of all its effects. */
     bool hasGain = false;
-    /** How many effects it holds at a time. */
-    int effects = 0;
+    /** What it can do, in words. */
+    std::string abilities;
     /** Why it cannot be used; empty if it can. */
     std::string problem;
 
-    /** @return what it can do, or why it cannot be used. */
+    /** @return its path and name, and what it can do or why it cannot be used. */
     std::string inWords() const;
 };
 

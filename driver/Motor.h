@@ -2,9 +2,6 @@
 #pragma once
 
 #include "Device.h"
-#include "Loop.h"
-
-#include <linux/input.h>
 
 #include <cstdint>
 
@@ -13,19 +10,26 @@ namespace driver {
 /** The full strength of a motor. */
 constexpr int kFullStrength = 10000;
 
+/** @return a strength in proportion to another full one, rounded. */
+constexpr uint32_t scaled(uint32_t strength, uint32_t full) {
+    return (strength * full + kFullStrength / 2) / kFullStrength;
+}
+
 /** The longest time that the kernel plays an effect, in ms. */
 constexpr int64_t kLongestEffect = 0xffff;
 
 /**
  * A force-feedback motor. It plays one effect, which it changes while it plays. The kernel stops it
- * when this process ends; it lives as long. A motor that is unplugged is opened again when it is
- * back.
+ * when this process ends; it lives as long.
  */
 class Motor {
   public:
     /** @throw std::system_error if the device cannot be opened. */
-    Motor(Device device, Loop& loop, std::function<void()> whenLost);
-    bool isThere() const { return mFile >= 0; }
+    explicit Motor(const Device& device);
+    /** @return whether it is plugged in; one that was unplugged has to be opened again. */
+    bool isThere() const;
+    /** Looks for the same device if it was unplugged. @return whether it is there. */
+    bool openAgain();
     /**
      * Runs the motor from now on, or changes its strength while it runs.
      *
@@ -37,17 +41,12 @@ class Motor {
     void stop();
 
   private:
-    int open(const std::string& path);
-    void look();
-    void lose();
-    /** @return the errno as a negative number. */
-    int fail(int error);
+    bool open(const Device& device);
+    /** @return errno as a negative number. */
+    int fail() const;
     bool send(uint16_t code, int32_t value) const;
 
     Device mDevice;
-    Loop& mLoop;
-    std::function<void()> mWhenLost;
-    int mChanges;
     int mFile = -1;
     /** The number of the effect; -1 until the kernel has given one. */
     int16_t mEffect = -1;

@@ -11,7 +11,7 @@ namespace driver {
 
 namespace product = ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
-MotorState::MotorState(Player& player, std::vector<std::vector<Segment>> patterns)
+MotorState::MotorState(Player& player, Patterns patterns)
     : mPlayer(player), mPatterns(std::move(patterns)) {}
 
 std::string MotorState::text(const std::string& leaf) const {
@@ -35,8 +35,8 @@ int MotorState::perform(const model::Action& action) {
 
 int MotorState::act(const model::RunMotor& action) {
     constexpr uint64_t kMost = std::numeric_limits<int32_t>::max();
-    const auto milliseconds = static_cast<uint32_t>(std::min(action.milliseconds, kMost));
-    Performance performance{{{milliseconds, kFullStrength}}};
+    const auto milliseconds = static_cast<int>(std::min(action.milliseconds, kMost));
+    Performance performance{{{milliseconds, kFullStrength, 0, 0}}};
     if (mChoice) performance = std::move(*mChoice);
     mChoice.reset();
     if (milliseconds == 0) return mPlayer.stop(), 0;
@@ -48,10 +48,7 @@ int MotorState::act(const model::SetIntensity& action) {
 }
 
 int MotorState::act(const model::SetPackets& action) {
-    mChoice = Performance{{}, kFullStrength};
-    for (const model::Packet& packet : action.packets) {
-        mChoice->segments.push_back(segmentOf(packet));
-    }
+    mChoice = Performance{action.packets, kFullStrength};
     return 0;
 }
 

@@ -1,21 +1,19 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Attributes.h"
 #include "Patterns.h"
 #include "Player.h"
 
 #include <map>
 #include <optional>
 #include <string>
-#include <vector>
 
 namespace driver {
 
 /** The attributes' texts in memory, and a motor that does what they ask for. */
 class MotorState : public model::State {
   public:
-    MotorState(Player& player, std::vector<std::vector<Segment>> patterns);
+    MotorState(Player& player, Patterns patterns);
 
     std::string text(const std::string& leaf) const override;
     int setText(const std::string& leaf, std::string_view text) override;
@@ -33,7 +31,7 @@ class MotorState : public model::State {
     int choosePattern(int number, std::optional<uint32_t> scale, bool repeats);
 
     Player& mPlayer;
-    const std::vector<std::vector<Segment>> mPatterns;
+    const Patterns mPatterns;
     std::map<std::string, std::string> mTexts;
     /** For the next start; without it the motor just runs. */
     std::optional<Performance> mChoice;

@@ -8,13 +8,13 @@
 #include <fcntl.h>
 #include <fuse3/fuse.h>
 #include <fuse3/fuse_lowlevel.h>
+#include <poll.h>
 #include <sys/mount.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
-#include <memory>
 #include <stdexcept>
 
 namespace driver {
@@ -47,10 +47,6 @@ struct Nodes::Requests {
         struct stat& info = nodes().mFiles[path];
         if (owner != static_cast<uid_t>(-1)) info.st_uid = owner;
         if (group != static_cast<gid_t>(-1)) info.st_gid = group;
-        return 0;
-    }
-    /** A shell that writes to a file empties it first. */
-    static int setSize(const char* /* path */, off_t /* size */, fuse_file_info* /* file */) {
         return 0;
     }
     static int list(const char* path, void* names, fuse_fill_dir_t add, off_t /* offset */,
@@ -92,8 +88,7 @@ struct Nodes::Requests {
     }
 };
 
-Nodes::Nodes(int file, model::Layout layout, model::State& state, Loop& loop,
-             const std::string& trace)
+Nodes::Nodes(int file, model::Layout layout, model::State& state, const std::string& trace)
     : mState(state),
       mTrace(trace),
       mDirectory(std::string(model::sysfsDirectory(layout)).substr(strlen("/sys/class"))) {
@@ -103,7 +98,6 @@ Nodes::Nodes(int file, model::Layout layout, model::State& state, Loop& loop,
     requests.init = Requests::begin;
     requests.getattr = Requests::getAttributes;
     requests.chown = Requests::setOwner;
-    requests.truncate = Requests::setSize;
     requests.readdir = Requests::list;
     requests.open = Requests::openFile;
     requests.read = Requests::readFile;
@@ -118,13 +112,18 @@ Nodes::Nodes(int file, model::Layout layout, model::State& state, Loop& loop,
     if (mFuse == nullptr || fuse_mount(mFuse, mounted.c_str()) != 0) {
         throw std::runtime_error("the file system of the nodes cannot be served");
     }
-    loop.watch(file, POLLIN,
-               [&loop, session = fuse_get_session(mFuse), request = std::make_shared<fuse_buf>()] {
-                   if (fuse_session_receive_buf(session, request.get()) > 0) {
-                       fuse_session_process_buf(session, request.get());
-                   }
-                   if (fuse_session_exited(session) != 0) loop.end();
-               });
+}
+
+void Nodes::serve(int timer, const std::function<void()>& action) {
+    fuse_session* const session = fuse_get_session(mFuse);
+    fuse_buf request{};
+    pollfd waiting[] = {{fuse_session_fd(session), POLLIN, 0}, {timer, POLLIN, 0}};
+    while (fuse_session_exited(session) == 0 && poll(waiting, 2, -1) > 0) {
+        if (waiting[1].revents != 0) action();
+        if (waiting[0].revents != 0 && fuse_session_receive_buf(session, &request) > 0) {
+            fuse_session_process_buf(session, &request);
+        }
+    }
 }
 
 void Nodes::add(const std::string& leaf, mode_t mode) {

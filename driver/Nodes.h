@@ -3,10 +3,10 @@
 
 #include "Attributes.h"
 #include "Folder.h"
-#include "Loop.h"
 
 #include <sys/stat.h>
 
+#include <functional>
 #include <map>
 #include <string>
 
@@ -33,19 +33,17 @@ void mountFileSystem(int file, const std::string& directory);
  */
 class Nodes {
   public:
-    /** Gets each access, as model::traceLine does. */
-    using Trace =
-            std::function<void(const std::string& access, long result, const std::string& shown)>;
     /**
      * @param file where the kernel asks.
      * @param trace gets each access; a directory that is no driver's for no trace.
      * @throw std::runtime_error
      */
-    Nodes(int file, model::Layout layout, model::State& state, Loop& loop,
-          const std::string& trace);
+    Nodes(int file, model::Layout layout, model::State& state, const std::string& trace);
 
     /** Adds a file for an attribute. */
     void add(const std::string& leaf, mode_t mode);
+    /** Serves them until they are unmounted. @param action called when a timer can be read. */
+    void serve(int timer, const std::function<void()>& action);
 
   private:
     struct Requests;

@@ -4,18 +4,12 @@
 #include "cli/CommandLine.h"
 #include "text/Text.h"
 
-#include <algorithm>
 #include <sstream>
 
 namespace driver {
 
-Segment segmentOf(const model::Packet& packet) {
-    return {static_cast<uint32_t>(std::max(packet.param0, 0)),
-            static_cast<uint32_t>(std::clamp(packet.intensity, 0, kFullStrength))};
-}
-
-std::vector<std::vector<Segment>> parsePatterns(const std::string& text) {
-    std::vector<std::vector<Segment>> patterns;
+Patterns parsePatterns(const std::string& text, const std::string& file) {
+    Patterns patterns;
     std::istringstream lines(text);
     size_t number = 1;
     for (std::string line; std::getline(lines, line); ++number) {
@@ -28,13 +22,15 @@ std::vector<std::vector<Segment>> parsePatterns(const std::string& text) {
                    &packet.param3, &end);
             if (end != static_cast<int>(word.size()) || patterns.empty()) {
                 throw cli::UsageError(
-                        "line " + std::to_string(number) + ": " + cli::inQuotes(word) +
+                        cli::inQuotes(file) + ": line " + std::to_string(number) + ": " +
+                        cli::inQuotes(word) +
                         " is not a packet of a pattern, PARAM0,INTENSITY,PARAM2,PARAM3");
             }
-            patterns.back().push_back(segmentOf(packet));
+            patterns.back().push_back(packet);
         }
     }
-    if (patterns.empty()) throw cli::UsageError("there is no pattern in it");
+    if (patterns.empty())
+        throw cli::UsageError(cli::inQuotes(file) + ": there is no pattern in it");
     return patterns;
 }
 

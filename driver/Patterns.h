@@ -2,23 +2,22 @@
 #pragma once
 
 #include "Attributes.h"
-#include "Player.h"
 
 #include <string>
 #include <vector>
 
 namespace driver {
 
-/** @return the time, the strength and the frequency that a packet of the haptic engine stands for.
- */
-Segment segmentOf(const model::Packet& packet);
+/** The packets of each stored pattern, the one with number 1 first. */
+using Patterns = std::vector<std::vector<model::Packet>>;
 
 /**
- * Reads stored patterns. A line [NAME] begins each, the first with number 1; packets follow, each
+ * Reads stored patterns. A line [NAME] begins each; packets follow, each
  * PARAM0,INTENSITY,PARAM2,PARAM3, with blanks between them. # begins a comment.
  *
+ * @param file what the text is from, for the error.
  * @throw cli::UsageError with the first mistake and its line.
  */
-std::vector<std::vector<Segment>> parsePatterns(const std::string& text);
+Patterns parsePatterns(const std::string& text, const std::string& file);
 
 }  // namespace driver

@@ -2,7 +2,6 @@
 #include "Player.h"
 
 #include <sys/timerfd.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
@@ -25,80 +24,73 @@ int64_t now() {
     return time.tv_sec * kSecond + time.tv_nsec;
 }
 
+/** @return how long a packet lasts, in ns. */
+int64_t lengthOf(const model::Packet& packet) {
+    return std::max(packet.param0, 0) * kMillisecond;
+}
+
+int64_t lengthOf(const std::vector<model::Packet>& packets) {
+    int64_t length = 0;
+    for (const model::Packet& packet : packets)
+        length += lengthOf(packet);
+    return length;
+}
+
 }  // namespace
 
-Player::Player(Device device, Loop& loop)
-    : mTimer(timerfd_create(CLOCK_BOOTTIME, TFD_CLOEXEC | TFD_NONBLOCK)),
-      mMotor(std::move(device), loop, [this] { stop(); }) {
+Player::Player(const Device& device)
+    : mTimer(timerfd_create(CLOCK_BOOTTIME, TFD_CLOEXEC)), mMotor(device) {
     if (mTimer < 0) throw std::system_error(errno, std::generic_category(), "timerfd_create");
-    loop.watch(mTimer, POLLIN, [this] {
-        uint64_t times = 0;
-        if (read(mTimer, &times, sizeof(times)) == sizeof(times)) advance();
-    });
 }
 
 int Player::start(Performance performance) {
-    if (!mMotor.isThere()) return -ENODEV;
+    if (!mMotor.openAgain()) return -ENODEV;
     mPlayed = std::move(performance);
-    mIndex = 0;
-    mNext = mEnd = now();
-    for (const Segment& segment : mPlayed.segments)
-        mEnd += segment.milliseconds * kMillisecond;
-    mPlayed.repeats = mPlayed.repeats && mEnd > mNext;
-    if (!mPlayed.segments.empty()) mNext += mPlayed.segments[0].milliseconds * kMillisecond;
+    mStart = now();
     return advance();
 }
 
 int Player::setStrength(uint32_t strength) {
     mStrength = strength;
-    return mIndex < mPlayed.segments.size() && !mPlayed.scale ? apply() : 0;
+    return remaining() > 0 && !mPlayed.scale ? advance() : 0;
 }
 
 void Player::stop() {
     mPlayed = {};
-    mIndex = 0;
     mMotor.stop();
     setTimer(0);
 }
 
 int64_t Player::remaining() const {
-    if (mIndex >= mPlayed.segments.size()) return 0;
+    if (!mMotor.isThere()) return 0;
     if (mPlayed.repeats) return std::numeric_limits<int32_t>::max();
-    return std::max<int64_t>(0, (mEnd - now() + kMillisecond - 1) / kMillisecond);
+    const int64_t left = mStart + lengthOf(mPlayed.packets) - now();
+    return std::max<int64_t>(0, (left + kMillisecond - 1) / kMillisecond);
 }
 
-/** Has the motor do what the current segment says. @return 0, or a negative errno. */
-int Player::apply() {
-    if (mIndex >= mPlayed.segments.size()) return stop(), 0;
-    const Segment& segment = mPlayed.segments[mIndex];
-    const uint32_t strength =
-            (segment.strength * mPlayed.scale.value_or(mStrength) + kFullStrength / 2) /
-            kFullStrength;
-    const int64_t left = std::min(remaining(), kLongestEffect);
+int Player::advance() {
+    const int64_t time = now();
+    const int64_t length = lengthOf(mPlayed.packets);
+    if (mPlayed.repeats && length > 0) mStart = time - (time - mStart) % length;
+    int64_t end = mStart;
+    const auto packet =
+            std::find_if(mPlayed.packets.begin(), mPlayed.packets.end(),
+                         [&](const model::Packet& each) { return (end += lengthOf(each)) > time; });
+    if (packet == mPlayed.packets.end()) return stop(), 0;
+    const auto intensity = static_cast<uint32_t>(std::clamp(packet->intensity, 0, kFullStrength));
+    const uint32_t strength = scaled(intensity, mPlayed.scale.value_or(mStrength));
     int error = 0;
     if (strength == 0) {
         mMotor.stop();
     } else {
-        error = mMotor.run(strength, left);
+        error = mMotor.run(strength, remaining());
     }
     // A kernel that ends the effect by itself does so not before the motor is stopped.
     if (error == 0)
-        setTimer(std::min(mNext, now() + kLongestEffect * kMillisecond - kMargin));
+        setTimer(std::min(end, time + kLongestEffect * kMillisecond - kMargin));
     else
         stop();
     return error;
-}
-
-/** Goes on to the segment whose time it is. @return 0, or a negative errno. */
-int Player::advance() {
-    const int64_t time = now();
-    while (mIndex < mPlayed.segments.size() && mNext <= time) {
-        ++mIndex;
-        if (mIndex == mPlayed.segments.size() && mPlayed.repeats) mIndex = 0;
-        if (mIndex < mPlayed.segments.size())
-            mNext += mPlayed.segments[mIndex].milliseconds * kMillisecond;
-    }
-    return apply();
 }
 
 void Player::setTimer(int64_t time) const {

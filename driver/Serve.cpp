@@ -28,6 +28,8 @@ namespace {
 namespace fs = std::filesystem;
 
 constexpr char kClasses[] = "/sys/class";
+/** Where a process that serves nodes has the descriptor for them, so that another finds it. */
+constexpr int kServedFile = 100;
 constexpr char kBanner[] =
         "The service on a motor. Try:\n"
         "  vibratorctl click\n"
@@ -61,34 +63,28 @@ void leaveMounts() {
 
 /** @return the descriptor over which another process serves files, as one of this process. */
 int takeFileSystem(pid_t process) {
-    const fs::path files = "/proc/" + std::to_string(process) + "/fd";
+    const std::string inWords = "process " + std::to_string(process);
     const auto handle = static_cast<int>(syscall(SYS_pidfd_open, process, 0));
+    if (handle < 0) fail(inWords);
     // A process that has just begun has not opened it yet: five seconds.
     for (int attempt = 0; attempt < 250; ++attempt) {
-        for (const auto& entry : fs::directory_iterator(files)) {
-            std::error_code error;
-            if (fs::read_symlink(entry.path(), error) != "/dev/fuse") continue;
-            const int number = std::stoi(entry.path().filename());
-            const auto file = static_cast<int>(syscall(SYS_pidfd_getfd, handle, number, 0));
-            if (file >= 0) return file;
-            fail("pidfd_getfd");
-        }
+        const auto file = static_cast<int>(syscall(SYS_pidfd_getfd, handle, kServedFile, 0));
+        if (file >= 0) return file;
+        if (errno != EBADF) break;
         usleep(20'000);
     }
-    throw std::runtime_error("process " + std::to_string(process) + " serves no nodes");
+    fail(inWords + " serves no nodes");
 }
 
 /** Serves nodes until they are unmounted. @param trace directory of the trace; empty for none. */
 void serve(const Setup& setup, int file, const std::string& trace) {
-    const auto patterns = parsePatterns(setup.patterns);
     model::Features features;
     for (const std::string& name : model::featureNames())
         features.names.insert(name);
-    features.waves = static_cast<int>(patterns.size());
-    Loop loop;
-    Player player(setup.device, loop);
-    MotorState state(player, patterns);
-    Nodes nodes(file, setup.layout, state, loop, trace);
+    features.waves = static_cast<int>(setup.patterns.size());
+    Player player(setup.device);
+    MotorState state(player, setup.patterns);
+    Nodes nodes(file, setup.layout, state, trace);
     for (const model::Attribute& attribute : model::attributes()) {
         if (!attribute.isIn(setup.layout, features)) continue;
         state.setText(attribute.leaf, attribute.initialText(features));
@@ -97,13 +93,13 @@ void serve(const Setup& setup, int file, const std::string& trace) {
     // Not of the kernel's drivers: says through what the motor is reached.
     state.setText("input_device", setup.device.path + " " + setup.device.name + "\n");
     nodes.add("input_device", 0444);
-    loop.run();
+    nodes.serve(player.timer(), [&player] { player.advance(); });
 }
 
 }  // namespace
 
 void serveMounted(const Setup& setup) {
-    const int file = openFileSystem();
+    const int file = dup2(openFileSystem(), kServedFile);
     // The kernel says nothing when it is mounted.
     for (pollfd each{file, POLLIN, 0}; poll(&each, 1, -1) >= 0 && (each.revents & POLLERR) != 0;)
         usleep(10'000);

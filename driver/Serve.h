@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Attributes.h"
 #include "Device.h"
+#include "Patterns.h"
 
 #include <sys/types.h>
 
@@ -15,8 +15,7 @@ namespace driver {
 struct Setup {
     Device device;
     model::Layout layout;
-    /** The text of the stored patterns. */
-    std::string patterns;
+    Patterns patterns;
 };
 
 /** Serves the nodes of a motor once another process has called mountNodes, until they are

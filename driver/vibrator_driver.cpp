@@ -42,28 +42,24 @@ class VibratorDriver : public cli::Program {
         const auto patterns =
                 command.file("--patterns FILE", "stored patterns, instead of the usual ones", "");
         return [=] {
+            const std::string file = patterns->empty() ? usualPatterns() : *patterns;
             return driver::Setup{
                     driver::chooseDevice(*device),
                     *layout == 0 ? model::Layout::kTimedOutput : model::Layout::kLedTrigger,
-                    readPatterns(*patterns)};
+                    driver::parsePatterns(readPatterns(file), file)};
         };
     }
-    static std::string readPatterns(std::string path) {
-        if (path.empty() && std::filesystem::exists(kPatternFile)) path = kPatternFile;
-        std::string text = kShippedPatterns;
-        if (!path.empty()) {
-            std::ifstream file(path);
-            if (!file || std::filesystem::is_directory(path)) {
-                throw cli::UsageError(cli::inQuotes(path) + " cannot be read");
-            }
-            text.assign(std::istreambuf_iterator<char>(file), {});
+    /** @return the file of patterns where no other is asked for; "": the shipped ones. */
+    static std::string usualPatterns() {
+        return std::filesystem::exists(kPatternFile) ? kPatternFile : "";
+    }
+    static std::string readPatterns(const std::string& path) {
+        if (path.empty()) return kShippedPatterns;
+        std::ifstream file(path);
+        if (!file || std::filesystem::is_directory(path)) {
+            throw cli::UsageError(cli::inQuotes(path) + " cannot be read");
         }
-        try {
-            driver::parsePatterns(text);
-        } catch (const cli::UsageError& error) {
-            throw cli::UsageError(cli::inQuotes(path) + ": " + error.what());
-        }
-        return text;
+        return {std::istreambuf_iterator<char>(file), {}};
     }
 
     void addRun() {
@@ -101,7 +97,7 @@ class VibratorDriver : public cli::Program {
 
     void addPatterns() {
         command("A motor", "patterns", "print the stored patterns, to be edited", "").run([] {
-            std::cout << readPatterns("");
+            std::cout << readPatterns(usualPatterns());
             return cli::kSuccess;
         });
     }
@@ -111,8 +107,7 @@ class VibratorDriver : public cli::Program {
                 .run([this] {
                     const std::vector<driver::Device> devices = driver::listDevices();
                     for (const driver::Device& device : devices) {
-                        std::cout << device.path << "  " << cli::printable(device.name) << ": "
-                                  << device.inWords() << '\n';
+                        std::cout << device.inWords() << '\n';
                     }
                     if (devices.empty()) warn("list: this machine has no force-feedback motor");
                     return cli::kSuccess;
