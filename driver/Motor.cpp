@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Motor.h"
 
+#include "text/Text.h"
+
 #include <fcntl.h>
-#include <linux/input.h>
+#include <libevdev/libevdev.h>
 #include <poll.h>
 #include <sys/ioctl.h>
 #include <unistd.h>
@@ -10,69 +12,141 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
+#include <filesystem>
+#include <fstream>
 #include <iostream>
-#include <system_error>
-#include <utility>
+#include <map>
+#include <stdexcept>
 
 namespace driver {
+namespace {
 
-Motor::Motor(const Device& device) {
-    if (!open(device)) throw std::system_error(errno, std::generic_category(), device.path);
+namespace fs = std::filesystem;
+
+/** @return the first line of a file; empty if there is none. */
+std::string firstLine(const std::string& path) {
+    std::string line;
+    std::getline(std::ifstream(path), line);
+    return line;
 }
 
-bool Motor::open(const Device& device) {
-    const int file = ::open(device.path.c_str(), O_RDWR | O_CLOEXEC | O_NONBLOCK);
-    if (file < 0) return false;
-    if (mFile >= 0) close(mFile);
-    mDevice = device;
-    mFile = file;
-    mEffect = -1;
-    mRuns = false;
-    // What another program has set stays until somebody sets it again.
-    if (mDevice.hasGain) send(FF_GAIN, 0xffff);
-    return true;
+}  // namespace
+
+Motor::Motor(const std::string& path, const std::string& properties)
+    : mPath(path),
+      mName(firstLine(properties + "/name")),
+      mIdentity(firstLine(properties + "/modalias") + mName + firstLine(properties + "/uniq")),
+      mFile(open(path.c_str(), O_RDWR | O_CLOEXEC | O_NONBLOCK)) {
+    if (mFile.isOpen()) {
+        ask();
+    } else {
+        mProblem = strerror(mFile.error());
+        if (mFile.error() == EACCES)
+            mProblem += "; log in at the seat that it belongs to, or join the group \"input\"";
+    }
+}
+
+/** Asks the device what it can do. */
+void Motor::ask() {
+    libevdev* device = nullptr;
+    if (const int error = libevdev_new_from_fd(mFile.get(), &device); error != 0) {
+        mProblem = strerror(-error);
+        return;
+    }
+    const auto has = [&](unsigned code) {
+        return libevdev_has_event_code(device, EV_FF, code) != 0;
+    };
+    // The kernel also offers rumble for a device that plays sine waves, and turns it into those.
+    mType = has(FF_RUMBLE) ? FF_RUMBLE : has(FF_CONSTANT) ? FF_CONSTANT : 0;
+    mHasGain = has(FF_GAIN);
+    libevdev_free(device);
+    int effects = 0;
+    ioctl(mFile.get(), EVIOCGEFFECTS, &effects);
+    if (mType == 0) mProblem = "it plays neither rumble nor constant forces";
+    if (effects == 0) mProblem = "it holds no effects";
+    mAbilities = std::string(mType == FF_RUMBLE ? "rumble, " : "constant forces, ") +
+                 (mHasGain ? "gain, " : "no gain, ") + std::to_string(effects) +
+                 (effects == 1 ? " effect" : " effects");
+}
+
+std::vector<Motor> Motor::list() {
+    std::map<int, Motor> byNumber;
+    std::error_code error;
+    for (const auto& entry : fs::directory_iterator("/sys/dev/char", error)) {
+        const fs::path device = fs::canonical(entry.path(), error);
+        int number = 0;
+        if (sscanf(device.filename().c_str(), "event%d", &number) != 1) continue;
+        const std::string properties = device / "device";
+        if (firstLine(properties + "/capabilities/ff") == "0") continue;
+        byNumber.emplace(number, Motor("/dev/input" / device.filename(), properties));
+    }
+    std::vector<Motor> motors;
+    motors.reserve(byNumber.size());
+    for (auto& [number, motor] : byNumber)
+        motors.push_back(std::move(motor));
+    return motors;
+}
+
+Motor Motor::choose(const std::string& path) {
+    std::error_code error;
+    const fs::path asked = fs::canonical(path, error);
+    std::vector<Motor> usable;
+    std::string all;
+    for (Motor& motor : list()) {
+        all += (all.empty() ? "" : "; ") + motor.inWords();
+        if (motor.mProblem.empty() && (path.empty() || motor.mPath == asked))
+            usable.push_back(std::move(motor));
+    }
+    if (usable.size() == 1) return std::move(usable[0]);
+    throw std::runtime_error(
+            (!path.empty()    ? cli::inQuotes(path) + " is no motor that can be used: "
+             : usable.empty() ? "no motor can be used: "
+                              : "choose a motor with --device: ") +
+            (all.empty() ? "this machine has none; plug one in, like a game controller with rumble"
+                         : all));
+}
+
+std::string Motor::inWords() const {
+    return mPath + " " + cli::inQuotes(mName) + ": " + (mProblem.empty() ? mAbilities : mProblem);
 }
 
 bool Motor::isThere() const {
-    pollfd state{mFile, 0, 0};
+    pollfd state{mFile.get(), 0, 0};
     return poll(&state, 1, 0) == 0;
 }
 
-bool Motor::openAgain() {
-    if (isThere()) return true;
-    for (const Device& device : listDevices()) {
-        if (device.identity != mDevice.identity || !device.problem.empty()) continue;
-        if (!open(device)) continue;
-        std::cerr << "vibrator-driver: \"" << mDevice.name << "\" is back, as " << mDevice.path
-                  << std::endl;
-        return true;
+int Motor::openAgain() {
+    if (isThere()) return 0;
+    for (Motor& motor : list()) {
+        if (motor.mIdentity != mIdentity || !motor.mProblem.empty()) continue;
+        *this = std::move(motor);
+        return 0;
     }
-    return false;
+    return fail(ENODEV);
 }
 
-int Motor::fail() const {
-    const int error = errno;
-    if (error != ENODEV) {
-        std::cerr << "vibrator-driver: \"" << mDevice.name << "\": "
-                  << (error == ENOSPC ? "other programs use all of its effects" : strerror(error))
-                  << std::endl;
-    }
+int Motor::fail(int error) const {
+    std::cerr << "vibrator-driver: " << cli::inQuotes(mName) << ": "
+              << (error == ENOSPC ? "other programs use all of its effects" : strerror(error))
+              << std::endl;
     return -error;
 }
 
-bool Motor::send(uint16_t code, int32_t value) const {
+bool Motor::send(int code, int value) const {
     input_event event{};
     event.type = EV_FF;
-    event.code = code;
+    event.code = static_cast<uint16_t>(code);
     event.value = value;
-    return write(mFile, &event, sizeof(event)) == sizeof(event);
+    return write(mFile.get(), &event, sizeof(event)) == sizeof(event);
 }
 
-int Motor::run(uint32_t strength, int64_t milliseconds) {
+int Motor::run(int strength, int64_t milliseconds) {
+    // What another program has set stays until somebody sets it again.
+    if (mEffect < 0 && mHasGain) send(FF_GAIN, 0xffff);
     ff_effect effect{};
     effect.id = mEffect;
-    effect.type = static_cast<uint16_t>(mDevice.effect);
-    if (effect.type == FF_RUMBLE) {
+    effect.type = mType;
+    if (mType == FF_RUMBLE) {
         const auto magnitude = static_cast<uint16_t>(scaled(strength, 0xffff));
         effect.u.rumble = {magnitude, magnitude};
     } else {
@@ -80,19 +154,13 @@ int Motor::run(uint32_t strength, int64_t milliseconds) {
     }
     effect.replay.length =
             static_cast<uint16_t>(std::clamp<int64_t>(milliseconds, 1, kLongestEffect));
-    if (ioctl(mFile, EVIOCSFF, &effect) != 0) return fail();
-    // A change of the strength goes on without a gap. Only a length that is renewed needs a start.
+    if (ioctl(mFile.get(), EVIOCSFF, &effect) != 0) return fail(errno);
     mEffect = effect.id;
-    const uint32_t before = std::exchange(mStrength, strength);
-    if (mRuns && before != strength) return 0;
-    if (!send(static_cast<uint16_t>(mEffect), 1)) return fail();
-    mRuns = true;
-    return 0;
+    return send(mEffect, 1) ? 0 : fail(errno);
 }
 
-void Motor::stop() {
-    if (mRuns && !send(static_cast<uint16_t>(mEffect), 0)) fail();
-    mRuns = false;
+void Motor::stop() const {
+    if (mEffect >= 0) send(mEffect, 0);
 }
 
 }  // namespace driver

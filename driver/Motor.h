@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Device.h"
+#include "Descriptor.h"
 
 #include <cstdint>
+#include <string>
+#include <vector>
 
 namespace driver {
 
@@ -11,47 +13,66 @@ namespace driver {
 constexpr int kFullStrength = 10000;
 
 /** @return a strength in proportion to another full one, rounded. */
-constexpr uint32_t scaled(uint32_t strength, uint32_t full) {
+constexpr int scaled(int strength, int full) {
     return (strength * full + kFullStrength / 2) / kFullStrength;
 }
 
-/** The longest time that the kernel plays an effect, in ms. */
-constexpr int64_t kLongestEffect = 0xffff;
+/** The longest time that the kernel promises to play an effect, in ms. */
+constexpr int64_t kLongestEffect = 0x7fff;
 
-/**
- * A force-feedback motor. It plays one effect, which it changes while it plays. The kernel stops it
- * when this process ends; it lives as long.
- */
+/** An input device that offers force feedback. It plays one effect, until it is closed at most. */
 class Motor {
   public:
-    /** @throw std::system_error if the device cannot be opened. */
-    explicit Motor(const Device& device);
+    /** @return the motors of this machine, in the order of their devices' numbers. */
+    static std::vector<Motor> list();
+    /**
+     * @return the motor with a path; for an empty path the only one that can be used.
+     * @throw std::runtime_error that says why there is none, or which ones there are.
+     */
+    static Motor choose(const std::string& path);
+
+    const std::string& path() const { return mPath; }
+    const std::string& name() const { return mName; }
+    /** @return path and name, and what it can do or why it cannot be used. */
+    std::string inWords() const;
+
     /** @return whether it is plugged in; one that was unplugged has to be opened again. */
     bool isThere() const;
-    /** Looks for the same device if it was unplugged. @return whether it is there. */
-    bool openAgain();
+    /** Looks for the same device if it was unplugged. @return 0, or a negative errno. */
+    int openAgain();
     /**
-     * Runs the motor from now on, or changes its strength while it runs.
+     * Runs the motor from now on; one that runs changes without a gap.
      *
      * @param strength 1 to kFullStrength.
-     * @param milliseconds when the kernel is to stop it, at most; kLongestEffect is the most.
+     * @param milliseconds when the kernel is to stop it, kLongestEffect at most.
      * @return 0, or a negative errno.
      */
-    int run(uint32_t strength, int64_t milliseconds);
-    void stop();
+    int run(int strength, int64_t milliseconds);
+    void stop() const;
 
   private:
-    bool open(const Device& device);
-    /** @return errno as a negative number. */
-    int fail() const;
-    bool send(uint16_t code, int32_t value) const;
+    /** @param properties the directory where the kernel describes the device. */
+    Motor(const std::string& path, const std::string& properties);
 
-    Device mDevice;
-    int mFile = -1;
+    void ask();
+    /** Logs an error. @return it as a negative errno. */
+    int fail(int error) const;
+    bool send(int code, int value) const;
+
+    std::string mPath;
+    std::string mName;
+    /** What stays when it is plugged in again. */
+    std::string mIdentity;
+    simulator::Descriptor mFile;
+    /** The effect that is used: FF_RUMBLE, else FF_CONSTANT; 0: none. */
+    uint16_t mType = 0;
+    /** Whether it has a setting for the strength of all its effects. */
+    bool mHasGain = false;
+    std::string mAbilities;
+    /** Why it cannot be used; empty if it can. */
+    std::string mProblem;
     /** The number of the effect; -1 until the kernel has given one. */
     int16_t mEffect = -1;
-    uint32_t mStrength = 0;
-    bool mRuns = false;
 };
 
 }  // namespace driver

@@ -9,25 +9,35 @@
 #include <fuse3/fuse.h>
 #include <fuse3/fuse_lowlevel.h>
 #include <poll.h>
-#include <sys/mount.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
-#include <cstring>
 #include <stdexcept>
 
 namespace driver {
+namespace {
+
+struct stat describe(mode_t mode) {
+    struct stat info {};
+    info.st_mode = mode;
+    info.st_nlink = 1;
+    info.st_uid = geteuid();
+    info.st_gid = getegid();
+    info.st_size = S_ISREG(mode) ? model::kPageSize : 0;
+    return info;
+}
+
+}  // namespace
 
 /** What the kernel asks for. Each returns 0 or a negative errno. */
 struct Nodes::Requests {
     static Nodes& nodes() { return *static_cast<Nodes*>(fuse_get_context()->private_data); }
-    static std::string leafOf(const char* path) { return strrchr(path, '/') + 1; }
-    static long trace(const char* path, const std::string& access, long result,
-                      const std::string& shown = {}) {
-        const std::string name = model::traceName("/sys/class" + std::string(path));
+    static int trace(const char* path, const std::string& access, ssize_t result,
+                     const std::string& shown = {}) {
+        const std::string name = model::traceName(nodes().mDirectory + (path + 1));
         simulator::trace(nodes().mTrace, name + ' ' + access, result, shown);
-        return result;
+        return static_cast<int>(result);
     }
 
     static void* begin(fuse_conn_info* /* connection */, fuse_config* config) {
@@ -49,13 +59,10 @@ struct Nodes::Requests {
         if (group != static_cast<gid_t>(-1)) info.st_gid = group;
         return 0;
     }
-    static int list(const char* path, void* names, fuse_fill_dir_t add, off_t /* offset */,
+    static int list(const char* /* path */, void* names, fuse_fill_dir_t add, off_t /* offset */,
                     fuse_file_info* /* file */, fuse_readdir_flags /* flags */) {
-        const std::string directory = path[1] == '\0' ? "" : path;
-        for (const auto& [each, info] : nodes().mFiles) {
-            const std::string leaf = leafOf(each.c_str());
-            if (each == directory + '/' + leaf && !leaf.empty())
-                add(names, leaf.c_str(), nullptr, 0, fuse_fill_dir_flags{});
+        for (const auto& [path, info] : nodes().mFiles) {
+            if (S_ISREG(info.st_mode)) add(names, &path[1], nullptr, 0, fuse_fill_dir_flags{});
         }
         return 0;
     }
@@ -67,33 +74,31 @@ struct Nodes::Requests {
         const int access = file->flags & O_ACCMODE;
         const bool isRefused = (access != O_WRONLY && (mode & 0444) == 0) ||
                                (access != O_RDONLY && (mode & 0222) == 0);
-        return static_cast<int>(
-                trace(path, std::string("open ") + kNames[access], isRefused ? -EACCES : 0));
+        return trace(path, std::string("open ") + kNames[access], isRefused ? -EACCES : 0);
     }
     static int readFile(const char* path, char* buffer, size_t size, off_t offset,
                         fuse_file_info* /* file */) {
-        const std::string text = model::show(nodes().mState, leafOf(path));
+        const std::string text = model::show(nodes().mState, path + 1);
         const auto start = std::min(static_cast<size_t>(offset), text.size());
         const size_t length = text.copy(buffer, size, start);
-        return static_cast<int>(trace(path, "read " + std::to_string(size),
-                                      static_cast<long>(length), model::quote({buffer, length})));
+        return trace(path, "read " + std::to_string(size), static_cast<ssize_t>(length),
+                     model::quote({buffer, length}));
     }
     static int writeFile(const char* path, const char* buffer, size_t size, off_t /* offset */,
                          fuse_file_info* /* file */) {
-        const ssize_t taken = model::store(nodes().mState, leafOf(path), {buffer, size});
-        return static_cast<int>(trace(path, "write " + model::quote({buffer, size}), taken));
+        const ssize_t taken = model::store(nodes().mState, path + 1, {buffer, size});
+        return trace(path, "write " + model::quote({buffer, size}), taken);
     }
     static int closeFile(const char* path, fuse_file_info* /* file */) {
-        return static_cast<int>(trace(path, "close", 0));
+        return trace(path, "close", 0);
     }
 };
 
 Nodes::Nodes(int file, model::Layout layout, model::State& state, const std::string& trace)
-    : mState(state),
-      mTrace(trace),
-      mDirectory(std::string(model::sysfsDirectory(layout)).substr(strlen("/sys/class"))) {
-    for (size_t end = 0; end != std::string::npos; end = mDirectory.find('/', end + 1))
-        addFile(mDirectory.substr(0, std::max<size_t>(end, 1)), S_IFDIR | 0755);
+    : mFiles{{"/", describe(S_IFDIR | 0755)}},
+      mState(state),
+      mDirectory(model::sysfsDirectory(layout)),
+      mTrace(trace) {
     fuse_operations requests{};
     requests.init = Requests::begin;
     requests.getattr = Requests::getAttributes;
@@ -103,15 +108,19 @@ Nodes::Nodes(int file, model::Layout layout, model::State& state, const std::str
     requests.read = Requests::readFile;
     requests.write = Requests::writeFile;
     requests.release = Requests::closeFile;
-    char name[] = "vibrator-driver";
-    char* arguments[] = {name, nullptr};
-    fuse_args options = FUSE_ARGS_INIT(1, arguments);
+    fuse_args options = FUSE_ARGS_INIT(0, nullptr);
+    fuse_opt_add_arg(&options, "vibrator-driver");
     mFuse = fuse_new(&options, &requests, sizeof(requests), this);
     // The library's name for a file system that somebody else mounts.
     const std::string mounted = "/dev/fd/" + std::to_string(file);
     if (mFuse == nullptr || fuse_mount(mFuse, mounted.c_str()) != 0) {
         throw std::runtime_error("the file system of the nodes cannot be served");
     }
+}
+
+void Nodes::add(const std::string& leaf, mode_t mode, const std::string& text) {
+    mFiles["/" + leaf] = describe(S_IFREG | mode);
+    mState.setText(leaf, text);
 }
 
 void Nodes::serve(int timer, const std::function<void()>& action) {
@@ -124,37 +133,6 @@ void Nodes::serve(int timer, const std::function<void()>& action) {
             fuse_session_process_buf(session, &request);
         }
     }
-}
-
-void Nodes::add(const std::string& leaf, mode_t mode) {
-    addFile(mDirectory + leaf, S_IFREG | mode);
-}
-
-void Nodes::addFile(const std::string& path, mode_t mode) {
-    struct stat& info = mFiles[path];
-    info.st_mode = mode;
-    info.st_nlink = 1;
-    info.st_uid = geteuid();
-    info.st_gid = getegid();
-    info.st_size = S_ISREG(mode) ? model::kPageSize : 0;
-}
-
-int openFileSystem() {
-    const int file = open("/dev/fuse", O_RDWR | O_NONBLOCK | O_CLOEXEC);
-    if (file >= 0) return file;
-    const int error = errno;
-    throw std::runtime_error(std::string("/dev/fuse: ") + strerror(error) +
-                             (error == EACCES ? "; give this user access to it, or run this as root"
-                                              : "; load the kernel's module fuse"));
-}
-
-void mountFileSystem(int file, const std::string& directory) {
-    std::string options = "fd=" + std::to_string(file) + ",rootmode=40000,default_permissions" +
-                          ",user_id=" + std::to_string(geteuid()) +
-                          ",group_id=" + std::to_string(getegid()) + ",allow_other";
-    constexpr unsigned long kFlags = MS_NOSUID | MS_NODEV | MS_NOEXEC;
-    if (mount("vibrator-driver", directory.c_str(), "fuse", kFlags, options.c_str()) == 0) return;
-    throw std::runtime_error("\"" + directory + "\" cannot be mounted on: " + strerror(errno));
 }
 
 }  // namespace driver

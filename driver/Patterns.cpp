@@ -18,8 +18,8 @@ Patterns parsePatterns(const std::string& text, const std::string& file) {
         for (std::string word; line[0] != '[' && words >> word;) {
             model::Packet packet{};
             int end = 0;
-            sscanf(word.c_str(), "%d,%d,%d,%d%n", &packet.param0, &packet.intensity, &packet.param2,
-                   &packet.param3, &end);
+            sscanf(word.c_str(), "%9d,%9d,%9d,%9d%n", &packet.param0, &packet.intensity,
+                   &packet.param2, &packet.param3, &end);
             if (end != static_cast<int>(word.size()) || patterns.empty()) {
                 throw cli::UsageError(
                         cli::inQuotes(file) + ": line " + std::to_string(number) + ": " +

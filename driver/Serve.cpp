@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Serve.h"
 
-#include "MotorState.h"
 #include "Nodes.h"
+#include "Player.h"
 #include "Session.h"
 #include "SimulatedDriver.h"
 
@@ -10,22 +10,19 @@
 #include <poll.h>
 #include <sched.h>
 #include <sys/mount.h>
-#include <sys/prctl.h>
+#include <sys/stat.h>
 #include <sys/syscall.h>
 #include <unistd.h>
 
 #include <cerrno>
-#include <csignal>
-#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <iostream>
-#include <stdexcept>
+#include <system_error>
+#include <thread>
 
 namespace driver {
 namespace {
-
-namespace fs = std::filesystem;
 
 constexpr char kClasses[] = "/sys/class";
 /** Where a process that serves nodes has the descriptor for them, so that another finds it. */
@@ -36,8 +33,28 @@ constexpr char kBanner[] =
         "  vibratorctl pattern play 4\n"
         "  vibratorctl plot                  # draws what the driver was told\n";
 
+/** Throws what errno says. */
 [[noreturn]] void fail(const std::string& what) {
-    throw std::runtime_error(what + ": " + strerror(errno));
+    throw std::system_error(errno, std::generic_category(), what);
+}
+
+/** @return a descriptor over which the kernel asks for the files of a file system. */
+int openFileSystem() {
+    const int file = open("/dev/fuse", O_RDWR | O_NONBLOCK | O_CLOEXEC);
+    if (file < 0) fail("this user needs access to /dev/fuse, of the kernel's module fuse");
+    return file;
+}
+
+/** Mounts a file system that is served over a descriptor; makes the directory. */
+void mountFileSystem(int file, const std::string& directory) {
+    std::filesystem::create_directories(directory);
+    const std::string options = "fd=" + std::to_string(file) +
+                                ",user_id=" + std::to_string(geteuid()) +
+                                ",group_id=" + std::to_string(getegid()) +
+                                ",rootmode=40000,default_permissions,allow_other";
+    constexpr unsigned long kFlags = MS_NOSUID | MS_NODEV | MS_NOEXEC;
+    if (mount("vibrator-driver", directory.c_str(), "fuse", kFlags, options.c_str()) != 0)
+        fail(directory);
 }
 
 void writeFile(const std::string& path, const std::string& text) {
@@ -61,86 +78,68 @@ void leaveMounts() {
     if (mount("none", "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0) fail("mount");
 }
 
-/** @return the descriptor over which another process serves files, as one of this process. */
-int takeFileSystem(pid_t process) {
-    const std::string inWords = "process " + std::to_string(process);
-    const auto handle = static_cast<int>(syscall(SYS_pidfd_open, process, 0));
-    if (handle < 0) fail(inWords);
-    // A process that has just begun has not opened it yet: five seconds.
-    for (int attempt = 0; attempt < 250; ++attempt) {
-        const auto file = static_cast<int>(syscall(SYS_pidfd_getfd, handle, kServedFile, 0));
-        if (file >= 0) return file;
-        if (errno != EBADF) break;
-        usleep(20'000);
+/** A motor and its nodes. Lives as long as its process. */
+struct Driver {
+    Driver(Setup setup, int file, const std::string& trace)
+        : player(std::move(setup.motor), setup.patterns), nodes(file, setup.layout, player, trace) {
+        const std::vector<std::string> all = model::featureNames();
+        model::Features features{{all.begin(), all.end()}};
+        features.waves = static_cast<int>(setup.patterns.size());
+        for (const model::Attribute& each : model::attributes()) {
+            if (each.isIn(setup.layout, features))
+                nodes.add(each.leaf, each.mode, each.initialText(features));
+        }
+        // Not of the kernel's drivers: says through what the motor is reached.
+        nodes.add("input_device", 0444, player.device() + "\n");
     }
-    fail(inWords + " serves no nodes");
-}
+    void serve() {
+        nodes.serve(player.timer(), [this] { player.advance(); });
+    }
 
-/** Serves nodes until they are unmounted. @param trace directory of the trace; empty for none. */
-void serve(const Setup& setup, int file, const std::string& trace) {
-    model::Features features;
-    for (const std::string& name : model::featureNames())
-        features.names.insert(name);
-    features.waves = static_cast<int>(setup.patterns.size());
-    Player player(setup.device);
-    MotorState state(player, setup.patterns);
-    Nodes nodes(file, setup.layout, state, trace);
-    for (const model::Attribute& attribute : model::attributes()) {
-        if (!attribute.isIn(setup.layout, features)) continue;
-        state.setText(attribute.leaf, attribute.initialText(features));
-        nodes.add(attribute.leaf, attribute.mode);
-    }
-    // Not of the kernel's drivers: says through what the motor is reached.
-    state.setText("input_device", setup.device.path + " " + setup.device.name + "\n");
-    nodes.add("input_device", 0444);
-    nodes.serve(player.timer(), [&player] { player.advance(); });
-}
+    Player player;
+    Nodes nodes;
+};
 
 }  // namespace
 
-void serveMounted(const Setup& setup) {
+void serveMounted(Setup setup) {
     const int file = dup2(openFileSystem(), kServedFile);
     // The kernel says nothing when it is mounted.
     for (pollfd each{file, POLLIN, 0}; poll(&each, 1, -1) >= 0 && (each.revents & POLLERR) != 0;)
         usleep(10'000);
-    serve(setup, file, "");
+    Driver(std::move(setup), file, "").serve();
 }
 
 void mountNodes(pid_t process, const std::string& directory) {
-    fs::create_directories(directory);
-    mountFileSystem(takeFileSystem(process), directory);
+    // The service's user looks for the nodes there.
+    umask(0022);
+    const auto handle = static_cast<int>(syscall(SYS_pidfd_open, process, 0));
+    // A process that has just begun has not opened it yet: five seconds.
+    for (int attempt = 0; attempt < 250; ++attempt) {
+        const auto file = static_cast<int>(syscall(SYS_pidfd_getfd, handle, kServedFile, 0));
+        if (file >= 0) return mountFileSystem(file, directory);
+        if (handle < 0 || errno != EBADF) break;
+        usleep(20'000);
+    }
+    fail("process " + std::to_string(process) + " serves no nodes");
 }
 
-int runSession(const Setup& setup, const std::vector<std::string>& command) {
+int runSession(Setup setup, const std::vector<std::string>& command) {
     // Its helper removes the directory, and must see it without what is mounted there.
     session::Session session;
     const std::string directory = session / "driver";
     simulator::claimDirectory(directory);
-    const std::string nodes = directory + kClasses;
-    fs::create_directories(nodes);
+    const std::string nodes = model::sysfsDirectory(setup.layout);
     leaveMounts();
     const int file = openFileSystem();
-    mountFileSystem(file, kClasses);
-    if (mount(kClasses, nodes.c_str(), nullptr, MS_BIND, nullptr) != 0) fail(nodes);
-    const session::Child server({"vibrator-driver"}, [&] {
-        // Not reached by the terminal's signals, and not outliving this process.
-        setpgid(0, 0);
-        prctl(PR_SET_PDEATHSIG, SIGKILL);
-        prctl(PR_SET_NAME, "vibrator-motor");
-        try {
-            serve(setup, file, directory);
-        } catch (const std::exception& error) {
-            std::cerr << "vibrator-driver: run: " << error.what() << std::endl;
-        }
-        _exit(1);
-    });
-    // Without the server the nodes are gone.
-    close(file);
+    mountFileSystem(file, directory + nodes);
+    if (mount((directory + kClasses).c_str(), kClasses, nullptr, MS_BIND | MS_REC, nullptr) != 0)
+        fail(kClasses);
+    const bool isLed = setup.layout == model::Layout::kLedTrigger;
+    // Never destroyed: it serves until this process ends.
+    std::thread(&Driver::serve, new Driver(std::move(setup), file, directory)).detach();
     const auto stop = [&] {
-        const bool isLed = setup.layout == model::Layout::kLedTrigger;
-        std::ofstream(model::sysfsDirectory(setup.layout) +
-                      std::string(isLed ? "activate" : "enable"))
-                << "0\n";
+        writeFile(nodes + (isLed ? "activate" : "enable"), "0\n");
         std::cerr << "vibrator-driver: the service has ended" << std::endl;
     };
     return session.run({directory, [] {}, stop, kBanner}, command);

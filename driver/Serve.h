@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Device.h"
+#include "Motor.h"
 #include "Patterns.h"
 
 #include <sys/types.h>
@@ -13,14 +13,14 @@ namespace driver {
 
 /** A motor, and the driver that it is to have. */
 struct Setup {
-    Device device;
+    Motor motor;
     model::Layout layout;
     Patterns patterns;
 };
 
 /** Serves the nodes of a motor once another process has called mountNodes, until they are
  * unmounted. */
-void serveMounted(const Setup& setup);
+void serveMounted(Setup setup);
 
 /** Mounts, as root, the nodes that a process serves; makes the directory. @throw on failure */
 void mountNodes(pid_t process, const std::string& directory);
@@ -29,6 +29,6 @@ void mountNodes(pid_t process, const std::string& directory);
  * Runs the service on a motor, and a command beside it, where /sys/class has only the motor's
  * nodes. Other programs see nothing of it. @return the command's exit code.
  */
-int runSession(const Setup& setup, const std::vector<std::string>& command);
+int runSession(Setup setup, const std::vector<std::string>& command);
 
 }  // namespace driver

@@ -107,10 +107,10 @@ Session::Session()
       mClient(findProgram("vibratorctl", {"../tools", "."})),
       mSignals(blockSignals()) {}
 
-/** @return the next blocked signal; 0 if none comes for 20 ms. */
-int Session::takeSignal(siginfo_t* info) const {
+/** @return the next blocked signal; 0 if none comes for 20 ms, where it does not wait longer. */
+int Session::takeSignal(siginfo_t* info, bool waits) const {
     const timespec time{0, 20'000'000};
-    return std::max(sigtimedwait(&mSignals, info, &time), 0);
+    return std::max(sigtimedwait(&mSignals, info, waits ? nullptr : &time), 0);
 }
 
 /** Waits until the daemon answers, and checks that it has probed the driver. */
@@ -121,7 +121,7 @@ void Session::awaitDaemon(Child& daemon, const Folder& directory) const {
     });
     while (!status.hasEnded() && !daemon.hasEnded()) {
         siginfo_t info{};
-        const int number = takeSignal(&info);
+        const int number = takeSignal(&info, true);
         if (number == 0 || number == SIGCHLD) continue;
         throw std::runtime_error(std::string("ended by ") + strsignal(number));
     }
@@ -145,7 +145,7 @@ int Session::awaitCommand(Child& command, Child& daemon, const Driver& driver) c
     bool isServed = true;
     while (!command.hasEnded()) {
         siginfo_t info{};
-        const int number = takeSignal(&info);
+        const int number = takeSignal(&info, !isEnding);
         if (number == 0 && isEnding && --patience == 0) command.signal(SIGKILL);
         if (number == SIGCHLD && isServed && daemon.hasEnded()) {
             isServed = false;

@@ -59,7 +59,7 @@ class Session {
   private:
     void linkPrograms() const;
     void setEnvironment(const std::string& directory) const;
-    int takeSignal(siginfo_t* info) const;
+    int takeSignal(siginfo_t* info, bool waits) const;
     void awaitDaemon(Child& daemon, const simulator::Folder& directory) const;
     int awaitCommand(Child& command, Child& daemon, const Driver& driver) const;
 
