@@ -5,6 +5,7 @@
 
 #include <android/hidl/base/1.0/BpHwBase.h>
 #include <dirent.h>
+#include <fcntl.h>
 #include <hwbinder/ProcessState.h>
 #include <sys/stat.h>
 
@@ -23,34 +24,42 @@ using ::android::hidl::manager::V1_0::IServiceNotification;
 /** An interface and an instance. */
 using Name = std::pair<std::string, std::string>;
 
-/** @return the names of the sockets, and links to them, that this process can see. */
+/** Looks at a socket, or a link to one. @return whether it is there. */
+bool lookAt(const SocketDirectory& directory, const std::string& name, struct stat* info) {
+    return fstatat(directory.descriptor(), name.c_str(), info, 0) == 0 && S_ISSOCK(info->st_mode);
+}
+
+/** @return the names of the sockets, and links to them, where this process looks for services. */
 std::set<Name> listNames() {
     std::set<Name> names;
     for (const std::string& path : clientDirectories()) {
-        DIR* directory = opendir(path.c_str());
-        if (directory == nullptr) continue;
-        while (const dirent* entry = readdir(directory)) {
+        SocketDirectory directory;
+        if (!directory.open(path, false).isOk()) continue;
+        DIR* entries =
+                fdopendir(openat(directory.descriptor(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+        if (entries == nullptr) continue;
+        while (const dirent* entry = readdir(entries)) {
             const std::string name = entry->d_name;
             struct stat info;
             // "a.b@1.0::IName.instance": a dot ends the interface behind its last colon.
             const size_t colon = name.find("::");
             const size_t dot = colon == std::string::npos ? colon : name.find('.', colon);
-            if (dot != std::string::npos && name.back() != '~' &&
-                stat((path + "/" + name).c_str(), &info) == 0 && S_ISSOCK(info.st_mode)) {
+            if (dot != std::string::npos && name.back() != '~' && lookAt(directory, name, &info)) {
                 names.emplace(name.substr(0, dot), name.substr(dot + 1));
             }
         }
-        closedir(directory);
+        closedir(entries);
     }
     return names;
 }
 
 /** Which socket there is for a service; it changes with every registration. */
 std::pair<ino_t, time_t> socketOf(const Name& name) {
-    for (const std::string& directory : clientDirectories()) {
+    for (const std::string& path : clientDirectories()) {
+        SocketDirectory directory;
         struct stat info;
-        const std::string path = directory + "/" + socketName(name.first, name.second);
-        if (stat(path.c_str(), &info) == 0 && S_ISSOCK(info.st_mode)) {
+        if (directory.open(path, false).isOk() &&
+            lookAt(directory, socketName(name.first, name.second), &info)) {
             return {info.st_ino, info.st_ctime};
         }
     }

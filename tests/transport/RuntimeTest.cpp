@@ -216,7 +216,8 @@ TEST_F(RuntimeTest, WhatIsNoServiceIsNotRegistered) {
     const auto manager = android::hardware::defaultServiceManager1_2();
     EXPECT_FALSE(manager->addWithChain("x", new Slow, {}).withDefault(true));
     EXPECT_FALSE(manager->addWithChain("x", nullptr, {"a@1.0::IA"}).withDefault(true));
-    setenv("HWBINDER_DIR", "/nowhere", 1);
+    EXPECT_EQ((new Slow)->registerAsService("x"), android::OK);
+    EXPECT_EQ(chmod(mDirectory.path().c_str(), 0777), 0) << "where it is not looked for";
     size_t count = 1;
     EXPECT_TRUE(manager->list([&](const auto& names) { count = names.size(); }).isOk());
     EXPECT_EQ(count, 0U);
