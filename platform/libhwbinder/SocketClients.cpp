@@ -39,22 +39,20 @@ SocketClient* SocketClients::add(uid_t uid, UniqueFd socket, const sp<BHwBinder>
     return &client;
 }
 
-void SocketClients::leave(SocketClient* client, std::list<SocketClient>* into) {
+void SocketClients::retire(SocketClient* client) {
     SocketUser* user = client->user;
-    into->splice(into->end(), client->isWaiting ? user->waiting : mIdle, client->place);
+    mRetired.splice(mRetired.end(), client->isWaiting ? user->waiting : mIdle, client->place);
     if (std::exchange(client->isWaiting, false) && user->waiting.empty()) {
         mTurns.erase(std::find(mTurns.begin(), mTurns.end(), user));
     }
-}
-
-void SocketClients::retire(SocketClient* client) {
-    leave(client, &mRetired);
     client->isRetired = true;
+    ++user->retired;
 }
 
 void SocketClients::remove(SocketClient* client) {
-    if (!client->isRetired) leave(client, &mRetired);
+    if (!client->isRetired) retire(client);
     SocketUser* user = client->user;
+    --user->retired;
     mRetired.erase(client->place);
     --mConnections;
     if (--user->connections == 0) mUsers.erase(user->uid);
@@ -85,7 +83,9 @@ SocketClient* SocketClients::surplus(SocketClient* newcomer,
     if (!ownGivesWay && mConnections <= mLimits.ofAll(own->uid)) return nullptr;
     size_t most = own->connections;
     for (const auto& [uid, user] : mUsers) {
-        if (!ownGivesWay && !ConnectionLimits::isPrivileged(uid)) {
+        const bool canGiveWay =
+                user.retired < user.connections && !ConnectionLimits::isPrivileged(uid);
+        if (!ownGivesWay && canGiveWay) {
             most = std::max(most, user.connections);
         }
     }

@@ -64,6 +64,8 @@ struct SocketClient : EventSource {
 struct SocketUser {
     uid_t uid = 0;
     size_t connections = 0;
+    /** How many of them are retired, and so cannot give way. */
+    size_t retired = 0;
     /** Those that have calls waiting, the one that has waited longest first. */
     std::list<SocketClient> waiting;
 };
@@ -100,8 +102,6 @@ class SocketClients {
     SocketClient* surplus(SocketClient* newcomer, FunctionRef<bool(const SocketClient&)> isIdle);
 
   private:
-    void leave(SocketClient* client, std::list<SocketClient>* into);
-
     const ConnectionLimits mLimits;
     size_t mConnections = 0;
     /** Those that have no call waiting, the one that was served longest ago first. */
