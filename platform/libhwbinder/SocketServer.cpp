@@ -45,7 +45,10 @@ struct Message {
         header.msg_controllen = sizeof(control);
     }
     ssize_t receive(int socket, int flags) {
-        return recvmsg(socket, &header, flags | MSG_DONTWAIT | MSG_CMSG_CLOEXEC);
+        flags |= MSG_DONTWAIT | MSG_CMSG_CLOEXEC;
+        const ssize_t size = recvmsg(socket, &header, flags);
+        // A client that has gone with replies unread: said once, it hides the calls that wait.
+        return size < 0 && errno == ECONNRESET ? recvmsg(socket, &header, flags) : size;
     }
     /** @return the sender; nullptr if he is unknown. */
     const ucred* sender() const {
@@ -293,10 +296,9 @@ void SocketServer::refuseOne(int listener) {
 void SocketServer::drop(SocketClient* client) {
     // Closing is not enough where a child of this process has the connection, too.
     epoll_ctl(mEpoll.get(), EPOLL_CTL_DEL, client->socket.get(), nullptr);
-    const auto isEmpty = [](Content content) {
-        return content == Content::kNothing || content == Content::kEnd;
-    };
-    if (!mMayBringDescriptors || isEmpty(look(client->socket.get()))) {
+    // No message may come between the look and the end.
+    if (mMayBringDescriptors) shutdown(client->socket.get(), SHUT_RD);
+    if (!mMayBringDescriptors || look(client->socket.get()) == Content::kEnd) {
         mClients.remove(client);
         return;
     }
