@@ -103,35 +103,11 @@ void ServiceManager::removeService(const Service* service) {
     }
 }
 
-ServiceManager::Return<void> ServiceManager::list(list_cb callback) {
-    std::vector<Text> names;
-    for (const auto& [name, service] : mServices)
-        names.emplace_back(name.first + "/" + name.second);
-    callback(names);
-    return ::android::hardware::Void();
-}
-
-ServiceManager::Return<void> ServiceManager::listByInterface(const Text& interface,
-                                                             listByInterface_cb callback) {
-    std::vector<Text> instances;
-    for (const auto& [name, service] : mServices) {
-        if (interface == name.first) instances.emplace_back(name.second);
-    }
-    callback(instances);
-    return ::android::hardware::Void();
-}
-
-ServiceManager::Return<void> ServiceManager::debugDump(debugDump_cb callback) {
+std::vector<ServiceManager::InstanceDebugInfo> ServiceManager::services() {
     std::vector<InstanceDebugInfo> infos;
-    for (const auto& [name, service] : mServices) {
-        InstanceDebugInfo info{};
-        info.interfaceName = name.first;
-        info.instanceName = name.second;
-        info.pid = service->pid;
-        infos.push_back(info);
-    }
-    callback(infos);
-    return ::android::hardware::Void();
+    for (const auto& [name, service] : mServices)
+        infos.push_back(infoOf(name.first, name.second, service->pid));
+    return infos;
 }
 
 ServiceManager::Return<bool> ServiceManager::registerForNotifications(

@@ -30,9 +30,6 @@ class ServiceManager : public ::android::hardware::ServiceManagerBase {
     Return<bool> add(const Text& name, const ::android::sp<Interface>& service) override;
     Return<bool> addWithChain(const Text& name, const ::android::sp<Interface>& service,
                               const ::android::hardware::hidl_vec<Text>& chain) override;
-    Return<void> list(list_cb callback) override;
-    Return<void> listByInterface(const Text& interface, listByInterface_cb callback) override;
-    Return<void> debugDump(debugDump_cb callback) override;
     /** @param name empty for every instance. @return false for too many from one user, or too long
      * a name. */
     Return<bool> registerForNotifications(const Text& interface, const Text& name,
@@ -65,6 +62,7 @@ class ServiceManager : public ::android::hardware::ServiceManagerBase {
         ::android::sp<::android::hardware::hidl_death_recipient> recipient;
     };
 
+    std::vector<InstanceDebugInfo> services() override;
     void removeService(const Service* service);
     size_t removeListeners(const Name& name, const ::android::sp<Notification>& callback);
 

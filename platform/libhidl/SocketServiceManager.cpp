@@ -144,22 +144,11 @@ Return<sp<IBase>> SocketServiceManager::get(const hidl_string& interface, const 
     return service;
 }
 
-Return<void> SocketServiceManager::list(list_cb callback) {
-    std::vector<hidl_string> names;
+std::vector<SocketServiceManager::InstanceDebugInfo> SocketServiceManager::services() {
+    std::vector<InstanceDebugInfo> infos;
     for (const auto& [interface, instance] : listNames())
-        names.emplace_back(interface + "/" + instance);
-    callback(names);
-    return Void();
-}
-
-Return<void> SocketServiceManager::listByInterface(const hidl_string& interface,
-                                                   listByInterface_cb callback) {
-    std::vector<hidl_string> instances;
-    for (const Name& name : listNames()) {
-        if (interface == name.first) instances.emplace_back(name.second);
-    }
-    callback(instances);
-    return Void();
+        infos.push_back(infoOf(interface, instance, static_cast<pid_t>(PidConstant::NO_PID)));
+    return infos;
 }
 
 Return<bool> SocketServiceManager::registerForNotifications(
@@ -174,19 +163,6 @@ Return<bool> SocketServiceManager::unregisterForNotifications(
         const hidl_string& interface, const hidl_string& name,
         const sp<IServiceNotification>& callback) {
     return Notifications::instance().remove({interface, name}, callback);
-}
-
-Return<void> SocketServiceManager::debugDump(debugDump_cb callback) {
-    std::vector<InstanceDebugInfo> infos;
-    for (const auto& [interface, instance] : listNames()) {
-        InstanceDebugInfo info{};
-        info.interfaceName = interface;
-        info.instanceName = instance;
-        info.pid = static_cast<int32_t>(PidConstant::NO_PID);
-        infos.push_back(info);
-    }
-    callback(infos);
-    return Void();
 }
 
 Return<bool> SocketServiceManager::addWithChain(const hidl_string& name, const sp<IBase>& service,

@@ -22,14 +22,10 @@ class SocketServiceManager : public ServiceManagerBase {
 
     Return<sp<::android::hidl::base::V1_0::IBase>> get(const hidl_string& interface,
                                                        const hidl_string& name) override;
-    Return<void> list(list_cb callback) override;
-    Return<void> listByInterface(const hidl_string& interface,
-                                 listByInterface_cb callback) override;
     /** Has a thread look for the service ten times a second. */
     Return<bool> registerForNotifications(
             const hidl_string& interface, const hidl_string& name,
             const sp<::android::hidl::manager::V1_0::IServiceNotification>& callback) override;
-    Return<void> debugDump(debugDump_cb callback) override;
     Return<bool> unregisterForNotifications(
             const hidl_string& interface, const hidl_string& name,
             const sp<::android::hidl::manager::V1_0::IServiceNotification>& callback) override;
@@ -43,6 +39,8 @@ class SocketServiceManager : public ServiceManagerBase {
     }
 
   private:
+    std::vector<InstanceDebugInfo> services() override;
+
     SocketDriver& mDriver;
 };
 

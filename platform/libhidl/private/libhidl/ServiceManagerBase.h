@@ -3,6 +3,8 @@
 
 #include <android/hidl/manager/1.2/IServiceManager.h>
 
+#include <vector>
+
 namespace android::hardware {
 
 /** What both service managers of this platform answer in the same way. */
@@ -16,6 +18,27 @@ class ServiceManagerBase : public ::android::hidl::manager::V1_2::IServiceManage
         const Return<void> result = service->interfaceChain(
                 [&](const auto& chain) { success = addWithChain(name, service, chain); });
         return result.isOk() && success;
+    }
+    Return<void> list(list_cb callback) override {
+        std::vector<hidl_string> names;
+        for (const InstanceDebugInfo& each : services())
+            names.emplace_back(std::string(each.interfaceName) + "/" +
+                               std::string(each.instanceName));
+        callback(names);
+        return Void();
+    }
+    Return<void> listByInterface(const hidl_string& interface,
+                                 listByInterface_cb callback) override {
+        std::vector<hidl_string> instances;
+        for (const InstanceDebugInfo& each : services()) {
+            if (each.interfaceName == interface) instances.push_back(each.instanceName);
+        }
+        callback(instances);
+        return Void();
+    }
+    Return<void> debugDump(debugDump_cb callback) override {
+        callback(services());
+        return Void();
     }
     /**
      * There is no list of declared services, so every service may still come, and then over this: a
@@ -40,6 +63,18 @@ class ServiceManagerBase : public ::android::hidl::manager::V1_2::IServiceManage
     Return<void> listManifestByInterface(const hidl_string& interface,
                                          listManifestByInterface_cb callback) override {
         return listByInterface(interface, callback);
+    }
+
+  protected:
+    /** @return what is known of each service, once for each of its names. */
+    virtual std::vector<InstanceDebugInfo> services() = 0;
+    static InstanceDebugInfo infoOf(const std::string& interface, const std::string& instance,
+                                    pid_t pid) {
+        InstanceDebugInfo info{};
+        info.interfaceName = interface;
+        info.instanceName = instance;
+        info.pid = pid;
+        return info;
     }
 };
 
