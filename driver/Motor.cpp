@@ -37,11 +37,12 @@ Motor::Motor(const std::string& path, const std::string& properties)
       mName(firstLine(properties + "/name")),
       mIdentity(firstLine(properties + "/modalias") + mName + firstLine(properties + "/uniq")),
       mFile(open(path.c_str(), O_RDWR | O_CLOEXEC | O_NONBLOCK)) {
-    if (mFile.isOpen()) {
+    if (mFile.isValid()) {
         ask();
     } else {
-        mProblem = strerror(mFile.error());
-        if (mFile.error() == EACCES)
+        const int error = errno;
+        mProblem = strerror(error);
+        if (error == EACCES)
             mProblem += "; log in at the seat that it belongs to, or join the group \"input\"";
     }
 }

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Descriptor.h"
+#include <utils/UniqueFd.h>
 
 #include <cstdint>
 #include <string>
@@ -63,7 +63,7 @@ class Motor {
     std::string mName;
     /** What stays when it is plugged in again. */
     std::string mIdentity;
-    simulator::Descriptor mFile;
+    android::UniqueFd mFile;
     /** The effect that is used: FF_RUMBLE, else FF_CONSTANT; 0: none. */
     uint16_t mType = 0;
     /** Whether it has a setting for the strength of all its effects. */

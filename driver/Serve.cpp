@@ -128,7 +128,7 @@ int runSession(Setup setup, const std::vector<std::string>& command) {
     // Its helper removes the directory, and must see it without what is mounted there.
     session::Session session;
     const std::string directory = session / "driver";
-    simulator::claimDirectory(directory);
+    simulator::claimDirectory(simulator::Folder::make(directory));
     const std::string nodes = model::sysfsDirectory(setup.layout);
     leaveMounts();
     const int file = openFileSystem();

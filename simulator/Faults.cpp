@@ -82,7 +82,7 @@ bool setFault(const Folder& directory, const std::string& leaf, const std::strin
 
 std::optional<Fault> takeFault(const Folder& directory, const std::string& leaf,
                                const std::string& operation) {
-    const Descriptor file = directory.open(fileName(leaf, operation), O_RDWR);
+    const UniqueFd file = directory.open(fileName(leaf, operation), O_RDWR);
     return flock(file.get(), LOCK_EX) == 0 ? countDown(file.get()) : std::nullopt;
 }
 

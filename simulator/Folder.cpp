@@ -7,11 +7,11 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <filesystem>
+#include <system_error>
 
 namespace simulator {
 namespace {
-
-constexpr int kOpenFolder = O_PATH | O_DIRECTORY | O_CLOEXEC;
 
 /** @return a name; for one that leads out of its folder "", which every system call refuses. */
 const char* inside(const std::string& name) {
@@ -29,18 +29,31 @@ void makeFolder(int above, const char* name) {
 }  // namespace
 
 // openat throughout: in a program with the stand-ins, open is one of them.
-Folder::Folder(const std::string& path)
-    : mFolder(openat(AT_FDCWD, path.empty() ? "/" : path.c_str(), kOpenFolder)) {}
+Folder::Folder(const std::string& path) {
+    enter(AT_FDCWD, path.empty() ? "/" : path.c_str());
+}
 
-Folder::Folder(const Folder& above, std::string_view path, bool create)
-    : mFolder(above.error() != 0 ? Descriptor::failed(above.error())
-                                 : Descriptor(openat(above.mFolder.get(), ".", kOpenFolder))) {
-    while (mFolder.isOpen() && !path.empty()) {
+Folder Folder::make(const std::string& path) {
+    std::error_code error;
+    std::filesystem::create_directories(path, error);
+    Folder folder(path);
+    if (folder.mError != 0 && error) folder.mError = error.value();
+    return folder;
+}
+
+Folder::Folder(const Folder& above, std::string_view path, bool create) : mError(above.mError) {
+    if (mError == 0) enter(above.mFolder.get(), ".");
+    while (mError == 0 && !path.empty()) {
         const std::string name(path.substr(0, path.find('/')));
         path.remove_prefix(std::min(name.size() + 1, path.size()));
         if (create) makeFolder(mFolder.get(), inside(name));
-        mFolder = Descriptor(openat(mFolder.get(), inside(name), kOpenFolder | O_NOFOLLOW));
+        enter(mFolder.get(), inside(name), O_NOFOLLOW);
     }
+}
+
+void Folder::enter(int above, const char* name, int flags) {
+    mFolder.reset(openat(above, name, O_PATH | O_DIRECTORY | O_CLOEXEC | flags));
+    mError = mFolder.isValid() ? 0 : errno;
 }
 
 mode_t Folder::mode(const std::string& name) const {
@@ -48,19 +61,21 @@ mode_t Folder::mode(const std::string& name) const {
     return fstatat(mFolder.get(), inside(name), &info, AT_SYMLINK_NOFOLLOW) == 0 ? info.st_mode : 0;
 }
 
-Descriptor Folder::open(const std::string& name, int flags, mode_t mode) const {
-    if (error() != 0) return Descriptor::failed(error());
+UniqueFd Folder::open(const std::string& name, int flags, mode_t mode) const {
     // O_NONBLOCK: opening a pipe in a file's place must not block.
     constexpr int kSafely = O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC;
-    Descriptor file(openat(mFolder.get(), inside(name), flags | kSafely, mode));
+    UniqueFd file(openat(mFolder.get(), inside(name), flags | kSafely, mode));
     struct stat info;
-    const bool isPlain = fstat(file.get(), &info) == 0 && S_ISREG(info.st_mode);
-    return !file.isOpen() || isPlain ? std::move(file) : Descriptor::failed(EINVAL);
+    if (file.isValid() && (fstat(file.get(), &info) != 0 || !S_ISREG(info.st_mode))) {
+        file.reset();
+        errno = EINVAL;
+    }
+    return file;
 }
 
 std::string Folder::read(const std::string& name) const {
     std::string text;
-    const Descriptor file = open(name, O_RDONLY);
+    const UniqueFd file = open(name, O_RDONLY);
     char piece[4096];
     for (ssize_t count; (count = ::read(file.get(), piece, sizeof(piece))) > 0;)
         text.append(piece, static_cast<size_t>(count));
@@ -73,8 +88,8 @@ int Folder::replace(const std::string& name, std::string_view text, mode_t mode)
     const std::string fresh = ".new." + std::to_string(gettid());
     remove(fresh);
     constexpr int kCreate = O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC;
-    const Descriptor file(openat(mFolder.get(), fresh.c_str(), kCreate, 0600));
-    if (!file.isOpen()) return file.error();
+    const UniqueFd file(openat(mFolder.get(), fresh.c_str(), kCreate, 0600));
+    if (!file.isValid()) return errno;
     errno = ENOSPC;
     if (write(file.get(), text.data(), text.size()) == static_cast<ssize_t>(text.size()) &&
         fchmod(file.get(), mode) == 0 &&

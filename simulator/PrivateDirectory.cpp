@@ -56,11 +56,11 @@ PrivateDirectory::PrivateDirectory() {
         _exit(removeDirectory(mPath) ? 0 : 1);
     }
     close(ends[0]);
-    mPipe = ends[1];
+    mPipe.reset(ends[1]);
 }
 
 PrivateDirectory::~PrivateDirectory() {
-    close(mPipe);
+    mPipe.reset();
     waitpid(mRemover, nullptr, 0);
 }
 

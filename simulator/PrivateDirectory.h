@@ -2,6 +2,7 @@
 #pragma once
 
 #include <sys/types.h>
+#include <utils/UniqueFd.h>
 
 #include <string>
 
@@ -23,7 +24,7 @@ class PrivateDirectory {
   private:
     std::string mPath = "/tmp/vibrator-sim.XXXXXX";
     /** The remover waits for the end of a pipe, of which this process has the other end. */
-    int mPipe;
+    android::UniqueFd mPipe;
     pid_t mRemover;
 };
 

@@ -24,7 +24,7 @@ constexpr char kBanner[] =
 }  // namespace
 
 void makeDriver(const std::string& directory, Layout layout, const Features& features) {
-    const int error = createDriver(directory, layout, features);
+    const int error = createDriver(Folder::make(directory), layout, features);
     if (error == ENOTEMPTY) {
         throw std::runtime_error("\"" + directory +
                                  "\" is neither empty nor a driver's; name a new directory");

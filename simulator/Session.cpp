@@ -130,7 +130,7 @@ void Session::awaitDaemon(Child& daemon, const Folder& directory) const {
                                  (daemon.hasEnded() ? "has ended" : "does not answer") +
                                  "; the end of its log: " + lastLine(directory.read("log")));
     }
-    const simulator::Descriptor trace = directory.open("trace", O_RDONLY);
+    const simulator::UniqueFd trace = directory.open("trace", O_RDONLY);
     struct stat info;
     if (fstat(trace.get(), &info) != 0 || info.st_size == 0) {
         throw std::runtime_error("the daemon does not use this driver");

@@ -11,7 +11,6 @@
 #include <cstdlib>
 #include <cstring>
 #include <ctime>
-#include <filesystem>
 
 namespace simulator {
 namespace {
@@ -30,13 +29,6 @@ Folder openBelow(const Folder& directory, std::string_view path, bool create = f
 /** @return the folder that a node's file lies in. */
 Folder folderOf(const Node& node) {
     return openBelow(*node.directory, node.path.substr(0, node.path.rfind('/') + 1));
-}
-
-/** Makes a directory, and those above it, where there is none. @return an errno, 0 for success. */
-int makeDirectory(const std::string& directory) {
-    std::error_code error;
-    std::filesystem::create_directories(directory, error);
-    return error.value();
 }
 
 int64_t now() {
@@ -61,8 +53,8 @@ class FolderState : public model::State {
     int perform(const model::Action& action) override {
         const auto* run = std::get_if<model::RunMotor>(&action);
         if (run == nullptr) return 0;
-        constexpr uint64_t kMost = 1'000'000'000'000;
-        const auto time = static_cast<int64_t>(std::min(run->milliseconds, kMost)) * 1'000'000;
+        constexpr uint64_t kMax = 1'000'000'000'000;
+        const auto time = static_cast<int64_t>(std::min(run->milliseconds, kMax)) * 1'000'000;
         return -mFolder.replace(kDeadlineFile, std::to_string(now() + time), 0644);
     }
 
@@ -87,11 +79,6 @@ int claimDirectory(const Folder& directory) {
     return directory.replace(kMarkFile, "", 0644);
 }
 
-int claimDirectory(const std::string& directory) {
-    const int error = makeDirectory(directory);
-    return error != 0 ? error : claimDirectory(Folder(directory));
-}
-
 int createNodes(const Folder& directory, Layout layout, const Features& features) {
     const Folder nodes = openBelow(directory, model::sysfsDirectory(layout), true);
     // The driver that was there before may be running its motor.
@@ -105,11 +92,6 @@ int createNodes(const Folder& directory, Layout layout, const Features& features
         }
     }
     return error;
-}
-
-int createDriver(const std::string& directory, Layout layout, const Features& features) {
-    const int error = makeDirectory(directory);
-    return error != 0 ? error : createDriver(Folder(directory), layout, features);
 }
 
 int createDriver(const Folder& directory, Layout layout, const Features& features) {
@@ -154,7 +136,8 @@ int openNode(const Node& node, int flags) {
     const bool writes = (flags & O_ACCMODE) != O_RDONLY;
     if (mode == 0 || leaf[0] == '.') return -ENOENT;
     if ((reads && (mode & 0444) == 0) || (writes && (mode & 0222) == 0)) return -EACCES;
-    return folder.open(leaf, flags & O_ACCMODE).release();
+    UniqueFd file = folder.open(leaf, flags & O_ACCMODE);
+    return file.isValid() ? file.release() : -errno;
 }
 
 std::string show(const Node& node) {

@@ -26,8 +26,6 @@ std::string inheritedDirectory();
  * @return an errno, 0 for success; ENOTEMPTY if it has other content and no mark.
  */
 int claimDirectory(const Folder& directory);
-/** The same for a directory that is made if there is none. */
-int claimDirectory(const std::string& directory);
 /** @return whether a directory has been claimed. */
 bool isMarked(const Folder& directory);
 /**
@@ -35,8 +33,6 @@ bool isMarked(const Folder& directory);
  * no links inside. @return an errno, 0 for success.
  */
 int createDriver(const Folder& directory, Layout layout, const Features& features);
-/** The same for a directory that is made if there is none. */
-int createDriver(const std::string& directory, Layout layout, const Features& features);
 /** Makes only the nodes, in any directory. @return an errno, 0 for success. */
 int createNodes(const Folder& directory, Layout layout, const Features& features);
 

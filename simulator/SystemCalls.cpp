@@ -142,14 +142,11 @@ int simulateClose(int file, const OpenNode& open) {
     return static_cast<int>(result);
 }
 
-int openAnything(const char* path, int flags, mode_t mode) {
+/** @return whether a path, which may be nullptr, is a node's; then *node is that node. */
+bool isNode(const char* path, Node* node) {
     const char* directory = getenv("VIBRATOR_SIM_DIR");
-    Node node;
-    if (directory != nullptr && *directory != '\0' && path != nullptr &&
-        simulator::findNode(directory, path, &node)) {
-        return answer([&] { return simulateOpen(node, flags); });
-    }
-    return static_cast<int>(syscall(SYS_openat, AT_FDCWD, path, flags | O_LARGEFILE, mode));
+    return directory != nullptr && *directory != '\0' && path != nullptr &&
+           simulator::findNode(directory, path, node);
 }
 
 }  // namespace
@@ -160,6 +157,8 @@ extern "C" {
 // reserved ones.
 
 int open(const char* path, int flags, ...) {
+    Node node;
+    if (isNode(path, &node)) return answer([&] { return simulateOpen(node, flags); });
     mode_t mode = 0;
     if ((flags & O_CREAT) != 0 || (flags & O_TMPFILE) == O_TMPFILE) {
         va_list arguments;
@@ -167,16 +166,8 @@ int open(const char* path, int flags, ...) {
         mode = va_arg(arguments, mode_t);  // NOLINT(clang-analyzer-valist.Uninitialized): it is not
         va_end(arguments);
     }
-    return openAnything(path, flags, mode);
+    return static_cast<int>(syscall(SYS_openat, AT_FDCWD, path, flags | O_LARGEFILE, mode));
 }
-int open64(const char* path, int flags, ...) __attribute__((alias("open")));
-
-// What a fortified program calls in place of open and read.
-int __open_2(const char* path, int flags);
-int __open_2(const char* path, int flags) {
-    return openAnything(path, flags, 0);
-}
-int __open64_2(const char* path, int flags) __attribute__((alias("__open_2")));
 
 ssize_t read(int file, void* buffer, size_t size) {
     OpenNode* node = findOpenNode(file);
@@ -184,6 +175,7 @@ ssize_t read(int file, void* buffer, size_t size) {
                            : answer([&] { return simulateRead(*node, buffer, size); });
 }
 
+// What a program that checks its buffers calls in place of read.
 ssize_t __read_chk(int file, void* buffer, size_t size, size_t room);
 ssize_t __read_chk(int file, void* buffer, size_t size, size_t room) {
     if (size > room) abort();

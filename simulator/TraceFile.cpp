@@ -21,7 +21,7 @@ std::string traceFile(const std::string& directory) {
 void trace(const Folder& directory, const std::string& access, long result,
            const std::string& shown) {
     const std::string line = model::traceLine(access, result, shown);
-    const Descriptor file = directory.open(kTraceName, O_WRONLY | O_APPEND | O_CREAT, 0644);
+    const UniqueFd file = directory.open(kTraceName, O_WRONLY | O_APPEND | O_CREAT, 0644);
     struct stat info;
     // One write a line, so that the lines of several processes do not mix. A failure cannot be
     // reported to anybody.

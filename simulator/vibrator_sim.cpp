@@ -189,11 +189,11 @@ class Simulator : public cli::Program {
                 fault.text("OPERATION", "open, read, write or close", "", choicesOf(kOperations));
         const auto text = fault.text("FAULT", "an errno like EINVAL; short=BYTES; none", "",
                                      choicesOf({"EACCES", "EINVAL", "EIO", "short=", "none"}));
-        constexpr uint32_t kMost = 1'000'000;
+        constexpr uint32_t kMax = 1'000'000;
         const auto times = fault.number(
-                "--times N", {"a number of accesses", 1, kMost},
+                "--times N", {"a number of accesses", 1, kMax},
                 "how many accesses fail; without it, all until the fault is set to none");
-        const auto after = fault.number("--after N", {"a number of accesses", 0, kMost},
+        const auto after = fault.number("--after N", {"a number of accesses", 0, kMax},
                                         "how many accesses succeed first", 0);
         const auto clear = fault.flag("--clear", "remove all faults");
         fault.run([=] {

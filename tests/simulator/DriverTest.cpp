@@ -259,7 +259,7 @@ TEST_F(SimulatedDriverTest, NamesStayInTheirFolder) {
     const simulator::Folder folder(mDirectory.path());
     for (const char* name : {"a/b", ".", "..", "../x", ""}) {
         EXPECT_NE(folder.replace(name, "x", 0600), 0) << name;
-        EXPECT_FALSE(folder.open(name, O_RDONLY).isOpen()) << name;
+        EXPECT_FALSE(folder.open(name, O_RDONLY).isValid()) << name;
     }
     for (const char* path : {"..", "sys/../../x"})
         EXPECT_NE(simulator::Folder(folder, path, true).error(), 0) << path;
