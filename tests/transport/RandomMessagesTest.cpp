@@ -2,8 +2,8 @@
 #include "transport/RawClient.h"
 #include "transport/TransportTest.h"
 
-#include <atomic>
-#include <iostream>
+#include <algorithm>
+#include <filesystem>
 #include <random>
 
 // Real requests, damaged at random, from several clients at once. What is sent depends only on the
@@ -16,28 +16,18 @@ using ::android::hardware::Packet;
 
 constexpr unsigned kSeed = 26;
 
-/** @return right requests; most have lists, where there is most to damage. */
+/** @return the requests that the fuzzer begins with, those with lists last. */
 std::vector<std::string> rightRequests() {
     std::vector<std::string> requests;
-    const auto add = [&](const std::unique_ptr<Packet>& packet) {
-        requests.emplace_back(reinterpret_cast<const char*>(packet->bytes), packet->size);
-    };
-    for (const uint32_t code : {kPing, kInterfaceChain})
-        add(request(kBase, code));
-    for (uint32_t code = kOn; code <= 5; ++code)
-        add(request(kV10, code, {1, 1}));
-    for (uint32_t code = 11; code < kDaxPerformHapticEngine; ++code)
-        add(request(kV20, code, {1}));
-    RawMessage engine = RawMessage::to(kV20);
-    engine.addList(3, std::string(48, '\1'));
-    engine.tail = bytesOf(10000);
-    RawMessage debug = RawMessage::to(kBase);
-    // No descriptors, and a list of one text.
-    debug.head += bytesOf(uint64_t{0});
-    debug.addList(1, bytesOf(uint64_t{0}) + bytesOf(uint64_t{4}));
-    debug.add(std::string("text\0", 5), true, 1);
-    for (size_t i = requests.size(); i > 0; --i)
-        add(i % 2 == 0 ? debug.packet(kDebug) : engine.packet(kDaxPerformHapticEngine));
+    for (const auto& file :
+         std::filesystem::directory_iterator(SOURCE_DIRECTORY "/fuzz/seeds/transactions")) {
+        const std::string bytes = readFile(file.path());
+        // The first byte tells a request from a reply.
+        if (bytes[0] % 2 == 0) requests.push_back(bytes.substr(1));
+    }
+    std::sort(requests.begin(), requests.end(), [](const auto& one, const auto& other) {
+        return std::pair(one.size(), one) < std::pair(other.size(), other);
+    });
     return requests;
 }
 
@@ -72,7 +62,7 @@ void damage(std::string& bytes, std::mt19937& random) {
 class RandomMessagesTest : public TransportTest {
   protected:
     /** Sends a message, and expects what must come of it; connects anew if it is the end. */
-    void send(std::unique_ptr<RawClient>& client, const std::string& bytes) {
+    int32_t send(std::unique_ptr<RawClient>& client, const std::string& bytes) const {
         const bool isEnd = bytes.empty() || bytes.size() > Packet::kMaxSize;
         const bool isOneway = !isEnd && (wordOf(bytes, 1) & TF_ONE_WAY) != 0;
         EXPECT_TRUE(client->send(bytes.data(), bytes.size()));
@@ -81,18 +71,17 @@ class RandomMessagesTest : public TransportTest {
         const Received answer = client->receive();
         EXPECT_EQ(answer.isClosed, isEnd);
         EXPECT_TRUE(!isOneway || answer.status == 0 || client->receive().status == 0);
-        ++mSent;
-        mFailed += answer.status != 0 ? 1 : 0;
-        mOneway += isOneway && answer.status == 0 ? 1 : 0;
-        mClosed += isEnd ? 1 : 0;
         if (isEnd) client = std::make_unique<RawClient>(mDirectory.path());
+        return answer.status;
     }
-    void sendDamaged(unsigned seed, size_t count) {
+    void sendDamaged(unsigned seed, size_t count) const {
         std::mt19937 random(seed);
         const std::vector<std::string> right = rightRequests();
+        const auto any = [&] { return random() % right.size(); };
         auto client = std::make_unique<RawClient>(mDirectory.path());
         for (size_t i = 0; i < count; ++i) {
-            std::string bytes = right[random() % right.size()];
+            // Most often one with lists, where there is most to damage.
+            std::string bytes = right[std::max({any(), any(), any()})];
             for (size_t times = 1 + random() % 2; times > 0; --times)
                 damage(bytes, random);
             // Some in two pieces.
@@ -102,8 +91,6 @@ class RandomMessagesTest : public TransportTest {
             ASSERT_FALSE(HasFailure()) << "up to message " << i << " of seed " << seed;
         }
     }
-
-    std::atomic<size_t> mSent = 0, mFailed = 0, mOneway = 0, mClosed = 0;
 };
 
 TEST_F(RandomMessagesTest, AreAnsweredAndHarmNobody) {
@@ -111,20 +98,18 @@ TEST_F(RandomMessagesTest, AreAnsweredAndHarmNobody) {
     const size_t count = number == nullptr ? 20'000 : std::stoul(number);
     serve("export ANDROID_LOG_TAGS='*:S'");
     auto client = std::make_unique<RawClient>(mDirectory.path());
+    size_t understood = 0;
     for (const std::string& bytes : rightRequests())
-        send(client, bytes);
-    EXPECT_EQ(mFailed, 0U);
+        understood += send(client, bytes) == android::OK ? 1 : 0;
+    EXPECT_GT(understood, 25U);
     sendDamaged(kSeed, 1000);
-    const size_t memory = mServer.residentKiB();
+    [[maybe_unused]] const size_t memory = mServer.residentKiB();
 
     const auto polite = IDaxVibrator::getService();
     runBeside(
             3, [&](unsigned i) { sendDamaged(kSeed + 1 + i, count / 3); },
             [&] { EXPECT_EQ(call(*polite).inWords(), "(UNSUPPORTED_OPERATION, 0)"); });
     EXPECT_TRUE(answers());
-    std::cout << mSent << " sent: " << mFailed << " failed, " << mOneway << " without an answer, "
-              << mClosed << " at an end; memory before: " << memory
-              << " KiB, after: " << mServer.residentKiB() << " KiB\n";
 #ifndef SANITIZED  // a sanitizer keeps what has been freed
     EXPECT_LE(mServer.residentKiB(), memory + 256);
 #endif
