@@ -158,11 +158,14 @@ TEST_F(SocketDirectoryTest, MissingDescriptorsAreSaid) {
 TEST_F(SocketDirectoryTest, LockThatOthersCouldHoldIsRefused) {
     make("sockets", 0755);
     const std::string lock = mDirectory + "/a@1.0::IA.x.lock";
-    UniqueFd(open(lock.c_str(), O_CREAT | O_CLOEXEC, 0644));
     ListeningSocket listener;
-    EXPECT_EQ(publish(&listener).text(),
-              lock + ": others may open it, and hold the name; remove it");
-    fs::remove(lock);
+    for (const mode_t mode : {0644U, 0600U}) {
+        UniqueFd(open(lock.c_str(), O_CREAT | O_CLOEXEC, mode));
+        if (mode == 0600 && (!isRoot() || chown(lock.c_str(), kStranger, kStranger) != 0)) break;
+        EXPECT_EQ(publish(&listener).text(),
+                  lock + ": others may open it, and hold the name; remove it");
+        fs::remove(lock);
+    }
     EXPECT_TRUE(publish(&listener).isOk());
     EXPECT_EQ(fs::status(lock).permissions(), fs::perms::owner_read | fs::perms::owner_write);
 }
@@ -200,11 +203,16 @@ TEST_F(SocketDirectoryTest, OwnerIsTrustedWhereNobodyElseCouldHavePutTheDirector
         EXPECT_EQ(listen(listener.get(), 8), 0);
         ASSERT_EQ(seteuid(0), 0);
         ASSERT_EQ(chown(path.c_str(), row.owner, row.owner), 0);
+        const std::string by = "/a: served by uid " + std::to_string(row.server);
         ASSERT_TRUE(directory.open(path, false).isOk());
         UniqueFd connection;
         const std::string whyNot = directory.connect("a", &connection).text();
-        const std::string by = ": served by uid " + std::to_string(row.server);
-        EXPECT_EQ(whyNot, *row.complaint == '\0' ? "" : path + "/a" + by + row.complaint);
+        EXPECT_EQ(whyNot, *row.complaint == '\0' ? "" : path + by + row.complaint);
+        // Nobody knows who could change the path to the directory that this process is in.
+        fs::current_path(parent);
+        ASSERT_TRUE(directory.open("sockets", false).isOk());
+        EXPECT_EQ(directory.connect("a", &connection).isOk(), row.server == 0);
+        fs::current_path("/");
         fs::remove_all(parent);
     }
 }

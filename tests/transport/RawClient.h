@@ -168,11 +168,11 @@ class RawClient {
   public:
     using Packet = android::hardware::Packet;
 
-    explicit RawClient(const std::string& directory)
+    explicit RawClient(const std::string& directory, const std::string& interface = raw::kV21)
         : mSocket(socket(AF_UNIX, SOCK_SEQPACKET | SOCK_CLOEXEC, 0)) {
         sockaddr_un address{};
         address.sun_family = AF_UNIX;
-        const std::string path = directory + "/" + raw::kV21 + ".default";
+        const std::string path = directory + "/" + interface + ".default";
         memcpy(address.sun_path, path.c_str(), path.size());
         const timeval tenSeconds{10, 0};
         setsockopt(mSocket.get(), SOL_SOCKET, SO_RCVTIMEO, &tenSeconds, sizeof(tenSeconds));

@@ -4,6 +4,7 @@
 #include "libhwbinder/SocketConnection.h"
 #include "libhwbinder/SocketServer.h"
 #include "support/LogCapture.h"
+#include "transport/RawClient.h"
 #include "transport/TransportTest.h"
 
 #include <android/hidl/manager/1.0/IServiceNotification.h>
@@ -163,6 +164,20 @@ TEST_F(RuntimeTest, OneThreadServesHoweverManyJoin) {
     EXPECT_EQ(slow->most, 1);
 }
 
+TEST_F(RuntimeTest, ConnectionThatAForkedChildHasTooIsDroppedAllTheSame) {
+    const sp<Slow> object = new Slow;
+    ASSERT_EQ(object->registerAsService("default"), android::OK);
+    ProcessState::self()->startThreadPool();
+    const RawClient client(mDirectory.path(), Slow::descriptor);
+    ASSERT_TRUE(client.answersPing());
+    const Child child([] { pause(); });
+    // One without measure costs the connection; what comes after it must not find it again.
+    for (int i = 0; i < 3; ++i)
+        EXPECT_TRUE(client.send("", 0));
+    for (int i = 0; i < 100; ++i)
+        EXPECT_TRUE(RawClient(mDirectory.path(), Slow::descriptor).answersPing());
+}
+
 TEST_F(RuntimeTest, WhatIsWaitedForLongIsFoundSoonByAServerThatIsIdle) {
     const std::string lock =
             mDirectory.path() + "/" + IServiceNotification::descriptor + ".taken.lock";
@@ -191,7 +206,7 @@ TEST_F(RuntimeTest, WhatIsWaitedForLongIsFoundSoonByAServerThatIsIdle) {
     LogCapture ownLog;
     std::thread search([] { EXPECT_NE(IServiceNotification::getService("late"), nullptr); });
     // Long enough to show whether the tries get ever rarer.
-    std::this_thread::sleep_for(milliseconds(950));
+    std::this_thread::sleep_for(milliseconds(1100));
     const auto start = std::chrono::steady_clock::now();
     first.kill();
     EXPECT_TRUE(eventually(isServed));
