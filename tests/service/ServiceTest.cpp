@@ -37,14 +37,6 @@ TEST_F(ServiceTest, StartsInItsOrder) {
     EXPECT_EQ(std::count(text.begin(), text.end(), '\n'), 12 + paths);
 }
 
-TEST_F(ServiceTest, RegistersWithoutADriver) {
-    start();
-    EXPECT_NE(log().find("): Vibrator driver does not exist. Remove VIB HAL or Setup Vibrator "
-                         "Driver\n"),
-              std::string::npos);
-    EXPECT_EQ(Status(IDaxVibrator::getService()->on(5)), Status::UNKNOWN_ERROR);
-}
-
 TEST_F(ServiceTest, ServesEveryOperationToEveryCaller) {
     std::vector<uid_t> uids = {geteuid()};
     if (geteuid() == 0) uids = {0, 1000, 1001, 2000, 10123};

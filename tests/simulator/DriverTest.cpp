@@ -3,6 +3,7 @@
 #include "Folder.h"
 #include "TraceFile.h"
 #include "TraceLine.h"
+#include "support/Child.h"
 #include "support/TransientTrigger.h"
 #include "support/VibratorTest.h"
 
@@ -211,19 +212,15 @@ TEST_F(SimulatedDriverTest, TwoProcessesShareTheTimesOfAFault) {
 
 TEST_F(SimulatedDriverTest, ReadersNeverSeeHalfAValue) {
     start(Layout::kLedTrigger);
-    const pid_t writer = fork();
-    if (writer == 0) {
-        alarm(20);
+    const Child writer([&] {
         for (;;) {
             put("intensity", "1\n");
             put("intensity", "10000\n");
         }
-    }
+    });
     std::set<std::string> seen;
     for (int i = 0; i < 3000; ++i)
         seen.insert(get("intensity"));
-    kill(writer, SIGKILL);
-    waitpid(writer, nullptr, 0);
     EXPECT_EQ(seen, (std::set<std::string>{"1\n", "10000\n"}));
 }
 
