@@ -1,21 +1,23 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "support/Process.h"
+
 #include <fcntl.h>
 #include <gtest/gtest.h>
+#include <linux/uhid.h>
 #include <linux/uinput.h>
 #include <poll.h>
 #include <sys/ioctl.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <atomic>
 #include <cstring>
 #include <ctime>
 #include <filesystem>
-#include <map>
 #include <mutex>
+#include <set>
 #include <string>
 #include <thread>
 #include <vector>
@@ -29,13 +31,15 @@ inline double nowInMs() {
     return static_cast<double>(time.tv_sec) * 1e3 + static_cast<double>(time.tv_nsec) / 1e6;
 }
 
-/** A force-feedback motor of the kernel's input core that writes down what it was told, and when.
- */
+/** A motor of the kernel's input core that writes down what it was told, and when. */
 class RecordedMotor {
   public:
     struct Kind {
         const char* name;
-        /** What it offers, like FF_RUMBLE. */
+        /**
+         * What it offers, like FF_RUMBLE. Without any it is a game controller of which only the
+         * radio is not real: the kernel's own driver keeps the effects, and their times.
+         */
         std::vector<int> bits;
         uint32_t effects;
     };
@@ -45,23 +49,17 @@ class RecordedMotor {
         int strength;
     };
 
-    explicit RecordedMotor(const Kind& kind) : mFile(open("/dev/uinput", O_RDWR | O_CLOEXEC)) {
-        uinput_setup setup{};
-        setup.id = {BUS_VIRTUAL, 1, 1, 1};
-        setup.ff_effects_max = kind.effects;
-        strncpy(setup.name, kind.name, sizeof(setup.name) - 1);
-        EXPECT_EQ(ioctl(mFile, UI_SET_EVBIT, EV_FF), 0);
-        for (const int bit : kind.bits)
-            EXPECT_EQ(ioctl(mFile, UI_SET_FFBIT, bit), 0);
-        EXPECT_EQ(ioctl(mFile, UI_DEV_SETUP, &setup), 0);
-        EXPECT_EQ(ioctl(mFile, UI_DEV_CREATE), 0);
-        char name[64] = "";
-        EXPECT_GT(ioctl(mFile, UI_GET_SYSNAME(sizeof(name)), name), 0);
-        const std::string directory = "/sys/devices/virtual/input/" + std::string(name);
-        for (const auto& entry : std::filesystem::directory_iterator(directory)) {
-            const std::string leaf = entry.path().filename();
-            if (leaf.find("event") == 0) mPath = "/dev/input/" + leaf;
-        }
+    explicit RecordedMotor(const Kind& kind)
+        : mIsController(kind.bits.empty()),
+          mFile(open(mIsController ? "/dev/uhid" : "/dev/uinput", O_RDWR | O_CLOEXEC)) {
+        const std::set<std::string> before = devices();
+        mIsController ? plugController(kind.name) : plug(kind);
+        EXPECT_TRUE(eventually([&] {
+            for (const std::string& path : devices()) {
+                if (before.count(path) == 0) mPath = path;
+            }
+            return !mPath.empty();
+        }));
         // As udev does for the user at the seat.
         EXPECT_EQ(chmod(mPath.c_str(), 0666), 0);
         mThread = std::thread([this] { record(); });
@@ -69,7 +67,7 @@ class RecordedMotor {
     RecordedMotor(const RecordedMotor&) = delete;
     RecordedMotor& operator=(const RecordedMotor&) = delete;
     ~RecordedMotor() {
-        ioctl(mFile, UI_DEV_DESTROY);
+        if (!mIsController) ioctl(mFile, UI_DEV_DESTROY);
         // Does not wake up who reads.
         mHasEnded = true;
         mThread.join();
@@ -90,86 +88,112 @@ class RecordedMotor {
     }
     /** @return the gain that was set last; -1 if none was. */
     int gain() const { return mGain; }
-    /** @return the most effects that it held at a time. */
-    size_t effects() const { return mMostHeld; }
+    /** @return how many effects it has held. */
+    size_t effects() const { return mNumbers.size(); }
 
   private:
-    struct Held {
-        int strength;
-        double length;
-        bool plays;
-        /** When it ends by itself. */
-        double end;
-    };
-
-    static int strengthOf(const ff_effect& effect) {
-        if (effect.type == FF_CONSTANT) return effect.u.constant.level;
-        if (effect.type == FF_PERIODIC) return effect.u.periodic.magnitude;
-        EXPECT_EQ(effect.type, FF_RUMBLE);
-        EXPECT_EQ(effect.u.rumble.strong_magnitude, effect.u.rumble.weak_magnitude);
-        return effect.u.rumble.strong_magnitude;
+    static std::set<std::string> devices() {
+        std::set<std::string> paths;
+        for (const auto& entry : std::filesystem::directory_iterator("/dev/input"))
+            paths.insert(entry.path());
+        return paths;
+    }
+    void plug(const Kind& kind) const {
+        uinput_setup setup{};
+        setup.id = {BUS_VIRTUAL, 1, 1, 1};
+        setup.ff_effects_max = kind.effects;
+        strncpy(setup.name, kind.name, sizeof(setup.name) - 1);
+        EXPECT_EQ(ioctl(mFile, UI_SET_EVBIT, EV_FF), 0);
+        for (const int bit : kind.bits)
+            EXPECT_EQ(ioctl(mFile, UI_SET_FFBIT, bit), 0);
+        EXPECT_EQ(ioctl(mFile, UI_DEV_SETUP, &setup), 0);
+        EXPECT_EQ(ioctl(mFile, UI_DEV_CREATE), 0);
+    }
+    void plugController(const char* name) const {
+        // A gamepad with eight buttons.
+        constexpr char kDescriptor[] =
+                "\x05\x01\x09\x05\xa1\x01\x05\x09\x19\x01\x29\x08\x15\x00\x25\x01\x75\x01\x95\x08"
+                "\x81\x02\xc0";
+        uhid_event event{};
+        event.type = UHID_CREATE2;
+        event.u.create2 = {{}, {}, {}, sizeof(kDescriptor) - 1, BUS_BLUETOOTH, 0x045e, 0x02fd,
+                           1,  0,  {}};
+        memcpy(event.u.create2.name, name, strlen(name));
+        memcpy(event.u.create2.rd_data, kDescriptor, sizeof(kDescriptor));
+        EXPECT_EQ(write(mFile, &event, sizeof(event)), sizeof(event));
     }
 
     void record() {
         pollfd waiting{mFile, POLLIN, 0};
         while (!mHasEnded) {
-            input_event event{};
-            if (poll(&waiting, 1, 20) != 1) continue;
-            if (read(mFile, &event, sizeof(event)) != sizeof(event)) continue;
-            const std::lock_guard<std::mutex> lock(mMutex);
-            const double time = static_cast<double>(event.input_event_sec) * 1e3 +
-                                static_cast<double>(event.input_event_usec) / 1e3;
-            endBefore(time);
-            if (event.type == EV_UINPUT && event.code == UI_FF_UPLOAD) upload(time, event.value);
-            if (event.type == EV_UINPUT && event.code == UI_FF_ERASE) erase(time, event.value);
-            if (event.type == EV_FF && event.code == FF_GAIN) mGain = event.value;
-            if (event.type == EV_FF && event.code < FF_GAIN)
-                play(time, event.code, event.value != 0);
+            if (poll(&waiting, 1, 20) == 1) mIsController ? recordReport() : recordEvent();
         }
     }
-    void upload(double time, int number) {
+    void recordReport() {
+        uhid_event event{};
+        if (read(mFile, &event, sizeof(event)) < 0 || event.type != UHID_OUTPUT) return;
+        const std::lock_guard<std::mutex> lock(mMutex);
+        change(nowInMs(), event.u.output.data[4]);
+    }
+    void recordEvent() {
+        input_event event{};
+        if (read(mFile, &event, sizeof(event)) != sizeof(event)) return;
+        const std::lock_guard<std::mutex> lock(mMutex);
+        const double time = static_cast<double>(event.input_event_sec) * 1e3 +
+                            static_cast<double>(event.input_event_usec) / 1e3;
+        endBefore(time);
+        if (event.type == EV_UINPUT && event.code == UI_FF_UPLOAD) {
+            upload(time, static_cast<uint32_t>(event.value));
+        } else if (event.type == EV_UINPUT) {
+            uinput_ff_erase request{static_cast<uint32_t>(event.value), 0, 0};
+            ioctl(mFile, UI_BEGIN_FF_ERASE, &request);
+            ioctl(mFile, UI_END_FF_ERASE, &request);
+            play(time, false);
+        } else if (event.code == FF_GAIN) {
+            mGain = event.value;
+        } else {
+            play(time, event.value != 0);
+        }
+    }
+    void upload(double time, uint32_t number) {
         uinput_ff_upload request{};
-        request.request_id = static_cast<uint32_t>(number);
+        request.request_id = number;
         if (ioctl(mFile, UI_BEGIN_FF_UPLOAD, &request) != 0) return;
-        Held& held = mHeld[request.effect.id];
-        held.strength = strengthOf(request.effect);
-        held.length = request.effect.replay.length;
-        mMostHeld = std::max<size_t>(mMostHeld, mHeld.size());
+        const ff_effect& effect = request.effect;
+        mNumbers.insert(effect.id);
+        mEffect = effect.type == FF_CONSTANT   ? effect.u.constant.level
+                  : effect.type == FF_PERIODIC ? effect.u.periodic.magnitude
+                                               : effect.u.rumble.strong_magnitude;
+        EXPECT_TRUE(effect.type != FF_RUMBLE || effect.u.rumble.weak_magnitude == mEffect);
+        mLength = effect.replay.length;
         // As motors do whose time the kernel keeps: it begins anew.
-        if (held.plays) play(time, request.effect.id, true);
-        request.retval = 0;
+        if (mEnd > 0) play(time, true);
         ioctl(mFile, UI_END_FF_UPLOAD, &request);
     }
-    void erase(double time, int number) {
-        uinput_ff_erase request{};
-        request.request_id = static_cast<uint32_t>(number);
-        if (ioctl(mFile, UI_BEGIN_FF_ERASE, &request) != 0) return;
-        play(time, static_cast<int>(request.effect_id), false);
-        mHeld.erase(static_cast<int>(request.effect_id));
-        request.retval = 0;
-        ioctl(mFile, UI_END_FF_ERASE, &request);
+    void play(double time, bool plays) {
+        mEnd = plays ? time + mLength : 0;
+        change(time, plays ? mEffect : 0);
     }
-    void play(double time, int effect, bool plays) {
-        Held& held = mHeld[effect];
-        held.plays = plays;
-        held.end = time + held.length;
-        const int strength = plays ? held.strength : 0;
+    void endBefore(double time) {
+        if (mEnd > 0 && mEnd <= time) play(mEnd, false);
+    }
+    void change(double time, int strength) {
         if (strength != mStrength) mChanges.push_back({time, strength});
         mStrength = strength;
     }
-    void endBefore(double time) {
-        for (auto& [effect, held] : mHeld) {
-            if (held.plays && held.end <= time) play(held.end, effect, false);
-        }
-    }
 
-    int mFile;
+    const bool mIsController;
+    const int mFile;
     std::string mPath;
     std::mutex mMutex;
-    std::map<int, Held> mHeld;
     std::vector<Change> mChanges;
     int mStrength = 0;
-    std::atomic<size_t> mMostHeld{0};
+    /** Strength and length of the effect. */
+    int mEffect = 0;
+    double mLength = 0;
+    /** When it ends by itself; 0: it does not play. */
+    double mEnd = 0;
+    std::set<int> mNumbers;
     std::atomic<int> mGain{-1};
     std::atomic<bool> mHasEnded{false};
     std::thread mThread;
