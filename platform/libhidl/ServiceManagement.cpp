@@ -169,15 +169,25 @@ class Registrations : public hidl_death_recipient {
 
     void addAgain() {
         const std::lock_guard<std::mutex> lock(mMutex);
-        mManager.clear();
-        if (!connect().isOk()) return;
+        do {
+            mManager.clear();
+            if (!connect().isOk()) return;
+        } while (!addAll());
+    }
+
+    /** @return false if the manager has died meanwhile. */
+    bool addAll() {
         for (const auto& [service, instance] : mServices) {
             const Return<bool> added = hardware::add(*mManager, service, instance);
-            const bool isKnown = added.withDefault(false);
-            __android_log_print(isKnown ? ANDROID_LOG_INFO : ANDROID_LOG_ERROR, kLogTag,
+            if (!added.isOk()) {
+                std::this_thread::sleep_for(milliseconds(100));
+                return false;
+            }
+            __android_log_print(added ? ANDROID_LOG_INFO : ANDROID_LOG_ERROR, kLogTag,
                                 "%s with the new service manager: %s",
-                                isKnown ? "registered" : "not registered", instance.c_str());
+                                added ? "registered" : "not registered", instance.c_str());
         }
+        return true;
     }
 
     std::mutex mMutex;

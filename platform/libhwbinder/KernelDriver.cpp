@@ -26,9 +26,12 @@ size_t mappingSize() {
 class KernelDriver::Object : public RemoteObject {
   public:
     explicit Object(uint32_t handle) : mHandle(handle) {
-        KernelThread::self().queue(BC_ACQUIRE, mHandle);
+        // Calls to the context manager need no reference, and the kernel silently refuses one, and
+        // notices that need it, as long as there is none: it is taken when it has answered.
+        if (handle != 0) acquire();
     }
     ~Object() override {
+        if (!mIsAcquired) return;
         KernelThread::self().queue(BC_RELEASE, mHandle);
         KernelThread::self().flush();
     }
@@ -39,6 +42,7 @@ class KernelDriver::Object : public RemoteObject {
         return KernelThread::self().transact(mHandle, code, data, reply, flags);
     }
     status_t requestDeathNotice() override {
+        if (!mIsAcquired) acquire();
         KernelThread::self().queue(BC_REQUEST_DEATH_NOTIFICATION,
                                    binder_handle_cookie{mHandle, mHandle});
         return KernelThread::self().flush();
@@ -50,7 +54,13 @@ class KernelDriver::Object : public RemoteObject {
     }
 
   private:
+    void acquire() {
+        KernelThread::self().queue(BC_ACQUIRE, mHandle);
+        mIsAcquired = true;
+    }
+
     const uint32_t mHandle;
+    bool mIsAcquired = false;
 };
 
 KernelDriver::KernelDriver(const std::string& device) : mName(device) {
