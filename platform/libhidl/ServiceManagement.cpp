@@ -233,8 +233,10 @@ status_t registerAsServiceInternal(const sp<IBase>& service, const std::string& 
 
 namespace host {
 
-const Transport& transport() {
-    return ProcessState::self()->transport();
+Transport transport() {
+    Transport transport = ProcessState::self()->transport();
+    if (SocketDriver* sockets = driver().socketDriver()) transport.path = sockets->directory();
+    return transport;
 }
 
 void setCallTimeout(milliseconds limit) {

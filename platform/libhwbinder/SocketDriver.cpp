@@ -7,7 +7,8 @@
 
 namespace android::hardware {
 
-SocketDriver::SocketDriver() : mServer(std::make_unique<SocketServer>()) {}
+SocketDriver::SocketDriver()
+    : mServer(std::make_unique<SocketServer>()), mDirectory(serverDirectory()) {}
 
 SocketDriver::~SocketDriver() = default;
 
@@ -25,6 +26,11 @@ std::string SocketDriver::name() const {
     return "sockets in " + serverDirectory();
 }
 
+std::string SocketDriver::directory() const {
+    const std::lock_guard<std::mutex> lock(mMutex);
+    return mDirectory;
+}
+
 Error SocketDriver::connect(const std::string& interface, const std::string& instance,
                             uint32_t* handle) {
     std::string whyNot;
@@ -35,6 +41,7 @@ Error SocketDriver::connect(const std::string& interface, const std::string& ins
         if (error.isOk()) error = directory.connect(socketName(interface, instance), &socket);
         if (error.isOk()) {
             const std::lock_guard<std::mutex> lock(mMutex);
+            mDirectory = path;
             *handle = ++mLastHandle;
             mConnections[*handle] =
                     std::make_unique<SocketConnection>(std::move(socket), *mServer, *handle);

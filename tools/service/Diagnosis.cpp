@@ -41,7 +41,6 @@ class Examination {
   public:
     explicit Examination(const std::string& instance) {
         setCallTimeout(kPatience);
-        mFound.route = findRoute();
         try {
             mVibrator = connect(instance);
             mFound.server = serverOf(*mVibrator);
@@ -52,6 +51,7 @@ class Examination {
             mFound.service = error.what();
             examineSilence();
         }
+        mFound.route = findRoute();
         mOpener = mFound.server.value_or(thisProcess());
         mDriver = LocalDriver(mOpener);
     }

@@ -10,8 +10,8 @@
 /** What only this platform offers, for programs that are not built for a device's runtime. */
 namespace android::hardware::host {
 
-/** @return the transport of this process's calls. */
-const Transport& transport();
+/** @return the transport of this process's calls; its path, where the last service was found. */
+Transport transport();
 
 /** Whether calls over the transport need a service manager, and whether one answers. */
 enum class ManagerState { NOT_NEEDED, ANSWERS, SILENT };

@@ -24,6 +24,9 @@ class SocketDriver : public Driver {
     SocketDriver* socketDriver() override { return this; }
     std::string name() const override;
 
+    /** @return where a service was found last; before that, where one of this process would be. */
+    std::string directory() const;
+
     /**
      * Connects to a service.
      *
@@ -42,7 +45,8 @@ class SocketDriver : public Driver {
 
   private:
     const std::unique_ptr<SocketServer> mServer;
-    std::mutex mMutex;
+    mutable std::mutex mMutex;
+    std::string mDirectory;
     uint32_t mLastHandle = 0;
     /** Those that are not open yet. */
     std::map<uint32_t, std::unique_ptr<RemoteObject>> mConnections;
