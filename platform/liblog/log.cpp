@@ -18,6 +18,7 @@
 #include <cstring>
 #include <ctime>
 #include <mutex>
+#include <string>
 
 namespace android::log {
 namespace {
@@ -121,6 +122,14 @@ int logDescriptor() {
     return opened >= 0 ? opened : STDERR_FILENO;
 }
 
+/** @return whether standard error is systemd's journal, as it tells the programs that it starts. */
+bool isJournal() {
+    const char* stream = getenv("JOURNAL_STREAM");
+    struct stat info;
+    if (stream == nullptr || fstat(STDERR_FILENO, &info) != 0) return false;
+    return std::to_string(info.st_dev) + ":" + std::to_string(info.st_ino) == stream;
+}
+
 /** Writes without waiting for a slow reader, or being killed by SIGPIPE when it has gone. */
 int writeLine(const char* line, size_t length) {
     const int descriptor = logDescriptor();
@@ -147,9 +156,12 @@ int printLine(int priority, const char* tag, const char* format, va_list argumen
     vsnprintf(message, sizeof(message), format, arguments);
 
     constexpr char kLetters[] = "??VDIWEFS";
+    // The journal takes syslog's level from the beginning of a line, and removes it.
+    constexpr char kLevels[] = "??7764322";
     char line[kMaxTag + 32 + 4 * kMaxMessage];
-    const int prefix = snprintf(line, kMaxTag + 31, "%c/%-8.*s(%5d): ", kLetters[priority],
-                                static_cast<int>(kMaxTag), tag, getpid());
+    const char level[] = {'<', kLevels[priority], '>', '\0'};
+    const int prefix = snprintf(line, kMaxTag + 31, "%s%c/%-8.*s(%5d): ", isJournal() ? level : "",
+                                kLetters[priority], static_cast<int>(kMaxTag), tag, getpid());
     char* end = escape(message, line + prefix);
     // A pipe takes so much in one piece, or nothing of it.
     if (end - line >= PIPE_BUF) end = line + PIPE_BUF - 1;

@@ -6,6 +6,7 @@
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <poll.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -78,6 +79,20 @@ TEST(LogTest, PriorityIsALetter) {
     for (int priority = ANDROID_LOG_VERBOSE; priority <= ANDROID_LOG_FATAL; ++priority)
         letters += letterOf(priority);
     EXPECT_EQ(letters, "VDIWEF");
+
+    struct stat info;
+    ASSERT_EQ(fstat(STDERR_FILENO, &info), 0);
+    const std::string journal = std::to_string(info.st_dev) + ":" + std::to_string(info.st_ino);
+    setenv("JOURNAL_STREAM", journal.c_str(), 1);
+    std::string levels;
+    for (int priority = ANDROID_LOG_VERBOSE; priority <= ANDROID_LOG_FATAL; ++priority) {
+        __android_log_print(priority, "T", "text");
+        levels += log.takeText().substr(0, 4);
+    }
+    EXPECT_EQ(levels, "<7>V<7>D<6>I<4>W<3>E<2>F");
+    setenv("JOURNAL_STREAM", (journal + "1").c_str(), 1);
+    EXPECT_EQ(letterOf(ANDROID_LOG_ERROR), 'E') << "standard error is something else";
+    unsetenv("JOURNAL_STREAM");
     // What is no priority of a line counts as debug.
     const int others[] = {ANDROID_LOG_UNKNOWN, ANDROID_LOG_DEFAULT, ANDROID_LOG_SILENT, -1, 99};
     for (const int priority : others)
