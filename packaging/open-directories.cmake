@@ -1,4 +1,0 @@
-# Everybody may enter the package's directories, whatever the umask while packing.
-file(CHMOD_RECURSE ${CPACK_TEMPORARY_DIRECTORY}
-    DIRECTORY_PERMISSIONS OWNER_READ OWNER_WRITE OWNER_EXECUTE GROUP_READ GROUP_EXECUTE
-        WORLD_READ WORLD_EXECUTE)
