@@ -1,0 +1,43 @@
+// SPDX-License-Identifier: GPL-2.0
+/* An LED named "vibrator", which stands for a motor that a GPIO switches. */
+#include <linux/leds.h>
+#include <linux/module.h>
+#include <linux/platform_device.h>
+
+static struct platform_device *device;
+
+static void set(struct led_classdev *led, enum led_brightness brightness)
+{
+}
+
+static struct led_classdev motor = {
+	.name = "vibrator",
+	.max_brightness = 1,
+	.brightness_set = set,
+};
+
+static int __init motor_init(void)
+{
+	int error;
+
+	device = platform_device_register_simple("test-motor", -1, NULL, 0);
+	if (IS_ERR(device))
+		return PTR_ERR(device);
+	error = led_classdev_register(&device->dev, &motor);
+	if (error)
+		platform_device_unregister(device);
+	return error;
+}
+module_init(motor_init);
+
+static void __exit motor_exit(void)
+{
+	led_classdev_unregister(&motor);
+	platform_device_unregister(device);
+}
+module_exit(motor_exit);
+
+/* A device that the virtual machine has, so that udev loads this. */
+MODULE_ALIAS("platform:pcspkr");
+MODULE_DESCRIPTION("LED of the boot test");
+MODULE_LICENSE("GPL");
