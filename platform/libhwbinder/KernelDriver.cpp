@@ -35,8 +35,6 @@ class KernelDriver::Object : public RemoteObject {
         KernelThread::self().queue(BC_RELEASE, mHandle);
         KernelThread::self().flush();
     }
-    Object(const Object&) = delete;
-    Object& operator=(const Object&) = delete;
 
     status_t transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags) override {
         return KernelThread::self().transact(mHandle, code, data, reply, flags);

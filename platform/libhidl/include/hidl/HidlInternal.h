@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include <cstdint>
+#include <charconv>
+#include <iterator>
 #include <string>
 #include <type_traits>
 #include <utility>
@@ -21,14 +22,9 @@ static_assert(sizeof(void*) == 8, "this platform is for 64-bit processes");
 /** @return a number like "0x1f". */
 template <typename T>
 std::string toHexString(T number) {
-    constexpr char kDigits[] = "0123456789abcdef";
-    uint64_t rest = static_cast<std::make_unsigned_t<T>>(number);
-    std::string digits;
-    do {
-        digits.insert(digits.begin(), kDigits[rest % 16]);
-        rest /= 16;
-    } while (rest != 0);
-    return "0x" + digits;
+    char digits[2 * sizeof(number)];
+    const auto value = static_cast<std::make_unsigned_t<T>>(number);
+    return "0x" + std::string(digits, std::to_chars(digits, std::end(digits), value, 16).ptr);
 }
 
 /** Base of generated classes that could report their calls, which this platform does not do. */

@@ -12,8 +12,8 @@ class BHwBinder : public IBinder {
                       TransactCallback callback = nullptr) final {
         return onTransact(code, data, reply, flags, callback);
     }
-    status_t linkToDeath(const sp<DeathRecipient>& recipient) final;
-    status_t unlinkToDeath(const sp<DeathRecipient>& recipient) final;
+    status_t linkToDeath(const sp<DeathRecipient>&) final { return INVALID_OPERATION; }
+    status_t unlinkToDeath(const sp<DeathRecipient>&) final { return INVALID_OPERATION; }
     BHwBinder* localBinder() final { return this; }
 
     /** @return the least priority, as a nice value, that a call is served with. */

@@ -12,7 +12,10 @@ namespace android::hardware {
 class IPCThreadState {
   public:
     /** @return the state of the current thread. */
-    static IPCThreadState* self();
+    static IPCThreadState* self() {
+        static thread_local IPCThreadState state;
+        return &state;
+    }
 
     /** @return process id of the caller, 0 where it is unknown; this process's outside a call. */
     pid_t getCallingPid() const {

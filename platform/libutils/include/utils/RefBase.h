@@ -15,15 +15,10 @@ class RefBase {
     /** The two counts of an object, which exist as long as the object or a wp<> to it. */
     class weakref_type {
       public:
-        explicit weakref_type(RefBase* object) : mObject(object) {}
-
         void incWeak(const void* id);
         void decWeak(const void* id);
         /** Takes a strong reference, if there is still one. @return whether it did. */
         bool attemptIncStrong(const void* id);
-
-        /** @return the object, alive or not. */
-        RefBase* refBase() const { return mObject; }
 
       private:
         friend class RefBase;
@@ -31,7 +26,6 @@ class RefBase {
         std::atomic<int32_t> mStrong{0};
         /** Counts each wp<>, and the object itself as one. */
         std::atomic<int32_t> mWeak{1};
-        RefBase* const mObject;
     };
 
     RefBase(const RefBase&) = delete;
@@ -46,7 +40,7 @@ class RefBase {
     weakref_type* getWeakRefs() const { return mRefs; }
 
   protected:
-    RefBase() : mRefs(new weakref_type(this)) {}
+    RefBase() : mRefs(new weakref_type) {}
     virtual ~RefBase() { mRefs->decWeak(this); }
 
   private:

@@ -23,9 +23,4 @@ auto uninterrupted(Call call, GoesOn goesOn) {
     }
 }
 
-template <typename Call>
-auto uninterrupted(Call call) {
-    return uninterrupted(call, [] { return true; });
-}
-
 }  // namespace android
