@@ -110,7 +110,7 @@ bool findNode(const std::string& directory, const char* path, Node* node) {
                 const std::string_view place = model::sysfsDirectory(layout);
                 return strncmp(path, place.data(), place.size()) == 0;
             });
-    if (isBelow) *node = {path, std::make_shared<const Folder>(directory), directory + path};
+    if (isBelow) *node = {path, std::make_shared<const Folder>(directory)};
     return isBelow;
 }
 
@@ -121,7 +121,7 @@ std::vector<Node> listNodes(const std::string& directory) {
         const std::string place(model::sysfsDirectory(layout));
         for (const std::string& leaf : openBelow(*folder, place).names()) {
             if (leaf[0] == '.') continue;
-            nodes.push_back({place + leaf, folder, directory + place + leaf});
+            nodes.push_back({place + leaf, folder});
         }
     }
     return nodes;

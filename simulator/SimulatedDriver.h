@@ -42,8 +42,6 @@ struct Node {
     std::string path;
     /** The directory of the driver. */
     std::shared_ptr<const Folder> directory;
-    /** The path of the file that holds its state. */
-    std::string file;
 
     /** @return the last part of its path, like "intensity". */
     std::string leaf() const;

@@ -81,7 +81,7 @@ LocalDriver::Node LocalDriver::look(const std::string& name) const {
     }
     struct stat info {};
     Node node;
-    if (stat(isSimulated ? simulated.file.c_str() : path.c_str(), &info) != 0) return node;
+    if (stat(((isSimulated ? simulation : "") + path).c_str(), &info) != 0) return node;
     node.exists = true;
     node.reads = mOpener.mayOpen(info, true, false);
     node.writes = mOpener.mayOpen(info, false, true);
