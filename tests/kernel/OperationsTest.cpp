@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Vibrator.h"
 #include "support/Operations.h"
-#include "transport/TransportTest.h"
+#include "support/TransportTest.h"
 
 #include <hwbinder/IPCThreadState.h>
 #include <sys/stat.h>

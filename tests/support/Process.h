@@ -15,9 +15,8 @@ struct Outcome {
     std::string errors;
 };
 
-/** Runs a program to its end, as another user where asked for, with text on standard input. */
-Outcome runProgram(const std::vector<std::string>& command, uid_t uid = geteuid(),
-                   const std::string& input = {});
+/** Runs a program to its end, without input, as another user where asked for. */
+Outcome runProgram(const std::vector<std::string>& command, uid_t uid = geteuid());
 
 /** Runs a function in a process of its own and another uid. @return its exit code. */
 int runAs(uid_t uid, const std::function<int()>& function);

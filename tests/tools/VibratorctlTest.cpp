@@ -35,7 +35,7 @@ TEST_F(VibratorctlTest, DoctorAgreesWithTheService) {
     for (const std::string motor : {"LINEAR_1040", "LINEAR_1030", "NONE"}) {
         for (const std::string some : {"intensity,motor-name", "pattern,haptic-engine", "none"}) {
             SCOPED_TRACE(motor + " " + some);
-            createDriver({"--motor", motor, "--features", some});
+            createDriver("--motor " + motor + " --features " + some);
             start();
             const auto known = json::parse(run("motor --json").output);
             // Which includes that the service answers as the doctor expects.
@@ -45,7 +45,7 @@ TEST_F(VibratorctlTest, DoctorAgreesWithTheService) {
             EXPECT_NE(log().find("daxGetAmplitudeList type: 0 : " + known["number"].dump() + "\n"),
                       std::string::npos);
             std::filesystem::remove(logFile());
-            mService.kill();
+            mServer.kill();
         }
     }
 }

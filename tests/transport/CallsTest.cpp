@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "support/LogCapture.h"
-#include "transport/TransportTest.h"
+#include "support/TransportTest.h"
 
 #include <android/hidl/manager/1.2/IServiceManager.h>
 #include <hidl/HidlBinderSupport.h>

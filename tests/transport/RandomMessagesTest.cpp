@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "support/TransportTest.h"
 #include "transport/RawClient.h"
-#include "transport/TransportTest.h"
 
 #include <algorithm>
 #include <filesystem>

@@ -4,8 +4,8 @@
 #include "libhwbinder/SocketConnection.h"
 #include "libhwbinder/SocketServer.h"
 #include "support/LogCapture.h"
+#include "support/TransportTest.h"
 #include "transport/RawClient.h"
-#include "transport/TransportTest.h"
 
 #include <android/hidl/manager/1.0/IServiceNotification.h>
 #include <android/hidl/manager/1.2/IServiceManager.h>
@@ -170,7 +170,7 @@ TEST_F(RuntimeTest, ConnectionThatAForkedChildHasTooIsDroppedAllTheSame) {
     ProcessState::self()->startThreadPool();
     const RawClient client(mDirectory.path(), Slow::descriptor);
     ASSERT_TRUE(client.answersPing());
-    const Child child([] { pause(); });
+    const Child child([] { sleep(30); });
     // One without measure costs the connection; what comes after it must not find it again.
     for (int i = 0; i < 3; ++i)
         EXPECT_TRUE(client.send("", 0));
