@@ -55,8 +55,6 @@ TEST(LogFilterTest, RulesDecideByTagAndPriority) {
             {"*", ANDROID_LOG_DEBUG, "A", true},
             {"  A:S\t", ANDROID_LOG_FATAL, "A", false},
             {"A:F", ANDROID_LOG_ERROR, "A", false},
-            {"A:W *:I", ANDROID_LOG_INFO, "A", false},
-            {"A:W *:I", ANDROID_LOG_INFO, "B", true},
             {"*:S\nA:V\tB:S", ANDROID_LOG_VERBOSE, "A", true},
     };
     for (const auto& [rules, priority, tag, shown] : cases) {
