@@ -30,7 +30,7 @@ Value<T> Command::add(const std::string& name, const std::string& help, const st
     const size_t start = name[0] == '-' ? name.find("--") : 0;
     const size_t blank = name.find(' ', start);
     argument.name = name.substr(start, blank - start);
-    argument.letter = start > 0 ? name[1] : '\0';
+    argument.letter = name.substr(0, start > 0 ? 2 : 0);
     argument.isFlag = argument.isOption() && blank == std::string::npos;
     const std::string between = range.empty() || shown.empty() ? "" : "; ";
     const std::string more = range + between + (shown.empty() ? "" : "default: " + shown);

@@ -54,8 +54,8 @@ struct Argument {
     std::string title;
     /** "MS", or "--output". */
     std::string name;
-    /** The option's letter, if it has one. */
-    char letter = 0;
+    /** "-o", if the option has a letter. */
+    std::string letter;
     bool isFlag = false;
     std::string help;
     std::vector<Choice> choices;
@@ -64,7 +64,8 @@ struct Argument {
     /** Whether it takes any number of words, and whether options among them. */
     bool isMany = false;
     bool takesOptions = false;
-    bool isGiven = false;
+    /** The index of the first word that was given for it. */
+    std::optional<size_t> given;
     /** Goes back to the initial value. */
     std::function<void()> reset;
     /** Reads a word. @throw UsageError */
@@ -202,6 +203,11 @@ class Program {
     void addHelp();
     /** Does what a command line asks for. */
     int obey(const std::vector<std::string>& words);
+    /** @return the name that helps show, for a second one; others as they are. */
+    std::string firstName(const std::string& name) const {
+        const auto found = mSecondNames.find(name);
+        return found == mSecondNames.end() ? name : found->second;
+    }
     /** @return the command with a name, or all whose names begin with its words. */
     std::vector<Command*> named(const std::string& name);
     /** @return the words that may follow those of a command, with what they mean. */
