@@ -30,7 +30,7 @@ Client::Client()
 
 int Client::perform(const cli::Command& command) {
     setCallTimeout(std::chrono::milliseconds(*mTimeout));
-    mReport.setSubject({command.name()});
+    mReport.setSubject({command.name});
     try {
         return Program::perform(command);
     } catch (const Unreachable& error) {

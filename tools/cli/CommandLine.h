@@ -80,53 +80,54 @@ struct Argument {
  * "-o, --output FILE". An argument without an initial value must be given; an option without one
  * has the value 0, or no text.
  */
-class Command {
-  public:
-    Command() = default;
-    /** For Program::command(). */
-    Command(std::string group, std::string name, std::string help, std::string example)
-        : mGroup(std::move(group)),
-          mName(std::move(name)),
-          mHelp(std::move(help)),
-          mExample(std::move(example)) {}
+struct Command {
+    std::string group = {};
+    /** The words that call it, like "pattern play". */
+    std::string name = {};
+    std::string help = {};
+    /** Arguments that make sense. */
+    std::string example = {};
+    /** What its help says besides. */
+    std::vector<std::string> notes = {};
+    bool hasJson = true;
+    std::deque<Argument> arguments = {};
+    /** Does what the command does, with what was read last. @return the exit code. */
+    std::function<int()> perform = {};
 
     /** A number, a time or a strength. @param initial in the unit of a number alone. */
-    Value<uint32_t> number(const std::string& name, const Numbers& numbers, const std::string& help,
-                           std::optional<uint32_t> initial = {});
+    Value<uint32_t> number(const std::string& title, const Numbers& numbers,
+                           const std::string& about, std::optional<uint32_t> initial = {});
     /** @return the index of what was chosen. */
-    Value<size_t> choice(const std::string& name, const std::vector<Choice>& choices,
-                         const std::string& help, std::optional<size_t> initial = {});
+    Value<size_t> choice(const std::string& title, const std::vector<Choice>& choices,
+                         const std::string& about, std::optional<size_t> initial = {});
     /** @param offered what completions offer, behind a comma again. */
-    Value<std::string> text(const std::string& name, const std::string& help,
-                            std::optional<std::string> initial = {},
+    Value<std::string> text(const std::string& title, const std::string& about,
+                            const std::optional<std::string>& initial = {},
                             std::vector<Choice> offered = {});
     /** Like text, for the name of a file. */
-    Value<std::string> file(const std::string& name, const std::string& help,
-                            std::optional<std::string> initial = {}) {
-        auto value = text(name, help, std::move(initial));
-        mArguments.back().isFile = true;
+    Value<std::string> file(const std::string& title, const std::string& about,
+                            const std::optional<std::string>& initial = {}) {
+        auto value = text(title, about, initial);
+        arguments.back().isFile = true;
         return value;
     }
     /** Any number of words. @param check throws a UsageError for a wrong one. */
-    Value<std::vector<std::string>> words(const std::string& name, const std::string& help,
+    Value<std::vector<std::string>> words(const std::string& title, const std::string& about,
                                           std::function<void(const std::string&)> check = {});
     /** All that stands behind the options, options of another command included. */
-    Value<std::vector<std::string>> rest(const std::string& name, const std::string& help) {
-        auto value = words(name, help);
-        mArguments.back().takesOptions = true;
+    Value<std::vector<std::string>> rest(const std::string& title, const std::string& about) {
+        auto value = words(title, about);
+        arguments.back().takesOptions = true;
         return value;
     }
-    Value<bool> flag(const std::string& name, const std::string& help);
+    Value<bool> flag(const std::string& title, const std::string& about);
 
     /** Says more in the command's help. */
-    Command& note(const std::string& text) { return mNotes.push_back(text), *this; }
+    Command& note(const std::string& text) { return notes.push_back(text), *this; }
     /** For a command whose output is no answer that could be JSON. */
-    Command& withoutJson() { return mHasJson = false, *this; }
+    Command& withoutJson() { return hasJson = false, *this; }
     /** Says what the command does; it returns the exit code. */
-    void run(std::function<int()> action) { mAction = std::move(action); }
-
-    /** The words that call it, like "pattern play". */
-    const std::string& name() const { return mName; }
+    void run(std::function<int()> action) { perform = std::move(action); }
 
     /**
      * Reads a step of a script. Options may also be given without their names, in the order in
@@ -135,28 +136,13 @@ class Command {
      * @throw UsageError with the index of the word
      */
     void readStep(const std::vector<std::string>& words);
-    /** Does what the command does, with what was read last. */
-    int perform() const { return mAction(); }
 
   private:
-    friend class Program;
-    friend class Line;
-
+    /** @param read makes a value of a word, or adds the word to it. */
     template <typename T, typename Read>
-    Value<T> add(const std::string& name, const std::string& help, const std::string& range,
-                 const std::optional<T>& initial, const std::string& shown, const Read& read);
-
-    std::string mGroup;
-    std::string mName;
-    std::string mHelp;
-    std::string mExample;
-    std::vector<std::string> mNotes;
-    bool mHasJson = true;
-    std::deque<Argument> mArguments;
-    std::function<int()> mAction;
+    Value<T> add(const std::string& title, const std::string& about,
+                 const std::optional<T>& initial, const Read& read);
 };
-
-class Line;
 
 /** A program of many commands: reads its command line, helps, and completes for shells. */
 class Program {
@@ -176,7 +162,7 @@ class Program {
      */
     Command& command(const std::string& group, const std::string& name, const std::string& help,
                      const std::string& example) {
-        return mCommands.emplace_back(group, name, help, example);
+        return mCommands.emplace_back(Command{group, name, help, example});
     }
     /** Takes a name that no help shows for the first word of a command, or for an option. */
     void addSecondName(const std::string& second, const std::string& first) {
@@ -189,7 +175,7 @@ class Program {
 
   protected:
     /** @return the words of the command that was recognised; empty where none was. */
-    std::string current() const { return mCurrent == nullptr ? "" : mCurrent->name(); }
+    std::string current() const { return mCurrent == nullptr ? "" : mCurrent->name; }
     /** @return whether answers must be JSON; also of a line with a mistake in it. */
     virtual bool isJson() const { return false; }
     /** Runs a command whose arguments have been read. @return the exit code. */
@@ -214,8 +200,8 @@ class Program {
     std::vector<Choice> commandsAfter(const std::string& typed) const;
     /** Prints the help of the commands with a name, or of the program. */
     void help(const std::string& name);
-    void help() const;
     void help(const Command& command) const;
+    void printCommands() const;
 
     std::string mName;
     std::string mVersion;

@@ -3,10 +3,10 @@
 #include "CompletionScripts.h"
 #include "text/Text.h"
 
-#include <algorithm>
 #include <cctype>
 #include <iostream>
 #include <regex>
+#include <set>
 
 namespace cli {
 namespace {
@@ -26,13 +26,13 @@ void printList(const std::string& heading, const std::vector<Choice>& list) {
     }
 }
 
-/** Prints either the options or the other arguments. */
-void printList(const std::string& heading, const std::deque<Argument>& arguments, bool isOptions) {
+/** @return either the options or the other arguments, as a help shows them. */
+std::vector<Choice> titlesOf(const std::deque<Argument>& arguments, bool isOptions) {
     std::vector<Choice> list;
     for (const Argument& each : arguments) {
         if (each.isOption() == isOptions) list.push_back({each.title, each.help});
     }
-    printList(heading, list);
+    return list;
 }
 
 /** @return the arguments as they stand in a call, without the options: " PATTERN [FILE...]". */
@@ -49,7 +49,7 @@ std::string inCall(const std::deque<Argument>& arguments) {
 }  // namespace
 
 void Program::addHelp() {
-    Command& first = command("Help", "help", "print the help of a command", mCommands[0].mName);
+    Command& first = command("Help", "help", "print the help of a command", mCommands[0].name);
     mTopic = first.words("COMMAND", "a command, in one or two words");
     first.withoutJson().run([this] {
         help(join(*mTopic, " ", " "));
@@ -69,47 +69,47 @@ void Program::addHelp() {
 }
 
 void Program::help(const std::string& name) {
-    if (name.empty()) return help();
-    const std::vector<Command*> commands = named(name);
+    const std::vector<Command*> commands = name.empty() ? std::vector{&mShared} : named(name);
+    if (commands.empty()) {
+        throw UsageError("no command " + inQuotes(name) +
+                         suggestion(name, valuesOf(commandsAfter(""))));
+    }
     for (const Command* each : commands)
         help(*each);
-    if (!commands.empty()) return;
-    throw UsageError("no command " + inQuotes(name) +
-                     suggestion(name, valuesOf(commandsAfter(""))));
-}
-
-void Program::help() const {
-    std::cout << "Usage: " << mName << " [OPTION...] COMMAND [ARGUMENT...]\n"
-              << wrap(mShared.mHelp, 0);
-    std::vector<std::pair<std::string, std::vector<Choice>>> groups;
-    for (const Command& each : mCommands) {
-        const auto isItsGroup = [&](const auto& group) { return group.first == each.mGroup; };
-        auto group = std::find_if(groups.begin(), groups.end(), isItsGroup);
-        if (group == groups.end()) group = groups.insert(group, {each.mGroup, {}});
-        group->second.push_back({each.mName + inCall(each.mArguments), each.mHelp});
-    }
-    for (const auto& [name, commands] : groups)
-        printList(name, commands);
-    printList("Options of every command", mShared.mArguments, true);
-    for (const std::string& note : mShared.mNotes)
-        std::cout << '\n' << wrap(note, 0);
 }
 
 void Program::help(const Command& command) const {
-    const auto& arguments = command.mArguments;
-    const bool hasOptions = std::any_of(arguments.begin(), arguments.end(),
-                                        [](const Argument& each) { return each.isOption(); });
-    std::string sentence = command.mHelp + ".";
-    sentence[0] = static_cast<char>(toupper(sentence[0]));
-    std::cout << "Usage: " << mName << ' ' << command.mName << inCall(arguments)
-              << (hasOptions ? " [OPTION...]" : "") << '\n'
-              << wrap(sentence, 0);
-    printList("Arguments", arguments, false);
-    printList("Options", arguments, true);
-    for (const std::string& note : command.mNotes)
+    const bool isOfAll = &command == &mShared;
+    const std::vector<Choice> options = titlesOf(command.arguments, true);
+    std::string about = command.help + (isOfAll ? "" : ".");
+    about[0] = static_cast<char>(toupper(about[0]));
+    std::cout << "Usage: " << mName
+              << (isOfAll ? " [OPTION...] COMMAND [ARGUMENT...]"
+                          : " " + command.name + inCall(command.arguments) +
+                                    (options.empty() ? "" : " [OPTION...]"))
+              << '\n'
+              << wrap(about, 0);
+    if (isOfAll) printCommands();
+    printList("Arguments", titlesOf(command.arguments, false));
+    printList(isOfAll ? "Options of every command" : "Options", options);
+    for (const std::string& note : command.notes)
         std::cout << '\n' << wrap(note, 0);
-    std::cout << "\nExample: " << mName << ' ' << command.mName
-              << (command.mExample.empty() ? "" : " ") << command.mExample << '\n';
+    if (isOfAll) return;
+    std::cout << "\nExample: " << mName << ' ' << command.name
+              << (command.example.empty() ? "" : " ") << command.example << '\n';
+}
+
+void Program::printCommands() const {
+    std::set<std::string> printed;
+    for (const Command& first : mCommands) {
+        if (!printed.insert(first.group).second) continue;
+        std::vector<Choice> list;
+        for (const Command& each : mCommands) {
+            if (each.group == first.group)
+                list.push_back({each.name + inCall(each.arguments), each.help});
+        }
+        printList(first.group, list);
+    }
 }
 
 }  // namespace cli

@@ -18,41 +18,31 @@ class Line {
     Command* command() const { return mCommand; }
     const std::string& typed() const { return mTyped; }
 
-    /** Reads words, as far as they make sense. */
+    /** Reads words, as far as they make sense; keeps the first mistake. */
     void read(const std::vector<std::string>& words) {
-        for (const std::string& word : words) {
-            // A number like -5 is no option, and - stands for a file.
-            const bool isOption = !mHaveOptionsEnded && word.size() > 1 && word[0] == '-' &&
-                                  isdigit(static_cast<unsigned char>(word[1])) == 0;
-            if (mTaking != nullptr) {
-                give(*std::exchange(mTaking, nullptr), word);
-            } else if (!isOption) {
-                takeWord(word);
-            } else if (word == "--") {
-                mHaveOptionsEnded = true;
-            } else {
-                takeOption(word);
+        for (; mIndex < words.size(); ++mIndex) {
+            try {
+                take(words[mIndex]);
+            } catch (const UsageError& error) {
+                if (!mProblem) mProblem.emplace(error.what(), mIndex);
             }
-            ++mIndex;
         }
     }
 
     /** Checks that there is no mistake, and that nothing is missing. @throw UsageError */
-    void finish() {
-        if (mTaking != nullptr) {
-            complain(mTaking->name + ": the value is missing");
-        } else if (mCommand == nullptr) {
-            const std::string known = join(valuesOf(mProgram->commandsAfter(mTyped)), ", ", " or ");
-            complain(mTyped.empty()
-                             ? "no command; " + inQuotes(mProgram->mName + " help") + " lists them"
-                             : mTyped + ": no command; " + known);
-        } else {
-            for (const Argument& each : mCommand->mArguments) {
-                if (each.given || !(each.isRequired || (isStep() && each.isMany))) continue;
-                complain(each.name + " is missing: " + each.help);
-            }
-        }
+    void finish() const {
         if (mProblem) throw UsageError(*mProblem);
+        if (mTaking != nullptr) throw UsageError(mTaking->name + ": the value is missing", mIndex);
+        if (mCommand == nullptr && mTyped.empty())
+            throw UsageError("no command; " + inQuotes(mProgram->mName + " help") + " lists them");
+        if (mCommand == nullptr) {
+            throw UsageError(mTyped + ": no command; " +
+                             join(valuesOf(mProgram->commandsAfter(mTyped)), ", ", " or "));
+        }
+        for (const Argument& each : mCommand->arguments) {
+            if (each.given || !(each.isRequired || (isStep() && each.isMany))) continue;
+            throw UsageError(each.name + " is missing: " + each.help, mIndex);
+        }
     }
 
     /**
@@ -90,12 +80,67 @@ class Line {
     /** Takes the arguments of a command from now on, too. */
     void begin(Command& command) {
         std::vector<Argument*> options;
-        for (Argument& each : command.mArguments) {
+        for (Argument& each : command.arguments) {
             each.reset();
             each.given.reset();
             if (each.isOption() && !(isStep() && each.isFile)) options.push_back(&each);
         }
         mOptions.insert(mOptions.begin(), options.begin(), options.end());
+    }
+
+    void take(const std::string& word) {
+        // A number like -5 is no option, and - stands for a file.
+        const bool isOption = !mHaveOptionsEnded && word.size() > 1 && word[0] == '-' &&
+                              isdigit(static_cast<unsigned char>(word[1])) == 0;
+        if (mTaking != nullptr) {
+            give(*std::exchange(mTaking, nullptr), word);
+        } else if (isOption && word == "--") {
+            mHaveOptionsEnded = true;
+        } else if (isOption) {
+            takeOption(word);
+        } else if (mCommand == nullptr) {
+            takeName(word);
+        } else if (Argument* argument = argumentFor(word)) {
+            mHaveOptionsEnded |= argument->takesOptions;
+            give(*argument, word);
+        } else {
+            throw UsageError(inQuotes(word) + " is one argument too many");
+        }
+    }
+
+    /** Takes "--name", "--name=value", "-n" or "-nvalue". */
+    void takeOption(const std::string& word) {
+        const bool isLong = word[1] == '-';
+        const std::string name = word.substr(0, isLong ? word.find('=') : 2);
+        Argument* const option = optionOf(name);
+        if (option == nullptr) {
+            throw UsageError("no option " + inQuotes(name) +
+                             (mCommand == nullptr ? " before the command" : "") +
+                             suggestion(name, valuesOf(optionsInWords())));
+        }
+        const bool hasValue = name != word;
+        if (option->isFlag && hasValue) throw UsageError(option->name + ": takes no value");
+        if (hasValue) {
+            give(*option, word.substr(name.size() + (isLong ? 1 : 0)));
+        } else if (option->isFlag) {
+            give(*option, "");
+        } else {
+            mTaking = option;
+        }
+    }
+
+    void takeName(const std::string& word) {
+        if (mProblem) return;
+        const std::string name = mTyped.empty() ? mProgram->firstName(word) : mTyped + " " + word;
+        const std::vector<Command*> found = mProgram->named(name);
+        if (found.empty()) {
+            throw UsageError("no command " + inQuotes(name) +
+                             suggestion(word, valuesOf(mProgram->commandsAfter(mTyped))));
+        }
+        mTyped = name;
+        if (found[0]->name != name) return;
+        mCommand = found[0];
+        begin(*mCommand);
     }
 
     std::vector<Choice> optionsInWords() const {
@@ -108,58 +153,16 @@ class Line {
     /** @return the option that has a name, a second name or a letter like "-o"; or nullptr. */
     Argument* optionOf(const std::string& given) const {
         const std::string name = isStep() ? given : mProgram->firstName(given);
-        const auto found = std::find_if(
-                mOptions.begin(), mOptions.end(),
-                [&](const Argument* each) { return name == each->name || name == each->letter; });
-        return found == mOptions.end() ? nullptr : *found;
-    }
-
-    /** Takes "--name", "--name=value", "-n" or "-nvalue". */
-    void takeOption(const std::string& word) {
-        const bool isLong = word[1] == '-';
-        const std::string name = word.substr(0, isLong ? word.find('=') : 2);
-        Argument* const option = optionOf(name);
-        if (option == nullptr) {
-            complain("no option " + inQuotes(name) +
-                     (mCommand == nullptr ? " before the command" : "") +
-                     suggestion(name, valuesOf(optionsInWords())));
-        } else if (name == word && option->isFlag) {
-            give(*option, "");
-        } else if (name == word) {
-            mTaking = option;
-        } else if (option->isFlag) {
-            complain(option->name + ": takes no value");
-        } else {
-            give(*option, word.substr(name.size() + (isLong ? 1 : 0)));
+        for (Argument* each : mOptions) {
+            if (name == each->name || name == each->letter) return each;
         }
-    }
-
-    void takeWord(const std::string& word) {
-        if (mProblem) return;
-        if (mCommand == nullptr) return takeName(word);
-        Argument* argument = argumentFor(word);
-        if (argument == nullptr) return complain(inQuotes(word) + " is one argument too many");
-        mHaveOptionsEnded |= argument->takesOptions;
-        give(*argument, word);
-    }
-
-    void takeName(const std::string& word) {
-        const std::string name = mTyped.empty() ? mProgram->firstName(word) : mTyped + " " + word;
-        const std::vector<Command*> found = mProgram->named(name);
-        if (found.empty()) {
-            return complain("no command " + inQuotes(name) +
-                            suggestion(word, valuesOf(mProgram->commandsAfter(mTyped))));
-        }
-        mTyped = name;
-        if (found[0]->name() != name) return;
-        mCommand = found[0];
-        begin(*mCommand);
+        return nullptr;
     }
 
     /** @return the argument that a word is for which is no option; nullptr for none. */
     Argument* argumentFor(const std::string& word) const {
         Argument* found = nullptr;
-        for (Argument& each : mCommand->mArguments) {
+        for (Argument& each : mCommand->arguments) {
             if (isStep() && each.isFlag && each.name == "--" + word) return &each;
             const bool isNamed = isStep() ? each.isFlag || each.isFile : each.isOption();
             if (found == nullptr && !isNamed && (each.isMany || !each.given)) found = &each;
@@ -167,19 +170,14 @@ class Line {
         return found;
     }
 
-    void give(Argument& argument, const std::string& word) {
+    void give(Argument& argument, const std::string& word) const {
         if (!argument.given) argument.given = mIndex;
         try {
             argument.read(word);
         } catch (const UsageError& error) {
             const bool isNamed = argument.isOption() && !isStep();
-            complain((isNamed ? argument.name + ": " : "") + error.what());
+            throw UsageError((isNamed ? argument.name + ": " : "") + error.what());
         }
-    }
-
-    /** Keeps the first mistake. */
-    void complain(const std::string& what) {
-        if (!mProblem) mProblem.emplace(what, mIndex);
     }
 
     Program* mProgram = nullptr;
@@ -223,7 +221,7 @@ int Program::obey(const std::vector<std::string>& words) {
         std::cout << mName << ' ' << mVersion << '\n';
     } else {
         line.finish();
-        if (!isJson() || mCurrent->mHasJson) return perform(*mCurrent);
+        if (!isJson() || mCurrent->hasJson) return perform(*mCurrent);
         throw UsageError("has no JSON answer; leave out --json");
     }
     return kSuccess;

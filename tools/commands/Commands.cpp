@@ -28,7 +28,7 @@ void addCall(Client& client, cli::Command& command, const OneArgument& argument,
     command.run([=, &client] {
         return client.report().answer(operation, call(*client.service(), number()), {shown()});
     });
-    client.steps.push_back({command.name(), &command});
+    client.steps.push_back({command.name, &command});
 }
 
 }  // namespace vibratorctl
