@@ -73,21 +73,20 @@ void addPattern(Client& client) {
 }
 
 Packets readPackets(const std::vector<std::string>& words, const std::string& file) {
-    Packets packets;
-    std::string error;
-    for (const std::string& word : words) {
-        if (!parsePacket(word, &packets, &error)) throw cli::UsageError(error);
-    }
     // Many times what a call may have; JSON takes 80 times as much memory.
-    constexpr size_t kMostMiB = 1;
-    if (!file.empty() && !parsePackets(readInput(file, kMostMiB), &packets, &error)) {
-        throw cli::UsageError(file + ": " + error);
+    constexpr size_t kMaxMiB = 1;
+    Packets packets;
+    for (const std::string& word : words)
+        packets.push_back(parsePacket(word));
+    const std::string text = file.empty() ? "" : readInput(file, kMaxMiB);
+    try {
+        for (const Packet& packet : parsePackets(text))
+            packets.push_back(packet);
+        if (!packets.empty()) return packets;
+        throw cli::UsageError("no packets; each is PARAM0,INTENSITY,PARAM2,PARAM3");
+    } catch (const cli::UsageError& error) {
+        throw cli::UsageError((file.empty() ? "" : file + ": ") + error.what());
     }
-    if (packets.empty()) {
-        throw cli::UsageError((file.empty() ? "" : file + ": ") +
-                              "no packets; each is PARAM0,INTENSITY,PARAM2,PARAM3");
-    }
-    return packets;
 }
 
 /** Refuses what the service would refuse, or what would overflow in it. @throw cli::UsageError */
@@ -129,7 +128,7 @@ void addEngine(Client& client) {
             command.number("--intensity N", kIntensities,
                            "scales the intensities; 10000 leaves them", kIntensities.most);
     const auto words = command.words("PACKET", "PARAM0,INTENSITY,PARAM2,PARAM3, whole numbers",
-                                     [](const std::string& word) { readPackets({word}, ""); });
+                                     [](const std::string& word) { parsePacket(word); });
     const auto packets = [=] {
         Packets read = readPackets(*words, *file);
         checkPackets(read, *intensity);

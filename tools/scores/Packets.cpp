@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "scores/Packets.h"
 
+#include "cli/CommandLine.h"
 #include "text/Text.h"
 
 #include <algorithm>
@@ -24,21 +25,20 @@ std::string_view trimmed(std::string_view text) {
     return text.substr(start, text.find_last_not_of(kBlanks) - start + 1);
 }
 
-void append(const int32_t (&values)[4], Packets* packets) {
-    packets->push_back({values[0], values[1], values[2], values[3]});
-}
-
-bool parseCsv(const std::string& text, Packets* packets, std::string* error) {
+Packets parseCsv(const std::string& text) {
+    Packets packets;
     std::istringstream lines(text);
     std::string line;
     for (int number = 1; std::getline(lines, line); ++number) {
         const std::string content(trimmed(line));
         if (content.empty() || content.front() == '#') continue;
-        if (parsePacket(content, packets, error)) continue;
-        *error = "line " + std::to_string(number) + ": " + *error;
-        return false;
+        try {
+            packets.push_back(parsePacket(content));
+        } catch (const cli::UsageError& error) {
+            throw cli::UsageError("line " + std::to_string(number) + ": " + error.what());
+        }
     }
-    return true;
+    return packets;
 }
 
 /** @return the number of 32 bits that an element has, by its index or by a name. */
@@ -53,36 +53,32 @@ std::optional<int32_t> numberOf(const json& element, size_t index) {
     return static_cast<int32_t>(number);
 }
 
-bool parseJson(const std::string& text, Packets* packets, std::string* error) {
+Packets parseJson(const std::string& text) {
     const json list = json::parse(text, nullptr, false);
-    if (!list.is_array()) {
-        *error = "no JSON list";
-        return false;
-    }
-    for (size_t i = 0; i < list.size(); ++i) {
+    if (!list.is_array()) throw cli::UsageError("no JSON list");
+    Packets packets;
+    for (const json& element : list) {
         int32_t values[4];
-        for (size_t k = 0; k < 4; ++k) {
-            const auto value = numberOf(list[i], k);
-            if (!value) {
-                *error = "packet " + std::to_string(i + 1) +
-                         ": not four whole numbers of 32 bits, in a list or as param0, intensity, "
-                         "param2 and param3";
-                return false;
+        for (size_t i = 0; i < 4; ++i) {
+            const auto number = numberOf(element, i);
+            if (!number) {
+                throw cli::UsageError(
+                        "packet " + std::to_string(packets.size() + 1) +
+                        ": not four whole numbers of 32 bits, in a list or as param0, intensity, "
+                        "param2 and param3");
             }
-            values[k] = *value;
+            values[i] = *number;
         }
-        append(values, packets);
+        packets.push_back({values[0], values[1], values[2], values[3]});
     }
-    return true;
+    return packets;
 }
 
 }  // namespace
 
-bool parsePacket(const std::string& text, Packets* packets, std::string* error) {
-    if (std::count(text.begin(), text.end(), ',') != 3) {
-        *error = cli::inQuotes(text) + " is not PARAM0,INTENSITY,PARAM2,PARAM3";
-        return false;
-    }
+Packet parsePacket(const std::string& text) {
+    if (std::count(text.begin(), text.end(), ',') != 3)
+        throw cli::UsageError(cli::inQuotes(text) + " is not PARAM0,INTENSITY,PARAM2,PARAM3");
     int32_t values[4];
     std::string_view rest = text;
     for (int32_t& value : values) {
@@ -90,18 +86,16 @@ bool parsePacket(const std::string& text, Packets* packets, std::string* error) 
         rest.remove_prefix(std::min(rest.find(',') + 1, rest.size()));
         const char* const end = word.data() + word.size();
         const auto [number, status] = std::from_chars(word.data(), end, value);
-        if (status == std::errc() && number == end) continue;
-        *error = cli::inQuotes(word) + " is no whole number of 32 bits";
-        return false;
+        if (status != std::errc() || number != end)
+            throw cli::UsageError(cli::inQuotes(word) + " is no whole number of 32 bits");
     }
-    append(values, packets);
-    return true;
+    return {values[0], values[1], values[2], values[3]};
 }
 
-bool parsePackets(const std::string& text, Packets* packets, std::string* error) {
+Packets parsePackets(const std::string& text) {
     const size_t first = text.find_first_not_of(" \t\r\n");
     const bool isJson = first != std::string::npos && (text[first] == '[' || text[first] == '{');
-    return isJson ? parseJson(text, packets, error) : parseCsv(text, packets, error);
+    return isJson ? parseJson(text) : parseCsv(text);
 }
 
 }  // namespace vibratorctl

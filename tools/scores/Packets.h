@@ -8,19 +8,19 @@
 
 namespace vibratorctl {
 
-using Packets = std::vector<::vendor::velmora::hardware::vibrator::V2_0::DaxHapticEnginePacket>;
+using Packet = ::vendor::velmora::hardware::vibrator::V2_0::DaxHapticEnginePacket;
+using Packets = std::vector<Packet>;
 
 /**
  * Reads haptic engine packets from a text: CSV, one packet of four numbers a line, blank lines and
  * lines that begin with # passed over; or JSON, a list of lists of four numbers, or of objects with
  * the members param0, intensity, param2 and param3.
  *
- * @param error set, on failure, to what is wrong and where.
- * @return whether the whole text made sense.
+ * @throw cli::UsageError says what is wrong and where.
  */
-bool parsePackets(const std::string& text, Packets* packets, std::string* error);
+Packets parsePackets(const std::string& text);
 
-/** Reads one packet, "PARAM0,INTENSITY,PARAM2,PARAM3". @return whether it is one. */
-bool parsePacket(const std::string& text, Packets* packets, std::string* error);
+/** Reads one packet, "PARAM0,INTENSITY,PARAM2,PARAM3". @throw cli::UsageError */
+Packet parsePacket(const std::string& text);
 
 }  // namespace vibratorctl
