@@ -3,41 +3,29 @@
 #include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
 
 #include <cstdio>
-#include <functional>
 
 using ::android::sp;
-using ::android::hardware::Return;
 using ::android::hardware::vibrator::V1_0::Status;
 using ::android::hardware::vibrator::V1_3::IVibrator;
 using ::vendor::velmora::hardware::vibrator::V2_1::IDaxVibrator;
 
-class Motor {
-  public:
-    /** Makes a call, if need be on a new service. @return whether the service answered OK. */
-    bool call(const std::function<Return<Status>(IVibrator&)>& operation) {
-        for (int attempt = 0; attempt < 2; ++attempt) {
-            if (mService == nullptr) mService = IVibrator::getService();  // waits for it
-            if (mService == nullptr) break;
-            const Return<Status> answer = operation(*mService);
-            if (answer.isOk()) return static_cast<Status>(answer) == Status::OK;
-            mService = nullptr;  // the service has ended; its answer is lost
-        }
-        fprintf(stderr, "there is no vibrator service\n");
-        return false;
+/** Runs the motor, if need be by a new service. @return the service that did; nullptr for none. */
+sp<IVibrator> run(sp<IVibrator> service, uint32_t ms) {
+    for (int attempt = 0; attempt < 2; ++attempt) {
+        if (service == nullptr) service = IVibrator::getService();  // waits for it
+        if (service == nullptr) break;
+        const auto answer = service->on(ms);
+        if (answer.isOk()) return static_cast<Status>(answer) == Status::OK ? service : nullptr;
+        service = nullptr;  // it has ended; its answer is lost
     }
-    /** @return the extended interface of the service; nullptr where it has none. */
-    sp<IDaxVibrator> extended() const { return IDaxVibrator::castFrom(mService); }
-
-  private:
-    sp<IVibrator> mService;
-};
+    return nullptr;
+}
 
 int main() {
-    Motor motor;
-    if (!motor.call([](IVibrator& vibrator) { return vibrator.on(500); })) return 1;
-    const sp<IDaxVibrator> extended = motor.extended();
+    const sp<IVibrator> service = run(nullptr, 500);
+    if (service == nullptr) return 1;
+    const sp<IDaxVibrator> extended = IDaxVibrator::castFrom(service);  // nullptr where it has none
     const bool isSet = extended != nullptr && extended->daxSetAmplitude(5000).withDefault(
                                                       Status::UNKNOWN_ERROR) == Status::OK;
     printf("the motor runs%s\n", isSet ? " at half strength" : "");
-    return 0;
 }
