@@ -3,18 +3,16 @@
 #include "PlotScript.h"
 #include "text/Text.h"
 
-#include <sys/mman.h>
 #include <sys/wait.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <cctype>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
-#include <fstream>
 #include <iomanip>
 #include <iterator>
+#include <memory>
 #include <sstream>
 #include <stdexcept>
 
@@ -53,13 +51,13 @@ void add(Bar bar, double pixel, std::vector<Bar>* bars) {
 
 /** @return the label of calls that stand close together; a setting does not stand first. */
 std::string labelOf(std::vector<Timeline::Mark> marks) {
-    constexpr size_t kLongest = 22;
+    constexpr size_t kMaxLength = 22;
     const auto first = std::find_if(marks.begin(), marks.end(),
                                     [](const auto& mark) { return !mark.isSetting; });
     if (first != marks.end()) std::rotate(marks.begin(), first, first + 1);
     std::string label = plain(marks[0].label);
     for (size_t i = 1; i < marks.size(); ++i) {
-        if (label.size() + marks[i].label.size() + 2 > kLongest)
+        if (label.size() + marks[i].label.size() + 2 > kMaxLength)
             return label + " +" + std::to_string(marks.size() - i);
         label += ", " + plain(marks[i].label);
     }
@@ -79,32 +77,21 @@ std::vector<Timeline::Mark> labelsOf(const std::vector<Timeline::Mark>& marks, d
     return labels;
 }
 
-/** An unnamed file in memory, which is gone when it is closed. */
-class MemoryFile {
-  public:
-    explicit MemoryFile(const std::string& text = {}) : mFile(memfd_create("plot", 0)) {
-        if (write(mFile, text.data(), text.size()) == static_cast<ssize_t>(text.size())) return;
-        const std::string reason = strerror(errno);
-        close(mFile);
-        throw std::runtime_error("no memory for the plot: " + reason);
-    }
-    MemoryFile(const MemoryFile&) = delete;
-    MemoryFile& operator=(const MemoryFile&) = delete;
-    ~MemoryFile() { close(mFile); }
-
-    /** @return its name, in this process and those that it starts. */
-    std::string name() const { return "/dev/fd/" + std::to_string(mFile); }
-
-  private:
-    int mFile;
-};
-
 std::string runGnuplot(const std::string& script) {
-    const MemoryFile input(script);
-    const MemoryFile complaints;
+    // Files without names, which are gone when they are closed.
+    using File = std::unique_ptr<std::FILE, int (*)(std::FILE*)>;
+    const File input(tmpfile(), fclose);
+    const File complaints(tmpfile(), fclose);
+    if (input == nullptr || complaints == nullptr || fputs(script.c_str(), input.get()) < 0 ||
+        fflush(input.get()) != 0) {
+        throw std::runtime_error(std::string("no room for the plot: ") + strerror(errno));
+    }
+    const auto nameOf = [](const File& file) {
+        return "/dev/fd/" + std::to_string(fileno(file.get()));
+    };
     // --default-settings: without the user's own settings.
-    const std::string command = "exec timeout -v 30 gnuplot --default-settings " + input.name() +
-                                " 2>" + complaints.name();
+    const std::string command = "exec timeout -v 30 gnuplot --default-settings " + nameOf(input) +
+                                " 2>" + nameOf(complaints);
     std::FILE* output = popen(command.c_str(), "re");
     if (output == nullptr) throw std::runtime_error("gnuplot cannot be started");
     std::string picture;
@@ -119,8 +106,8 @@ std::string runGnuplot(const std::string& script) {
                 "plot in text");
     }
     std::string complaint(200, '\0');
-    std::ifstream(complaints.name()).read(complaint.data(), 200);
-    throw std::runtime_error("gnuplot failed: " + cli::printable(complaint.c_str()));
+    complaint.resize(fread(complaint.data(), 1, complaint.size(), complaints.get()));
+    throw std::runtime_error("gnuplot failed: " + cli::printable(complaint));
 }
 
 /** Replaces the first part of a text that begins and ends so. @return whether there was one. */
@@ -135,13 +122,13 @@ bool replacePart(std::string* text, const std::string& begin, const std::string&
 
 /** Gives an SVG a title, a description, and dark colours for readers who prefer them. */
 std::string described(const Timeline& timeline, std::string svg) {
-    constexpr size_t kMostCalls = 20;
+    constexpr size_t kMaxCalls = 20;
     std::string calls;
-    for (size_t i = 0; i < timeline.marks.size() && i < kMostCalls; ++i) {
+    for (size_t i = 0; i < timeline.marks.size() && i < kMaxCalls; ++i) {
         calls += (i == 0 ? ": " : "; ") + timeline.marks[i].label + " at " +
                  cli::durationInWords(timeline.marks[i].time);
     }
-    calls += timeline.marks.size() > kMostCalls ? "; and more." : ".";
+    calls += timeline.marks.size() > kMaxCalls ? "; and more." : ".";
     const std::string note = plotNote(timeline);
     const std::string head = "<title>" + plotTitle(timeline) +
                              "</title>\n<desc>Strength over time" + calls +
