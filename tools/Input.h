@@ -7,9 +7,9 @@
 namespace vibratorctl {
 
 /**
- * @param mostMiB the most that it may hold, in MiB.
+ * @param maxMiB the most that it may hold, in MiB.
  * @return what a file holds, or standard input for "-". @throw cli::UsageError
  */
-std::string readInput(const std::string& name, size_t mostMiB = 64);
+std::string readInput(const std::string& name, size_t maxMiB = 64);
 
 }  // namespace vibratorctl

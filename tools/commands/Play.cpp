@@ -103,8 +103,9 @@ int play(Client& client, const std::string& file, bool isCheck, bool keepsGoing)
         client.complain("USAGE", file + ":" + std::to_string(error.line) + ":" +
                                          std::to_string(error.column) + ": " + error.what);
     }
-    if (errors.size() == kMostScoreErrors) {
-        client.warn("play: " + file + ": only the first 20 mistakes are shown");
+    if (errors.size() == kMaxScoreErrors) {
+        client.warn("play: " + file + ": only the first " + std::to_string(kMaxScoreErrors) +
+                    " mistakes are shown");
     }
     if (!errors.empty()) return cli::kUsage;
     if (!isCheck) return playScore(client, file, score, keepsGoing);
@@ -145,12 +146,10 @@ void addPlay(Client& client) {
             command.flag("--keep-going", "pass over steps that fail, and name them at the end");
     command.note(
             "Steps: click [light|medium|strong], on MS [STRENGTH] [wait], off, wait MS, amplitude "
-            "N, "
-            "intensity N, "
-            "pattern N [INTENSITY] [repeat], engine INTENSITY PACKET..., external on|off, "
-            "frequency N, force-touch N, fold open|close; the steps between repeat N and end are "
-            "played N times; # begins a comment. The whole score is checked before the first call. "
-            "The motor is stopped when a step fails or the play is interrupted.");
+            "N, intensity N, pattern N [INTENSITY] [repeat], engine INTENSITY PACKET..., external "
+            "on|off, frequency N, force-touch N, fold open|close; the steps between repeat N and "
+            "end are played N times; # begins a comment. The whole score is checked before the "
+            "first call. The motor is stopped when a step fails or the play is interrupted.");
     command.run([=, &client] { return play(client, *file, *check, *keepsGoing); });
 }
 

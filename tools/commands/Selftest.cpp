@@ -140,6 +140,9 @@ class Selftest {
                                 {"result", result},
                                 {"details", details}});
     }
+    void expect(const std::string& name, bool wanted, bool got) {
+        expect(name, std::string(wanted ? "yes" : "no"), std::string(got ? "yes" : "no"));
+    }
     void expect(const std::string& name, const std::string& wanted, const std::string& got) {
         tell(wanted == got ? "passed" : "failed", name,
              wanted == got ? "" : got + ", not " + wanted);
@@ -187,8 +190,8 @@ void Selftest::checkInterfaces() {
     expect("interface chain", cli::join(wanted, " ", " "), cli::join(got, " ", " "));
     checkHashes(wanted.size());
     const bool isNamed = platform::V1_0::IVibrator::tryGetService(mClient.instance()) != nullptr;
-    expect("found by the platform's interface", "yes", isNamed ? "yes" : "no");
-    expect("death notice", "yes", reached(mVibrator->linkToDeath(mRecipient, 0)) ? "yes" : "no");
+    expect("found by the platform's interface", true, isNamed);
+    expect("death notice", true, reached(mVibrator->linkToDeath(mRecipient, 0)));
 }
 
 /** Compares the hashes that the service reports with those of the interfaces that this was built
@@ -205,16 +208,14 @@ void Selftest::checkHashes(size_t interfaces) {
     size_t same = 0;
     while (same < std::min({kOurs, built.size(), reported.size()}) && built[same] == reported[same])
         ++same;
-    expect("hashes of the service's own interfaces", "as built",
-           same == kOurs ? "as built" : "others");
+    expect("the service's own interfaces are those of this client", true, same == kOurs);
 }
 
 void Selftest::checkQueries() {
     const bool isPermitted = mayCallRestricted();
     for (const Query& query : kQueries) {
         const bool wanted = (isPermitted || query.isForAll) && (mDriver.*query.expect)();
-        expect(query.operation, wanted ? "yes" : "no",
-               reached((*mVibrator.*query.ask)()) ? "yes" : "no");
+        expect(query.operation, wanted, reached((*mVibrator.*query.ask)()));
     }
     if (!isPermitted || !mDriver.isUsable()) return;
     std::string count;
@@ -304,8 +305,8 @@ void Selftest::checkCallers() {
         if (seteuid(uid) != 0) continue;
         const bool mayAsk = uid == AID_SYSTEM && hasIntensity;
         const std::string user = "uid " + std::to_string(uid) + ": ";
-        expect(user + "daxSupportsAmplitudeControl", mayAsk ? "yes" : "no",
-               reached(mVibrator->daxSupportsAmplitudeControl()) ? "yes" : "no");
+        expect(user + "daxSupportsAmplitudeControl", mayAsk,
+               reached(mVibrator->daxSupportsAmplitudeControl()));
         expect(user + "daxSetAmplitude", mayAsk ? "OK" : "UNKNOWN_ERROR",
                toString(ask<&I::daxSetAmplitude, 5000U>(*mVibrator)));
         expect(user + "on 0", "OK", toString(ask<&I::on, 0>(*mVibrator)));
@@ -334,8 +335,7 @@ void Selftest::checkRestart() {
     if (mRestart.empty()) return tell("skipped", kName, "--restart COMMAND says how");
     if (system(mRestart.c_str()) != 0)
         return tell("failed", kName, "this failed: " + cli::printable(mRestart));
-    expect("death notice of it", "yes",
-           comes([&] { return mRecipient->isNotified.load(); }) ? "yes" : "no");
+    expect("death notice of it", true, comes([&] { return mRecipient->isNotified.load(); }));
     const auto isBack = [&] {
         try {
             return ask<&I::off>(*mClient.service()) == VibratorStatus::OK;
@@ -343,7 +343,7 @@ void Selftest::checkRestart() {
             return false;
         }
     };
-    expect(kName, "yes", comes(isBack) ? "yes" : "no");
+    expect(kName, true, comes(isBack));
 }
 
 }  // namespace

@@ -13,6 +13,10 @@ using platform::V1_0::EffectStrength;
 
 namespace {
 
+/** The minor versions of the platform's interface, and the operation for effects in each. */
+const std::vector<cli::Choice> kVersions = {
+        {"1.0", "perform"}, {"1.1", "perform_1_1"}, {"1.2", "perform_1_2"}, {"1.3", "perform_1_3"}};
+
 cli::Value<size_t> addStrength(cli::Command& command) {
     constexpr size_t kMedium = 1;
     return command.choice("--strength STRENGTH",
@@ -30,8 +34,7 @@ std::string whatClickLacks(const LocalDriver& driver) {
     // The LED trigger keeps the time that it was told. Who may not read it does not know.
     if (driver.mode() == product::kLedTriggerMode && driver.look("duration").firstLine() == "0") {
         return "the service does not use the driver, nothing moved; \"vibratorctl doctor\" says "
-               "what "
-               "to do";
+               "what to do";
     }
     if (!mayCallRestricted()) {
         return "the strength is the one that was set before; only " + permittedUsers() +
@@ -45,11 +48,10 @@ std::string whatClickLacks(const LocalDriver& driver) {
  * Asks for a predefined effect, and reports the answer.
  *
  * @param argument what the user asked for, for the report.
- * @param version which minor version of the platform's interface has the effect, 0 to 3.
+ * @param version which of kVersions has the effect.
  */
 int performEffect(const Client& client, const std::string& argument, uint32_t effect,
                   size_t version, size_t strengthIndex) {
-    constexpr const char* kOperations[] = {"perform", "perform_1_1", "perform_1_2", "perform_1_3"};
     const auto strength = static_cast<EffectStrength>(strengthIndex);
     const ::android::sp<IDaxVibrator> vibrator = client.service();
     VibratorStatus status = VibratorStatus::UNKNOWN_ERROR;
@@ -69,7 +71,7 @@ int performEffect(const Client& client, const std::string& argument, uint32_t ef
     } else if (status == VibratorStatus::OK) {
         answer.warning = whatClickLacks(driverOf(*vibrator));
     }
-    return client.report().answer({kOperations[version]}, status, answer);
+    return client.report().answer({kVersions[version].meaning}, status, answer);
 }
 
 void addClick(Client& client) {
@@ -85,11 +87,7 @@ void addEffect(Client& client) {
     cli::Command& effect = client.command(
             kForAll, "effect", "ask for a predefined effect by its number", "0 --strength light");
     const auto number = effect.number("NUMBER", kEffects, "0 is the click");
-    const auto version = effect.choice("--version VERSION",
-                                       {{"1.0", "perform"},
-                                        {"1.1", "perform_1_1"},
-                                        {"1.2", "perform_1_2"},
-                                        {"1.3", "perform_1_3"}},
+    const auto version = effect.choice("--version VERSION", kVersions,
                                        "version of the interface that has the effect", 0);
     const auto strength = addStrength(effect);
     effect.run([=, &client] {
@@ -97,8 +95,7 @@ void addEffect(Client& client) {
     });
 }
 
-/** Runs the motor. @param intensity set before; 0 for the one that is set. @return the exit code.
- */
+/** Runs the motor. @param intensity set before it; 0 for none. @return the exit code. */
 int runMotor(const Client& client, uint32_t ms, uint32_t intensity) {
     const ::android::sp<IDaxVibrator> vibrator = client.service();
     Answer answer{std::to_string(ms)};

@@ -36,12 +36,11 @@ enum { kAuto, kAlways };
  * (no-color.org). */
 bool wantsColour(size_t when) {
     if (when != kAuto) return when == kAlways;
-    const auto is = [](const char* name, auto test) {
+    const auto variable = [](const char* name) -> std::string {
         const char* value = getenv(name);
-        return value != nullptr && test(std::string(value));
+        return value == nullptr ? "" : value;
     };
-    return isatty(STDOUT_FILENO) != 0 && !is("NO_COLOR", [](auto text) { return !text.empty(); }) &&
-           !is("TERM", [](auto text) { return text == "dumb"; });
+    return isatty(STDOUT_FILENO) != 0 && variable("NO_COLOR").empty() && variable("TERM") != "dumb";
 }
 
 void print(const NodeAccess& access, bool isColoured) {
@@ -67,14 +66,14 @@ class Printer {
 
     /** Takes what has come; an incomplete line is kept until the rest comes. */
     void take(const std::string& part) {
-        constexpr size_t kLongest = 1 << 20;
+        constexpr size_t kMaxLine = 1 << 20;
         size_t start = 0;
         for (size_t end; (end = part.find('\n', start)) != std::string::npos; start = end + 1) {
             mLine.append(part, start, end - start);
             takeLine();
         }
         mLine.append(part, start);
-        if (mLine.size() > kLongest) {
+        if (mLine.size() > kMaxLine) {
             throw cli::UsageError(mFile + ": a line of more than 1 MiB");
         }
     }

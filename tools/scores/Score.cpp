@@ -12,7 +12,7 @@ namespace vibratorctl {
 namespace {
 
 /** The most steps that a score plays; those of a block count each time. */
-constexpr size_t kMostSteps = 1'000'000;
+constexpr size_t kMaxSteps = 1'000'000;
 constexpr char kTooMany[] = "more than 1000000 steps to play";
 
 /** Reads a score line by line. */
@@ -73,7 +73,7 @@ class ScoreParser {
             mScore.order.push_back(static_cast<uint32_t>(mScore.lines.size()));
             mScore.lines.push_back(step);
             readStep(&mScore.lines.back());
-            if (mScore.order.size() > kMostSteps) throw cli::UsageError(kTooMany);
+            if (mScore.order.size() > kMaxSteps) throw cli::UsageError(kTooMany);
         }
     }
 
@@ -110,7 +110,7 @@ class ScoreParser {
         cli::Command().readStep(step.words);
         auto& order = mScore.order;
         const size_t size = order.size() - block.start;
-        if (block.start + size * block.times > kMostSteps) {
+        if (block.start + size * block.times > kMaxSteps) {
             mErrors.push_back({block.line, block.column, kTooMany});
             return;
         }
@@ -126,7 +126,7 @@ class ScoreParser {
             mWait.number("MS", {"a time like 500, 500ms or 2s", 0, 3'600'000, "ms"}, "how long");
     cli::Command mRepeat;
     cli::Value<uint32_t> mTimes =
-            mRepeat.number("N", {"a number of times", 1, kMostSteps}, "how often");
+            mRepeat.number("N", {"a number of times", 1, kMaxSteps}, "how often");
     std::vector<Block> mBlocks;
     size_t mLine = 0;
 };
@@ -134,9 +134,9 @@ class ScoreParser {
 }  // namespace
 
 std::string ScoreStep::argument() const {
-    constexpr size_t kLongest = 60;
+    constexpr size_t kMaxLength = 60;
     const std::string all = cli::join(words, " ", " ");
-    return all.size() <= kLongest ? all : all.substr(0, kLongest - 3) + "...";
+    return all.size() <= kMaxLength ? all : all.substr(0, kMaxLength - 3) + "...";
 }
 
 nlohmann::ordered_json ScoreStep::place() const {
@@ -162,10 +162,10 @@ std::vector<ScoreError> parseScore(const std::string& text, const std::vector<St
     constexpr std::string_view kByteOrderMark = "\xEF\xBB\xBF";
     const bool isMarked = text.compare(0, kByteOrderMark.size(), kByteOrderMark) == 0;
     std::istringstream lines(text.substr(isMarked ? kByteOrderMark.size() : 0));
-    for (std::string line; errors.size() < kMostScoreErrors && std::getline(lines, line);)
+    for (std::string line; errors.size() < kMaxScoreErrors && std::getline(lines, line);)
         parser.parseLine(line);
     parser.finish();
-    errors.resize(std::min(errors.size(), kMostScoreErrors));
+    errors.resize(std::min(errors.size(), kMaxScoreErrors));
     return errors;
 }
 

@@ -42,7 +42,7 @@ struct ScoreStep {
     nlohmann::ordered_json place() const;
 };
 
-constexpr size_t kMostScoreErrors = 20;
+constexpr size_t kMaxScoreErrors = 20;
 
 struct ScoreError {
     size_t line;
@@ -65,7 +65,7 @@ struct Score {
  * between "repeat N" and "end" are played N times.
  *
  * @param kinds all steps besides "wait", which takes a time in ms.
- * @return the mistakes, at most kMostScoreErrors; empty if the score can be played.
+ * @return the mistakes, at most kMaxScoreErrors; empty if the score can be played.
  */
 std::vector<ScoreError> parseScore(const std::string& text, const std::vector<StepKind>& kinds,
                                    Score* score);

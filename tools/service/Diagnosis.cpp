@@ -46,10 +46,8 @@ class Examination {
             mFound.server = serverOf(*mVibrator);
             reached(mVibrator->ping());
             mFound.answers = true;
-            mFound.service = "answers";
         } catch (const Unreachable& error) {
-            mFound.service = error.what();
-            examineSilence();
+            examineSilence(error.what());
         }
         mFound.route = findRoute();
         mOpener = mFound.server.value_or(thisProcess());
@@ -88,7 +86,7 @@ class Examination {
                              : "uid " + std::to_string(mOpener.uid);
     }
 
-    void examineSilence();
+    void examineSilence(const std::string& why);
     void examineMissingDriver();
     void examineNodes();
     std::string howToGive(const std::string& paths, const LocalDriver::Node& node) const;
@@ -104,8 +102,8 @@ class Examination {
     const System mSystem = thisSystem();
 };
 
-/** Says why no service answers. */
-void Examination::examineSilence() {
+/** Says why no service answers. @param why what the client met. */
+void Examination::examineSilence(const std::string& why) {
     std::vector<Process> servers = findServers();
     if (mFound.server) servers = {*mFound.server};
     for (const Process& server : servers) {
@@ -115,9 +113,9 @@ void Examination::examineSilence() {
                     "let it go on: kill -CONT " + std::to_string(server.pid));
     }
     if (servers.empty()) {
-        return find("the service does not run: " + mFound.service, mSystem.start);
+        return find("the service does not run: " + why, mSystem.start);
     }
-    find("a service runs (" + servers[0].inWords() + "), but cannot be reached: " + mFound.service,
+    find("a service runs (" + servers[0].inWords() + "), but cannot be reached: " + why,
          "give the client the HWBINDER_DIR and --instance of the service, or " + mSystem.restart);
 }
 

@@ -26,8 +26,6 @@ struct Finding {
 
 /** The service and the driver, examined. */
 struct Diagnosis {
-    /** "answers", or why not. */
-    std::string service;
     bool answers = false;
     std::optional<Process> server;
     Route route;

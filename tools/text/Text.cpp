@@ -58,12 +58,12 @@ std::string inQuotes(std::string_view text) {
 }
 
 std::string suggestion(std::string_view typed, const std::vector<std::string>& known) {
-    constexpr size_t kLongest = 64;
+    constexpr size_t kMaxTyped = 64;
     const std::string* nearest = nullptr;
     // A word of which more than a third is wrong is another word.
     size_t best = std::min<size_t>(2, (typed.size() + 1) / 3) + 1;
     for (const std::string& word : known) {
-        const size_t steps = typed.size() > kLongest ? best : distance(typed, word);
+        const size_t steps = typed.size() > kMaxTyped ? best : distance(typed, word);
         if (steps >= best) continue;
         best = steps;
         nearest = &word;

@@ -15,7 +15,7 @@ constexpr long kEighths = 8;
 /** Width of the column to the left of the strip. */
 constexpr size_t kMargin = 6;
 /** The most calls that are listed. */
-constexpr size_t kMostCalls = 40;
+constexpr size_t kMaxCalls = 40;
 /** Tolerance of times, as a part of a column. */
 constexpr double kInexact = 1e-6;
 
@@ -43,7 +43,7 @@ std::string axisOf(const Timeline& timeline, size_t width, double perColumn) {
         std::string mark = std::to_string(i + 1);
         // Numbers that touch would be read as one.
         const bool hasRoom = column == 0 || axis[column - 1] == '-';
-        if (i >= kMostCalls || !hasRoom || column + mark.size() > width) mark = "|";
+        if (i >= kMaxCalls || !hasRoom || column + mark.size() > width) mark = "|";
         axis.replace(column, mark.size(), mark);
         free = column + mark.size();
     }
@@ -87,13 +87,13 @@ std::string plotText(const Timeline& timeline, size_t columns, bool isAscii) {
     if (isBeyond) text += indent + "! beyond full strength\n";
     if (!plotNote(timeline).empty()) text += indent + plotNote(timeline) + '\n';
     text += '\n';
-    for (size_t i = 0; i < timeline.marks.size() && i < kMostCalls; ++i) {
+    for (size_t i = 0; i < timeline.marks.size() && i < kMaxCalls; ++i) {
         snprintf(line, sizeof(line), "%4zu %11s  ", i + 1,
                  cli::durationInWords(timeline.marks[i].time).c_str());
         text += line + timeline.marks[i].label + '\n';
     }
-    if (timeline.marks.size() > kMostCalls) {
-        text += "  and " + std::to_string(timeline.marks.size() - kMostCalls) +
+    if (timeline.marks.size() > kMaxCalls) {
+        text += "  and " + std::to_string(timeline.marks.size() - kMaxCalls) +
                 " more calls; --from, --to and --last show a part\n";
     }
     return text;
