@@ -16,12 +16,6 @@ Status Status::fromExceptionCode(int32_t code, const std::string& message) {
     return status;
 }
 
-Status Status::fromStatusT(status_t error) {
-    Status status;
-    status.setFromStatusT(error);
-    return status;
-}
-
 std::string Status::description() const {
     if (mException != EX_NONE && mException != EX_TRANSACTION_FAILED) {
         const std::string message = exceptionMessage();

@@ -23,7 +23,7 @@ TEST(ParcelTest, WhatIsReadIsWhatWasWritten) {
     Parcel parcel;
     parcel.writeUint8(2);
     parcel.writeString16("t\x80xt", 4);
-    parcel.writeInt64(-5);
+    parcel.writeUint64(5);
     writeToParcel(Status::fromExceptionCode(Status::EX_NULL_POINTER, "why"), &parcel);
     parcel.setDataPosition(0);
     bool flag = false;
@@ -34,7 +34,7 @@ TEST(ParcelTest, WhatIsReadIsWhatWasWritten) {
     EXPECT_EQ(text, "t?xt");
     uint64_t number = 0;
     EXPECT_EQ(parcel.readUint64(&number), android::OK);
-    EXPECT_EQ(static_cast<int64_t>(number), -5);
+    EXPECT_EQ(number, 5U);
     Status status;
     EXPECT_EQ(readFromParcel(&status, parcel), android::OK);
     EXPECT_EQ(status.description(), "why");

@@ -108,8 +108,11 @@ TEST_F(CallsTest, BaseOperationsAnswerForTheObject) {
             {android::BAD_TYPE, "the message does not hold what the operation takes"},
             {android::NOT_ENOUGH_DATA, "the message does not hold what the operation takes"},
     };
-    for (const auto& [error, description] : descriptions)
-        EXPECT_EQ(android::hardware::Status::fromStatusT(error).description(), description);
+    for (const auto& [error, description] : descriptions) {
+        android::hardware::Status status;
+        status.setFromStatusT(error);
+        EXPECT_EQ(status.description(), description);
+    }
     EXPECT_EQ(android::hardware::Status::fromExceptionCode(-5).description(), "exception -5");
 }
 

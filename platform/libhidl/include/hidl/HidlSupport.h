@@ -202,9 +202,6 @@ class hidl_array {
         std::copy_n(elements, N, mElements);
     }
 
-    T* data() { return mElements; }
-    const T* data() const { return mElements; }
-    T& operator[](size_t index) { return mElements[index]; }
     const T& operator[](size_t index) const { return mElements[index]; }
     static constexpr size_t size() { return N; }
     bool operator==(const hidl_array& other) const {

@@ -26,7 +26,6 @@ class Status {
     Status() = default;
     static Status ok() { return {}; }
     static Status fromExceptionCode(int32_t code, const std::string& message = {});
-    static Status fromStatusT(status_t error);
 
     /** Sets the outcome that an error of the transport means. */
     void setFromStatusT(status_t error) {

@@ -40,11 +40,9 @@ class Parcel {
     /** Begins a request: names the interface that declares the operation. */
     status_t writeInterfaceToken(const char* interface);
     status_t writeBool(bool value) { return writePadded(uint8_t{value}); }
-    status_t writeInt8(int8_t value) { return writePadded(value); }
     status_t writeUint8(uint8_t value) { return writePadded(value); }
     status_t writeInt32(int32_t value) { return writePadded(value); }
     status_t writeUint32(uint32_t value) { return writePadded(value); }
-    status_t writeInt64(int64_t value) { return writePadded(value); }
     status_t writeUint64(uint64_t value) { return writePadded(value); }
     /** Writes text as UTF-16; only for ASCII. */
     status_t writeString16(const char* text, size_t length);
@@ -67,11 +65,9 @@ class Parcel {
     /** @return whether the request names this interface. */
     bool enforceInterface(const char* interface) const;
     status_t readBool(bool* value) const;
-    status_t readInt8(int8_t* value) const { return readPadded(value); }
     status_t readUint8(uint8_t* value) const { return readPadded(value); }
     status_t readInt32(int32_t* value) const { return readPadded(value); }
     status_t readUint32(uint32_t* value) const { return readPadded(value); }
-    status_t readInt64(int64_t* value) const { return readPadded(value); }
     status_t readUint64(uint64_t* value) const { return readPadded(value); }
     /** Reads text; what is not ASCII becomes "?". */
     status_t readString16(std::string* text) const;

@@ -87,9 +87,6 @@ class wp {
     /** @return where the object is or was; only for comparing. */
     T* unsafe_get() const { return mObject; }
 
-    bool operator==(const wp& other) const { return mRefs == other.mRefs; }
-    bool operator!=(const wp& other) const { return mRefs != other.mRefs; }
-
   private:
     T* mObject = nullptr;
     RefBase::weakref_type* mRefs = nullptr;
