@@ -15,8 +15,8 @@
 #include <filesystem>
 #include <fstream>
 #include <iostream>
-#include <map>
 #include <stdexcept>
+#include <vector>
 
 namespace driver {
 namespace {
@@ -61,17 +61,11 @@ void Motor::ask() {
     mType = has(FF_RUMBLE) ? FF_RUMBLE : has(FF_CONSTANT) ? FF_CONSTANT : 0;
     mHasGain = has(FF_GAIN);
     libevdev_free(device);
-    int effects = 0;
-    ioctl(mFile.get(), EVIOCGEFFECTS, &effects);
     if (mType == 0) mProblem = "it plays neither rumble nor constant forces";
-    if (effects == 0) mProblem = "it holds no effects";
-    mAbilities = std::string(mType == FF_RUMBLE ? "rumble, " : "constant forces, ") +
-                 (mHasGain ? "gain, " : "no gain, ") + std::to_string(effects) +
-                 (effects == 1 ? " effect" : " effects");
 }
 
-std::vector<Motor> Motor::list() {
-    std::map<int, Motor> byNumber;
+std::map<int, Motor> Motor::list() {
+    std::map<int, Motor> motors;
     std::error_code error;
     for (const auto& entry : fs::directory_iterator("/sys/dev/char", error)) {
         const fs::path device = fs::canonical(entry.path(), error);
@@ -79,12 +73,8 @@ std::vector<Motor> Motor::list() {
         if (sscanf(device.filename().c_str(), "event%d", &number) != 1) continue;
         const std::string properties = device / "device";
         if (firstLine(properties + "/capabilities/ff") == "0") continue;
-        byNumber.emplace(number, Motor("/dev/input" / device.filename(), properties));
+        motors.emplace(number, Motor("/dev/input" / device.filename(), properties));
     }
-    std::vector<Motor> motors;
-    motors.reserve(byNumber.size());
-    for (auto& [number, motor] : byNumber)
-        motors.push_back(std::move(motor));
     return motors;
 }
 
@@ -93,7 +83,7 @@ Motor Motor::choose(const std::string& path) {
     const fs::path asked = fs::canonical(path, error);
     std::vector<Motor> usable;
     std::string all;
-    for (Motor& motor : list()) {
+    for (auto& [number, motor] : list()) {
         all += (all.empty() ? "" : "; ") + motor.inWords();
         if (motor.mProblem.empty() && (path.empty() || motor.mPath == asked))
             usable.push_back(std::move(motor));
@@ -108,7 +98,8 @@ Motor Motor::choose(const std::string& path) {
 }
 
 std::string Motor::inWords() const {
-    return mPath + " " + cli::inQuotes(mName) + ": " + (mProblem.empty() ? mAbilities : mProblem);
+    const char* effect = mType == FF_RUMBLE ? "rumble" : "constant forces";
+    return mPath + " " + cli::inQuotes(mName) + ": " + (mProblem.empty() ? effect : mProblem);
 }
 
 bool Motor::isThere() const {
@@ -118,7 +109,7 @@ bool Motor::isThere() const {
 
 int Motor::openAgain() {
     if (isThere()) return 0;
-    for (Motor& motor : list()) {
+    for (auto& [number, motor] : list()) {
         if (motor.mIdentity != mIdentity || !motor.mProblem.empty()) continue;
         *this = std::move(motor);
         return 0;
@@ -142,6 +133,7 @@ bool Motor::send(int code, int value) const {
 }
 
 int Motor::run(int strength, int64_t milliseconds) {
+    if (strength == 0) return stop();
     // What another program has set stays until somebody sets it again.
     if (mEffect < 0 && mHasGain) send(FF_GAIN, 0xffff);
     ff_effect effect{};
@@ -160,8 +152,9 @@ int Motor::run(int strength, int64_t milliseconds) {
     return send(mEffect, 1) ? 0 : fail(errno);
 }
 
-void Motor::stop() const {
+int Motor::stop() const {
     if (mEffect >= 0) send(mEffect, 0);
+    return 0;
 }
 
 }  // namespace driver

@@ -4,8 +4,8 @@
 #include <utils/UniqueFd.h>
 
 #include <cstdint>
+#include <map>
 #include <string>
-#include <vector>
 
 namespace driver {
 
@@ -23,17 +23,17 @@ constexpr int64_t kLongestEffect = 0x7fff;
 /** An input device that offers force feedback. It plays one effect, until it is closed at most. */
 class Motor {
   public:
-    /** @return the motors of this machine, in the order of their devices' numbers. */
-    static std::vector<Motor> list();
+    /** @return the motors of this machine, by the numbers of their devices. */
+    static std::map<int, Motor> list();
     /**
      * @return the motor with a path; for an empty path the only one that can be used.
      * @throw std::runtime_error that says why there is none, or which ones there are.
      */
     static Motor choose(const std::string& path);
 
-    const std::string& path() const { return mPath; }
-    const std::string& name() const { return mName; }
-    /** @return path and name, and what it can do or why it cannot be used. */
+    /** @return its path, and its name. */
+    std::string device() const { return mPath + " " + mName; }
+    /** @return both, and what it plays or why it cannot be used. */
     std::string inWords() const;
 
     /** @return whether it is plugged in; one that was unplugged has to be opened again. */
@@ -41,14 +41,15 @@ class Motor {
     /** Looks for the same device if it was unplugged. @return 0, or a negative errno. */
     int openAgain();
     /**
-     * Runs the motor from now on; one that runs changes without a gap.
+     * Runs the motor from now on, in place of what it did; without a gap if it ran.
      *
-     * @param strength 1 to kFullStrength.
+     * @param strength up to kFullStrength; 0 stops it.
      * @param milliseconds when the kernel is to stop it, kLongestEffect at most.
      * @return 0, or a negative errno.
      */
     int run(int strength, int64_t milliseconds);
-    void stop() const;
+    /** @return 0: what is not there rests. */
+    int stop() const;
 
   private:
     /** @param properties the directory where the kernel describes the device. */
@@ -68,7 +69,6 @@ class Motor {
     uint16_t mType = 0;
     /** Whether it has a setting for the strength of all its effects. */
     bool mHasGain = false;
-    std::string mAbilities;
     /** Why it cannot be used; empty if it can. */
     std::string mProblem;
     /** The number of the effect; -1 until the kernel has given one. */

@@ -67,18 +67,14 @@ struct Nodes::Requests {
         return 0;
     }
 
-    /** By the mode, which binds root too, as in sysfs. */
     static int openFile(const char* path, fuse_file_info* file) {
         constexpr const char* kNames[] = {"O_RDONLY", "O_WRONLY", "O_RDWR", "O_ACCMODE"};
-        const mode_t mode = nodes().mFiles[path].st_mode;
-        const int access = file->flags & O_ACCMODE;
-        const bool isRefused = (access != O_WRONLY && (mode & 0444) == 0) ||
-                               (access != O_RDONLY && (mode & 0222) == 0);
-        return trace(path, std::string("open ") + kNames[access], isRefused ? -EACCES : 0);
+        return trace(path, std::string("open ") + kNames[file->flags & O_ACCMODE],
+                     model::checkAccess(nodes().mFiles[path].st_mode, file->flags));
     }
     static int readFile(const char* path, char* buffer, size_t size, off_t offset,
                         fuse_file_info* /* file */) {
-        const std::string text = model::show(nodes().mState, path + 1);
+        const std::string text = model::show(nodes().mPlayer, path + 1);
         const auto start = std::min(static_cast<size_t>(offset), text.size());
         const size_t length = text.copy(buffer, size, start);
         return trace(path, "read " + std::to_string(size), static_cast<ssize_t>(length),
@@ -86,7 +82,7 @@ struct Nodes::Requests {
     }
     static int writeFile(const char* path, const char* buffer, size_t size, off_t /* offset */,
                          fuse_file_info* /* file */) {
-        const ssize_t taken = model::store(nodes().mState, path + 1, {buffer, size});
+        const ssize_t taken = model::store(nodes().mPlayer, path + 1, {buffer, size});
         return trace(path, "write " + model::quote({buffer, size}), taken);
     }
     static int closeFile(const char* path, fuse_file_info* /* file */) {
@@ -94,11 +90,20 @@ struct Nodes::Requests {
     }
 };
 
-Nodes::Nodes(int file, model::Layout layout, model::State& state, const std::string& trace)
-    : mFiles{{"/", describe(S_IFDIR | 0755)}},
-      mState(state),
-      mDirectory(model::sysfsDirectory(layout)),
+Nodes::Nodes(Setup setup, int file, const std::string& trace)
+    : mPlayer(std::move(setup.motor), setup.patterns),
+      mFiles{{"/", describe(S_IFDIR | 0755)}},
+      mDirectory(model::sysfsDirectory(setup.layout)),
       mTrace(trace) {
+    const std::vector<std::string> all = model::featureNames();
+    model::Features features{{all.begin(), all.end()}};
+    features.waves = static_cast<int>(setup.patterns.size());
+    for (const model::Attribute& each : model::attributes()) {
+        if (each.isIn(setup.layout, features))
+            add(each.leaf, each.mode, each.initialText(features));
+    }
+    // Not of the kernel's drivers: says through what the motor is reached.
+    add("input_device", 0444, mPlayer.device() + "\n");
     fuse_operations requests{};
     requests.init = Requests::begin;
     requests.getattr = Requests::getAttributes;
@@ -120,15 +125,15 @@ Nodes::Nodes(int file, model::Layout layout, model::State& state, const std::str
 
 void Nodes::add(const std::string& leaf, mode_t mode, const std::string& text) {
     mFiles["/" + leaf] = describe(S_IFREG | mode);
-    mState.setText(leaf, text);
+    mPlayer.setText(leaf, text);
 }
 
-void Nodes::serve(int timer, const std::function<void()>& action) {
+void Nodes::serve() {
     fuse_session* const session = fuse_get_session(mFuse);
     fuse_buf request{};
-    pollfd waiting[] = {{fuse_session_fd(session), POLLIN, 0}, {timer, POLLIN, 0}};
+    pollfd waiting[] = {{fuse_session_fd(session), POLLIN, 0}, {mPlayer.timer(), POLLIN, 0}};
     while (fuse_session_exited(session) == 0 && poll(waiting, 2, -1) > 0) {
-        if (waiting[1].revents != 0) action();
+        if (waiting[1].revents != 0) mPlayer.advance();
         if (waiting[0].revents != 0 && fuse_session_receive_buf(session, &request) > 0) {
             fuse_session_process_buf(session, &request);
         }

@@ -1,12 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Attributes.h"
 #include "Folder.h"
+#include "Player.h"
 
 #include <sys/stat.h>
 
-#include <functional>
 #include <map>
 #include <string>
 
@@ -14,9 +13,16 @@ struct fuse;
 
 namespace driver {
 
+/** A motor, and the driver that it is to have. */
+struct Setup {
+    Motor motor;
+    model::Layout layout;
+    Patterns patterns;
+};
+
 /**
- * Serves attributes as the files of a file system, which has nothing else and is to be mounted at
- * the directory of their layout. Lives as long as its process.
+ * Serves the driver's attributes as the files of a file system, which has nothing else and is to be
+ * mounted at the directory of their layout. Lives as long as its process.
  */
 class Nodes {
   public:
@@ -25,19 +31,19 @@ class Nodes {
      * @param trace gets each access; a directory that is no driver's for no trace.
      * @throw std::runtime_error
      */
-    Nodes(int file, model::Layout layout, model::State& state, const std::string& trace);
+    Nodes(Setup setup, int file, const std::string& trace);
 
-    /** Adds a file for an attribute, with the text that it shows at first. */
-    void add(const std::string& leaf, mode_t mode, const std::string& text);
-    /** Serves them until they are unmounted. @param action called when a timer can be read. */
-    void serve(int timer, const std::function<void()>& action);
+    /** Serves them until they are unmounted. */
+    void serve();
 
   private:
     struct Requests;
 
+    void add(const std::string& leaf, mode_t mode, const std::string& text);
+
+    Player mPlayer;
     /** The directory and its files, by path. */
     std::map<std::string, struct stat> mFiles;
-    model::State& mState;
     const std::string mDirectory;
     const simulator::Folder mTrace;
     struct fuse* mFuse;

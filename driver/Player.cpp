@@ -101,9 +101,8 @@ int Player::start(uint64_t milliseconds) {
 int Player::stop() {
     mPlayed = {};
     mLength = 0;
-    mMotor.stop();
     setTimer(0);
-    return 0;
+    return mMotor.stop();
 }
 
 int64_t Player::remaining() const {
@@ -122,17 +121,11 @@ int Player::advance() {
     if (packet == mPlayed.packets.end()) return stop();
     const int strength = scaled(std::clamp(packet->intensity, 0, kFullStrength),
                                 mPlayed.scale.value_or(mStrength));
-    int error = 0;
-    if (strength == 0) {
-        mMotor.stop();
-    } else {
-        error = mMotor.run(strength, remaining());
-    }
-    if (error != 0) {
+    const int error = mMotor.run(strength, remaining());
+    if (error != 0)
         stop();
-    } else {
+    else
         setTimer(std::min(end, time + kLongestEffect - kMargin));
-    }
     return error;
 }
 

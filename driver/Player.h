@@ -25,8 +25,7 @@ class Player : public model::State {
     uint64_t timeLeft() const override;
     int perform(const model::Action& action) override;
 
-    /** @return path and name of the motor. */
-    std::string device() const { return mMotor.path() + " " + mMotor.name(); }
+    std::string device() const { return mMotor.device(); }
     /** @return a descriptor that can be read when advance is to be called. */
     int timer() const { return mTimer; }
     /** Has the motor do what it is time for. @return 0, or a negative errno. */

@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Serve.h"
 
-#include "Nodes.h"
-#include "Player.h"
 #include "Session.h"
 #include "SimulatedDriver.h"
 
@@ -15,7 +13,6 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <filesystem>
 #include <fstream>
 #include <iostream>
 #include <system_error>
@@ -47,7 +44,7 @@ int openFileSystem() {
 
 /** Mounts a file system that is served over a descriptor; makes the directory. */
 void mountFileSystem(int file, const std::string& directory) {
-    std::filesystem::create_directories(directory);
+    simulator::Folder::make(directory);
     const std::string options = "fd=" + std::to_string(file) +
                                 ",user_id=" + std::to_string(geteuid()) +
                                 ",group_id=" + std::to_string(getegid()) +
@@ -78,28 +75,6 @@ void leaveMounts() {
     if (mount("none", "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0) fail("mount");
 }
 
-/** A motor and its nodes. Lives as long as its process. */
-struct Driver {
-    Driver(Setup setup, int file, const std::string& trace)
-        : player(std::move(setup.motor), setup.patterns), nodes(file, setup.layout, player, trace) {
-        const std::vector<std::string> all = model::featureNames();
-        model::Features features{{all.begin(), all.end()}};
-        features.waves = static_cast<int>(setup.patterns.size());
-        for (const model::Attribute& each : model::attributes()) {
-            if (each.isIn(setup.layout, features))
-                nodes.add(each.leaf, each.mode, each.initialText(features));
-        }
-        // Not of the kernel's drivers: says through what the motor is reached.
-        nodes.add("input_device", 0444, player.device() + "\n");
-    }
-    void serve() {
-        nodes.serve(player.timer(), [this] { player.advance(); });
-    }
-
-    Player player;
-    Nodes nodes;
-};
-
 }  // namespace
 
 void serveMounted(Setup setup) {
@@ -107,7 +82,7 @@ void serveMounted(Setup setup) {
     // The kernel says nothing when it is mounted.
     for (pollfd each{file, POLLIN, 0}; poll(&each, 1, -1) >= 0 && (each.revents & POLLERR) != 0;)
         usleep(10'000);
-    Driver(std::move(setup), file, "").serve();
+    Nodes(std::move(setup), file, "").serve();
 }
 
 void mountNodes(pid_t process, const std::string& directory) {
@@ -137,7 +112,7 @@ int runSession(Setup setup, const std::vector<std::string>& command) {
         fail(kClasses);
     const bool isLed = setup.layout == model::Layout::kLedTrigger;
     // Never destroyed: it serves until this process ends.
-    std::thread(&Driver::serve, new Driver(std::move(setup), file, directory)).detach();
+    std::thread(&Nodes::serve, new Nodes(std::move(setup), file, directory)).detach();
     const auto stop = [&] {
         writeFile(nodes + (isLed ? "activate" : "enable"), "0\n");
         std::cerr << "vibrator-driver: the service has ended" << std::endl;

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "Motor.h"
-#include "Patterns.h"
+#include "Nodes.h"
 
 #include <sys/types.h>
 
@@ -10,13 +9,6 @@
 #include <vector>
 
 namespace driver {
-
-/** A motor, and the driver that it is to have. */
-struct Setup {
-    Motor motor;
-    model::Layout layout;
-    Patterns patterns;
-};
 
 /** Serves the nodes of a motor once another process has called mountNodes, until they are
  * unmounted. */

@@ -47,8 +47,8 @@ void addCommands(cli::Program& program) {
         return program.command("A motor", name, help, example);
     };
     add("list", "list the motors of this machine and what they can do").run([&program] {
-        const std::vector<driver::Motor> motors = driver::Motor::list();
-        for (const driver::Motor& motor : motors)
+        const auto motors = driver::Motor::list();
+        for (const auto& [number, motor] : motors)
             std::cout << motor.inWords() << '\n';
         if (motors.empty()) program.warn("list: this machine has no force-feedback motor");
         return cli::kSuccess;

@@ -4,6 +4,8 @@
 #include "Amplitude.h"
 #include "NodePathTable.h"
 
+#include <fcntl.h>
+
 #include <algorithm>
 #include <cerrno>
 #include <charconv>
@@ -202,6 +204,12 @@ std::string Attribute::initialText(const Features& features) const {
     return (leaf == std::string_view("num_waves") ? std::to_string(features.waves)
                                                   : features.motor) +
            "\n";
+}
+
+int checkAccess(mode_t mode, int flags) {
+    const bool reads = (flags & O_ACCMODE) != O_WRONLY;
+    const bool writes = (flags & O_ACCMODE) != O_RDONLY;
+    return (reads && (mode & 0444) == 0) || (writes && (mode & 0222) == 0) ? -EACCES : 0;
 }
 
 std::string show(const State& state, const std::string& leaf) {

@@ -119,6 +119,12 @@ const std::vector<Attribute>& attributes();
 /** The size that an attribute has, and the most bytes that it takes in one write. */
 constexpr size_t kPageSize = 4096;
 
+/**
+ * @param flags as open takes them.
+ * @return 0, or the negative errno of what an attribute's permissions rule out, for root, too.
+ */
+int checkAccess(mode_t mode, int flags);
+
 /** @return what reading an attribute yields now. */
 std::string show(const State& state, const std::string& leaf);
 

@@ -130,12 +130,9 @@ std::vector<Node> listNodes(const std::string& directory) {
 int openNode(const Node& node, int flags) {
     const std::string leaf = node.leaf();
     const Folder folder = folderOf(node);
-    // The attribute's mode binds root too, who may open any plain file.
     const mode_t mode = folder.mode(leaf);
-    const bool reads = (flags & O_ACCMODE) != O_WRONLY;
-    const bool writes = (flags & O_ACCMODE) != O_RDONLY;
     if (mode == 0 || leaf[0] == '.') return -ENOENT;
-    if ((reads && (mode & 0444) == 0) || (writes && (mode & 0222) == 0)) return -EACCES;
+    if (const int error = model::checkAccess(mode, flags); error != 0) return error;
     UniqueFd file = folder.open(leaf, flags & O_ACCMODE);
     return file.isValid() ? file.release() : -errno;
 }

@@ -224,6 +224,22 @@ TEST_F(DriverTest, WorksAgainWhenTheMotorIsBack) {
     }
 }
 
+TEST_F(DriverTest, RestsAfterASuspension) {
+    ASSERT_NO_FATAL_FAILURE(serve(kController, "timed"));
+    mVibrator->on(3000);
+    const double start = nowInMs();
+    const Outcome slept =
+            runShell("echo +5 >/sys/class/rtc/rtc0/wakealarm && echo mem >/sys/power/state");
+    EXPECT_EQ(slept.exitCode, 0) << slept.errors;
+    wait(50);
+    EXPECT_FALSE(mMotor->isMoving()) << "its time is over, on the clock that goes on";
+    EXPECT_LT(nowInMs() - start, 3000);
+    mMotor->takeChanges();
+    const double again = nowInMs();
+    mVibrator->on(50);
+    expectRuns(again, {{10000, 50}});
+}
+
 TEST_F(DriverTest, SharesItsMotor) {
     // The only place for an effect is another program's.
     ASSERT_NO_FATAL_FAILURE(serve(kOneSlot, "timed"));
