@@ -37,23 +37,16 @@ Motor::Motor(const std::string& path, const std::string& properties)
       mName(firstLine(properties + "/name")),
       mIdentity(firstLine(properties + "/modalias") + mName + firstLine(properties + "/uniq")),
       mFile(open(path.c_str(), O_RDWR | O_CLOEXEC | O_NONBLOCK)) {
-    if (mFile.isValid()) {
-        ask();
-    } else {
-        const int error = errno;
-        mProblem = strerror(error);
-        if (error == EACCES)
-            mProblem += "; log in at the seat that it belongs to, or join the group \"input\"";
-    }
+    ask(mFile.isValid() ? 0 : errno);
 }
 
-/** Asks the device what it can do. */
-void Motor::ask() {
+void Motor::ask(int error) {
     libevdev* device = nullptr;
-    if (const int error = libevdev_new_from_fd(mFile.get(), &device); error != 0) {
-        mProblem = strerror(-error);
-        return;
-    }
+    if (error == 0) error = -libevdev_new_from_fd(mFile.get(), &device);
+    if (error != 0) mProblem = strerror(error);
+    if (error == EACCES)
+        mProblem += "; log in at the seat that it belongs to, or join the group \"input\"";
+    if (error != 0) return;
     const auto has = [&](unsigned code) {
         return libevdev_has_event_code(device, EV_FF, code) != 0;
     };
@@ -133,7 +126,10 @@ bool Motor::send(int code, int value) const {
 }
 
 int Motor::run(int strength, int64_t milliseconds) {
-    if (strength == 0) return stop();
+    if (strength == 0) {
+        if (mEffect >= 0) send(mEffect, 0);
+        return 0;
+    }
     // What another program has set stays until somebody sets it again.
     if (mEffect < 0 && mHasGain) send(FF_GAIN, 0xffff);
     ff_effect effect{};
@@ -150,11 +146,6 @@ int Motor::run(int strength, int64_t milliseconds) {
     if (ioctl(mFile.get(), EVIOCSFF, &effect) != 0) return fail(errno);
     mEffect = effect.id;
     return send(mEffect, 1) ? 0 : fail(errno);
-}
-
-int Motor::stop() const {
-    if (mEffect >= 0) send(mEffect, 0);
-    return 0;
 }
 
 }  // namespace driver

@@ -43,19 +43,18 @@ class Motor {
     /**
      * Runs the motor from now on, in place of what it did; without a gap if it ran.
      *
-     * @param strength up to kFullStrength; 0 stops it.
+     * @param strength up to kFullStrength; 0 stops it, which does not fail.
      * @param milliseconds when the kernel is to stop it, kLongestEffect at most.
      * @return 0, or a negative errno.
      */
     int run(int strength, int64_t milliseconds);
-    /** @return 0: what is not there rests. */
-    int stop() const;
 
   private:
     /** @param properties the directory where the kernel describes the device. */
     Motor(const std::string& path, const std::string& properties);
 
-    void ask();
+    /** Asks the device what it can do. @param error why it could not be opened; 0 if it is open. */
+    void ask(int error);
     /** Logs an error. @return it as a negative errno. */
     int fail(int error) const;
     bool send(int code, int value) const;

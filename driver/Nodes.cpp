@@ -68,8 +68,7 @@ struct Nodes::Requests {
     }
 
     static int openFile(const char* path, fuse_file_info* file) {
-        constexpr const char* kNames[] = {"O_RDONLY", "O_WRONLY", "O_RDWR", "O_ACCMODE"};
-        return trace(path, std::string("open ") + kNames[file->flags & O_ACCMODE],
+        return trace(path, "open " + model::accessMode(file->flags),
                      model::checkAccess(nodes().mFiles[path].st_mode, file->flags));
     }
     static int readFile(const char* path, char* buffer, size_t size, off_t offset,

@@ -7,10 +7,9 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <cstdint>
 #include <ctime>
-#include <limits>
 #include <system_error>
-#include <utility>
 
 namespace driver {
 namespace {
@@ -22,7 +21,7 @@ namespace product = ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 /** How long before its end the kernel's time for an effect is renewed. */
 constexpr int64_t kMargin = 5000;
 /** The longest time that the attributes show. */
-constexpr int kForever = std::numeric_limits<int32_t>::max();
+constexpr int kForever = INT32_MAX;
 
 /**
  * @return the time, rounded up. It goes on while the machine is suspended: what was to end
@@ -102,7 +101,7 @@ int Player::stop() {
     mPlayed = {};
     mLength = 0;
     setTimer(0);
-    return mMotor.stop();
+    return mMotor.run(0, 0);
 }
 
 int64_t Player::remaining() const {
@@ -121,18 +120,14 @@ int Player::advance() {
     if (packet == mPlayed.packets.end()) return stop();
     const int strength = scaled(std::clamp(packet->intensity, 0, kFullStrength),
                                 mPlayed.scale.value_or(mStrength));
+    setTimer(std::min(end, time + kLongestEffect - kMargin));
     const int error = mMotor.run(strength, remaining());
-    if (error != 0)
-        stop();
-    else
-        setTimer(std::min(end, time + kLongestEffect - kMargin));
+    if (error != 0) stop();
     return error;
 }
 
 void Player::setTimer(int64_t time) const {
-    itimerspec timer{};
-    timer.it_value.tv_sec = time / 1000;
-    timer.it_value.tv_nsec = time % 1000 * 1'000'000;
+    const itimerspec timer{{}, {time / 1000, time % 1000 * 1'000'000}};
     timerfd_settime(mTimer, TFD_TIMER_ABSTIME, &timer, nullptr);
 }
 

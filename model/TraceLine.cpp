@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "TraceLine.h"
 
+#include <fcntl.h>
+
 #include <cstdio>
 #include <cstring>
 #include <ctime>
@@ -27,6 +29,11 @@ std::string quote(std::string_view bytes) {
         }
     }
     return quoted + '"';
+}
+
+std::string accessMode(int flags) {
+    constexpr const char* kNames[] = {"O_RDONLY", "O_WRONLY", "O_RDWR", "O_ACCMODE"};
+    return kNames[flags & O_ACCMODE];
 }
 
 std::string traceName(std::string_view path) {

@@ -15,6 +15,9 @@ constexpr off_t kTraceLimit = off_t{64} << 20;
 /** @return bytes between quotation marks, escaped as in C. */
 std::string quote(std::string_view bytes);
 
+/** @return the flag with which a file is opened to read, write or both, like "O_RDWR". */
+std::string accessMode(int flags);
+
 /** @return an attribute as a trace names it: leds/state of /sys/class/leds/vibrator/state. */
 std::string traceName(std::string_view path);
 

@@ -102,11 +102,10 @@ ssize_t simulate(const OpenNode& open, const std::string& name, const std::strin
 }
 
 int simulateOpen(const Node& node, int flags) {
-    constexpr const char* kNames[] = {" O_RDONLY", " O_WRONLY", " O_RDWR", " O_ACCMODE"};
     if (!simulator::isMarked(*node.directory)) return -ENOENT;
     const OpenNode open{node, {}};
     int file = -1;
-    const ssize_t result = simulate(open, "open", kNames[flags & O_ACCMODE], [&](size_t) {
+    const ssize_t result = simulate(open, "open", ' ' + model::accessMode(flags), [&](size_t) {
         file = simulator::openNode(node, flags);
         return std::min(file, 0);
     });
