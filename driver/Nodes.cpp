@@ -133,9 +133,8 @@ void Nodes::serve() {
     pollfd waiting[] = {{fuse_session_fd(session), POLLIN, 0}, {mPlayer.timer(), POLLIN, 0}};
     while (fuse_session_exited(session) == 0 && poll(waiting, 2, -1) > 0) {
         if (waiting[1].revents != 0) mPlayer.advance();
-        if (waiting[0].revents != 0 && fuse_session_receive_buf(session, &request) > 0) {
+        if (waiting[0].revents != 0 && fuse_session_receive_buf(session, &request) > 0)
             fuse_session_process_buf(session, &request);
-        }
     }
 }
 
