@@ -6,8 +6,20 @@
 
 static struct platform_device *device;
 
+static unsigned int lasted;
+module_param(lasted, uint, 0444);
+MODULE_PARM_DESC(lasted, "how long the last run was, in ms");
+
 static void set(struct led_classdev *led, enum led_brightness brightness)
 {
+	static enum led_brightness now;
+	static ktime_t start;
+
+	if (brightness && !now)
+		start = ktime_get();
+	if (!brightness && now)
+		lasted = ktime_ms_delta(ktime_get(), start);
+	now = brightness;
 }
 
 static struct led_classdev motor = {
