@@ -214,6 +214,8 @@ TEST_F(DriverTest, WorksAgainWhenTheMotorIsBack) {
             wait(50);
             EXPECT_EQ(call(CALL(on)(50)), kFailed);
             EXPECT_EQ(call(CALL(off)()), "OK");
+            plugIn(kOneSlot);
+            EXPECT_EQ(call(CALL(on)(50)), kFailed) << "another motor";
             plugIn(kind);
             EXPECT_TRUE(eventually([&] { return call(CALL(on)(50)) == "OK"; }));
             wait(100);
@@ -349,40 +351,6 @@ TEST_F(DriverTest, CostsLittle) {
     std::sort(calls.begin(), calls.end());
     printf("%-49s %9.0f ns  %9.0f ns\n", "call of on to the motor's event: median, greatest",
            calls[100], calls.back());
-}
-
-/** As the units do: the driver has no rights, root mounts, and the service sees the mount alone. */
-TEST_F(DriverTest, ServesAnotherUsersService) {
-    plugIn(kPad);
-    const std::string classes = "/run/vibrator-driver/class";
-    const std::string nodes = classes + "/timed_output/vibrator";
-    ChildProcess driver;
-    driver.startProgram({kDriver, "serve", "--device", mMotor->path()}, kLog, {}, 1500);
-    const Outcome mounted = runShell(
-            "umask 0077; vibrator-driver mount " + std::to_string(driver.pid()) + " " + nodes +
-            " && chown 1000 " + nodes + "/* && mkdir -p /run/sockets && chown 1000 /run/sockets");
-    ASSERT_EQ(mounted.exitCode, 0) << mounted.errors;
-    setenv("HWBINDER_DIR", "/run/sockets", 1);
-    mSession.startProgram({"/bin/unshare", "-m", "/bin/sh", "-c",
-                           "mount --rbind " + classes +
-                                   " /sys/class; exec start-stop-daemon -S -c system -x "
-                                   "/sbin/vendor.velmora.hardware.vibrator@2.1-service"},
-                          kLog, {});
-    ASSERT_NO_FATAL_FAILURE(findService("/run/sockets"));
-    const double start = nowInMs();
-    EXPECT_EQ(call(CALL(on)(50)), "OK");
-    expectRuns(start, {{10000, 50}});
-    const std::string device = "vibrator-driver, " + mMotor->path();
-    EXPECT_EQ(runShell("vibratorctl doctor | grep -q '" + device + "'").exitCode, 0);
-    EXPECT_EQ(runShell("vibratorctl status | grep -q '" + device + "'").exitCode, 0);
-    // Others may read the nodes.
-    EXPECT_EQ(runShell("echo 5 >" + nodes + "/enable", 1000).exitCode, 0);
-    EXPECT_EQ(runShell("echo 5 >" + nodes + "/enable", 2000).exitCode, 1);
-    EXPECT_EQ(runShell("cat " + nodes + "/input_device", 2000).output,
-              mMotor->path() + " rumble\n");
-    mSession.kill();
-    EXPECT_EQ(runShell("umount " + nodes).exitCode, 0);
-    EXPECT_TRUE(eventually([&] { return !driver.isAlive(); })) << "without files to serve it ends";
 }
 
 }  // namespace
