@@ -162,7 +162,8 @@ class Program {
      */
     Command& command(const std::string& group, const std::string& name, const std::string& help,
                      const std::string& example) {
-        return mCommands.emplace_back(Command{group, name, help, example});
+        mCommands.push_back({group, name, help, example});
+        return mCommands.back();
     }
     /** Takes a name that no help shows for the first word of a command, or for an option. */
     void addSecondName(const std::string& second, const std::string& first) {
