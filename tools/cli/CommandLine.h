@@ -165,14 +165,13 @@ class Program {
         mCommands.push_back({group, name, help, example});
         return mCommands.back();
     }
-    /** Takes a name that no help shows for the first word of a command, or for an option. */
-    void addSecondName(const std::string& second, const std::string& first) {
-        mSecondNames[second] = first;
-    }
     /** Runs the command that a command line asks for. @return the program's exit code. */
     int run(int argc, char** argv);
     /** Says something on standard error, unless answers are JSON. */
     void warn(const std::string& text) const;
+
+    /** Names that no help shows, each for the first word of a command. */
+    std::map<std::string, std::string> secondNames;
 
   protected:
     /** @return the words of the command that was recognised; empty where none was. */
@@ -190,11 +189,6 @@ class Program {
     void addHelp();
     /** Does what a command line asks for. */
     int obey(const std::vector<std::string>& words);
-    /** @return the name that helps show, for a second one; others as they are. */
-    std::string firstName(const std::string& name) const {
-        const auto found = mSecondNames.find(name);
-        return found == mSecondNames.end() ? name : found->second;
-    }
     /** @return the command with a name, or all whose names begin with its words. */
     std::vector<Command*> named(const std::string& name);
     /** @return the words that may follow those of a command, with what they mean. */
@@ -212,7 +206,6 @@ class Program {
     /** The words behind "help". */
     Value<std::vector<std::string>> mTopic;
     std::deque<Command> mCommands;
-    std::map<std::string, std::string> mSecondNames;
     const Command* mCurrent = nullptr;
 };
 

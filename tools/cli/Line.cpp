@@ -131,7 +131,9 @@ class Line {
 
     void takeName(const std::string& word) {
         if (mProblem) return;
-        const std::string name = mTyped.empty() ? mProgram->firstName(word) : mTyped + " " + word;
+        const auto second = mProgram->secondNames.find(word);
+        const std::string& first = second == mProgram->secondNames.end() ? word : second->second;
+        const std::string name = mTyped.empty() ? first : mTyped + " " + word;
         const std::vector<Command*> found = mProgram->named(name);
         if (found.empty()) {
             throw UsageError("no command " + inQuotes(name) +
@@ -150,9 +152,8 @@ class Line {
         return list;
     }
 
-    /** @return the option that has a name, a second name or a letter like "-o"; or nullptr. */
-    Argument* optionOf(const std::string& given) const {
-        const std::string name = isStep() ? given : mProgram->firstName(given);
+    /** @return the option that has a name, or a letter like "-o"; or nullptr. */
+    Argument* optionOf(const std::string& name) const {
         for (Argument* each : mOptions) {
             if (name == each->name || name == each->letter) return each;
         }

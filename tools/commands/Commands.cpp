@@ -8,8 +8,7 @@ void addCommands(Client& client) {
                            addSelftest, addPlay, addWatch, addPlot}) {
         add(client);
     }
-    client.addSecondName("prebaked", "pattern");
-    client.addSecondName("--amplitude", "--intensity");
+    client.secondNames["prebaked"] = "pattern";
 }
 
 void addCall(Client& client, cli::Command& command, const OneArgument& argument,
