@@ -252,9 +252,11 @@ ManagerState managerState(std::string* whyNot) {
     return ManagerState::SILENT;
 }
 
-std::string findService(const std::string& interface, const std::string& instance,
-                        sp<IBase>* service) {
-    return hardware::findService(milliseconds(0), interface, instance, service).text();
+status_t findService(const std::string& interface, const std::string& instance, sp<IBase>* service,
+                     std::string* whyNot) {
+    const Error error = hardware::findService(milliseconds(0), interface, instance, service);
+    *whyNot = error.text();
+    return error.code();
 }
 
 }  // namespace host

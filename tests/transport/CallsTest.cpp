@@ -142,7 +142,8 @@ TEST_F(CallsTest, ObjectIsFoundUnderEveryInterfaceOfItsChain) {
                 "wrong", mClient, {Other::descriptor}));
     }
     sp<IBase> found;
-    const std::string whyNot = host::findService(Other::descriptor, "wrong", &found);
+    std::string whyNot;
+    EXPECT_EQ(host::findService(Other::descriptor, "wrong", &found, &whyNot), android::BAD_TYPE);
     EXPECT_EQ(found, nullptr);
     EXPECT_NE(whyNot.find("does not have the interface"), std::string::npos) << whyNot;
 
@@ -303,7 +304,8 @@ TEST_F(CallsTest, SearchWaitsForAServiceThatIsToCome) {
                                (isKernel() ? "/dev/hwbinder: the service manager does not know it"
                                            : mDirectory.path());
     sp<IBase> base;
-    const std::string said = host::findService(kChain[0], "default", &base);
+    std::string said;
+    EXPECT_EQ(host::findService(kChain[0], "default", &base, &said), android::NAME_NOT_FOUND);
     EXPECT_EQ(said.find(whyNot), 0U) << said;
     std::thread later([&] {
         std::this_thread::sleep_for(milliseconds(100));

@@ -11,8 +11,9 @@ namespace vibratorctl {
 
 ::android::sp<IDaxVibrator> connect(const std::string& instance) {
     ::android::sp<::android::hidl::base::V1_0::IBase> found;
-    const std::string whyNot = host::findService(IDaxVibrator::descriptor, instance, &found);
-    if (!whyNot.empty()) throw Unreachable(whyNot);
+    std::string whyNot;
+    const auto status = host::findService(IDaxVibrator::descriptor, instance, &found, &whyNot);
+    if (status != ::android::OK) throw Unreachable(whyNot, status == ::android::TIMED_OUT);
     ::android::sp<IDaxVibrator> vibrator = IDaxVibrator::castFrom(found).withDefault(nullptr);
     if (vibrator == nullptr) throw Unreachable("the service has just ended");
     return vibrator;

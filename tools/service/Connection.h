@@ -19,7 +19,10 @@ using ::vendor::velmora::hardware::vibrator::V2_1::IDaxVibrator;
 /** The service cannot be reached; what() says why. */
 class Unreachable : public std::runtime_error {
   public:
-    using runtime_error::runtime_error;
+    /** @param found whether there is such a service. */
+    explicit Unreachable(const std::string& why, bool found = true)
+        : runtime_error(why), isFound(found) {}
+    const bool isFound;
 };
 
 /** Finds the service, without waiting for it. @throw Unreachable */

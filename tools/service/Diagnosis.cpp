@@ -47,7 +47,7 @@ class Examination {
             reached(mVibrator->ping());
             mFound.answers = true;
         } catch (const Unreachable& error) {
-            examineSilence(error.what());
+            examineSilence(error);
         }
         mFound.route = findRoute();
         mOpener = mFound.server.value_or(thisProcess());
@@ -86,7 +86,7 @@ class Examination {
                              : "uid " + std::to_string(mOpener.uid);
     }
 
-    void examineSilence(const std::string& why);
+    void examineSilence(const Unreachable& error);
     void examineMissingDriver();
     void examineNodes();
     std::string howToGive(const std::string& paths, const LocalDriver::Node& node) const;
@@ -102,12 +102,14 @@ class Examination {
     const System mSystem = thisSystem();
 };
 
-/** Says why no service answers. @param why what the client met. */
-void Examination::examineSilence(const std::string& why) {
+/** Says why no service answers. @param error what the client met. */
+void Examination::examineSilence(const Unreachable& error) {
+    const std::string why = error.what();
     std::vector<Process> servers = findServers();
     if (mFound.server) servers = {*mFound.server};
     for (const Process& server : servers) {
-        if (server.state != 'T') continue;
+        // A service that is stopped is found all the same.
+        if (!error.isFound || server.state != 'T') continue;
         mFound.server = server;
         return find("the service (" + server.inWords() + ") is stopped, and answers nobody",
                     "let it go on: kill -CONT " + std::to_string(server.pid));

@@ -19,9 +19,15 @@ enum class ManagerState { NOT_NEEDED, ANSWERS, SILENT };
 /** @param whyNot set to why none answers, in words. @return the state of the service manager. */
 ManagerState managerState(std::string* whyNot);
 
-/** Looks once for a service. @param service set to it. @return "", or why it is not there. */
-std::string findService(const std::string& interface, const std::string& instance,
-                        sp<::android::hidl::base::V1_0::IBase>* service);
+/**
+ * Looks once for a service.
+ *
+ * @param service set to it.
+ * @param whyNot set to why it is not there, in words.
+ * @return OK; TIMED_OUT for one that is there and does not answer; or another negative status.
+ */
+status_t findService(const std::string& interface, const std::string& instance,
+                     sp<::android::hidl::base::V1_0::IBase>* service, std::string* whyNot);
 
 /**
  * Limits how long a call may take; one that takes longer fails with TIMED_OUT. Over sockets its
