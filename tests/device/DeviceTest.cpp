@@ -7,7 +7,7 @@
 #include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
 
 #include <filesystem>
-#include <pugixml.hpp>
+#include <numeric>
 #include <regex>
 #include <set>
 #include <sstream>
@@ -31,9 +31,14 @@ Texts linesOf(const std::string& file) {
     Texts lines;
     for (std::string line; std::getline(text, line);) {
         line.erase(0, line.find_first_not_of(' '));
-        if (!line.empty() && line[0] != '#') lines.push_back(line);
+        if (!line.empty() && line[0] != '#' && line.rfind("<!--", 0) != 0) lines.push_back(line);
     }
     return lines;
+}
+
+std::string textOf(const std::string& file) {
+    const Texts lines = linesOf(file);
+    return std::accumulate(lines.begin(), lines.end(), std::string());
 }
 
 TEST(DeviceTest, BlueprintNamesWhatThereIs) {
@@ -109,31 +114,25 @@ TEST(DeviceTest, EveryListOfNodesIsTheTables) {
     EXPECT_EQ(simulated, expected);
 }
 
-/** @return the interfaces that a manifest or a matrix names, each in all that is said of it. */
-Texts interfacesIn(const std::string& file) {
-    pugi::xml_document document;
-    EXPECT_TRUE(document.load_file((kSource + "/device/" + file).c_str())) << file;
-    const pugi::xml_node root = document.document_element();
-    Texts interfaces = {root.attribute("type").value()};
-    for (const pugi::xml_node& hal : root.children("hal")) {
-        const pugi::xml_node interface = hal.child("interface");
-        std::string words = std::string(hal.attribute("format").value()) + " " +
-                            hal.attribute("optional").value() + hal.child_value("transport") + " ";
-        words += std::string(hal.child_value("name")) + "@" + hal.child_value("version") +
-                 "::" + interface.child_value("name") + "/" + interface.child_value("instance");
-        interfaces.push_back(words);
-    }
-    return interfaces;
-}
-
 TEST(DeviceTest, ManifestDeclaresWhatIsRegisteredAndMatrixAllowsIt) {
-    const std::string ours = std::string(IDaxVibrator::descriptor) + "/default";
-    const std::string platforms = std::string(IVibrator::descriptor) + "/default";
-    EXPECT_EQ(interfacesIn(kBinary + ".xml"),
-              (Texts{"device", "hidl hwbinder " + ours, "hidl hwbinder " + platforms}));
+    const auto hal = [](const std::string& attribute, const std::string& transport,
+                        const std::string& descriptor) {
+        static const std::regex parts("(.*)@(.*)::(.*)");
+        return std::regex_replace(descriptor, parts,
+                                  "<hal format=\"hidl\"" + attribute + "><name>$1</name>" +
+                                          transport + "<version>$2</version><interface><name>$3" +
+                                          "</name><instance>default</instance></interface></hal>");
+    };
+    const std::string hwbinder = "<transport>hwbinder</transport>";
+    EXPECT_EQ(textOf("device/" + kBinary + ".xml"),
+              "<manifest version=\"1.0\" type=\"device\">" +
+                      hal("", hwbinder, IDaxVibrator::descriptor) +
+                      hal("", hwbinder, IVibrator::descriptor) + "</manifest>");
     // The platform's own matrix has the platform's interface.
-    EXPECT_EQ(interfacesIn("framework_compatibility_matrix.xml"),
-              (Texts{"framework", "hidl true " + ours}));
+    EXPECT_EQ(textOf("device/framework_compatibility_matrix.xml"),
+              "<compatibility-matrix version=\"1.0\" type=\"framework\">" +
+                      hal(" optional=\"true\"", "", IDaxVibrator::descriptor) +
+                      "</compatibility-matrix>");
 }
 
 TEST(DeviceTest, PolicyLabelsTheBinaryTheInterfaceAndTheNodes) {
