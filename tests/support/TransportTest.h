@@ -8,13 +8,9 @@
 #include <gtest/gtest.h>
 #include <sys/wait.h>
 
-#include <atomic>
 #include <csignal>
 #include <cstdlib>
-#include <functional>
 #include <string>
-#include <thread>
-#include <vector>
 
 using tests::Answer;
 using tests::answerTo;
@@ -63,23 +59,6 @@ class TransportTest : public ::testing::Test {
     static bool answers() {
         const auto vibrator = IDaxVibrator::tryGetService();
         return vibrator != nullptr && call(*vibrator).inWords() == "(UNSUPPORTED_OPERATION, 0)";
-    }
-
-    /** Runs a function in several threads, and another one here until they have ended. */
-    static void runBeside(unsigned count, const std::function<void(unsigned)>& function,
-                          const std::function<void()>& here) {
-        std::atomic<unsigned> running = count;
-        std::vector<std::thread> threads;
-        for (unsigned i = 0; i < count; ++i) {
-            threads.emplace_back([&, i] {
-                function(i);
-                --running;
-            });
-        }
-        while (running > 0)
-            here();
-        for (std::thread& thread : threads)
-            thread.join();
     }
 
     std::string logFile() const { return mDirectory.path() + "/log"; }
