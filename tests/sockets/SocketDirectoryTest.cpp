@@ -98,7 +98,12 @@ TEST_F(SocketDirectoryTest, OnlyDirectoriesThatTheRightOnesCanWriteToAreOpened) 
 
 TEST_F(SocketDirectoryTest, NameOfAnotherIsTakenWhateverHappensToErrno) {
     ListeningSocket first;
+    const mode_t before = umask(0077);
     ASSERT_TRUE(publish(&first).isOk());
+    EXPECT_EQ(umask(before), 0077U);
+    // Everybody may connect.
+    EXPECT_EQ(fs::status(mDirectory).permissions(), fs::perms(0755));
+    EXPECT_EQ(fs::status(mDirectory + "/a@1.0::IA.x").permissions(), fs::perms(0777));
     ListeningSocket second;
     const Error taken = publish(&second);
     EXPECT_EQ(taken.code(), -EWOULDBLOCK);
@@ -116,6 +121,8 @@ TEST_F(SocketDirectoryTest, NamesThatNoSocketCanHaveAreRefused) {
 
 TEST_F(SocketDirectoryTest, FilesThatAreInTheWayAreSaid) {
     make("sockets", 0755);
+    // What another service had.
+    fs::create_symlink("another", mDirectory + "/b@1.0::IB.x");
     ListeningSocket listener;
     const SocketPublication publication{nullptr, {"a@1.0::IA", "b@1.0::IB", "base"}, "x"};
     for (const auto& [name, complaint] : {std::pair("b@1.0::IB.x", "File exists"),
@@ -126,8 +133,12 @@ TEST_F(SocketDirectoryTest, FilesThatAreInTheWayAreSaid) {
                   mDirectory + "/" + name + ": " + complaint);
         fs::remove(temporary);
     }
+    // What a service that died in its start has left.
+    for (const char* name : {"/b@1.0::IB.x~", "/a@1.0::IA.x~"})
+        fs::create_symlink("another", mDirectory + name);
     EXPECT_TRUE(listenUnderNames(publication, &listener).isOk());
     EXPECT_EQ(fs::read_symlink(mDirectory + "/b@1.0::IB.x"), "a@1.0::IA.x");
+    EXPECT_FALSE(fs::exists(mDirectory + "/base.x")) << "every object has that one";
 }
 
 TEST_F(SocketDirectoryTest, MissingDescriptorsAreSaid) {
