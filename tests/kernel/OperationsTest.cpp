@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Vibrator.h"
 #include "support/Operations.h"
+#include "support/TransientTrigger.h"
 #include "support/TransportTest.h"
 
 #include <hwbinder/IPCThreadState.h>
@@ -23,6 +24,10 @@ std::string outcome(const Operation& operation, IDaxVibrator& vibrator) {
 }
 
 class OperationsTest : public TransportTest {};
+
+TEST_F(OperationsTest, TriggerDoesWhatTheSimulatorIsHeldTo) {
+    expectTransientTrigger(kLed);
+}
 
 /** Compares what the daemon does with what its object does in the caller's own process. */
 TEST_F(OperationsTest, AnswersAreThoseOfTheObjectForEveryCaller) {
