@@ -7,6 +7,7 @@
 
 #include <fcntl.h>
 #include <unistd.h>
+#include <utils/UniqueFd.h>
 
 #include <cerrno>
 #include <chrono>
@@ -113,15 +114,12 @@ class Printer {
 class GrowingFile {
   public:
     explicit GrowingFile(std::string name) : mName(std::move(name)) { open(); }
-    GrowingFile(const GrowingFile&) = delete;
-    GrowingFile& operator=(const GrowingFile&) = delete;
-    ~GrowingFile() { close(mFile); }
 
-    void skip() const { lseek(mFile, 0, SEEK_END); }
+    void skip() const { lseek(mFile.get(), 0, SEEK_END); }
     /** @return some of the next bytes; "" at the end. */
     std::string read() const {
         char part[65536];
-        const ssize_t size = ::read(mFile, part, sizeof(part));
+        const ssize_t size = ::read(mFile.get(), part, sizeof(part));
         if (size < 0) fail();
         return {part, static_cast<size_t>(size)};
     }
@@ -130,25 +128,24 @@ class GrowingFile {
         struct stat now = {};
         struct stat opened = {};
         if (stat(mName.c_str(), &now) != 0 || !S_ISREG(now.st_mode)) return false;
-        fstat(mFile, &opened);
+        fstat(mFile.get(), &opened);
         const bool isSame = now.st_dev == opened.st_dev && now.st_ino == opened.st_ino;
-        if (isSame && lseek(mFile, 0, SEEK_CUR) <= now.st_size) return false;
-        close(mFile);
+        if (isSame && lseek(mFile.get(), 0, SEEK_CUR) <= now.st_size) return false;
         open();
         return true;
     }
 
   private:
     void open() {
-        mFile = mName == "-" ? dup(STDIN_FILENO) : ::open(mName.c_str(), O_RDONLY | O_CLOEXEC);
-        if (mFile < 0) fail();
+        mFile.reset(mName == "-" ? dup(STDIN_FILENO) : ::open(mName.c_str(), O_RDONLY | O_CLOEXEC));
+        if (!mFile.isValid()) fail();
     }
     [[noreturn]] void fail() const {
         throw cli::UsageError(mName + ": cannot be read: " + strerror(errno));
     }
 
     std::string mName;
-    int mFile = -1;
+    ::android::UniqueFd mFile;
 };
 
 /** Shows accesses as they come, or only those that are there. @return the exit code. */

@@ -7,8 +7,8 @@
 #include "TextNode.h"
 
 #include <fcntl.h>
-#include <pwd.h>
 #include <unistd.h>
+#include <utils/UniqueFd.h>
 
 #include <algorithm>
 #include <cstdio>
@@ -21,36 +21,19 @@ using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
 namespace {
 
-/** @return the name that /etc/passwd has for a user, or the number; it needs no shared library. */
-std::string userName(uid_t uid) {
-    std::string name = std::to_string(uid);
-    std::FILE* users = fopen("/etc/passwd", "re");
-    if (users == nullptr) return name;
-    while (const passwd* user = fgetpwent(users)) {
-        if (user->pw_uid != uid) continue;
-        name = user->pw_name;
-        break;
-    }
-    fclose(users);
-    return name;
-}
-
 /** @return the first bytes of a file; empty where it cannot be read. */
 std::string readStart(const std::string& path) {
     char text[512];
-    const int file = open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
-    const ssize_t size = read(file, text, sizeof(text));
-    if (file >= 0) close(file);
+    const ::android::UniqueFd file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+    const ssize_t size = read(file.get(), text, sizeof(text));
     return {text, static_cast<size_t>(std::max<ssize_t>(size, 0))};
 }
 
 /** @return what a node shows; empty where this process cannot read it. */
 std::string readNode(const std::string& path, const simulator::Node* simulated) {
     if (simulated == nullptr) return readStart(path);
-    const int file = simulator::openNode(*simulated, O_RDONLY);
-    if (file < 0) return "";
-    close(file);
-    return simulator::show(*simulated);
+    const ::android::UniqueFd file(simulator::openNode(*simulated, O_RDONLY));
+    return file.isValid() ? simulator::show(*simulated) : "";
 }
 
 }  // namespace
@@ -90,7 +73,7 @@ LocalDriver::Node LocalDriver::look(const std::string& name) const {
     snprintf(mode, sizeof(mode), "%04o", info.st_mode & 07777);
     node.mode = mode;
     node.uid = info.st_uid;
-    node.owner = userName(info.st_uid);
+    node.owner = info.st_uid == 0 ? "root" : std::to_string(info.st_uid);
     return node;
 }
 

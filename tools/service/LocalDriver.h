@@ -28,7 +28,7 @@ class LocalDriver {
         bool writes = false;
         std::string mode;
         uid_t uid = 0;
-        /** The name of that user, or the number. */
+        /** That user, "root" or a number. */
         std::string owner;
         /** Empty where this process cannot read it. */
         std::string value;
