@@ -33,12 +33,12 @@ Answer answerOf(const ::android::hardware::Return<T>& result) {
     return {static_cast<T>(result), 1, true};
 }
 
-/** @return what an operation calls back with; Given is the type of its arguments together. */
-template <typename Given, typename Operation>
+/** @return what an operation calls back with. */
+template <typename Operation>
 Answer answerTo(Operation operation) {
     Answer answer;
     const ::android::hardware::Return<void> result = operation([&](const auto&... given) {
-        answer.value = Given(given...);
+        answer.value = std::pair(given...);
         ++answer.times;
     });
     answer.isOk = result.isOk();

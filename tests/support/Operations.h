@@ -6,9 +6,7 @@
 
 #include <functional>
 #include <string>
-#include <tuple>
 #include <type_traits>
-#include <utility>
 #include <vector>
 
 namespace tests {
@@ -48,14 +46,6 @@ struct Argument {
     }
 };
 
-/** What a callback is given, as one. */
-template <typename Callback>
-struct GivenTo;
-template <typename... Given>
-struct GivenTo<std::function<void(Given...)>> {
-    using Type = std::pair<std::decay_t<Given>...>;
-};
-
 /** @return what makes a Call from arguments; enums and structures are taken as plain numbers, too.
  */
 template <typename Result, typename Interface, typename... Taken>
@@ -65,10 +55,7 @@ auto callsOf(const char* name,
         return Call{
                 name, [=](IDaxVibrator& vibrator) {
                     if constexpr (std::is_void_v<Result>) {
-                        using Callback =
-                                std::tuple_element_t<sizeof...(given), std::tuple<Taken...>>;
-                        using Both = typename GivenTo<std::decay_t<Callback>>::Type;
-                        return answerTo<Both>([&](const auto& callback) {
+                        return answerTo([&](const auto& callback) {
                             return (vibrator.*operation)(Argument<decltype(given)>{given}...,
                                                          callback);
                         });

@@ -15,7 +15,6 @@
 using tests::Answer;
 using tests::answerTo;
 using tests::IDaxVibrator;
-using tests::StatusAndNumber;
 using tests::VibratorStatus;
 
 /**
@@ -49,7 +48,7 @@ class TransportTest : public ::testing::Test {
     /** @return what an effect of 1.1, which is never played, is answered with. */
     template <typename Interface>
     static Answer call(Interface& vibrator) {
-        return answerTo<StatusAndNumber>([&](const auto& callback) {
+        return answerTo([&](const auto& callback) {
             return vibrator.perform_1_1(::android::hardware::vibrator::V1_1::Effect_1_1::CLICK,
                                         ::android::hardware::vibrator::V1_0::EffectStrength::LIGHT,
                                         callback);
