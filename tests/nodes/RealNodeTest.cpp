@@ -5,7 +5,6 @@
 #include "support/TemporaryDirectory.h"
 
 #include <gtest/gtest.h>
-#include <hidl/HidlTransportSupport.h>
 #include <hwbinder/IPCThreadState.h>
 
 #include <atomic>
@@ -14,7 +13,6 @@
 #include <filesystem>
 #include <fstream>
 #include <new>
-#include <thread>
 #include <vector>
 
 namespace {
@@ -55,21 +53,19 @@ class RealNodeTest : public ::testing::Test {
     }
 
     TemporaryDirectory mDirectory;
-    /** @return how many times a function allocates, the first time aside. */
-    template <typename Function>
-    static size_t allocationsOf(const Function& function) {
-        function();
-        const size_t before = allocations;
-        function();
-        return allocations - before;
-    }
-
     std::string mNode = mDirectory.path() + "/a-node-with-a-long-path";
     LogCapture mLog;
     android::sp<Vibrator> mVibrator = new Vibrator;
 };
 
 TEST_F(RealNodeTest, OnlyTheCopiesOfPathsAreAllocated) {
+    /** How many times a function allocates, the first time aside. */
+    const auto allocationsOf = [](const auto& function) {
+        function();
+        const size_t before = allocations;
+        function();
+        return allocations - before;
+    };
     THE_DEVICE_INTENSITY = THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES = THE_DEVICE_HAPTIC_ENGINE = mNode;
     EXPECT_EQ(allocationsOf([&] { mVibrator->daxSetAmplitude(7); }), 1U);
     EXPECT_EQ(allocationsOf([&] { mVibrator->daxSupportsAmplitudeControl(); }), 1U);
@@ -80,29 +76,6 @@ TEST_F(RealNodeTest, OnlyTheCopiesOfPathsAreAllocated) {
             std::vector<DaxHapticEnginePacket>(339, {1, 2, 3, 4});
     EXPECT_EQ(allocationsOf([&] { mVibrator->daxPerformHapticEngine(packets, 5000); }), 1U);
     EXPECT_EQ(std::ifstream(mNode).peek(), '1');
-}
-
-TEST_F(RealNodeTest, TransportAllocatesNothingForACall) {
-    unsetenv("HWBINDER_DEVICE");
-    setenv("HWBINDER_DIR", mDirectory.path().c_str(), 1);
-    android::hardware::configureRpcThreadpool(1, true);
-    ASSERT_EQ(mVibrator->registerAsService("default"), android::OK);
-    std::thread([] { android::hardware::joinRpcThreadpool(); }).detach();
-    const android::sp<IDaxVibrator> remote = IDaxVibrator::getService();
-    ASSERT_TRUE(remote != nullptr && remote->isRemote());
-    bool isOk = true;
-    const auto call = [&] { isOk = isOk && remote->ping().isOk(); };
-    // The first calls fill what the later ones use.
-    for (int i = 0; i < 10; ++i)
-        call();
-    EXPECT_EQ(allocationsOf(call), 0U);
-    const auto ignore = [](Status, uint32_t) {};
-    const auto callBack = [&] {
-        isOk = isOk && remote->perform_1_1(Effect_1_1::CLICK, EffectStrength::LIGHT, ignore).isOk();
-    };
-    EXPECT_EQ(allocationsOf(callBack), 1U) << "the generated stub's callback, which is too large";
-    EXPECT_TRUE(isOk);
-    unsetenv("HWBINDER_DIR");
 }
 
 TEST_F(RealNodeTest, ErrnoIsThatOfTheWrite) {
