@@ -26,10 +26,7 @@ const std::string kDirectory = model::sysfsDirectory(Layout::kLedTrigger);
 
 /** Makes the nodes anew, as the operation expects them. @return its accesses of nodes. */
 Steps prepare(const Operation& operation) {
-    model::Features features;
-    for (const std::string& name : model::featureNames())
-        features.names.insert(name);
-    if (simulator::createNodes(std::string(), Layout::kLedTrigger, features) != 0) abort();
+    if (simulator::createNodes(std::string(), Layout::kLedTrigger, {}) != 0) abort();
     Steps steps = parseSteps(Layout::kLedTrigger, operation.steps);
     prepareNodes("", Layout::kLedTrigger, steps);
     Steps accesses;

@@ -94,8 +94,7 @@ Nodes::Nodes(Setup setup, int file, const std::string& trace)
       mFiles{{"/", describe(S_IFDIR | 0755)}},
       mDirectory(model::sysfsDirectory(setup.layout)),
       mTrace(trace) {
-    const std::vector<std::string> all = model::featureNames();
-    model::Features features{{all.begin(), all.end()}};
+    model::Features features;
     features.waves = static_cast<int>(setup.patterns.size());
     for (const model::Attribute& each : model::attributes()) {
         if (each.isIn(setup.layout, features))

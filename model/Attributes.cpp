@@ -196,7 +196,8 @@ std::vector<std::string> featureNames() {
 
 bool Attribute::isIn(Layout layout, const Features& features) const {
     if (const auto* own = std::get_if<Layout>(&origin)) return *own == layout;
-    return features.names.count(std::string(std::get<std::string_view>(origin))) > 0;
+    const auto name = std::get<std::string_view>(origin);
+    return std::find(features.names.begin(), features.names.end(), name) != features.names.end();
 }
 
 std::string Attribute::initialText(const Features& features) const {

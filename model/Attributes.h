@@ -5,7 +5,6 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <set>
 #include <string>
 #include <string_view>
 #include <variant>
@@ -23,18 +22,17 @@ inline constexpr Layout kLayouts[] = {Layout::kLedTrigger, Layout::kTimedOutput}
 /** @return where the kernel has the attributes of a layout; ends in a slash. */
 const char* sysfsDirectory(Layout layout);
 
+/** @return all features that a driver can have; each stands for one or more attributes. */
+std::vector<std::string> featureNames();
+
 /** What a driver offers besides running its motor. */
 struct Features {
-    /** Names of featureNames(); each stands for one or more attributes. */
-    std::set<std::string> names;
+    std::vector<std::string> names = featureNames();
     /** Text of the motor_type attribute. */
     std::string motor = "LINEAR_1040";
     /** Number of patterns stored in the driver. */
     int waves = 12;
 };
-
-/** @return all features that a driver can have. */
-std::vector<std::string> featureNames();
 
 /** Starts the motor. milliseconds: 0 stops it; a one-shot timer that is running is replaced. */
 struct RunMotor {

@@ -31,16 +31,16 @@ void require(const std::string& word, const Names& known, const std::string& com
 }
 
 /** @return the features that a list names. */
-std::set<std::string> featuresOf(const std::string& list) {
+Names featuresOf(const std::string& list) {
     const Names all = model::featureNames();
-    if (list == "all") return {all.begin(), all.end()};
+    if (list == "all") return all;
     if (list == "none") return {};
-    std::set<std::string> features;
+    Names features;
     std::istringstream words(list + ",");
     for (std::string name; std::getline(words, name, ',');) {
         if (name == "prebaked") name = "pattern";  // As it was called before.
         require(name, all, "--features: no feature " + cli::inQuotes(name));
-        features.insert(name);
+        features.push_back(name);
     }
     return features;
 }

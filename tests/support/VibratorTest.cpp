@@ -32,10 +32,7 @@ VibratorTest::~VibratorTest() {
 }
 
 void VibratorTest::createDriver() {
-    model::Features features;
-    for (const std::string& name : model::featureNames())
-        features.names.insert(name);
-    ASSERT_EQ(simulator::createDriver(mDirectory.path(), mLayout, features), 0);
+    ASSERT_EQ(simulator::createDriver(mDirectory.path(), mLayout, {}), 0);
 }
 
 void VibratorTest::start(Layout layout) {
