@@ -240,7 +240,7 @@ Transport transport() {
 }
 
 void setCallTimeout(milliseconds limit) {
-    ::android::hardware::setCallTimeout(static_cast<int>(limit.count()));
+    callTimeout = static_cast<int>(limit.count());
 }
 
 ManagerState managerState(std::string* whyNot) {

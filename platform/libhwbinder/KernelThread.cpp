@@ -1,16 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "KernelThread.h"
 
-#include "libutils/Uninterrupted.h"
-
 #include <android/log.h>
 #include <hwbinder/ProcessState.h>
 #include <sys/ioctl.h>
-#include <unistd.h>
 
 #include <cerrno>
-#include <csignal>
-#include <ctime>
 #include <utility>
 
 namespace android::hardware {
@@ -30,51 +25,6 @@ void release(const uint8_t* data, void* thread) {
 }
 
 }  // namespace
-
-/**
- * Interrupts this thread's wait for the driver when a time is up, and then again every 10 ms, since
- * the first signal may come before the wait begins. Polling the device with a timeout would do it,
- * too, but then the kernel waits for tens of milliseconds when the thread ends.
- */
-class KernelThread::Alarm {
-  public:
-    /** @param milliseconds 0 for no limit. */
-    explicit Alarm(int milliseconds) : mIsSet(milliseconds > 0) {
-        if (!mIsSet) return;
-        struct sigaction action {};
-        action.sa_handler = [](int) {};
-        sigaction(signalNumber(), &action, nullptr);
-        sigevent event{};
-        event.sigev_notify = SIGEV_THREAD_ID;
-        event.sigev_signo = signalNumber();
-        event._sigev_un._tid = gettid();
-        mIsSet = timer_create(CLOCK_MONOTONIC, &event, &mTimer) == 0;
-        const itimerspec times{{0, 10'000'000},
-                               {milliseconds / 1000, milliseconds % 1000 * 1'000'000L}};
-        if (mIsSet) timer_settime(mTimer, 0, &times, nullptr);
-        clock_gettime(CLOCK_MONOTONIC, &mEnd);
-        mEnd.tv_sec += times.it_value.tv_sec;
-        mEnd.tv_nsec += times.it_value.tv_nsec;
-    }
-    ~Alarm() {
-        if (mIsSet) timer_delete(mTimer);
-    }
-    Alarm(const Alarm&) = delete;
-    Alarm& operator=(const Alarm&) = delete;
-
-    bool isOver() const {
-        timespec now{};
-        clock_gettime(CLOCK_MONOTONIC, &now);
-        return mIsSet && (now.tv_sec - mEnd.tv_sec) * 1'000'000'000 + now.tv_nsec >= mEnd.tv_nsec;
-    }
-
-  private:
-    static int signalNumber() { return SIGRTMIN; }
-
-    bool mIsSet;
-    timer_t mTimer{};
-    timespec mEnd{};
-};
 
 // A process has one driver, and calls reach this one only where it is that.
 KernelThread::KernelThread()
@@ -102,13 +52,12 @@ status_t KernelThread::exchange(bool receive) {
         exchange.read_buffer = reinterpret_cast<binder_uintptr_t>(mIn);
         exchange.read_size = sizeof(mIn);
     }
-    const int result = uninterrupted(
-            [&] { return ioctl(mDriver.mDevice.get(), BINDER_WRITE_READ, &exchange); },
-            [&] { return !(receive && mAlarm != nullptr && mAlarm->isOver()); });
+    const int result = mAlarm->uninterrupted(
+            [&] { return ioctl(mDriver.mDevice.get(), BINDER_WRITE_READ, &exchange); });
     // Commands that the kernel has not taken are dropped: it did not understand one of them.
     mOutSize = 0;
     if (result != 0) {
-        if (errno != EINTR) return -errno;
+        if (errno != ETIMEDOUT) return -errno;
         // Makes the kernel forget this thread, and the call with it. With the next command it
         // gets to know the thread anew.
         ioctl(mDriver.mDevice.get(), BINDER_THREAD_EXIT, 0);
@@ -166,7 +115,7 @@ status_t KernelThread::transact(uint32_t handle, uint32_t code, const Parcel& da
     // No TF_ACCEPT_FDS: a reply with descriptors is refused by the kernel.
     queueTransaction(BC_TRANSACTION_SG, handle, code, data, flags, nullptr);
     const bool oneway = (flags & IBinder::FLAG_ONEWAY) != 0;
-    const Alarm alarm(callTimeout());
+    const Alarm alarm(callTimeout);
     const Alarm* const before = std::exchange(mAlarm, &alarm);
     const status_t status = waitFor(oneway ? Until::kCompletion : Until::kReply, reply);
     mAlarm = before;

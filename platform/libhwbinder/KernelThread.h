@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "Alarm.h"
 #include "KernelDriver.h"
 
 #include <linux/android/binder.h>
@@ -36,8 +37,6 @@ class KernelThread {
     KernelThread();
     ~KernelThread();
 
-    class Alarm;
-
     /** What waitFor is waiting for. */
     enum class Until { kReply, kCompletion, kForEver };
 
@@ -56,8 +55,10 @@ class KernelThread {
     void giveBack(const binder_transaction_data& received);
 
     KernelDriver& mDriver;
-    /** Of the call that is being waited for; nullptr outside calls. */
-    const Alarm* mAlarm = nullptr;
+    /** Outside calls. */
+    const Alarm mNoAlarm{0};
+    /** Of the call that is being waited for. */
+    const Alarm* mAlarm = &mNoAlarm;
     // A command of the kernel's own never measures more than some 80 bytes.
     alignas(8) uint8_t mOut[512];
     size_t mOutSize = 0;

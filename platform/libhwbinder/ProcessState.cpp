@@ -7,7 +7,6 @@
 #include <hwbinder/BpHwBinder.h>
 #include <hwbinder/ProcessState.h>
 
-#include <atomic>
 #include <cstdlib>
 #include <thread>
 
@@ -37,11 +36,6 @@ std::unique_ptr<Driver> chooseDriver(Transport* transport) {
     }
     *transport = {"sockets", serverDirectory(), why};
     return std::make_unique<SocketDriver>();
-}
-
-std::atomic<int>& timeout() {
-    static std::atomic<int> milliseconds = 0;
-    return milliseconds;
 }
 
 }  // namespace
@@ -108,14 +102,6 @@ void ProcessState::sendObituary(uint32_t handle) {
         if (entry != mProxies.end()) proxy = entry->second.promote();
     }
     if (proxy != nullptr) proxy->remoteBinder()->sendObituary();
-}
-
-int callTimeout() {
-    return timeout();
-}
-
-void setCallTimeout(int milliseconds) {
-    timeout() = milliseconds;
 }
 
 }  // namespace android::hardware

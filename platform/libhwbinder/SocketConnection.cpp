@@ -1,10 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "SocketConnection.h"
 
+#include "Alarm.h"
 #include "Packet.h"
 #include "SocketServer.h"
-#include "SocketTimeLimit.h"
-#include "libutils/Uninterrupted.h"
 
 #include <sys/socket.h>
 #include <unistd.h>
@@ -97,7 +96,7 @@ ssize_t sendRequest(int socket, const Packet& packet) {
 }  // namespace
 
 SocketConnection::SocketConnection(UniqueFd socket, const SocketServer& watcher, uint32_t handle)
-    : mSocket(std::move(socket)), mWatcher(watcher), mHandle(handle), mTimeout(callTimeout()) {}
+    : mSocket(std::move(socket)), mWatcher(watcher), mHandle(handle) {}
 
 status_t SocketConnection::requestDeathNotice() {
     return mWatcher.watch(mHandle, mSocket.get()) ? OK : DEAD_OBJECT;
@@ -112,16 +111,14 @@ inline status_t SocketConnection::exchange(Packet* packet, bool oneway) {
     if (mIsDead) return DEAD_OBJECT;
     // Until the exchange has succeeded: a late reply must not be taken for that of the next call.
     mIsDead = true;
-    SocketTimeLimit limit(mSocket.get(), mTimeout);
-    const auto isTimeLeft = [&] { return limit.shorten(); };
-    const auto error = [] { return errno == EAGAIN || errno == EINTR ? TIMED_OUT : DEAD_OBJECT; };
-    if (uninterrupted([&] { return sendRequest(mSocket.get(), *packet); }, isTimeLeft) < 0) {
+    const Alarm alarm(callTimeout);
+    const auto error = [] { return errno == ETIMEDOUT ? TIMED_OUT : DEAD_OBJECT; };
+    if (alarm.uninterrupted([&] { return sendRequest(mSocket.get(), *packet); }) < 0) {
         return error();
     }
     if (!oneway) {
-        const ssize_t size = uninterrupted(
-                [&] { return recv(mSocket.get(), packet->bytes, Packet::kMaxSize, MSG_TRUNC); },
-                isTimeLeft);
+        const ssize_t size = alarm.uninterrupted(
+                [&] { return recv(mSocket.get(), packet->bytes, Packet::kMaxSize, MSG_TRUNC); });
         if (size < 0) return error();
         if (size == 0 || static_cast<size_t>(size) > Packet::kMaxSize) return DEAD_OBJECT;
         packet->size = static_cast<size_t>(size);

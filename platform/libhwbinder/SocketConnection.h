@@ -19,11 +19,7 @@ struct Packet;
  */
 class SocketConnection : public RemoteObject {
   public:
-    /**
-     * Each call may take as long as callTimeout() says now.
-     *
-     * @param watcher sends the obituary of the handle, if asked to.
-     */
+    /** @param watcher sends the obituary of the handle, if asked to. */
     SocketConnection(UniqueFd socket, const SocketServer& watcher, uint32_t handle);
 
     status_t transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags) override;
@@ -36,8 +32,6 @@ class SocketConnection : public RemoteObject {
     const UniqueFd mSocket;
     const SocketServer& mWatcher;
     const uint32_t mHandle;
-    /** How long a call may take, in ms; 0 without a limit. */
-    const int mTimeout;
     std::mutex mMutex;
     bool mIsDead = false;
 };

@@ -1,9 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "libhwbinder/SocketDirectory.h"
 
-#include "SocketTimeLimit.h"
+#include "Alarm.h"
 #include "libhwbinder/Driver.h"
-#include "libutils/Uninterrupted.h"
 
 #include <fcntl.h>
 #include <sys/socket.h>
@@ -179,16 +178,11 @@ Error SocketDirectory::connect(const std::string& name, UniqueFd* connection) co
     if (!error.isOk()) return error;
     UniqueFd socket(::socket(AF_UNIX, SOCK_SEQPACKET | SOCK_CLOEXEC, 0));
     if (!socket.isValid()) return Error::ofErrno({"no socket for ", mPath, "/", name});
-    const int limit = callTimeout();
-    SocketTimeLimit::set(socket.get(), std::chrono::milliseconds(limit));
-    SocketTimeLimit time(socket.get(), limit);
     // On a Unix socket an interrupted connect has not begun, and is simply called again.
-    const int result = uninterrupted(
-            [&] {
-                return ::connect(socket.get(), reinterpret_cast<const sockaddr*>(&address),
-                                 sizeof(address));
-            },
-            [&] { return time.shorten(); });
+    const int result = Alarm(callTimeout).uninterrupted([&] {
+        return ::connect(socket.get(), reinterpret_cast<const sockaddr*>(&address),
+                         sizeof(address));
+    });
     ucred server{};
     socklen_t size = sizeof(server);
     if (result != 0 || getsockopt(socket.get(), SOL_SOCKET, SO_PEERCRED, &server, &size) != 0) {

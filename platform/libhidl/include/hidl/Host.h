@@ -31,7 +31,7 @@ status_t findService(const std::string& interface, const std::string& instance,
 
 /**
  * Limits how long a call may take; one that takes longer fails with TIMED_OUT. Over sockets its
- * object then stays unusable, and the limit applies only to objects that are found afterwards.
+ * object then stays unusable.
  *
  * @param limit 0 for no limit, which is the default.
  */

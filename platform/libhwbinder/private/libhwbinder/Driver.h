@@ -8,6 +8,7 @@
 #include <hwbinder/Parcel.h>
 #include <utils/Errors.h>
 
+#include <atomic>
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -74,9 +75,8 @@ inline constexpr char kLogTag[] = "hwbinder";
 /** @return an environment variable; empty where it is not set. */
 std::string environment(const char* name);
 
-/** @return how long a call may take, in ms; 0 without a limit. */
-int callTimeout();
-void setCallTimeout(int milliseconds);
+/** How long a call may take, in ms; 0 without a limit. */
+inline std::atomic<int> callTimeout = 0;
 
 /** Sets this thread's caller while one of its calls is served. */
 class CallerIdentity {
