@@ -8,6 +8,7 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <cerrno>
 #include <cstring>
 #include <utility>
@@ -15,45 +16,20 @@
 namespace android::hardware {
 namespace {
 
-/** A packet, and the next of those that this thread has no use for now. */
-struct SparePacket : Packet {
-    SparePacket* next;
-};
+/** One that no call uses now, so that most calls need no memory from the heap. */
+std::atomic<Packet*> sSpare = nullptr;
 
-/** Most calls need no memory from the heap. */
-thread_local SparePacket* spare = nullptr;
-/** Set when this thread has deleted its spare packets: what is destroyed later may still call. */
-thread_local bool areSparesGone = false;
-
-struct SparesEnd {
-    ~SparesEnd() {
-        areSparesGone = true;
-        while (spare != nullptr)
-            delete std::exchange(spare, spare->next);
-    }
-};
-
-SparePacket* newPacket() {
-    static thread_local const SparesEnd end;
-    return new SparePacket;
+Packet* takePacket() {
+    Packet* packet = sSpare.exchange(nullptr);
+    return packet == nullptr ? new Packet : packet;
 }
 
-SparePacket* takePacket() {
-    return spare == nullptr ? newPacket() : std::exchange(spare, spare->next);
-}
-
-void giveBack(const uint8_t* /* bytes */, void* owner) {
-    auto* packet = static_cast<SparePacket*>(owner);
-    if (areSparesGone) {
-        delete packet;
-        return;
-    }
-    packet->next = spare;
-    spare = packet;
+void giveBack(const uint8_t* /* bytes */, void* packet) {
+    delete sSpare.exchange(static_cast<Packet*>(packet));
 }
 
 /** Makes a parcel of a reply. @return OK, or the status that the object has answered instead. */
-status_t take(SparePacket* packet, Parcel* reply) {
+status_t take(Packet* packet, Parcel* reply) {
     Packet::Header header;
     status_t status = packet->unpack(&header, reply, giveBack, packet);
     if (status != OK) {
@@ -129,7 +105,7 @@ inline status_t SocketConnection::exchange(Packet* packet, bool oneway) {
 
 status_t SocketConnection::transact(uint32_t code, const Parcel& data, Parcel* reply,
                                     uint32_t flags) {
-    SparePacket* packet = takePacket();
+    Packet* packet = takePacket();
     const bool oneway = (flags & IBinder::FLAG_ONEWAY) != 0;
     status_t status = packet->pack(code, flags, data);
     if (status == OK) status = exchange(packet, oneway);
