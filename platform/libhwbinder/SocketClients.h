@@ -39,16 +39,14 @@ class ConnectionLimits {
 
 /** What a loop waits for. */
 struct EventSource {
-    enum class Kind { kWake, kDeaths, kListener, kClient };
-    explicit EventSource(Kind what) : kind(what) {}
-    const Kind kind;
+    const bool isClient = false;
 };
 
 struct SocketUser;
 
 /** A client's connection. */
 struct SocketClient : EventSource {
-    SocketClient() : EventSource(Kind::kClient) {}
+    SocketClient() : EventSource{true} {}
 
     UniqueFd socket;
     /** What it is connected to. */

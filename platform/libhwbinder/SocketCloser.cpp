@@ -3,22 +3,13 @@
 
 #include <sys/eventfd.h>
 
+#include <thread>
 #include <utility>
 
 namespace android::hardware {
 
-SocketCloser::~SocketCloser() {
-    if (!mThread.joinable()) return;
-    {
-        const std::lock_guard<std::mutex> lock(mMutex);
-        mIsEnding = true;
-    }
-    mHasWork.notify_one();
-    mThread.join();
-}
-
 void SocketCloser::start() {
-    if (!mThread.joinable()) mThread = std::thread([this] { run(); });
+    std::thread([this] { run(); }).detach();
 }
 
 void SocketCloser::close(SocketClient* client) {
@@ -35,8 +26,7 @@ std::vector<SocketClient*> SocketCloser::takeClosed() {
 void SocketCloser::run() {
     std::unique_lock<std::mutex> lock(mMutex);
     for (;;) {
-        mHasWork.wait(lock, [this] { return mIsEnding || !mToClose.empty(); });
-        if (mIsEnding) return;
+        mHasWork.wait(lock, [this] { return !mToClose.empty(); });
         SocketClient* client = mToClose.back();
         mToClose.pop_back();
         lock.unlock();

@@ -5,24 +5,20 @@
 
 #include <condition_variable>
 #include <mutex>
-#include <thread>
 #include <vector>
 
 namespace android::hardware {
 
 /**
  * Closes connections in a thread of its own. Descriptors that a client has sent along are closed
- * with its connection, and to close one may take seconds.
+ * with its connection, and to close one may take seconds. Lives as long as its process.
  */
 class SocketCloser {
   public:
     /** @param wake an eventfd that is written to after each connection. */
     explicit SocketCloser(int wake) : mWake(wake) {}
-    ~SocketCloser();
-    SocketCloser(const SocketCloser&) = delete;
-    SocketCloser& operator=(const SocketCloser&) = delete;
 
-    /** Starts the thread, unless it runs. */
+    /** Starts the thread, which never ends. */
     void start();
     /** Begins to close the connection of a client, which lives until it is taken back. */
     void close(SocketClient* client);
@@ -33,10 +29,8 @@ class SocketCloser {
     void run();
 
     const int mWake;
-    std::thread mThread;
     std::mutex mMutex;
     std::condition_variable mHasWork;
-    bool mIsEnding = false;
     std::vector<SocketClient*> mToClose;
     std::vector<SocketClient*> mClosed;
 };

@@ -3,8 +3,8 @@
 
 #include "Alarm.h"
 #include "Packet.h"
-#include "SocketServer.h"
 
+#include <sys/epoll.h>
 #include <sys/socket.h>
 #include <unistd.h>
 
@@ -71,15 +71,16 @@ ssize_t sendRequest(int socket, const Packet& packet) {
 
 }  // namespace
 
-SocketConnection::SocketConnection(UniqueFd socket, const SocketServer& watcher, uint32_t handle)
-    : mSocket(std::move(socket)), mWatcher(watcher), mHandle(handle) {}
-
 status_t SocketConnection::requestDeathNotice() {
-    return mWatcher.watch(mHandle, mSocket.get()) ? OK : DEAD_OBJECT;
+    epoll_event event{};
+    // A death is news only once.
+    event.events = EPOLLRDHUP | EPOLLONESHOT;
+    event.data.u32 = mHandle;
+    return epoll_ctl(mDeaths, EPOLL_CTL_ADD, mSocket.get(), &event) == 0 ? OK : DEAD_OBJECT;
 }
 
 void SocketConnection::clearDeathNotice() {
-    mWatcher.unwatch(mSocket.get());
+    epoll_ctl(mDeaths, EPOLL_CTL_DEL, mSocket.get(), nullptr);
 }
 
 inline status_t SocketConnection::exchange(Packet* packet, bool oneway) {

@@ -7,10 +7,10 @@
 
 #include <cstdint>
 #include <mutex>
+#include <utility>
 
 namespace android::hardware {
 
-class SocketServer;
 struct Packet;
 
 /**
@@ -19,8 +19,9 @@ struct Packet;
  */
 class SocketConnection : public RemoteObject {
   public:
-    /** @param watcher sends the obituary of the handle, if asked to. */
-    SocketConnection(UniqueFd socket, const SocketServer& watcher, uint32_t handle);
+    /** @param deaths the epoll that tells of the end of connections, by their handles. */
+    SocketConnection(UniqueFd socket, int deaths, uint32_t handle)
+        : mSocket(std::move(socket)), mDeaths(deaths), mHandle(handle) {}
 
     status_t transact(uint32_t code, const Parcel& data, Parcel* reply, uint32_t flags) override;
     status_t requestDeathNotice() override;
@@ -30,7 +31,7 @@ class SocketConnection : public RemoteObject {
     status_t exchange(Packet* packet, bool oneway);
 
     const UniqueFd mSocket;
-    const SocketServer& mWatcher;
+    const int mDeaths;
     const uint32_t mHandle;
     std::mutex mMutex;
     bool mIsDead = false;

@@ -7,10 +7,7 @@
 
 namespace android::hardware {
 
-SocketDriver::SocketDriver()
-    : mServer(std::make_unique<SocketServer>()), mDirectory(serverDirectory()) {}
-
-SocketDriver::~SocketDriver() = default;
+SocketDriver::SocketDriver() : mServer(*new SocketServer), mDirectory(serverDirectory()) {}
 
 std::unique_ptr<RemoteObject> SocketDriver::open(uint32_t handle) {
     const std::lock_guard<std::mutex> lock(mMutex);
@@ -19,7 +16,7 @@ std::unique_ptr<RemoteObject> SocketDriver::open(uint32_t handle) {
 }
 
 void SocketDriver::serve() {
-    mServer->serve();
+    mServer.serve();
 }
 
 std::string SocketDriver::name() const {
@@ -43,8 +40,8 @@ Error SocketDriver::connect(const std::string& interface, const std::string& ins
             const std::lock_guard<std::mutex> lock(mMutex);
             mDirectory = path;
             *handle = ++mLastHandle;
-            mConnections[*handle] =
-                    std::make_unique<SocketConnection>(std::move(socket), *mServer, *handle);
+            mConnections[*handle] = std::make_unique<SocketConnection>(std::move(socket),
+                                                                       mServer.deaths(), *handle);
             return error;
         }
         whyNot += (whyNot.empty() ? "" : "; ") + error.text();
@@ -54,7 +51,7 @@ Error SocketDriver::connect(const std::string& interface, const std::string& ins
 
 bool SocketDriver::publish(const sp<BHwBinder>& object, const std::vector<std::string>& chain,
                            const std::string& instance) {
-    return mServer->add({object, chain, instance});
+    return mServer.add({object, chain, instance});
 }
 
 }  // namespace android::hardware

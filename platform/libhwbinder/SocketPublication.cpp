@@ -1,16 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "SocketPublication.h"
 
-#include "libhwbinder/Driver.h"
 #include "libhwbinder/SocketDirectory.h"
 
-#include <android/log.h>
 #include <fcntl.h>
 #include <sys/file.h>
 #include <sys/socket.h>
 #include <sys/stat.h>
 
-#include <algorithm>
 #include <cstdio>
 #include <string_view>
 #include <utility>
@@ -21,9 +18,6 @@ namespace {
 /** Ends of the names of the files beside a service's socket. */
 constexpr char kTemporary[] = "~";
 constexpr char kLock[] = ".lock";
-
-/** Longest time between two tries to get a name that another process has, in ms. */
-constexpr int kMaxRetry = 256;
 
 #ifdef SO_PASSRIGHTS
 constexpr int kPassRights = SO_PASSRIGHTS;
@@ -130,9 +124,6 @@ bool ListeningSocket::mayBringDescriptors() const {
 }
 
 Error listenUnderNames(const SocketPublication& publication, ListeningSocket* listener) {
-    // The umask is the whole process's: two that change it at once could leave it changed.
-    static std::mutex mutex;
-    const std::lock_guard<std::mutex> one(mutex);
     const std::string name = publication.name();
     SocketDirectory directory;
     ListeningSocket made;
@@ -146,28 +137,6 @@ Error listenUnderNames(const SocketPublication& publication, ListeningSocket* li
     if (error.isOk()) error = listenAt(directory, name, &made.socket);
     if (error.isOk()) *listener = std::move(made);
     return error;
-}
-
-void PendingPublications::add(const SocketPublication& publication) {
-    const std::lock_guard<std::mutex> lock(mMutex);
-    mPending.push_back(publication);
-    mIsEmpty = false;
-}
-
-int PendingPublications::retry(
-        FunctionRef<void(const SocketPublication&, ListeningSocket)> listen) {
-    const std::lock_guard<std::mutex> lock(mMutex);
-    const auto hasItsNames = [&](const SocketPublication& each) {
-        ListeningSocket listener;
-        if (!listenUnderNames(each, &listener).isOk()) return false;
-        __android_log_print(ANDROID_LOG_INFO, kLogTag, "%s is registered now", each.name().c_str());
-        listen(each, std::move(listener));
-        return true;
-    };
-    mPending.erase(std::remove_if(mPending.begin(), mPending.end(), hasItsNames), mPending.end());
-    mRetryAfter = std::min(2 * mRetryAfter, kMaxRetry);
-    mIsEmpty = mPending.empty();
-    return mIsEmpty ? -1 : mRetryAfter;
 }
 
 }  // namespace android::hardware

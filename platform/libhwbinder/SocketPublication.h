@@ -4,11 +4,8 @@
 #include "libutils/Error.h"
 
 #include <hwbinder/Binder.h>
-#include <utils/FunctionRef.h>
 #include <utils/UniqueFd.h>
 
-#include <atomic>
-#include <mutex>
 #include <string>
 #include <vector>
 
@@ -36,30 +33,10 @@ struct ListeningSocket {
 };
 
 /**
- * Makes the socket of an object, and the links to it.
+ * Makes the socket of an object, and the links to it; not for two threads at once.
  *
  * @return OK; an error of the code -EWOULDBLOCK if another process has the name.
  */
 Error listenUnderNames(const SocketPublication& publication, ListeningSocket* listener);
-
-/** Objects that wait until the processes that have their names have gone. */
-class PendingPublications {
-  public:
-    bool isEmpty() const { return mIsEmpty; }
-    void add(const SocketPublication& publication);
-    /**
-     * Tries again: soon at first, since the process that has a name may be ending.
-     *
-     * @param listen gets what has its names now.
-     * @return the time until the next try, in ms; -1 if there is nothing left.
-     */
-    int retry(FunctionRef<void(const SocketPublication&, ListeningSocket)> listen);
-
-  private:
-    std::mutex mMutex;
-    std::vector<SocketPublication> mPending;
-    std::atomic<bool> mIsEmpty = true;
-    int mRetryAfter = 1;
-};
 
 }  // namespace android::hardware

@@ -22,6 +22,8 @@ namespace {
 /** New connections between two rounds of calls, so that a flood of them does not delay calls. */
 constexpr int kMaxAcceptedAtOnce = 128;
 constexpr int kMaxEventsAtOnce = 1024;
+/** Longest time between two tries to get a name that another process has, in ms. */
+constexpr int kMaxRetry = 256;
 
 size_t descriptorLimit() {
     rlimit limit{};
@@ -108,6 +110,7 @@ bool SocketServer::waitFor(EventSource* source, int descriptor, uint32_t events)
 }
 
 bool SocketServer::add(const SocketPublication& publication) {
+    const std::lock_guard<std::mutex> lock(mMutex);
     ListeningSocket socket;
     const Error error = listenUnderNames(publication, &socket);
     if (error.isOk()) return listen(publication.object, std::move(socket));
@@ -115,34 +118,34 @@ bool SocketServer::add(const SocketPublication& publication) {
     __android_log_print(ANDROID_LOG_ERROR, kLogTag, "%s is not registered%s: %s",
                         publication.name().c_str(), isTaken ? " yet" : "", error.text().c_str());
     if (isTaken) {
-        mPending.add(publication);
+        mPending.push_back(publication);
+        // Soon: the process that has the name may be ending.
+        mRetryAfter = 1;
         // The loop may be waiting without an end.
         eventfd_write(mWakeEvent.get(), 1);
     }
     return false;
 }
 
-bool SocketServer::listen(const sp<BHwBinder>& object, ListeningSocket socket) {
+/** Tries again to get the names of what waits. @return the time until the next try, in ms. */
+int SocketServer::retry() {
     const std::lock_guard<std::mutex> lock(mMutex);
-    if (socket.mayBringDescriptors()) {
-        mMayBringDescriptors = true;
-        mCloser.start();
-    }
-    Listener& listener = mListeners.emplace_back(
-            Listener{EventSource(EventSource::Kind::kListener), std::move(socket), object});
+    const auto hasItsNames = [this](const SocketPublication& each) {
+        ListeningSocket socket;
+        if (!listenUnderNames(each, &socket).isOk()) return false;
+        __android_log_print(ANDROID_LOG_INFO, kLogTag, "%s is registered now", each.name().c_str());
+        listen(each.object, std::move(socket));
+        return true;
+    };
+    mPending.erase(std::remove_if(mPending.begin(), mPending.end(), hasItsNames), mPending.end());
+    mRetryAfter = mPending.empty() ? -1 : std::min(2 * mRetryAfter, kMaxRetry);
+    return mRetryAfter;
+}
+
+bool SocketServer::listen(const sp<BHwBinder>& object, ListeningSocket socket) {
+    if (socket.mayBringDescriptors() && !mMayBringDescriptors.exchange(true)) mCloser.start();
+    Listener& listener = mListeners.emplace_back(Listener{{}, std::move(socket), object});
     return waitFor(&listener, listener.socket.socket.get(), EPOLLIN);
-}
-
-bool SocketServer::watch(uint32_t handle, int connection) const {
-    epoll_event event{};
-    // A death is news only once.
-    event.events = EPOLLRDHUP | EPOLLONESHOT;
-    event.data.u32 = handle;
-    return epoll_ctl(mDeathEpoll.get(), EPOLL_CTL_ADD, connection, &event) == 0;
-}
-
-void SocketServer::unwatch(int connection) const {
-    epoll_ctl(mDeathEpoll.get(), EPOLL_CTL_DEL, connection, nullptr);
 }
 
 void SocketServer::sendObituaries() const {
@@ -163,11 +166,8 @@ void SocketServer::serve() {
     }
     mRequest = std::make_unique<Packet>();
     mReply = std::make_unique<Packet>();
-    const auto start = [this](const SocketPublication& publication, ListeningSocket socket) {
-        listen(publication.object, std::move(socket));
-    };
     for (;;) {
-        const int timeout = mPending.isEmpty() ? -1 : mPending.retry(start);
+        const int timeout = mRetryAfter < 0 ? -1 : retry();
         if (!collect(mClients.turns() == 0 ? timeout : 0)) return;
         serveOneOfEach();
     }
@@ -181,7 +181,7 @@ bool SocketServer::collect(int timeout) {
     int others = 0;
     for (int i = 0; i < count; ++i) {
         auto* source = static_cast<EventSource*>(events[i].data.ptr);
-        if (source->kind == EventSource::Kind::kClient) {
+        if (source->isClient) {
             handle(static_cast<SocketClient*>(source), events[i].events);
         } else {
             events[others++] = events[i];

@@ -10,15 +10,16 @@
 #include <utils/UniqueFd.h>
 
 #include <atomic>
-#include <cstdint>
 #include <list>
 #include <memory>
 #include <mutex>
+#include <vector>
 
 namespace android::hardware {
 
 /**
- * Serves the clients of this process's objects with one thread, one call at a time.
+ * Serves the clients of this process's objects with one thread, one call at a time. Lives as long
+ * as the process.
  *
  * SocketClients says whose turn it is and who gives way. The server never waits for a client: one
  * that does not read its replies loses its connection. What a client has closed itself is gone
@@ -37,9 +38,8 @@ class SocketServer {
     /** Serves calls until that becomes impossible. */
     void serve();
 
-    /** Sends the obituary of a handle when the other side of its connection closes. */
-    bool watch(uint32_t handle, int connection) const;
-    void unwatch(int connection) const;
+    /** @return an epoll. When it tells of a handle, serve sends its obituary. */
+    int deaths() const { return mDeathEpoll.get(); }
 
   private:
     struct Listener : EventSource {
@@ -48,6 +48,7 @@ class SocketServer {
     };
 
     bool listen(const sp<BHwBinder>& object, ListeningSocket socket);
+    int retry();
     bool waitFor(EventSource* source, int descriptor, uint32_t events) const;
     bool collect(int timeout);
     void handle(SocketClient* client, uint32_t events);
@@ -66,14 +67,17 @@ class SocketServer {
     const UniqueFd mDeathEpoll;
     const UniqueFd mWakeEvent;
     UniqueFd mSpare;
-    EventSource mDeaths{EventSource::Kind::kDeaths};
-    EventSource mWake{EventSource::Kind::kWake};
+    EventSource mDeaths;
+    EventSource mWake;
     SocketClients mClients;
     SocketCloser mCloser;
-    PendingPublications mPending;
-    /** Guards the listeners, to which others may add while calls are served. */
+    /** Guards what others may add to while calls are served. */
     std::mutex mMutex;
     std::list<Listener> mListeners;
+    /** What waits until the processes that have its names have gone. */
+    std::vector<SocketPublication> mPending;
+    /** When that is to be tried again, in ms; -1 if there is nothing. */
+    std::atomic<int> mRetryAfter = -1;
     /** Whether the kernel lets clients send descriptors. */
     std::atomic<bool> mMayBringDescriptors = false;
     std::unique_ptr<Packet> mRequest;

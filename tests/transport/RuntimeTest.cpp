@@ -2,7 +2,6 @@
 #include "libhwbinder/KernelDriver.h"
 #include "libhwbinder/Packet.h"
 #include "libhwbinder/SocketConnection.h"
-#include "libhwbinder/SocketServer.h"
 #include "support/LogCapture.h"
 #include "support/TransportTest.h"
 #include "transport/RawClient.h"
@@ -108,14 +107,13 @@ TEST_F(RuntimeTest, ObjectThatHasGoneIsNotGivenAgain) {
 }
 
 TEST(SocketConnectionTest, WrongReplyIsAFailureAndAnEndOrOneThatIsTooLargeADeath) {
-    const android::hardware::SocketServer server;
     android::hardware::Packet packet;
     packet.packStatus(android::OK);
     const std::string success(reinterpret_cast<const char*>(packet.bytes), packet.size);
     for (const std::string& last : {std::string(), std::string(packet.kMaxSize + 1, '\0')}) {
         int sockets[2];
         ASSERT_EQ(socketpair(AF_UNIX, SOCK_SEQPACKET, 0, sockets), 0);
-        android::hardware::SocketConnection connection(android::UniqueFd{sockets[0]}, server, 0);
+        android::hardware::SocketConnection connection(android::UniqueFd{sockets[0]}, -1, 0);
         android::hardware::Parcel reply;
         for (const std::string& wrong : {success, std::string(17, '\0')}) {
             ASSERT_GT(send(sockets[1], wrong.data(), wrong.size(), 0), 0);

@@ -17,7 +17,6 @@ class SocketServer;
 class SocketDriver : public Driver {
   public:
     SocketDriver();
-    ~SocketDriver() override;
 
     std::unique_ptr<RemoteObject> open(uint32_t handle) override;
     void serve() override;
@@ -44,7 +43,7 @@ class SocketDriver : public Driver {
                  const std::string& instance);
 
   private:
-    const std::unique_ptr<SocketServer> mServer;
+    SocketServer& mServer;
     mutable std::mutex mMutex;
     std::string mDirectory;
     uint32_t mLastHandle = 0;
