@@ -17,11 +17,17 @@ namespace {
  */
 constexpr uint32_t kTransactionPendingFrozen = _IO('r', 20);
 
-/** Gives a buffer of the mapping back to the kernel. */
-void release(const uint8_t* data, void* thread) {
-    // Any thread may give it back, not only the one that has received it.
-    (void)thread;
+/** Gives a buffer of the mapping back to the kernel. Any thread may do that. */
+void release(const uint8_t* data, void* /* owner */) {
     KernelThread::self().queue(BC_FREE_BUFFER, reinterpret_cast<binder_uintptr_t>(data));
+}
+
+/** Makes a parcel of what has been received, which gives it back in the end. */
+void take(const binder_transaction_data& received, Parcel* parcel) {
+    parcel->ipcSetDataReference(reinterpret_cast<const uint8_t*>(received.data.ptr.buffer),
+                                received.data_size,
+                                reinterpret_cast<const binder_size_t*>(received.data.ptr.offsets),
+                                received.offsets_size / sizeof(binder_size_t), release, nullptr);
 }
 
 }  // namespace
@@ -90,30 +96,24 @@ T KernelThread::argument() {
 }
 
 void KernelThread::queueTransaction(uint32_t command, uint32_t handle, uint32_t code,
-                                    const Parcel& data, uint32_t flags, const status_t* status) {
+                                    const Parcel& data, uint32_t flags) {
     binder_transaction_data_sg outgoing{};
     binder_transaction_data& call = outgoing.transaction_data;
     call.target.handle = handle;
     call.code = code;
     call.flags = flags;
-    if (status != nullptr) {
-        call.flags |= TF_STATUS_CODE;
-        call.data_size = sizeof(*status);
-        call.data.ptr.buffer = reinterpret_cast<binder_uintptr_t>(status);
-    } else {
-        call.data_size = data.dataSize();
-        call.data.ptr.buffer = reinterpret_cast<binder_uintptr_t>(data.data());
-        call.offsets_size = data.offsetCount() * sizeof(binder_size_t);
-        call.data.ptr.offsets = reinterpret_cast<binder_uintptr_t>(data.offsets());
-        outgoing.buffers_size = data.buffersSize();
-    }
+    call.data_size = data.dataSize();
+    call.data.ptr.buffer = reinterpret_cast<binder_uintptr_t>(data.data());
+    call.offsets_size = data.offsetCount() * sizeof(binder_size_t);
+    call.data.ptr.offsets = reinterpret_cast<binder_uintptr_t>(data.offsets());
+    outgoing.buffers_size = data.buffersSize();
     queue(command, outgoing);
 }
 
 status_t KernelThread::transact(uint32_t handle, uint32_t code, const Parcel& data, Parcel* reply,
                                 uint32_t flags) {
     // No TF_ACCEPT_FDS: a reply with descriptors is refused by the kernel.
-    queueTransaction(BC_TRANSACTION_SG, handle, code, data, flags, nullptr);
+    queueTransaction(BC_TRANSACTION_SG, handle, code, data, flags);
     const bool oneway = (flags & IBinder::FLAG_ONEWAY) != 0;
     const Alarm alarm(callTimeout);
     const Alarm* const before = std::exchange(mAlarm, &alarm);
@@ -142,32 +142,15 @@ status_t KernelThread::waitFor(Until until, Parcel* reply) {
             case BR_FROZEN_REPLY:
                 if (until != Until::kForEver) return FAILED_TRANSACTION;
                 break;
-            case BR_REPLY:
-                return takeReply(argument<binder_transaction_data>(), reply);
+            case BR_REPLY: {
+                const auto received = argument<binder_transaction_data>();
+                take(received, reply);
+                return statusOf(*reply, received.flags);
+            }
             default:
                 handle(command);
         }
     }
-}
-
-status_t KernelThread::takeReply(const binder_transaction_data& received, Parcel* reply) {
-    const auto* data = reinterpret_cast<const uint8_t*>(received.data.ptr.buffer);
-    if ((received.flags & TF_STATUS_CODE) != 0) {
-        status_t status = UNKNOWN_ERROR;
-        if (received.data_size >= sizeof(status)) memcpy(&status, data, sizeof(status));
-        giveBack(received);
-        return status;
-    }
-    Parcel unwanted;
-    (reply == nullptr ? &unwanted : reply)
-            ->ipcSetDataReference(data, received.data_size,
-                                  reinterpret_cast<const binder_size_t*>(received.data.ptr.offsets),
-                                  received.offsets_size / sizeof(binder_size_t), release, nullptr);
-    return OK;
-}
-
-void KernelThread::giveBack(const binder_transaction_data& received) {
-    queue(BC_FREE_BUFFER, received.data.ptr.buffer);
 }
 
 void KernelThread::handle(uint32_t command) {
@@ -205,33 +188,19 @@ void KernelThread::handle(uint32_t command) {
     }
 }
 
-void KernelThread::sendReply(const Parcel& data, const status_t* status) {
-    queueTransaction(BC_REPLY_SG, 0, 0, data, 0, status);
-    waitFor(Until::kCompletion, nullptr);
-}
-
 void KernelThread::serveCall(const binder_transaction_data& received) {
-    const auto* bytes = reinterpret_cast<const uint8_t*>(received.data.ptr.buffer);
-    Parcel data;
-    data.ipcSetDataReference(bytes, received.data_size,
-                             reinterpret_cast<const binder_size_t*>(received.data.ptr.offsets),
-                             received.offsets_size / sizeof(binder_size_t), release, nullptr);
+    Parcel arguments;
+    take(received, &arguments);
     const sp<BHwBinder> object =
             received.target.ptr == 0 ? mDriver.mContextManager
                                      : sp<BHwBinder>(reinterpret_cast<BHwBinder*>(received.cookie));
     const CallerIdentity caller(received.sender_euid, received.sender_pid);
-    const bool oneway = (received.flags & TF_ONE_WAY) != 0;
-
-    Parcel reply;
-    bool replied = false;
-    const auto send = [&](Parcel& results) {
-        if (!oneway && !replied) sendReply(results, nullptr);
-        replied = true;
-    };
-    const status_t status = object->BHwBinder::transact(received.code, data, &reply,
-                                                        received.flags & TF_ONE_WAY, send);
-    if (oneway || replied) return;
-    sendReply(reply, status == OK ? nullptr : &status);
+    Parcel results;
+    answerCall(*object, received.code, arguments, received.flags, &results,
+               [this](const Parcel& reply, uint32_t flags) {
+                   queueTransaction(BC_REPLY_SG, 0, 0, reply, flags);
+                   waitFor(Until::kCompletion, nullptr);
+               });
 }
 
 void KernelThread::serve() {

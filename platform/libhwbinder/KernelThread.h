@@ -47,12 +47,9 @@ class KernelThread {
     template <typename T>
     T argument();
     void queueTransaction(uint32_t command, uint32_t handle, uint32_t code, const Parcel& data,
-                          uint32_t flags, const status_t* status);
-    status_t takeReply(const binder_transaction_data& received, Parcel* reply);
+                          uint32_t flags);
     void handle(uint32_t command);
     void serveCall(const binder_transaction_data& received);
-    void sendReply(const Parcel& data, const status_t* status);
-    void giveBack(const binder_transaction_data& received);
 
     KernelDriver& mDriver;
     /** Outside calls. */

@@ -31,15 +31,10 @@ void giveBack(const uint8_t* /* bytes */, void* packet) {
 /** Makes a parcel of a reply. @return OK, or the status that the object has answered instead. */
 status_t take(Packet* packet, Parcel* reply) {
     Packet::Header header;
-    status_t status = packet->unpack(&header, reply, giveBack, packet);
-    if (status != OK) {
-        giveBack(nullptr, packet);
-        return status;
-    }
-    if ((header.flags & TF_STATUS_CODE) == 0) return OK;
-    const status_t read = reply->readInt32(&status);
-    reply->clear();
-    return read == OK && status != OK ? status : FAILED_TRANSACTION;
+    const status_t status = packet->unpack(&header, reply, giveBack, packet);
+    if (status == OK) return statusOf(*reply, header.flags);
+    giveBack(nullptr, packet);
+    return status;
 }
 
 /**

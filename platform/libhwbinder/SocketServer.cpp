@@ -223,37 +223,26 @@ bool SocketServer::serveCall(SocketClient* client) {
     ucred caller{};
     if (!receive(socket, mRequest.get(), &caller)) return false;
 
-    Packet::Header header;
-    status_t status = mRequest->unpack(&header, &mArguments);
-    // The header of a malformed packet cannot be trusted, nor its oneway flag: it gets an answer.
-    const bool oneway = status == OK && (header.flags & TF_ONE_WAY) != 0;
     bool isAlive = true;
-    bool replied = oneway;
-    const auto send = [&](Parcel& parcel) {
-        if (replied) return;
-        replied = true;
-        const status_t packed = mReply->pack(0, 0, parcel);
-        if (packed != OK) mReply->packStatus(packed);
-        isAlive = reply(socket);
+    const auto reply = [&](const Parcel& parcel, uint32_t flags) {
+        const status_t status = mReply->pack(0, flags, parcel);
+        if (status != OK) mReply->packStatus(status);
+        // Never waits: a client that does not read its replies is dropped.
+        isAlive = send(socket, mReply->bytes, mReply->size, MSG_DONTWAIT | MSG_NOSIGNAL) >= 0;
     };
+    Packet::Header header;
+    const status_t status = mRequest->unpack(&header, &mArguments);
     if (status == OK) {
         const CallerIdentity identity(caller.uid, caller.pid);
-        status = client->object->BHwBinder::transact(header.code, mArguments, &mResults,
-                                                     header.flags & TF_ONE_WAY, send);
-    }
-    if (!replied && status == OK) send(mResults);
-    if (!replied) {
-        mReply->packStatus(status);
-        isAlive = reply(socket);
+        answerCall(*client->object, header.code, mArguments, header.flags, &mResults, reply);
+    } else {
+        // Its header cannot be trusted, nor its oneway flag: it gets an answer.
+        mResults.writeInt32(status);
+        reply(mResults, TF_STATUS_CODE);
     }
     mArguments.clear();
     mResults.clear();
     return isAlive;
-}
-
-bool SocketServer::reply(int socket) {
-    // Never waits: a client that does not read its replies is dropped.
-    return send(socket, mReply->bytes, mReply->size, MSG_DONTWAIT | MSG_NOSIGNAL) >= 0;
 }
 
 void SocketServer::acceptAll(const Listener& listener) {

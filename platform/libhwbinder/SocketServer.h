@@ -55,7 +55,6 @@ class SocketServer {
     void sendObituaries() const;
     void serveOneOfEach();
     bool serveCall(SocketClient* client);
-    bool reply(int socket);
 
     void acceptAll(const Listener& listener);
     void admit(UniqueFd socket, uid_t uid, const sp<BHwBinder>& object);

@@ -12,6 +12,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <utility>
 
 namespace android::hardware {
 
@@ -93,5 +94,36 @@ class CallerIdentity {
     IPCThreadState* const mThread;
     const int64_t mBefore;
 };
+
+/**
+ * Has an object answer a call.
+ *
+ * @param results room for them, empty.
+ * @param reply sends a parcel, with its flags; called once, and for no oneway call.
+ */
+template <typename Reply>
+void answerCall(BHwBinder& object, uint32_t code, const Parcel& arguments, uint32_t flags,
+                Parcel* results, Reply reply) {
+    bool replied = (flags & TF_ONE_WAY) != 0;
+    const auto send = [&](const Parcel& parcel) {
+        if (!std::exchange(replied, true)) reply(parcel, 0);
+    };
+    const status_t status =
+            object.BHwBinder::transact(code, arguments, results, flags & TF_ONE_WAY, send);
+    if (status == OK) return send(*results);
+    if (replied) return;
+    results->clear();
+    results->writeInt32(status);
+    reply(*results, TF_STATUS_CODE);
+}
+
+/** @return OK, or the status that a received reply has in place of results. */
+inline status_t statusOf(Parcel& reply, uint32_t flags) {
+    if ((flags & TF_STATUS_CODE) == 0) return OK;
+    status_t status = OK;
+    const status_t read = reply.readInt32(&status);
+    reply.clear();
+    return read == OK && status != OK ? status : FAILED_TRANSACTION;
+}
 
 }  // namespace android::hardware
