@@ -6,19 +6,22 @@
 namespace android::hardware {
 namespace {
 
-/** @return whether the place of an object's address is in its parent's buffer. */
-bool isWithin(const binder_buffer_object& parent, const binder_buffer_object& object) {
-    return object.parent_offset <= parent.length &&
-           sizeof(object.buffer) <= parent.length - object.parent_offset;
-}
-
-/** Writes an object's address into its parent's buffer. @return whether the place is in there. */
-bool setAddress(const uint8_t* parentObject, const binder_buffer_object& object) {
+/**
+ * Writes an object's address into its parent's buffer.
+ *
+ * @param base what the parent has the place of its buffer from.
+ * @return whether the place of the address is in there.
+ */
+bool setAddress(const uint8_t* parentObject, const binder_buffer_object& object,
+                binder_uintptr_t base, binder_uintptr_t address) {
     binder_buffer_object parent;
     memcpy(&parent, parentObject, sizeof(parent));
-    if (!isWithin(parent, object)) return false;
-    memcpy(reinterpret_cast<uint8_t*>(parent.buffer) + object.parent_offset, &object.buffer,
-           sizeof(object.buffer));
+    if (object.parent_offset > parent.length ||
+        sizeof(address) > parent.length - object.parent_offset) {
+        return false;
+    }
+    memcpy(reinterpret_cast<uint8_t*>(base + parent.buffer) + object.parent_offset, &address,
+           sizeof(address));
     return true;
 }
 
@@ -42,20 +45,13 @@ bool isInOrder(const uint8_t* data, const binder_size_t* offsets, size_t index,
 
 }  // namespace
 
-bool Packet::clearAddress(size_t parentObject, const binder_buffer_object& object) {
-    binder_buffer_object parent;
-    memcpy(&parent, bytes + sizeof(Header) + parentObject, sizeof(parent));
-    if (!isWithin(parent, object)) return false;
-    memset(bytes + parent.buffer + object.parent_offset, 0, sizeof(object.buffer));
-    return true;
-}
-
 status_t Packet::packObjects(const Parcel& parcel) {
     if (!append(parcel.offsets(), parcel.offsetCount() * sizeof(binder_size_t))) {
         return FAILED_TRANSACTION;
     }
+    uint8_t* const data = bytes + sizeof(Header);
     for (size_t i = 0; i < parcel.offsetCount(); ++i) {
-        uint8_t* place = bytes + sizeof(Header) + parcel.offsets()[i];
+        uint8_t* place = data + parcel.offsets()[i];
         binder_buffer_object object;
         memcpy(&object.hdr, place, sizeof(object.hdr));
         if (object.hdr.type != BINDER_TYPE_PTR) return FAILED_TRANSACTION;
@@ -69,7 +65,8 @@ status_t Packet::packObjects(const Parcel& parcel) {
         object.buffer = at;
         memcpy(place, &object, sizeof(object));
         if ((object.flags & BINDER_BUFFER_FLAG_HAS_PARENT) != 0 &&
-            (object.parent >= i || !clearAddress(parcel.offsets()[object.parent], object))) {
+            (object.parent >= i || !setAddress(data + parcel.offsets()[object.parent], object,
+                                               reinterpret_cast<binder_uintptr_t>(bytes), 0))) {
             return FAILED_TRANSACTION;
         }
     }
@@ -110,7 +107,7 @@ bool Packet::relocate(const Header& header) {
         memcpy(data + offset, &object, sizeof(object));
         if ((object.flags & BINDER_BUFFER_FLAG_HAS_PARENT) == 0) continue;
         if (object.parent >= i || !isInOrder(data, offsets, i, object) ||
-            !setAddress(data + offsets[object.parent], object)) {
+            !setAddress(data + offsets[object.parent], object, 0, object.buffer)) {
             return false;
         }
     }

@@ -87,8 +87,6 @@ struct Packet {
         return true;
     }
     status_t packObjects(const Parcel& parcel);
-    /** Clears the place of an object's address in its parent's buffer. */
-    bool clearAddress(size_t parentObject, const binder_buffer_object& object);
     /**
      * Changes objects and addresses of a received packet to where the buffers lie here.
      *

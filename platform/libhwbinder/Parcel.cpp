@@ -166,10 +166,9 @@ status_t Parcel::readBuffer(size_t length, size_t* handle, const void** buffer) 
 }
 
 status_t Parcel::readNullPointer(size_t parentHandle, size_t parentOffset) const {
-    const uint8_t* place = read(sizeof(binder_buffer_object));
-    if (place == nullptr) return NOT_ENOUGH_DATA;
     binder_buffer_object object;
-    memcpy(&object, place, sizeof(object));
+    const status_t status = readPadded(&object);
+    if (status != OK) return status;
     if (object.hdr.type != BINDER_TYPE_PTR) return BAD_TYPE;
     // The address in the parent is the sender's, since the driver has not filled it in.
     binder_buffer_object parent;
@@ -205,9 +204,8 @@ status_t Parcel::readNullableStrongBinder(sp<IBinder>* binder) const {
     flat_binder_object object;
     size_t index = 0;
     if (!isObjectNext()) {
-        const uint8_t* place = read(sizeof(object));
-        if (place == nullptr) return NOT_ENOUGH_DATA;
-        memcpy(&object, place, sizeof(object));
+        const status_t status = readPadded(&object);
+        if (status != OK) return status;
         *binder = nullptr;
         return object.hdr.type == BINDER_TYPE_BINDER && object.binder == 0 ? OK : BAD_TYPE;
     }
