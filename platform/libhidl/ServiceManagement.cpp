@@ -49,7 +49,7 @@ Error askForManager(sp<Manager>* manager) {
     const sp<Manager> proxy =
             new BpHwServiceManager(ProcessState::self()->getStrongProxyForHandle(0));
     if (!proxy->ping().isOk()) {
-        return {DEAD_OBJECT, driver().name() + ": no service manager answers"};
+        return {DEAD_OBJECT, host::transport().path + ": no service manager answers"};
     }
     *manager = proxy;
     return {};
@@ -67,7 +67,7 @@ Error lookUp(const std::string& interface, const std::string& instance, sp<IBase
     if (!found.isOk()) return errorOf(found);
     *service = found;
     if (*service != nullptr) return {};
-    return {NAME_NOT_FOUND, driver().name() + ": the service manager does not know it"};
+    return {NAME_NOT_FOUND, host::transport().path + ": the service manager does not know it"};
 }
 
 /** Asks once for a service. @return OK, or why it is not there. */

@@ -61,7 +61,7 @@ class KernelDriver::Object : public RemoteObject {
     bool mIsAcquired = false;
 };
 
-KernelDriver::KernelDriver(const std::string& device) : mName(device) {
+KernelDriver::KernelDriver(const std::string& device) {
     mDevice.reset(::open(device.c_str(), O_RDWR | O_CLOEXEC));
     if (!mDevice.isValid()) {
         mError = Error::ofErrno({device});
@@ -77,20 +77,11 @@ KernelDriver::KernelDriver(const std::string& device) : mName(device) {
                                    std::to_string(BINDER_CURRENT_PROTOCOL_VERSION)};
     } else if (ioctl(mDevice.get(), BINDER_SET_MAX_THREADS, &noFurtherThreads) != 0) {
         mError = Error::ofErrno({device});
-    } else {
-        void* mapping = mmap(nullptr, mappingSize(), PROT_READ, MAP_PRIVATE | MAP_NORESERVE,
-                             mDevice.get(), 0);
-        if (mapping != MAP_FAILED) {
-            mMapping = mapping;
-            return;
-        }
+    } else if (mmap(nullptr, mappingSize(), PROT_READ, MAP_PRIVATE | MAP_NORESERVE, mDevice.get(),
+                    0) == MAP_FAILED) {
         mError = Error::ofErrno({device, ": mmap"});
     }
-    mDevice.reset();
-}
-
-KernelDriver::~KernelDriver() {
-    if (mMapping != nullptr) munmap(mMapping, mappingSize());
+    if (!mError.isOk()) mDevice.reset();
 }
 
 std::unique_ptr<RemoteObject> KernelDriver::open(uint32_t handle) {

@@ -11,26 +11,22 @@
 
 namespace android::hardware {
 
-/** The kernel's binder driver, through its device. */
+/** The kernel's binder driver, through its device. Lives as long as its process. */
 class KernelDriver : public Driver {
   public:
     explicit KernelDriver(const std::string& device);
-    ~KernelDriver() override;
 
     std::unique_ptr<RemoteObject> open(uint32_t handle) override;
     void serve() override;
     status_t becomeContextManager(const sp<BHwBinder>& object) override;
     /** @return why the device could not be opened: "/dev/hwbinder: No such file or directory". */
     Error check() const override { return mError; }
-    std::string name() const override { return mName; }
 
   private:
     class Object;
     friend class KernelThread;
 
-    const std::string mName;
     UniqueFd mDevice;
-    void* mMapping = nullptr;
     Error mError;
     sp<BHwBinder> mContextManager;
 };

@@ -209,8 +209,8 @@ void KernelThread::serve() {
     memcpy(mOut + mOutSize, &enter, sizeof(enter));
     mOutSize += sizeof(enter);
     const status_t status = waitFor(Until::kForEver, nullptr);
-    __android_log_print(ANDROID_LOG_ERROR, kLogTag, "%s serves no more: %s", mDriver.name().c_str(),
-                        strerror(-status));
+    __android_log_print(ANDROID_LOG_ERROR, kLogTag, "%s serves no more: %s",
+                        ProcessState::self()->transport().path.c_str(), strerror(-status));
 }
 
 }  // namespace android::hardware

@@ -19,10 +19,6 @@ void SocketDriver::serve() {
     mServer.serve();
 }
 
-std::string SocketDriver::name() const {
-    return "sockets in " + serverDirectory();
-}
-
 std::string SocketDriver::directory() const {
     const std::lock_guard<std::mutex> lock(mMutex);
     return mDirectory;

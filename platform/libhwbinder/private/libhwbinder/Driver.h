@@ -21,10 +21,7 @@ class SocketDriver;
 /** An object of another process, as its proxy sees it. It is given up when this ends. */
 class RemoteObject {
   public:
-    RemoteObject() = default;
     virtual ~RemoteObject() = default;
-    RemoteObject(const RemoteObject&) = delete;
-    RemoteObject& operator=(const RemoteObject&) = delete;
 
     /**
      * Makes a call and, unless it is oneway, waits for the reply. Calls that the other process
@@ -46,10 +43,7 @@ class RemoteObject {
  */
 class Driver {
   public:
-    Driver() = default;
     virtual ~Driver() = default;
-    Driver(const Driver&) = delete;
-    Driver& operator=(const Driver&) = delete;
 
     /** @return the object of a handle; nullptr if there is none. */
     virtual std::unique_ptr<RemoteObject> open(uint32_t handle) = 0;
@@ -66,8 +60,6 @@ class Driver {
 
     /** @return OK if it can carry calls, now or later. */
     virtual Error check() const { return {}; }
-    /** @return what this is, in words: "/dev/hwbinder". */
-    virtual std::string name() const = 0;
 };
 
 /** The tag of the runtime's log lines. */

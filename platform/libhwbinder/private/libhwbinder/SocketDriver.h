@@ -21,7 +21,6 @@ class SocketDriver : public Driver {
     std::unique_ptr<RemoteObject> open(uint32_t handle) override;
     void serve() override;
     SocketDriver* socketDriver() override { return this; }
-    std::string name() const override;
 
     /** @return where a service was found last; before that, where one of this process would be. */
     std::string directory() const;
