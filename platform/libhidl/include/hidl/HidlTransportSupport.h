@@ -2,7 +2,9 @@
 #pragma once
 
 #include <hidl/HidlBinderSupport.h>
+#include <hwbinder/ProcessState.h>
 #include <sched.h>
+#include <unistd.h>
 
 #include <cstddef>
 
@@ -20,15 +22,21 @@ namespace android::hardware {
  *     warning if another number is given.
  * @param callerWillJoin whether the caller provides this thread, with joinRpcThreadpool.
  */
-void configureRpcThreadpool(size_t maxThreads, bool callerWillJoin);
+inline void configureRpcThreadpool(size_t maxThreads, bool callerWillJoin) {
+    ProcessState::self()->setThreadPoolConfiguration(maxThreads, callerWillJoin);
+}
 
 /** Serves calls with the calling thread. Returns only if that is impossible, with a log line. */
-void joinRpcThreadpool();
+inline void joinRpcThreadpool() {
+    ProcessState::self()->joinThreadPool();
+}
 
 namespace details {
 
 /** @return the process's id, for getDebugInfo. */
-int32_t getPidIfSharable();
+inline int32_t getPidIfSharable() {
+    return getpid();
+}
 /** @return whether callers may learn addresses of this process: no. */
 inline bool debuggable() {
     return false;

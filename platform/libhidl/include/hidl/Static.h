@@ -14,7 +14,7 @@ namespace android::hidl::base::V1_0 {
 struct IBase;
 }
 
-/** Data that generated code keeps for the life of the process. */
+/** Data that generated code keeps before main and after it, and so is never destroyed. */
 namespace android::hardware::details {
 
 /** A map that threads share. */
@@ -65,14 +65,21 @@ using BnConstructorMap = ConcurrentMap<std::string, std::function<sp<IBinder>(vo
 using BsConstructorMap =
         ConcurrentMap<std::string, std::function<sp<::android::hidl::base::V1_0::IBase>(void*)>>;
 
-/** Makers of stubs, by the descriptor of their interface. */
-BnConstructorMap& getBnConstructorMap();
-/** Makers of wrappers for objects of the same process. */
-BsConstructorMap& getBsConstructorMap();
+/** @return makers of stubs, by the descriptor of their interface. */
+inline BnConstructorMap& getBnConstructorMap() {
+    static auto* const map = new BnConstructorMap;
+    return *map;
+}
+/** @return makers of wrappers for objects of the same process. */
+inline BsConstructorMap& getBsConstructorMap() {
+    static auto* const map = new BsConstructorMap;
+    return *map;
+}
 
 /** The stub of each object that has one. */
-extern ConcurrentMap<const ::android::hidl::base::V1_0::IBase*, wp<BHwBinder>>* const gBnMap;
-extern const DefaultsOnly<SchedPrio>* const gServicePrioMap;
-extern const DefaultsOnly<bool>* const gServiceSidMap;
+inline auto* const gBnMap =
+        new ConcurrentMap<const ::android::hidl::base::V1_0::IBase*, wp<BHwBinder>>;
+inline const auto* const gServicePrioMap = new DefaultsOnly<SchedPrio>;
+inline const auto* const gServiceSidMap = new DefaultsOnly<bool>;
 
 }  // namespace android::hardware::details
