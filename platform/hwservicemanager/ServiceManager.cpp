@@ -106,7 +106,7 @@ void ServiceManager::removeService(const Service* service) {
 std::vector<ServiceManager::InstanceDebugInfo> ServiceManager::services() {
     std::vector<InstanceDebugInfo> infos;
     for (const auto& [name, service] : mServices)
-        infos.push_back(infoOf(name.first, name.second, service->pid));
+        infos.push_back({name.first, name.second, service->pid, {}, {}});
     return infos;
 }
 

@@ -11,7 +11,7 @@
 
 #include <algorithm>
 #include <chrono>
-#include <set>
+#include <map>
 #include <thread>
 #include <utility>
 
@@ -24,14 +24,12 @@ using ::android::hidl::manager::V1_0::IServiceNotification;
 /** An interface and an instance. */
 using Name = std::pair<std::string, std::string>;
 
-/** Looks at a socket, or a link to one. @return whether it is there. */
-bool lookAt(const SocketDirectory& directory, const std::string& name, struct stat* info) {
-    return fstatat(directory.descriptor(), name.c_str(), info, 0) == 0 && S_ISSOCK(info->st_mode);
-}
+/** What tells a socket from another one of its name: it changes with every registration. */
+using Socket = std::pair<ino_t, time_t>;
 
-/** @return the names of the sockets, and links to them, where this process looks for services. */
-std::set<Name> listNames() {
-    std::set<Name> names;
+/** @return the sockets where this process looks for services, also by the links to them. */
+std::map<Name, Socket> listSockets() {
+    std::map<Name, Socket> sockets;
     for (const std::string& path : clientDirectories()) {
         SocketDirectory directory;
         if (!directory.open(path, false).isOk()) continue;
@@ -44,26 +42,16 @@ std::set<Name> listNames() {
             // "a.b@1.0::IName.instance": a dot ends the interface behind its last colon.
             const size_t colon = name.find("::");
             const size_t dot = colon == std::string::npos ? colon : name.find('.', colon);
-            if (dot != std::string::npos && name.back() != '~' && lookAt(directory, name, &info)) {
-                names.emplace(name.substr(0, dot), name.substr(dot + 1));
+            if (dot != std::string::npos && name.back() != '~' &&
+                fstatat(directory.descriptor(), name.c_str(), &info, 0) == 0 &&
+                S_ISSOCK(info.st_mode)) {
+                sockets.emplace(Name(name.substr(0, dot), name.substr(dot + 1)),
+                                Socket(info.st_ino, info.st_ctime));
             }
         }
         closedir(entries);
     }
-    return names;
-}
-
-/** Which socket there is for a service; it changes with every registration. */
-std::pair<ino_t, time_t> socketOf(const Name& name) {
-    for (const std::string& path : clientDirectories()) {
-        SocketDirectory directory;
-        struct stat info;
-        if (directory.open(path, false).isOk() &&
-            lookAt(directory, socketName(name.first, name.second), &info)) {
-            return {info.st_ino, info.st_ctime};
-        }
-    }
-    return {};
+    return sockets;
 }
 
 /** Who wants to hear of which service. */
@@ -95,7 +83,7 @@ class Notifications {
     struct Watch {
         Name name;
         sp<IServiceNotification> callback;
-        std::pair<ino_t, time_t> socket;
+        Socket socket;
         bool isNew;
     };
 
@@ -107,9 +95,10 @@ class Notifications {
                 const std::lock_guard<std::mutex> lock(mMutex);
                 mIsWatching = !mWatches.empty();
                 if (!mIsWatching) return;
+                auto sockets = listSockets();
                 for (Watch& watch : mWatches) {
-                    const auto socket = socketOf(watch.name);
-                    if (socket.first != 0 && socket != watch.socket) news.push_back(watch);
+                    const Socket socket = sockets[watch.name];
+                    if (socket != Socket() && socket != watch.socket) news.push_back(watch);
                     watch.socket = socket;
                     watch.isNew = false;
                 }
@@ -146,8 +135,8 @@ Return<sp<IBase>> SocketServiceManager::get(const hidl_string& interface, const 
 
 std::vector<SocketServiceManager::InstanceDebugInfo> SocketServiceManager::services() {
     std::vector<InstanceDebugInfo> infos;
-    for (const auto& [interface, instance] : listNames())
-        infos.push_back(infoOf(interface, instance, static_cast<pid_t>(PidConstant::NO_PID)));
+    for (const auto& [name, socket] : listSockets())
+        infos.push_back({name.first, name.second, static_cast<pid_t>(PidConstant::NO_PID), {}, {}});
     return infos;
 }
 

@@ -68,14 +68,6 @@ class ServiceManagerBase : public ::android::hidl::manager::V1_2::IServiceManage
   protected:
     /** @return what is known of each service, once for each of its names. */
     virtual std::vector<InstanceDebugInfo> services() = 0;
-    static InstanceDebugInfo infoOf(const std::string& interface, const std::string& instance,
-                                    pid_t pid) {
-        InstanceDebugInfo info{};
-        info.interfaceName = interface;
-        info.instanceName = instance;
-        info.pid = pid;
-        return info;
-    }
 };
 
 }  // namespace android::hardware
