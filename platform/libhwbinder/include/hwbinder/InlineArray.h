@@ -46,9 +46,7 @@ class InlineArray {
         mRoom = 0;
     }
     void clear() {
-        freeHeap();
-        mData = mInline;
-        mSize = 0;
+        refer(mInline, 0);
         mRoom = kInlineCapacity;
     }
 
