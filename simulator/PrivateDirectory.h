@@ -1,15 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include <sys/types.h>
-#include <utils/UniqueFd.h>
-
+#include <cstdio>
 #include <string>
 
 namespace session {
 
 /**
- * A directory in /tmp, which other users may look into. A second process removes it when this one
+ * A directory in /tmp, which other users may look into. A shell removes it when this process
  * ends, even if it is killed.
  */
 class PrivateDirectory {
@@ -23,9 +21,8 @@ class PrivateDirectory {
 
   private:
     std::string mPath = "/tmp/vibrator-sim.XXXXXX";
-    /** The remover waits for the end of a pipe, of which this process has the other end. */
-    android::UniqueFd mPipe;
-    pid_t mRemover;
+    /** The other end of the remover's input. */
+    FILE* mRemover = nullptr;
 };
 
 }  // namespace session
