@@ -99,12 +99,12 @@ class Flooder {
 
 /** Calls for some seconds. @return how long the answers took, in ms, sorted. */
 std::vector<double> waits() {
-    constexpr size_t kMost = 1000;
+    constexpr size_t kMax = 1000;
     const auto end = steady_clock::now() + std::chrono::seconds(5);
     const auto vibrator = IDaxVibrator::getService();
     if (vibrator == nullptr) abort();
     std::vector<double> milliseconds;
-    while (milliseconds.size() < kMost && (steady_clock::now() < end || milliseconds.empty())) {
+    while (milliseconds.size() < kMax && (steady_clock::now() < end || milliseconds.empty())) {
         const auto start = steady_clock::now();
         if (!vibrator->off().isOk()) abort();
         const std::chrono::duration<double, std::milli> wait = steady_clock::now() - start;

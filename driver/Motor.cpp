@@ -141,8 +141,7 @@ int Motor::run(int strength, int64_t milliseconds) {
     } else {
         effect.u.constant.level = static_cast<int16_t>(scaled(strength, 0x7fff));
     }
-    effect.replay.length =
-            static_cast<uint16_t>(std::clamp<int64_t>(milliseconds, 1, kLongestEffect));
+    effect.replay.length = static_cast<uint16_t>(std::clamp<int64_t>(milliseconds, 1, kMaxEffect));
     if (ioctl(mFile.get(), EVIOCSFF, &effect) != 0) return fail(errno);
     mEffect = effect.id;
     return send(mEffect, 1) ? 0 : fail(errno);

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "Amplitude.h"
+
 #include <utils/UniqueFd.h>
 
 #include <cstdint>
@@ -9,8 +11,10 @@
 
 namespace driver {
 
+namespace product = ::vendor::velmora::hardware::vibrator::V2_1::implementation;
+
 /** The full strength of a motor. */
-constexpr int kFullStrength = 10000;
+constexpr int kFullStrength = product::kMaxAmplitude;
 
 /** @return a strength in proportion to another full one, rounded. */
 constexpr int scaled(int strength, int full) {
@@ -18,7 +22,7 @@ constexpr int scaled(int strength, int full) {
 }
 
 /** The longest time that the kernel promises to play an effect, in ms. */
-constexpr int64_t kLongestEffect = 0x7fff;
+constexpr int64_t kMaxEffect = 0x7fff;
 
 /** An input device that offers force feedback. It plays one effect, until it is closed at most. */
 class Motor {
@@ -44,7 +48,7 @@ class Motor {
      * Runs the motor from now on, in place of what it did; without a gap if it ran.
      *
      * @param strength up to kFullStrength; 0 stops it, which does not fail.
-     * @param milliseconds when the kernel is to stop it, kLongestEffect at most.
+     * @param milliseconds when the kernel is to stop it, kMaxEffect at most.
      * @return 0, or a negative errno.
      */
     int run(int strength, int64_t milliseconds);

@@ -14,8 +14,6 @@
 namespace driver {
 namespace {
 
-namespace product = ::vendor::velmora::hardware::vibrator::V2_1::implementation;
-
 // All times are in ms.
 
 /** How long before its end the kernel's time for an effect is renewed. */
@@ -120,7 +118,7 @@ int Player::advance() {
     if (packet == mPlayed.packets.end()) return stop();
     const int strength = scaled(std::clamp(packet->intensity, 0, kFullStrength),
                                 mPlayed.scale.value_or(mStrength));
-    setTimer(std::min(end, time + kLongestEffect - kMargin));
+    setTimer(std::min(end, time + kMaxEffect - kMargin));
     const int error = mMotor.run(strength, remaining());
     if (error != 0) stop();
     return error;

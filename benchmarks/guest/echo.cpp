@@ -27,7 +27,7 @@ struct Sizes {
 };
 /** As in guest-ping: a ping's token and status; a call has two more numbers, its reply one. */
 constexpr Sizes kSizes[] = {{"ping", 32, 4}, {"call", 52, 12}};
-constexpr size_t kMost = 128;
+constexpr size_t kMaxSize = 128;
 
 /** @return the size of a parcel's packet: with a header, both padded to a multiple of 8. */
 constexpr size_t packetSize(size_t parcel) {
@@ -36,7 +36,7 @@ constexpr size_t packetSize(size_t parcel) {
 
 /** A server of one client, whose identity it does not check. */
 [[noreturn]] void echo(int socket, size_t reply) {
-    char message[kMost];
+    char message[kMaxSize];
     while (recv(socket, message, sizeof(message), 0) > 0) {
         if (send(socket, message, reply, 0) < 0) _exit(1);
     }
@@ -51,7 +51,7 @@ constexpr size_t packetSize(size_t parcel) {
     epoll_event event{};
     event.events = EPOLLIN;
     epoll_ctl(all, EPOLL_CTL_ADD, socket, &event);
-    char message[kMost];
+    char message[kMaxSize];
     alignas(cmsghdr) char control[CMSG_SPACE(sizeof(ucred))];
     for (;;) {
         iovec place{message, sizeof(message)};
@@ -74,7 +74,7 @@ void echoOverSocket(const char* server, void (*serve)(int socket, size_t reply),
     int sockets[2];
     if (socketpair(AF_UNIX, SOCK_SEQPACKET, 0, sockets) != 0) abort();
     const Child child([&] { serve(sockets[1], reply); });
-    char message[kMost] = {};
+    char message[kMaxSize] = {};
     measure((std::string(server) + ", " + sizes.call).c_str(), [&] {
         if (send(sockets[0], message, request, 0) != static_cast<ssize_t>(request) ||
             recv(sockets[0], message, sizeof(message), 0) != static_cast<ssize_t>(reply)) {
@@ -155,7 +155,7 @@ void echoOverBinder(const Sizes& sizes) {
         Binder binder;
         binder.becomeManager();
         if (write(ready[1], "", 1) != 1) abort();
-        const char message[kMost] = {};
+        const char message[kMaxSize] = {};
         for (;;) {
             binder.exchange(BR_TRANSACTION);
             binder.addMessage(BC_REPLY, message, sizes.reply);
@@ -164,7 +164,7 @@ void echoOverBinder(const Sizes& sizes) {
     char byte = 0;
     if (read(ready[0], &byte, 1) != 1) abort();
     Binder binder;
-    const char message[kMost] = {};
+    const char message[kMaxSize] = {};
     measure((std::string("bare binder echo, ") + sizes.call).c_str(), [&] {
         binder.addMessage(BC_TRANSACTION, message, sizes.request);
         binder.exchange(BR_REPLY);
