@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 #include <hidl/HidlBinderSupport.h>
 #include <hwbinder/ProcessState.h>
+#include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
 
 #include <cstdint>
 #include <string>
@@ -13,6 +14,7 @@ namespace {
 
 using ::android::sp;
 using ::android::hardware::getOrCreateCachedBinder;
+using ::android::hardware::hidl_string;
 using ::android::hardware::hidl_vec;
 using ::android::hardware::IBinder;
 using ::android::hardware::Parcel;
@@ -115,6 +117,24 @@ TEST(ParcelTest, WhatWasReceivedIsGivenBackAndNotWrittenTo) {
             EXPECT_EQ(parcel.writeUint32(i), android::OK);
     }
     EXPECT_EQ(givenBack, 2);
+}
+
+TEST(TypesTest, OfferWhatADevicesDo) {
+    using ::android::hardware::vibrator::V1_3::Effect;
+    using ::vendor::velmora::hardware::vibrator::V2_0::DaxHapticEnginePacket;
+    EXPECT_EQ(toString(static_cast<Effect>(0x9abcdef)), "0x9abcdef");
+    int effects = 0;
+    for (const Effect effect : ::android::hardware::hidl_enum_range<Effect>())
+        effects += static_cast<int>(effect);
+    EXPECT_EQ(effects, 21 * 22 / 2);
+    const DaxHapticEnginePacket packet{1, 2, 3, 4};
+    EXPECT_EQ(toString(packet), "{.param0 = 1, .intensity = 2, .param2 = 3, .param3 = 4}");
+    EXPECT_EQ(toString(hidl_vec<hidl_string>{"a", ""}), "[2]{\"a\", \"\"}");
+    hidl_vec<DaxHapticEnginePacket> packets = {packet};
+    packets.resize(2);
+    EXPECT_EQ(packets, (hidl_vec<DaxHapticEnginePacket>{packet, {}}));
+    EXPECT_NE(packets, hidl_vec<DaxHapticEnginePacket>{packet});
+    EXPECT_LT(hidl_string(static_cast<const char*>(nullptr)), hidl_string("ab", 1));
 }
 
 TEST(PacketTest, EmbeddedBufferMustLieInOneBeforeIt) {

@@ -123,6 +123,10 @@ TEST_F(ServiceManagerTest, BinderOfAnotherInterfaceIsNoListener) {
     };
     EXPECT_EQ(listener(mObject.get()), mObject);
     EXPECT_EQ(listener(mManager.get()), nullptr);
+    using ::android::hidl::base::V1_0::IBase;
+    EXPECT_EQ(sp<Notification>(Notification::castFrom(sp<IBase>(mObject))), mObject);
+    EXPECT_EQ(sp<Notification>(Notification::castFrom(sp<IBase>(mManager))), nullptr);
+    EXPECT_EQ(sp<Notification>(Notification::castFrom(sp<IBase>())), nullptr);
 }
 
 TEST_F(ServiceManagerTest, LastOneAddedHasTheNamesAndOnlyItsProcessTakesThemAway) {
