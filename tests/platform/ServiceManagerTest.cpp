@@ -53,6 +53,13 @@ struct Remote : BpHwServiceNotification {
     std::list<sp<hidl_death_recipient>> recipients;
 };
 
+/** An object that does not say which interfaces it has. */
+struct Silent : Object {
+    Return<void> interfaceChain(interfaceChain_cb) override {
+        return ::android::hardware::Status::fromExceptionCode(-1);
+    }
+};
+
 constexpr char kInterface[] = "android.hidl.manager@1.0::IServiceNotification";
 constexpr uid_t kNobody = 54321;
 
@@ -88,6 +95,7 @@ TEST_F(ServiceManagerTest, OnlySomeMayAdd) {
     }
     EXPECT_FALSE(mManager->add("", mObject).withDefault(true));
     EXPECT_FALSE(mManager->add("none", nullptr).withDefault(true));
+    EXPECT_FALSE(mManager->add("none", new Silent).withDefault(true));
     EXPECT_FALSE(mManager->addWithChain("none", nullptr, {kInterface}).withDefault(true));
     EXPECT_FALSE(mManager->addWithChain("none", mObject, {}).withDefault(true));
     const sp<Remote> gone = new Remote(mObject);
