@@ -90,15 +90,6 @@ TEST_F(HostileClientTest, MessageWithoutMeasureCostsTheConnection) {
     EXPECT_TRUE(answers());
 }
 
-TEST_F(HostileClientTest, OnewayCallsHaveNoReply) {
-    serve();
-    const RawClient client = rawClient();
-    ASSERT_TRUE(client.send(request(kV10, kOn, {77}, TF_ONE_WAY)));
-    // The operation is not one; the next reply is the ping's.
-    EXPECT_TRUE(client.answersPing());
-    EXPECT_EQ(log().find("val:77"), std::string::npos);
-}
-
 TEST_F(HostileClientTest, RepliesHoldNothingOfTheDaemonsMemory) {
     serve();
     const Received chain = rawClient().call(request(kBase, kInterfaceChain));

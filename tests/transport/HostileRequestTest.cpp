@@ -240,6 +240,7 @@ TEST_P(HostileRequestTest, OnewayOfEverythingCostsNobodyAnything) {
             call(GetParam().right(token), code, TF_ONE_WAY);
     }
     expectService();
+    EXPECT_EQ(log().find("val:"), std::string::npos) << "on was run: " << log();
     for (int i = 0; i < 300; ++i)
         call(RawMessage::to(GetParam().interface), GetParam().code, TF_ONE_WAY);
     // On a device these are oneway, and nothing else.
@@ -305,22 +306,16 @@ TEST_P(HostileRequestTest, BufferIsReadAsNothingElse) {
 TEST_P(HostileRequestTest, EmptyListsAreReadInBothForms) {
     const struct {
         const char* name;
-        uint64_t address;
-        uint32_t count;
+        uint64_t address, count;
         binder_buffer_object elements;
         status_t status;
     } forms[] = {
             {"a device's", 0, 0, {{BINDER_TYPE_PTR}, 1, 0, 0, 0, 0}, android::OK},
-            {"with an address", 4096, 0, {{BINDER_TYPE_PTR}, 1, 4096, 0, 0, 0}, kBadValue},
-            {"with an address in the list", 4096, 0, {{BINDER_TYPE_PTR}, 1, 0, 0, 0, 0}, kBadValue},
-            {"with an address in the object",
-             0,
-             0,
-             {{BINDER_TYPE_PTR}, 1, 4096, 0, 0, 0},
-             kBadValue},
-            {"with a length", 0, 0, {{BINDER_TYPE_PTR}, 1, 0, 1, 0, 0}, kBadValue},
-            {"with a count", 0, 1, {{BINDER_TYPE_PTR}, 1, 0, 0, 0, 0}, kBadType},
-            {"of another type", 0, 0, {{BINDER_TYPE_FDA}, 1, 0, 0, 0, 0}, kBadType},
+            {"address in the list", 4096, 0, {{BINDER_TYPE_PTR}, 1, 0, 0, 0, 0}, kBadValue},
+            {"address in the object", 0, 0, {{BINDER_TYPE_PTR}, 1, 4096, 0, 0, 0}, kBadValue},
+            {"length", 0, 0, {{BINDER_TYPE_PTR}, 1, 0, 1, 0, 0}, kBadValue},
+            {"count", 0, 1, {{BINDER_TYPE_PTR}, 1, 0, 0, 0, 0}, kBadType},
+            {"another type", 0, 0, {{BINDER_TYPE_FDA}, 1, 0, 0, 0, 0}, kBadType},
     };
     RawMessage listed = RawMessage::to(raw::kBase);
     listed.head += bytesOf(uint64_t{0});
@@ -329,7 +324,7 @@ TEST_P(HostileRequestTest, EmptyListsAreReadInBothForms) {
     for (const auto& [name, address, count, elements, status] : forms) {
         RawMessage debug = RawMessage::to(raw::kBase);
         debug.head += bytesOf(uint64_t{0});
-        debug.add(bytesOf(address) + bytesOf(uint64_t{count}));
+        debug.add(bytesOf(address) + bytesOf(count));
         debug.tail = bytesOf(elements);
         EXPECT_EQ(call(debug, raw::kDebug), status) << name;
         debug.tail.resize(36);
