@@ -10,9 +10,7 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <chrono>
 #include <climits>
-#include <thread>
 #include <utility>
 
 static int otherWriter = -1;
@@ -73,11 +71,6 @@ TEST(LogTest, PriorityIsALetter) {
         EXPECT_EQ(__android_log_print(priority, "T", "text"), 1);
         return log.takeText()[0];
     };
-    std::string letters;
-    for (int priority = ANDROID_LOG_VERBOSE; priority <= ANDROID_LOG_FATAL; ++priority)
-        letters += letterOf(priority);
-    EXPECT_EQ(letters, "VDIWEF");
-
     struct stat info;
     ASSERT_EQ(fstat(STDERR_FILENO, &info), 0);
     const std::string journal = std::to_string(info.st_dev) + ":" + std::to_string(info.st_ino);
@@ -129,15 +122,11 @@ TEST(LogTest, NoLineWaitsForRoomThatAnotherWriterTakes) {
     const std::string self = "/proc/self/fd/" + std::to_string(pipe[1]);
     otherWriter = open(self.c_str(), O_WRONLY | O_NONBLOCK | O_CLOEXEC);
     dup2(pipe[1], STDERR_FILENO);
-    // Ends the wait of a line that does.
-    std::thread reader([&] {
-        std::this_thread::sleep_for(std::chrono::milliseconds(300));
-        char page[4096];
-        EXPECT_GT(read(pipe[0], page, sizeof(page)), 0);
-    });
+    // Ends a line that waits, and the test.
+    alarm(3);
     EXPECT_EQ(__android_log_print(ANDROID_LOG_ERROR, "T", "text"), -EAGAIN);
+    alarm(0);
     dup2(before, STDERR_FILENO);
-    reader.join();
     for (const int descriptor : {pipe[0], pipe[1], before, std::exchange(otherWriter, -1)})
         close(descriptor);
 }
