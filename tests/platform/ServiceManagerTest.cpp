@@ -158,6 +158,10 @@ TEST_F(ServiceManagerTest, LastOneAddedHasTheNamesAndOnlyItsProcessTakesThemAway
     EXPECT_TRUE(knows("default"));
     EXPECT_TRUE(mManager->tryUnregister(kInterface, "default", second));
     EXPECT_TRUE(names().empty());
+    using Transport = ServiceManager::Transport;
+    EXPECT_EQ(mManager->getTransport(kInterface, "default").withDefault(Transport::EMPTY),
+              Transport::HWBINDER)
+            << "it may come again";
 }
 
 TEST_F(ServiceManagerTest, ListenersHearOfWhatTheyAskedFor) {
@@ -194,25 +198,6 @@ TEST_F(ServiceManagerTest, OneUserCannotMakeItGrow) {
     EXPECT_FALSE(mManager->registerForNotifications("a", "", mObject));
     const Caller another(kNobody + 1, 8);
     EXPECT_TRUE(mManager->registerForNotifications("a", "", mObject));
-}
-
-TEST_F(ServiceManagerTest, ListsSayWhatIsThere) {
-    const Caller caller(0, 7);
-    EXPECT_TRUE(mManager->add("x", mObject));
-    EXPECT_TRUE(mManager->add("y", mObject));
-    std::vector<std::string> instances;
-    mManager->listByInterface(
-            kInterface, [&](const auto& list) { instances.assign(list.begin(), list.end()); });
-    EXPECT_EQ(instances, (std::vector<std::string>{"x", "y"}));
-    mManager->debugDump([&](const auto& infos) {
-        ASSERT_EQ(infos.size(), 2U);
-        EXPECT_EQ(std::string(infos[1].interfaceName), kInterface);
-        EXPECT_EQ(std::string(infos[1].instanceName), "y");
-        EXPECT_EQ(infos[1].pid, 7);
-    });
-    using Transport = ServiceManager::Transport;
-    EXPECT_EQ(mManager->getTransport(kInterface, "to come").withDefault(Transport::EMPTY),
-              Transport::HWBINDER);
 }
 
 }  // namespace
