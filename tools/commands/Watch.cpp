@@ -138,7 +138,8 @@ class GrowingFile {
   private:
     void open() {
         mFile.reset(mName == "-" ? dup(STDIN_FILENO) : ::open(mName.c_str(), O_RDONLY | O_CLOEXEC));
-        if (!mFile.isValid()) fail();
+        // A directory opens, too, and says only here that it is one.
+        if (!mFile.isValid() || ::read(mFile.get(), nullptr, 0) < 0) fail();
     }
     [[noreturn]] void fail() const {
         throw cli::UsageError(mName + ": cannot be read: " + strerror(errno));
