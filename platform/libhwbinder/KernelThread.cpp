@@ -80,13 +80,6 @@ status_t KernelThread::flush() {
     return mOutSize == 0 ? OK : exchange(false);
 }
 
-bool KernelThread::next(uint32_t* command) {
-    if (mInSize - mInPosition < sizeof(*command)) return false;
-    memcpy(command, mIn + mInPosition, sizeof(*command));
-    mInPosition += sizeof(*command);
-    return true;
-}
-
 template <typename T>
 T KernelThread::argument() {
     T value;
@@ -124,11 +117,11 @@ status_t KernelThread::transact(uint32_t handle, uint32_t code, const Parcel& da
 
 status_t KernelThread::waitFor(Until until, Parcel* reply) {
     for (;;) {
-        uint32_t command = 0;
-        while (!next(&command)) {
+        while (mInPosition == mInSize) {
             const status_t status = exchange(true);
             if (status != OK) return status;
         }
+        const auto command = argument<uint32_t>();
         switch (command) {
             case BR_TRANSACTION_COMPLETE:
             case BR_ONEWAY_SPAM_SUSPECT:

@@ -43,7 +43,6 @@ class KernelThread {
     /** Sends the commands. @return OK; TIMED_OUT when the alarm's time is up before. */
     status_t exchange(bool receive);
     status_t waitFor(Until until, Parcel* reply);
-    bool next(uint32_t* command);
     template <typename T>
     T argument();
     void queueTransaction(uint32_t command, uint32_t handle, uint32_t code, const Parcel& data,
