@@ -35,8 +35,7 @@ struct Nodes::Requests {
     static Nodes& nodes() { return *static_cast<Nodes*>(fuse_get_context()->private_data); }
     static int trace(const char* path, const std::string& access, ssize_t result,
                      const std::string& shown = {}) {
-        const std::string name = model::traceName(nodes().mDirectory + (path + 1));
-        simulator::trace(nodes().mTrace, name + ' ' + access, result, shown);
+        simulator::trace(nodes().mTrace, nodes().mDirectory + (path + 1), access, result, shown);
         return static_cast<int>(result);
     }
 

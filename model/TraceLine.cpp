@@ -36,19 +36,16 @@ std::string accessMode(int flags) {
     return kNames[flags & O_ACCMODE];
 }
 
-std::string traceName(std::string_view path) {
+std::string traceLine(const std::string& path, const std::string& access, long result,
+                      const std::string& shown) {
     constexpr size_t kStart = std::string_view("/sys/class/").size();
-    std::string name(path.substr(kStart, path.find('/', kStart) - kStart));
-    return name.append(path.substr(path.rfind('/')));
-}
-
-std::string traceLine(const std::string& access, long result, const std::string& shown) {
     timespec time{};
     clock_gettime(CLOCK_MONOTONIC, &time);
     char clock[32];
     snprintf(clock, sizeof(clock), "%lld.%06ld ", static_cast<long long>(time.tv_sec),
              time.tv_nsec / 1000);
-    std::string line = clock + access + " = ";
+    std::string line = clock + path.substr(kStart, path.find('/', kStart) - kStart) +
+                       path.substr(path.rfind('/')) + ' ' + access + " = ";
     line += result < 0 ? std::string("-1 ") + strerrorname_np(static_cast<int>(-result))
                        : std::to_string(result);
     if (!shown.empty()) line += " " + shown;

@@ -96,8 +96,7 @@ ssize_t simulate(const OpenNode& open, const std::string& name, const std::strin
     std::string bytes;
     if (shown != nullptr && result >= 0)
         bytes = model::quote({static_cast<const char*>(shown), static_cast<size_t>(result)});
-    simulator::trace(*open.node.directory, model::traceName(open.node.path) + ' ' + name + argument,
-                     result, bytes);
+    simulator::trace(*open.node.directory, open.node.path, name + argument, result, bytes);
     return result;
 }
 

@@ -18,9 +18,9 @@ std::string traceFile(const std::string& directory) {
     return directory + "/" + kTraceName;
 }
 
-void trace(const Folder& directory, const std::string& access, long result,
+void trace(const Folder& directory, const std::string& path, const std::string& access, long result,
            const std::string& shown) {
-    const std::string line = model::traceLine(access, result, shown);
+    const std::string line = model::traceLine(path, access, result, shown);
     const UniqueFd file = directory.open(kTraceName, O_WRONLY | O_APPEND | O_CREAT, 0644);
     struct stat info;
     // One write a line, so that the lines of several processes do not mix. A failure cannot be

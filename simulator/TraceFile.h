@@ -14,7 +14,7 @@ std::string traceFile(const std::string& directory);
  * Appends the line of one access, as model::traceLine makes it, to the trace of a directory that is
  * marked as a driver's. Up to the limit.
  */
-void trace(const Folder& directory, const std::string& access, long result,
+void trace(const Folder& directory, const std::string& path, const std::string& access, long result,
            const std::string& shown = {});
 
 }  // namespace simulator
