@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Folder.h"
 
-#include <dirent.h>
 #include <fcntl.h>
 #include <unistd.h>
 
@@ -107,14 +106,10 @@ void Folder::remove(const std::string& name) const {
 
 std::vector<std::string> Folder::names() const {
     std::vector<std::string> names;
-    const int file = openat(mFolder.get(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
-    DIR* folder = file < 0 ? nullptr : fdopendir(file);
-    if (folder == nullptr) return names;
-    while (const dirent* entry = readdir(folder)) {
-        const std::string name = entry->d_name;
-        if (name != "." && name != "..") names.push_back(name);
-    }
-    closedir(folder);
+    const std::string self = "/proc/self/fd/" + std::to_string(mFolder.get());
+    std::error_code error;
+    for (const auto& entry : std::filesystem::directory_iterator(self, error))
+        names.push_back(entry.path().filename());
     std::sort(names.begin(), names.end());
     return names;
 }

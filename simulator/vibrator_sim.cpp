@@ -38,7 +38,6 @@ Names featuresOf(const std::string& list) {
     Names features;
     std::istringstream words(list + ",");
     for (std::string name; std::getline(words, name, ',');) {
-        if (name == "prebaked") name = "pattern";  // As it was called before.
         require(name, all, "--features: no feature " + cli::inQuotes(name));
         features.push_back(name);
     }
