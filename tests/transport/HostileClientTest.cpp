@@ -61,8 +61,11 @@ TEST_F(HostileClientTest, MessageMayEndAnywhere) {
     serve();
     const RawClient client = rawClient();
     RawMessage message = RawMessage::to(kV20);
-    message.addList(1, std::string(16, '\1'));
-    message.tail = bytesOf(10000);
+    message.addList(1, std::string(17, '\1'));
+    // To be written far away, if a piece of the buffer before counts as the whole.
+    message.add("");
+    message.objects[2].length = UINT64_MAX / 2;
+    message.add("", true, 2, uint64_t{1} << 40);
     const auto whole = message.packet(kDaxPerformHapticEngine);
     for (size_t size = 1; size < whole->size; ++size) {
         ASSERT_TRUE(client.send(whole->bytes, size));
