@@ -56,8 +56,7 @@ class DriverTest : public ::testing::Test {
         unlink(kEnvironment);
         const std::string script =
                 "echo $HWBINDER_DIR >" + std::string(kEnvironment) + "; exec sleep 1000";
-        mSession.startProgram({kDriver, "run", "--layout", layout, "/bin/sh", "-c", script}, kLog,
-                              {});
+        mSession.startProgram({kDriver, "run", "--layout", layout, "/bin/sh", "-c", script}, kLog);
         ASSERT_TRUE(eventually([] { return !readFile(kEnvironment).empty(); })) << readFile(kLog);
         std::string directory = readFile(kEnvironment);
         directory.pop_back();

@@ -24,17 +24,18 @@ TEST(ManagersTest, DISABLED_OfVersion1_0) {
 }
 
 TEST(ManagersTest, ServiceIsFoundWithEachManagerThatComes) {
-    const std::string device = "HWBINDER_DEVICE=/dev/binder";
+    const auto onDevice = [](const std::string& command) -> std::vector<std::string> {
+        return {"/bin/sh", "-c", "exec env HWBINDER_DEVICE=/dev/binder " + command};
+    };
     ChildProcess daemon;
-    daemon.startProgram({SERVICE}, "/tmp/daemon", {device});
-    const std::vector<std::string> older = {"/bin/binder-tests", "--gtest_also_run_disabled_tests",
-                                            "--gtest_filter=*DISABLED_OfVersion1_0"};
-    const std::vector<std::string> newer = {"/bin/hwservicemanager"};
-    for (const auto& command : {older, newer, older}) {
+    daemon.startProgram(onDevice(SERVICE), "/tmp/daemon");
+    const std::string older =
+            "binder-tests --gtest_also_run_disabled_tests --gtest_filter=*DISABLED_OfVersion1_0";
+    for (const std::string& command : {older, std::string("hwservicemanager"), older}) {
         ChildProcess manager;
-        manager.startProgram(command, "/tmp/manager", {device});
+        manager.startProgram(onDevice(command), "/tmp/manager");
         EXPECT_TRUE(eventually([&] {
-            return runProgram({"/bin/busybox", "env", device, VIBRATORCTL, "off"}).exitCode == 0;
+            return runProgram(onDevice(VIBRATORCTL " off")).exitCode == 0;
         })) << readFile("/tmp/daemon")
             << readFile("/tmp/manager");
         EXPECT_TRUE(daemon.isAlive());

@@ -42,7 +42,7 @@ TEST_F(VibratorSimTest, RunCleansUpWhateverEndsIt) {
                                    "$HWBINDER_DIR; } >$0.new; (sleep 0.1; mv $0.new $0) & "
                                    "exec sleep 10";
         ChildProcess session;
-        session.startProgram({VIBRATOR_SIM, "run", "bash", "-c", script, ready}, "/dev/null", {});
+        session.startProgram({VIBRATOR_SIM, "run", "bash", "-c", script, ready});
         ASSERT_TRUE(eventually([&] { return fs::exists(ready); }));
         std::ifstream file(ready);
         pid_t daemon = -1;

@@ -33,7 +33,7 @@ void becomeUser(uid_t uid) {
 }
 
 /** Becomes a program, as another user, who need not be able to reach the folder that it lies in. */
-[[noreturn]] void execute(const std::vector<std::string>& command, uid_t uid) {
+[[noreturn]] void execute(const std::vector<std::string>& command, uid_t uid = geteuid()) {
     const int program = open(command[0].c_str(), O_PATH | O_CLOEXEC);
     std::vector<char*> arguments;
     for (const std::string& word : command)
@@ -78,14 +78,12 @@ int runAs(uid_t uid, const std::function<int()>& function) {
     return exitCodeOf(pid);
 }
 
-void ChildProcess::startProgram(const std::vector<std::string>& command, const std::string& logFile,
-                                const std::vector<std::string>& environment, uid_t uid) {
+void ChildProcess::startProgram(const std::vector<std::string>& command,
+                                const std::string& logFile) {
     const int log = open(logFile.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0644);
     start([&] {
         dup2(log, STDERR_FILENO);
-        for (const std::string& each : environment)
-            putenv(const_cast<char*>(each.c_str()));
-        execute(command, uid);
+        execute(command);
     });
     close(log);
 }

@@ -24,13 +24,9 @@ int runAs(uid_t uid, const std::function<int()>& function);
 /** A child process with a look at what it uses. */
 class ChildProcess : public Child {
   public:
-    /**
-     * Runs a program with standard error in a file, and more environment, as NAME=VALUE; as another
-     * user where asked for.
-     */
-    void startProgram(const std::vector<std::string>& command, const std::string& logFile,
-                      const std::vector<std::string>& environment, uid_t uid = geteuid());
-
+    /** Runs a program with standard error in a file. */
+    void startProgram(const std::vector<std::string>& command,
+                      const std::string& logFile = "/dev/null");
     bool isAlive() const;
     /** @return how many descriptors the process has open. */
     size_t descriptors() const;

@@ -32,7 +32,7 @@ class TransportTest : public ::testing::Test {
 
     /** Starts a daemon. @param limits shell commands that come first. */
     void startDaemon(ChildProcess& daemon, const std::string& limits = "true") const {
-        daemon.startProgram({"/bin/sh", "-c", limits + "; exec \"$0\"", SERVICE}, logFile(), {});
+        daemon.startProgram({"/bin/sh", "-c", limits + "; exec \"$0\"", SERVICE}, logFile());
     }
     /** Starts the daemon, and waits until it answers. */
     void serve(const std::string& limits = "true") {
