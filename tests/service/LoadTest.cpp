@@ -55,7 +55,7 @@ class LoadTest : public DaemonTest {};
 
 TEST_F(LoadTest, ManyClientsGetTheirOwnAnswersAndEachCallActsOnce) {
     createDriver();
-    start("*:S");
+    start();
     waitpid(spawn(0, 1000), nullptr, 0);
     const size_t descriptors = mServer.descriptors();
     [[maybe_unused]] const size_t memory = mServer.residentKiB();

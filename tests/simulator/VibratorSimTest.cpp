@@ -1,7 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "support/DaemonTest.h"
+#include "support/Process.h"
+#include "support/TemporaryDirectory.h"
 
 #include <fcntl.h>
+#include <gtest/gtest.h>
 #include <sys/wait.h>
 
 #include <csignal>
@@ -14,10 +16,9 @@ namespace {
 
 namespace fs = std::filesystem;
 
-class VibratorSimTest : public DaemonTest {
+class VibratorSimTest : public ::testing::Test {
   protected:
-    /** Anybody may simulate a driver. */
-    void SetUp() override {}
+    TemporaryDirectory mDirectory;
 };
 
 TEST_F(VibratorSimTest, RunCleansUpWhateverEndsIt) {

@@ -12,8 +12,6 @@ class DaemonTest : public TransportTest {
     DaemonTest() {
         setenv("HWBINDER_DIR", (mDirectory.path() + "/sockets").c_str(), 1);
         setenv("VIBRATOR_SIM_DIR", mDirectory.path().c_str(), 1);
-        // A sanitizer's own library does not come first in a process with a preloaded one.
-        setenv("ASAN_OPTIONS", "verify_asan_link_order=0", 1);
         simulator::claimDirectory(mDirectory.path());
     }
     ~DaemonTest() override { unsetenv("VIBRATOR_SIM_DIR"); }
@@ -24,14 +22,11 @@ class DaemonTest : public TransportTest {
         }
     }
 
-    /** Makes a driver, with more options of the simulator's create command. */
-    static void createDriver(const std::string& options = {}) {
-        const Outcome outcome = runProgram({"/bin/sh", "-c", VIBRATOR_SIM " create " + options});
-        ASSERT_EQ(outcome.exitCode, 0) << outcome.errors;
+    /** Makes a driver. */
+    void createDriver(simulator::Layout layout = simulator::Layout::kLedTrigger,
+                      const simulator::Features& features = {}) const {
+        ASSERT_EQ(simulator::createDriver(mDirectory.path(), layout, features), 0);
     }
-
     /** Starts the daemon on the driver, and waits until it answers. */
-    void start(const std::string& tags = {}) {
-        serve("export LD_PRELOAD=" PRELOAD " ANDROID_LOG_TAGS='" + tags + "'");
-    }
+    void start() { serve("export LD_PRELOAD=" PRELOAD); }
 };
