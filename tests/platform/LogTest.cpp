@@ -6,26 +6,25 @@
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <poll.h>
+#include <sys/socket.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
 #include <climits>
+#include <functional>
 #include <utility>
+#include <vector>
 
-static int otherWriter = -1;
+/** What happens between a promise of room and the write. */
+static std::function<void()> afterPoll = [] {};
 
-/**
- * Is called for poll, and takes the room that this has promised, as another process that writes to
- * the same pipe could. It has a name of its own since fortified headers define the other.
- */
-int pollAndFill(pollfd* descriptors, nfds_t count, int milliseconds) __asm__("poll");
-int pollAndFill(pollfd* descriptors, nfds_t count, int milliseconds) {
+/** Is called for poll. It has a name of its own since fortified headers define the other. */
+int pollAndMore(pollfd* descriptors, nfds_t count, int milliseconds) __asm__("poll");
+int pollAndMore(pollfd* descriptors, nfds_t count, int milliseconds) {
     const timespec limit{milliseconds / 1000, milliseconds % 1000 * 1'000'000L};
     const int result = ppoll(descriptors, count, milliseconds < 0 ? nullptr : &limit, nullptr);
-    const std::string page(4096, 'x');
-    while (otherWriter >= 0 && write(otherWriter, page.data(), page.size()) > 0) {
-    }
+    afterPoll();
     return result;
 }
 
@@ -115,19 +114,49 @@ TEST(LogTest, WhatATerminalCouldObeyIsEscaped) {
     }
 }
 
-TEST(LogTest, NoLineWaitsForRoomThatAnotherWriterTakes) {
-    int pipe[2];
-    ASSERT_EQ(pipe2(pipe, O_CLOEXEC), 0);
+TEST(LogTest, NoLineWaitsForItsReaderOrEndsTheProcess) {
+    int full[2];
+    int broken[2];
+    int journal[2];
+    ASSERT_EQ(pipe2(full, O_CLOEXEC) + pipe2(broken, O_CLOEXEC), 0);
+    ASSERT_EQ(socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, journal), 0);
+    const int terminal = posix_openpt(O_RDWR | O_NOCTTY | O_CLOEXEC);
+    ASSERT_EQ(grantpt(terminal) + unlockpt(terminal), 0);
+    const int shown = open(ptsname(terminal), O_RDWR | O_NOCTTY | O_CLOEXEC);
+    const std::string self = "/proc/self/fd/" + std::to_string(full[1]);
+    const int other = open(self.c_str(), O_WRONLY | O_NONBLOCK | O_CLOEXEC);
+    const struct {
+        int log;
+        /** What another process could do then. */
+        std::function<void()> afterPoll;
+        int result;
+    } cases[] = {
+            {full[1],
+             [&] {
+                 const std::string page(4096, 'x');
+                 while (write(other, page.data(), page.size()) > 0) {
+                 }
+             },
+             -EAGAIN},
+            {broken[1], [&] { close(std::exchange(broken[0], -1)); }, -EPIPE},
+            {journal[1], [] {}, 1},
+            {shown, [] {}, 1},
+    };
+    const auto print = [] { return __android_log_print(ANDROID_LOG_ERROR, "T", "text"); };
     const int before = dup(STDERR_FILENO);
-    const std::string self = "/proc/self/fd/" + std::to_string(pipe[1]);
-    otherWriter = open(self.c_str(), O_WRONLY | O_NONBLOCK | O_CLOEXEC);
-    dup2(pipe[1], STDERR_FILENO);
     // Ends a line that waits, and the test.
-    alarm(3);
-    EXPECT_EQ(__android_log_print(ANDROID_LOG_ERROR, "T", "text"), -EAGAIN);
+    alarm(10);
+    for (const auto& each : cases) {
+        dup2(each.log, STDERR_FILENO);
+        afterPoll = each.afterPoll;
+        EXPECT_EQ(print(), each.result);
+        while (print() == 1) {
+        }
+    }
     alarm(0);
     dup2(before, STDERR_FILENO);
-    for (const int descriptor : {pipe[0], pipe[1], before, std::exchange(otherWriter, -1)})
+    for (const int descriptor :
+         {full[0], full[1], broken[1], journal[0], journal[1], terminal, shown, other, before})
         close(descriptor);
 }
 
