@@ -2,7 +2,6 @@
 #include "support/TransportTest.h"
 #include "transport/RawClient.h"
 
-#include <fcntl.h>
 #include <linux/filter.h>
 #include <linux/seccomp.h>
 #include <netinet/in.h>
@@ -245,8 +244,10 @@ bool sendWithDescriptor(const RawClient& client, const std::unique_ptr<Packet>& 
     return sendmsg(client.socketNumber(), &message, MSG_NOSIGNAL) >= 0;
 }
 
+/** SO_PASSRIGHTS, which headers before Linux 6.16 lack. */
+constexpr int kPassRights = 83;
+
 TEST_F(HostileClientTest, DescriptorsDoNotReachTheDaemon) {
-    constexpr int kPassRights = 83;
     int value = 0;
     socklen_t size = sizeof(value);
     const int probe = socket(AF_UNIX, SOCK_SEQPACKET | SOCK_CLOEXEC, 0);
@@ -263,7 +264,6 @@ TEST_F(HostileClientTest, DescriptorsDoNotReachTheDaemon) {
 
 /** Makes this process's kernel one that does not know SO_PASSRIGHTS, as before 6.16. */
 void makeKernelOlder() {
-    constexpr uint32_t kPassRights = 83;
     sock_filter code[] = {
             BPF_STMT(BPF_LD | BPF_W | BPF_ABS, offsetof(seccomp_data, nr)),
             BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, SYS_setsockopt, 1, 0),
