@@ -21,8 +21,8 @@ Timeline timelineOf(const std::string& text) {
         double ms = 0;
         NodeAccess access;
         words >> ms >> access.node >> std::ws;
-        std::getline(words, access.bytes);
-        access.bytes += '\n';
+        std::getline(words, access.text);
+        access.text += "\\n";
         access.time = 100 + ms / 1000;
         access.clock = ms < 0 ? "" : "time";
         access.kind = access.node[0] == '?' ? NodeAccess::kProbe : NodeAccess::kWrite;
@@ -30,7 +30,7 @@ Timeline timelineOf(const std::string& text) {
         accesses.push_back(access);
         if (access.kind == NodeAccess::kProbe) continue;
         // What the driver has not taken counts for nothing.
-        access.bytes = "700\n";
+        access.text = "700\\n";
         access.error = "EINVAL";
         accesses.push_back(access);
     }

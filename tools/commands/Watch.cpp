@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
-#include "TraceLine.h"
 #include "Traffic.h"
 #include "text/Text.h"
 #include "traffic/AccessReader.h"
@@ -51,7 +50,7 @@ void print(const NodeAccess& access, bool isColoured) {
     line << std::left << std::setw(30)
          << (access.node.empty() ? "a call" : cli::printable(access.node)) << "  " << std::setw(7)
          << kKinds[access.kind].name << "  ";
-    if (access.kind != NodeAccess::kProbe) line << model::quote(access.bytes) << "  ";
+    if (access.kind != NodeAccess::kProbe) line << '"' << cli::printable(access.text) << "\"  ";
     line << (isGood ? "ok" : cli::printable(access.error));
     std::cout << (!isColoured ? ""
                   : isGood    ? kKinds[access.kind].colour

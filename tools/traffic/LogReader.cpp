@@ -125,18 +125,10 @@ constexpr struct {
         {": false", kProbeEnd, "cannot be opened"},
 };
 
-/** @return the text that was written, whose final newline the log escapes. */
-std::string writtenText(const std::string& logged) {
-    std::string text = logged.substr(0, logged.rfind(" , "));
-    if (const size_t newline = text.find("\\n"); newline != std::string::npos)
-        text.replace(newline, 2, "\n");
-    return text;
-}
-
 }  // namespace
 
-void LogReader::begin(std::string_view path, NodeAccess::Kind kind, const std::string& bytes) {
-    mNumber = {nodeName(path), kind, bytes};
+void LogReader::begin(std::string_view path, NodeAccess::Kind kind, const std::string& text) {
+    mNumber = {nodeName(path), kind, text};
     mDirectory = mNumber->node.substr(0, mNumber->node.find('/'));
 }
 
@@ -149,7 +141,7 @@ std::optional<NodeAccess> LogReader::beginWrite(const std::string& text) {
     std::optional<NodeAccess> done;
     if (isStart && mText && mText->leaf() != "event_cmd") done = std::exchange(mText, std::nullopt);
     if (value < text.size()) {
-        begin(path, NodeAccess::kWrite, text.substr(value + kValue.size()) + "\n");
+        begin(path, NodeAccess::kWrite, text.substr(value + kValue.size()) + "\\n");
     }
     return done;
 }
@@ -159,8 +151,8 @@ std::optional<NodeAccess> LogReader::read(std::string_view line) {
     std::optional<NodeAccess> done = readStep(line);
     if (!done) return done;
     if (done->kind == NodeAccess::kRefusal) {
-        done->bytes = after(line.substr(tag), ": ").value_or(line);
-        done->node = done->bytes.substr(0, done->bytes.find(' '));
+        done->text = after(line.substr(tag), ": ").value_or(line);
+        done->node = done->text.substr(0, done->text.find(' '));
         if (done->node == "Pemission") done->node.clear();
     }
     if (tag < line.size()) done->time = readClock(std::string(line.substr(0, tag)), &done->clock);
@@ -197,8 +189,9 @@ std::optional<NodeAccess> LogReader::readStep(std::string_view line) {
         case kTextRead:
             return NodeAccess{mDirectory + '/' + row->detail, NodeAccess::kRead, text};
         case kText:
-            mText = {mDirectory + '/' + row->detail, NodeAccess::kWrite, writtenText(text)};
-            if (mText->leaf() == "event_cmd") mText->bytes.insert(0, "FOLDER_");
+            mText = {mDirectory + '/' + row->detail, NodeAccess::kWrite,
+                     text.substr(0, text.rfind(" , "))};
+            if (mText->leaf() == "event_cmd") mText->text.insert(0, "FOLDER_");
             break;
         case kTextEnd:
             return end(&mText);

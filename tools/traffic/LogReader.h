@@ -19,7 +19,7 @@ class LogReader {
 
   private:
     std::optional<NodeAccess> readStep(std::string_view line);
-    void begin(std::string_view path, NodeAccess::Kind kind, const std::string& bytes);
+    void begin(std::string_view path, NodeAccess::Kind kind, const std::string& text);
     /** @return the text whose success the write shows, if it does. */
     std::optional<NodeAccess> beginWrite(const std::string& text);
 

@@ -13,8 +13,8 @@ struct NodeAccess {
      * operation, if it is known. */
     std::string node;
     Kind kind = kProbe;
-    /** The bytes that were read or written; for a refusal what the service logged. */
-    std::string bytes = {};
+    /** What was read or written, escaped as in C; for a refusal what the service logged. */
+    std::string text = {};
     /** Why it failed, like "ENOENT"; empty if it succeeded. */
     std::string error = {};
     /** When it ended, in s; 0 if the source has no times. */

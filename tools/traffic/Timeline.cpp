@@ -62,7 +62,7 @@ class TimelineMaker {
                 mFirst = std::min(mFirst, access.time - mNow);
                 mNow = access.time - mFirst;
             }
-            write(access.leaf(), access.bytes);
+            write(access.leaf(), access.text);
         }
         mProbed = access.kind == NodeAccess::kProbe && isGood && access.leaf() == "intensity";
     }
@@ -89,33 +89,18 @@ class TimelineMaker {
      * @param text begins with a number, where the node takes one.
      */
     void write(const std::string& leaf, const std::string& text) {
-        using Maker = TimelineMaker;
-        using Take = void (*)(Maker & maker, long long value, const std::string& text);
-        static constexpr std::pair<std::string_view, Take> kNodes[] = {
-                {"enable", [](Maker& m, auto value, auto&) { m.start(value); }},
-                {"duration", [](Maker& m, auto value, auto&) { m.mDuration = value; }},
-                {"activate", [](Maker& m, auto value, auto&) { m.activate(value != 0); }},
-                {"intensity", [](Maker& m, auto value, auto&) { m.setIntensity(value); }},
-                {"haptic_engine", [](Maker& m, auto, auto& packets) { m.takePackets(packets); }},
-                {"cp_trigger_index", [](Maker& m, auto value, auto&) { m.choosePattern(value); }},
-                {"cp_trigger_queue",
-                 [](Maker& m, auto pattern, auto& queue) { m.queuePattern(pattern, queue); }},
-                {"event_cmd",
-                 [](Maker& m, auto, auto& command) {
-                     m.set(command == FOLDER_OPEN_COMMAND ? "fold open" : "fold close");
-                 }},
-                {"ext_control", [](Maker& m, auto value,
-                                   auto&) { m.set(value == 0 ? "external off" : "external on"); }},
-                {"multi_freq",
-                 [](Maker& m, auto value, auto&) { m.set("frequency " + std::to_string(value)); }},
-                {"force_touch_intensity",
-                 [](Maker& m, auto value, auto&) {
-                     m.set("force-touch " + std::to_string(value));
-                 }},
-        };
-        for (const auto& [name, take] : kNodes) {
-            if (name == leaf) take(*this, strtoll(text.c_str(), nullptr, 10), text);
-        }
+        const long long value = strtoll(text.c_str(), nullptr, 10);
+        if (leaf == "enable") start(value);
+        if (leaf == "duration") mDuration = value;
+        if (leaf == "activate") activate(value != 0);
+        if (leaf == "intensity") setIntensity(value);
+        if (leaf == "haptic_engine") takePackets(text);
+        if (leaf == "cp_trigger_index") choosePattern(value);
+        if (leaf == "cp_trigger_queue") queuePattern(value, text);
+        if (leaf == "event_cmd") set(text.find("OPEN") < text.size() ? "fold open" : "fold close");
+        if (leaf == "ext_control") set(value == 0 ? "external off" : "external on");
+        if (leaf == "multi_freq") set("frequency " + std::to_string(value));
+        if (leaf == "force_touch_intensity") set("force-touch " + std::to_string(value));
     }
 
     /** @return whether the last call may be still going on. */

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "traffic/TraceReader.h"
 
-#include <charconv>
 #include <cstdlib>
 
 namespace vibratorctl {
@@ -16,27 +15,12 @@ std::string_view takeWord(std::string_view* text) {
     return word;
 }
 
-/** @return the bytes between quotation marks, which are escaped as in C. */
-std::string unquote(std::string_view text) {
-    const size_t first = text.find('"');
-    const size_t last = text.rfind('"');
-    std::string bytes;
-    for (size_t i = first + 1; first != last && i < last; ++i) {
-        if (text[i] != '\\' || i + 1 == last) {
-            bytes += text[i];
-            continue;
-        }
-        const char escaped = text[++i];
-        if (escaped == 'x' && i + 2 < last) {
-            unsigned byte = 0;
-            std::from_chars(text.data() + i + 1, text.data() + i + 3, byte, 16);
-            bytes += static_cast<char>(byte);
-            i += 2;
-        } else {
-            bytes += escaped == 'n' ? '\n' : escaped == '0' ? '\0' : escaped;
-        }
-    }
-    return bytes;
+/** @return how many bytes an escaped text stands for. */
+size_t sizeOf(std::string_view text) {
+    size_t size = text.size();
+    for (size_t i = 0; (i = text.find('\\', i)) < text.size(); i += 2)
+        size -= text.substr(i, 2) == "\\x" ? 3 : 1;
+    return size;
 }
 
 }  // namespace
@@ -62,8 +46,9 @@ std::optional<NodeAccess> TraceReader::read(std::string_view line) {
     if (call != "close") access.error = error;
     if (isTransfer) {
         access.kind = call == "read" ? NodeAccess::kRead : NodeAccess::kWrite;
-        access.bytes = unquote(line);
-        const bool isShort = strtoul(result.c_str(), nullptr, 10) != access.bytes.size();
+        const size_t start = line.find('"') + 1;
+        access.text = line.substr(start, line.rfind('"') - start);
+        const bool isShort = strtoul(result.c_str(), nullptr, 10) != sizeOf(access.text);
         if (call == "write" && error.empty() && isShort) access.error = "cut short";
         return std::nullopt;
     }
