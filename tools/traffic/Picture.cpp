@@ -6,13 +6,13 @@
 #include <sys/wait.h>
 
 #include <algorithm>
-#include <cctype>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
 #include <iomanip>
 #include <iterator>
 #include <memory>
+#include <regex>
 #include <sstream>
 #include <stdexcept>
 
@@ -22,14 +22,6 @@ namespace {
 
 /** The width that the time takes up, in pixels. */
 constexpr int kColumns = 796;
-
-/** @return the text without characters that have a meaning for gnuplot. */
-std::string plain(std::string text) {
-    std::replace_if(
-            text.begin(), text.end(),
-            [](unsigned char c) { return isalnum(c) == 0 && !strchr(" ,.:%()+-", c); }, '?');
-    return text;
-}
 
 struct Bar {
     double start;
@@ -55,11 +47,11 @@ std::string labelOf(std::vector<Timeline::Mark> marks) {
     const auto first = std::find_if(marks.begin(), marks.end(),
                                     [](const auto& mark) { return !mark.isSetting; });
     if (first != marks.end()) std::rotate(marks.begin(), first, first + 1);
-    std::string label = plain(marks[0].label);
+    std::string label = marks[0].label;
     for (size_t i = 1; i < marks.size(); ++i) {
         if (label.size() + marks[i].label.size() + 2 > kMaxLength)
             return label + " +" + std::to_string(marks.size() - i);
-        label += ", " + plain(marks[i].label);
+        label += ", " + marks[i].label;
     }
     return label;
 }
@@ -110,16 +102,6 @@ std::string runGnuplot(const std::string& script) {
     throw std::runtime_error("gnuplot failed: " + cli::printable(complaint));
 }
 
-/** Replaces the first part of a text that begins and ends so. @return whether there was one. */
-bool replacePart(std::string* text, const std::string& begin, const std::string& end,
-                 const std::string& with) {
-    const size_t from = text->find(begin);
-    const size_t to = text->find(end, from);
-    if (to == std::string::npos) return false;
-    text->replace(from, to + end.size() - from, with);
-    return true;
-}
-
 /** Gives an SVG a title, a description, and dark colours for readers who prefer them. */
 std::string described(const Timeline& timeline, std::string svg) {
     constexpr size_t kMaxCalls = 20;
@@ -135,11 +117,9 @@ std::string described(const Timeline& timeline, std::string svg) {
                              (note.empty() ? "" : " ") + note +
                              "</desc>\n<style>@media (prefers-color-scheme: dark) "
                              "{ svg { filter: invert(1) hue-rotate(180deg) } }</style>";
-    replacePart(&svg, "<title>", "</desc>", head);
+    svg = std::regex_replace(svg, std::regex("<title>[^<]*</title>\\s*<desc>[^<]*</desc>"), head);
     // Names without a meaning, which screen readers would read out.
-    while (replacePart(&svg, "<title>gnuplot_plot_", "</title>", "")) {
-    }
-    return svg;
+    return std::regex_replace(svg, std::regex("<title>gnuplot_plot_[^<]*</title>"), "");
 }
 
 }  // namespace
@@ -158,7 +138,7 @@ std::string plotScript(const Timeline& timeline, PictureFormat format) {
     std::ostringstream out;
     out << std::setprecision(9) << "terminal = '"
         << (format == PictureFormat::kSvg ? "svg" : "pngcairo fontscale 0.75") << "'\ntitle = '"
-        << plain(plotTitle(timeline)) << "'\nnote = '" << plotNote(timeline)
+        << plotTitle(timeline) << "'\nnote = '" << plotNote(timeline)
         << "'\nstart = " << timeline.start << "\nlength = " << length << "\ncolumns = " << kColumns
         << "\ngoing_on = " << (timeline.goesOn ? percentOf(timeline.segments.back().strength) : -1)
         << "\n$calls << END\n";

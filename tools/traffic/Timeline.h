@@ -27,7 +27,7 @@ struct Timeline {
     /** A client's call, inferred from its node accesses. */
     struct Mark {
         double time;
-        /** In the words of a score, like "click light"; letters, digits, blanks and commas. */
+        /** In the words of a score, like "click light"; without quotation marks and backslashes. */
         std::string label;
         /** Whether it only changes a setting of the motor or of the driver. */
         bool isSetting = false;
