@@ -58,121 +58,101 @@ void print(const NodeAccess& access, bool isColoured) {
               << line.str() << (isColoured ? kPlain : "") << std::endl;
 }
 
-/** Prints the access that each line ends; warns once if no line does. */
-class Printer {
+/** Shows the accesses in a file that others append to or replace, or in standard input, "-". */
+class Watch {
   public:
-    Printer(const Client& client, std::string file, bool isColoured)
-        : mClient(client), mFile(std::move(file)), mIsColoured(isColoured) {}
-
-    /** Takes what has come; an incomplete line is kept until the rest comes. */
-    void take(const std::string& part) {
-        constexpr size_t kMaxLine = 1 << 20;
-        size_t start = 0;
-        for (size_t end; (end = part.find('\n', start)) != std::string::npos; start = end + 1) {
-            mLine.append(part, start, end - start);
-            takeLine();
-        }
-        mLine.append(part, start);
-        if (mLine.size() > kMaxLine) {
-            throw cli::UsageError(mFile + ": a line of more than 1 MiB");
-        }
-    }
-    void forgetIncomplete() { mLine.clear(); }
-    void takeIncomplete() {
-        if (!mLine.empty()) takeLine();
-    }
-
-    /** Called when all that there is has been read. */
-    void end() {
-        if (mIsKnown || mLines == 0) return;
-        mIsKnown = true;
-        mClient.warn("watch: " + mFile +
-                     ": no access of a node in it; is it a trace, or the daemon's log?");
-    }
-
-  private:
-    void takeLine() {
-        constexpr size_t kMany = 100;
-        const std::string line = std::exchange(mLine, {});
-        const auto access = mReader.read(line);
-        mIsKnown = mIsKnown || access;
-        if (++mLines == kMany) end();
-        if (access) print(*access, mIsColoured);
-    }
-
-    const Client& mClient;
-    const std::string mFile;
-    const bool mIsColoured;
-    AccessReader mReader;
-    std::string mLine;
-    size_t mLines = 0;
-    bool mIsKnown = false;
-};
-
-/** A file that others append to or replace; or standard input, "-". */
-class GrowingFile {
-  public:
-    explicit GrowingFile(std::string name) : mName(std::move(name)) { open(); }
-
-    void skip() const { lseek(mFile.get(), 0, SEEK_END); }
-    /** @return some of the next bytes; "" at the end. */
-    std::string read() const {
-        char part[65536];
-        const ssize_t size = ::read(mFile.get(), part, sizeof(part));
-        if (size < 0) fail();
-        return {part, static_cast<size_t>(size)};
-    }
-    /** Opens the file again if it was replaced or cut. @return whether it did. */
-    bool openIfNew() {
-        struct stat now = {};
-        struct stat opened = {};
-        if (stat(mName.c_str(), &now) != 0 || !S_ISREG(now.st_mode)) return false;
-        fstat(mFile.get(), &opened);
-        const bool isSame = now.st_dev == opened.st_dev && now.st_ino == opened.st_ino;
-        if (isSame && lseek(mFile.get(), 0, SEEK_CUR) <= now.st_size) return false;
+    Watch(const Client& client, std::string file, bool isColoured)
+        : mClient(client), mName(std::move(file)), mIsColoured(isColoured) {
         open();
-        return true;
+    }
+
+    /** Shows accesses as they come, or only those that are there. @return the exit code. */
+    int run(bool fromStart, bool once) {
+        const bool isInput = mName == "-";
+        if (!isInput && !fromStart && !once) lseek(mFile.get(), 0, SEEK_END);
+        if (!once) {
+            std::cerr << "Waiting for accesses in "
+                      << (isInput ? "standard input" : cli::printable(mName)) << "; Ctrl-C ends it."
+                      << std::endl;
+        }
+        while (std::cout) {
+            if (readMore()) continue;
+            if (once || isInput) break;
+            warnIfUnknown();
+            openIfNew();
+            std::this_thread::sleep_for(std::chrono::milliseconds(50));
+        }
+        if (!mLine.empty()) takeLine();
+        warnIfUnknown();
+        return cli::kSuccess;
     }
 
   private:
     void open() {
         mFile.reset(mName == "-" ? dup(STDIN_FILENO) : ::open(mName.c_str(), O_RDONLY | O_CLOEXEC));
         // A directory opens, too, and says only here that it is one.
-        if (!mFile.isValid() || ::read(mFile.get(), nullptr, 0) < 0) fail();
+        if (!mFile.isValid() || read(mFile.get(), nullptr, 0) < 0) fail();
     }
     [[noreturn]] void fail() const {
         throw cli::UsageError(mName + ": cannot be read: " + strerror(errno));
     }
 
-    std::string mName;
-    ::android::UniqueFd mFile;
-};
+    /** Takes some of what has come; an incomplete line is kept. @return false at the end. */
+    bool readMore() {
+        constexpr size_t kMaxLine = 1 << 20;
+        char part[65536];
+        const ssize_t size = read(mFile.get(), part, sizeof(part));
+        if (size < 0) fail();
+        for (const char* next = part; next < part + size; ++next) {
+            if (*next == '\n') {
+                takeLine();
+            } else {
+                mLine += *next;
+            }
+        }
+        if (mLine.size() > kMaxLine) throw cli::UsageError(mName + ": a line of more than 1 MiB");
+        return size > 0;
+    }
 
-/** Shows accesses as they come, or only those that are there. @return the exit code. */
-int watch(const Client& client, const std::string& name, bool fromStart, bool once,
-          bool isColoured) {
-    const bool isInput = name == "-";
-    GrowingFile file(name);
-    if (!isInput && !fromStart && !once) file.skip();
-    if (!once) {
-        std::cerr << "Waiting for accesses in "
-                  << (isInput ? "standard input" : cli::printable(name)) << "; Ctrl-C ends it."
-                  << std::endl;
+    void takeLine() {
+        constexpr size_t kMany = 100;
+        const auto access = mReader.read(std::exchange(mLine, {}));
+        mIsKnown = mIsKnown || access;
+        if (++mLines == kMany) warnIfUnknown();
+        if (access) print(*access, mIsColoured);
     }
-    Printer printer(client, name, isColoured);
-    while (std::cout) {
-        const std::string part = file.read();
-        printer.take(part);
-        if (!part.empty()) continue;
-        if (once || isInput) break;
-        printer.end();
-        if (file.openIfNew()) printer.forgetIncomplete();
-        std::this_thread::sleep_for(std::chrono::milliseconds(50));
+
+    /** Warns once, if there are lines and none of them ends an access. */
+    void warnIfUnknown() {
+        if (mIsKnown || mLines == 0) return;
+        mIsKnown = true;
+        mClient.warn("watch: " + mName +
+                     ": no access of a node in it; is it a trace, or the daemon's log?");
     }
-    printer.takeIncomplete();
-    printer.end();
-    return cli::kSuccess;
-}
+
+    /** Begins anew with a file that was replaced or cut. */
+    void openIfNew() {
+        struct stat now = {};
+        struct stat opened = {};
+        if (stat(mName.c_str(), &now) != 0 || !S_ISREG(now.st_mode)) return;
+        fstat(mFile.get(), &opened);
+        const bool isSame = now.st_dev == opened.st_dev && now.st_ino == opened.st_ino;
+        if (isSame && lseek(mFile.get(), 0, SEEK_CUR) <= now.st_size) return;
+        open();
+        mLine.clear();
+    }
+
+    const Client& mClient;
+    const std::string mName;
+    const bool mIsColoured;
+    ::android::UniqueFd mFile;
+    AccessReader mReader;
+    /** A line whose end has not come. */
+    std::string mLine;
+    size_t mLines = 0;
+    /** Whether a line has ended an access, or the user was warned. */
+    bool mIsKnown = false;
+};
 
 }  // namespace
 
@@ -190,7 +170,7 @@ void addWatch(Client& client) {
     command.note(
             "A trace does not show the calls that the service refused; the daemon's log does.");
     command.withoutJson().run([=, &client] {
-        return watch(client, traffic(), *fromStart, *once, wantsColour(*colour));
+        return Watch(client, traffic(), wantsColour(*colour)).run(*fromStart, *once);
     });
 }
 
