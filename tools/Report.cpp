@@ -9,24 +9,6 @@ using nlohmann::ordered_json;
 
 namespace vibratorctl {
 
-Served describe(const std::optional<Process>& server, const Route& route) {
-    constexpr const char* kManagers[] = {"none is needed", "answers", ""};
-    constexpr const char* kStates[] = {"not needed", "answers", "silent"};
-    const auto manager = static_cast<size_t>(route.manager);
-    const auto& [kind, path, why] = route.transport;
-    Served served{"a process that is not known",
-                  route.transport.inWords(),
-                  kManagers[manager] + route.whyNoManager,
-                  {{"server", nullptr},
-                   {"transport", {{"kind", kind}, {"path", path}, {"why", why}}},
-                   {"manager", {{"state", kStates[manager]}}}}};
-    if (!server) return served;
-    served.server = server->inWords() + (server->program.empty() ? "" : ", " + server->program);
-    served.members["server"] = {
-            {"pid", server->pid}, {"uid", server->uid}, {"program", server->program}};
-    return served;
-}
-
 ordered_json asJson(const LocalDriver::Motor& motor) {
     return {{"name", motor.name}, {"number", motor.number}, {"found", motor.found}};
 }

@@ -33,15 +33,6 @@ struct Subject {
     nlohmann::ordered_json members = nlohmann::ordered_json::object();
 };
 
-/** Who serves the calls and how they get there: the lines for a person, and the members. */
-struct Served {
-    std::string server;
-    std::string transport;
-    std::string manager;
-    nlohmann::ordered_json members;
-};
-Served describe(const std::optional<Process>& server, const Route& route);
-
 /** @return a motor as a member of the JSON. */
 nlohmann::ordered_json asJson(const LocalDriver::Motor& motor);
 

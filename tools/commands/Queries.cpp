@@ -52,7 +52,7 @@ int supports(const Client& client) {
 
 int status(const Client& client, uint32_t waitMs) {
     const auto vibrator = await(client, waitMs);
-    const Served served = describe(serverOf(*vibrator), findRoute());
+    const Served served = describe(serverOf(*vibrator));
     std::vector<std::string> interfaces;
     reached(vibrator->interfaceChain([&](const auto& chain) {
         for (const auto& descriptor : chain)

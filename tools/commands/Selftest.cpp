@@ -111,7 +111,8 @@ class Selftest {
     int run() {
         mBefore = look();
         checkInterfaces();
-        checkQueries();
+        for (const auto& [question, wanted, got] : compareAnswers(*mVibrator, mDriver))
+            expect(question, wanted, got);
         // The LED trigger keeps its duration, and then counts as running.
         ask<&I::on, 0>(*mVibrator);
         for (const Trial& trial : kTrials)
@@ -150,7 +151,6 @@ class Selftest {
 
     void checkInterfaces();
     void checkHashes(size_t interfaces);
-    void checkQueries();
     /** @return what each node of the driver holds, by its leaf. */
     std::map<std::string, std::string> look() const;
     void tryOut(const Trial& trial);
@@ -209,24 +209,6 @@ void Selftest::checkHashes(size_t interfaces) {
     while (same < std::min({kOurs, built.size(), reported.size()}) && built[same] == reported[same])
         ++same;
     expect("the service's own interfaces are those of this client", true, same == kOurs);
-}
-
-void Selftest::checkQueries() {
-    const bool isPermitted = mayCallRestricted();
-    for (const Query& query : kQueries) {
-        const bool wanted = (isPermitted || query.isForAll) && (mDriver.*query.expect)();
-        expect(query.operation, wanted, reached((*mVibrator.*query.ask)()));
-    }
-    if (!isPermitted || !mDriver.isUsable()) return;
-    std::string count;
-    reached(mVibrator->daxGetNumberOfPrebakedHapticPattern([&](auto status, uint32_t patterns) {
-        if (status == VibratorStatus::OK) count = std::to_string(patterns);
-    }));
-    expect("number of patterns", mDriver.look("num_waves").firstLine(), count);
-    for (const uint32_t type : {0U, 1U}) {
-        expect("ladder " + std::to_string(type), ladderInWords(mDriver.ladder(type)),
-               ladderInWords(askLadder(*mVibrator, type)));
-    }
 }
 
 std::map<std::string, std::string> Selftest::look() const {

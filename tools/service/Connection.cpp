@@ -3,8 +3,6 @@
 
 #include <hidl/Host.h>
 
-#include <chrono>
-
 namespace host = ::android::hardware::host;
 
 namespace vibratorctl {
@@ -29,10 +27,24 @@ std::optional<Process> serverOf(IDaxVibrator& vibrator) {
     return result.isOk() && pid > 0 ? readProcess(pid) : std::nullopt;
 }
 
-Route findRoute() {
-    Route route{host::transport(), {}, ""};
-    route.manager = host::managerState(&route.whyNoManager);
-    return route;
+Served describe(const std::optional<Process>& server) {
+    constexpr const char* kManagers[] = {"none is needed", "answers", ""};
+    constexpr const char* kStates[] = {"not needed", "answers", "silent"};
+    std::string whyNoManager;
+    const auto manager = static_cast<size_t>(host::managerState(&whyNoManager));
+    const auto transport = host::transport();
+    const auto& [kind, path, why] = transport;
+    Served served{"a process that is not known",
+                  transport.inWords(),
+                  kManagers[manager] + whyNoManager,
+                  {{"server", nullptr},
+                   {"transport", {{"kind", kind}, {"path", path}, {"why", why}}},
+                   {"manager", {{"state", kStates[manager]}}}}};
+    if (!server) return served;
+    served.server = server->inWords() + (server->program.empty() ? "" : ", " + server->program);
+    served.members["server"] = {
+            {"pid", server->pid}, {"uid", server->uid}, {"program", server->program}};
+    return served;
 }
 
 }  // namespace vibratorctl

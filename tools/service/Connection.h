@@ -3,11 +3,11 @@
 
 #include "service/Process.h"
 
-#include <hidl/Host.h>
 #include <hidl/Status.h>
 #include <vendor/velmora/hardware/vibrator/2.1/IDaxVibrator.h>
 
 #include <chrono>
+#include <nlohmann/json.hpp>
 #include <stdexcept>
 #include <string>
 
@@ -41,14 +41,15 @@ T reached(const ::android::hardware::Return<T>& result) {
 /** @return the process that serves the calls; nothing where /proc does not show it. */
 std::optional<Process> serverOf(IDaxVibrator& vibrator);
 
-/** How calls get to the service. */
-struct Route {
-    ::android::hardware::Transport transport;
-    ::android::hardware::host::ManagerState manager;
-    /** Why no service manager answers that is needed. */
-    std::string whyNoManager;
+/** Who serves the calls and how they get there: the lines for a person, and the members. */
+struct Served {
+    std::string server;
+    std::string transport;
+    std::string manager;
+    nlohmann::ordered_json members;
 };
 
-Route findRoute();
+/** @return how the last call to a server got there, or would have got. */
+Served describe(const std::optional<Process>& server);
 
 }  // namespace vibratorctl

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "service/Queries.h"
 
+#include "service/Reasons.h"
+
 namespace vibratorctl {
 
 const std::vector<Query> kQueries = {
@@ -28,6 +30,28 @@ const std::vector<Query> kQueries = {
          &IDaxVibrator::daxSupportsEnhancedVelmoraHapticPattern,
          &LocalDriver::daxSupportsEnhancedVelmoraHapticPattern},
 };
+
+std::vector<Comparison> compareAnswers(IDaxVibrator& vibrator, const LocalDriver& driver) {
+    std::vector<Comparison> answers;
+    const bool isPermitted = mayCallRestricted();
+    for (const Query& query : kQueries) {
+        const bool wanted = (isPermitted || query.isForAll) && (driver.*query.expect)();
+        const bool got = reached((vibrator.*query.ask)());
+        answers.push_back({query.operation, wanted ? "yes" : "no", got ? "yes" : "no"});
+    }
+    if (!isPermitted || !driver.isUsable()) return answers;
+    std::string count;
+    reached(vibrator.daxGetNumberOfPrebakedHapticPattern([&](auto status, uint32_t patterns) {
+        if (status == VibratorStatus::OK) count = std::to_string(patterns);
+    }));
+    const LocalDriver::Node waves = driver.look("num_waves");
+    answers.push_back({"number of patterns", waves.reads ? waves.firstLine() : "", count});
+    for (const uint32_t type : {0U, 1U}) {
+        answers.push_back({"ladder " + std::to_string(type), ladderInWords(driver.ladder(type)),
+                           ladderInWords(askLadder(vibrator, type))});
+    }
+    return answers;
+}
 
 LocalDriver driverOf(IDaxVibrator& vibrator) {
     return LocalDriver(serverOf(vibrator).value_or(thisProcess()));

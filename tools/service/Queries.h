@@ -24,6 +24,17 @@ struct Query {
 };
 extern const std::vector<Query> kQueries;
 
+/** What the service answers to a question, and what the driver's nodes make of it. */
+struct Comparison {
+    std::string question;
+    std::string wanted;
+    std::string got;
+};
+
+/** Asks all that this process's user may ask; of a driver that is not usable only the queries.
+ * @throw Unreachable */
+std::vector<Comparison> compareAnswers(IDaxVibrator& vibrator, const LocalDriver& driver);
+
 /** @return the driver, judged for the process that serves the calls; where that is not seen, for
  * this one. */
 LocalDriver driverOf(IDaxVibrator& vibrator);
