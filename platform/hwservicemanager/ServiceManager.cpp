@@ -11,13 +11,8 @@
 #include <functional>
 #include <utility>
 
+namespace android::hardware {
 namespace {
-
-using ::android::sp;
-using ::android::wp;
-using ::android::hardware::getOrCreateCachedBinder;
-using ::android::hardware::hidl_death_recipient;
-using ::android::hardware::IPCThreadState;
 
 constexpr char kTag[] = "hwservicemanager";
 
@@ -31,7 +26,7 @@ class WhenDead : public hidl_death_recipient {
   public:
     explicit WhenDead(std::function<void()> call) : mCall(std::move(call)) {}
     void serviceDied(uint64_t /* cookie */,
-                     const wp<::android::hidl::base::V1_0::IBase>& /* who */) override {
+                     const wp<ServiceManagerBase::IBase>& /* who */) override {
         mCall();
     }
 
@@ -60,20 +55,19 @@ ServiceManager::Service::~Service() {
     object->unlinkToDeath(recipient);
 }
 
-ServiceManager::Return<sp<ServiceManager::Interface>> ServiceManager::get(const Text& interface,
-                                                                          const Text& name) {
+Return<sp<ServiceManager::IBase>> ServiceManager::get(const hidl_string& interface,
+                                                      const hidl_string& name) {
     const auto found = mServices.find({interface, name});
-    return found == mServices.end() ? sp<Interface>() : found->second->object;
+    return found == mServices.end() ? sp<IBase>() : found->second->object;
 }
 
-ServiceManager::Return<bool> ServiceManager::add(const Text& name, const sp<Interface>& service) {
+Return<bool> ServiceManager::add(const hidl_string& name, const sp<IBase>& service) {
     // Checked first: to ask a hostile object for its interfaces could take for ever.
     return mayAdd(name) && ServiceManagerBase::add(name, service).withDefault(false);
 }
 
-ServiceManager::Return<bool> ServiceManager::addWithChain(
-        const Text& name, const sp<Interface>& service,
-        const ::android::hardware::hidl_vec<Text>& chain) {
+Return<bool> ServiceManager::addWithChain(const hidl_string& name, const sp<IBase>& service,
+                                          const hidl_vec<hidl_string>& chain) {
     if (!mayAdd(name) || service == nullptr || chain.size() == 0 || name.empty()) return false;
     auto added = std::make_shared<Service>();
     added->object = service;
@@ -82,8 +76,8 @@ ServiceManager::Return<bool> ServiceManager::addWithChain(
     if (service->isRemote() && !service->linkToDeath(added->recipient, 0).withDefault(false)) {
         return false;
     }
-    for (const Text& interface : chain) {
-        if (interface == Interface::descriptor) continue;
+    for (const hidl_string& interface : chain) {
+        if (interface == IBase::descriptor) continue;
         mServices[{interface, name}] = added;
         for (const Listener& listener : mListeners) {
             if (listener.name.first == std::string(interface) &&
@@ -110,8 +104,9 @@ std::vector<ServiceManager::InstanceDebugInfo> ServiceManager::services() {
     return infos;
 }
 
-ServiceManager::Return<bool> ServiceManager::registerForNotifications(
-        const Text& interface, const Text& name, const sp<Notification>& callback) {
+Return<bool> ServiceManager::registerForNotifications(const hidl_string& interface,
+                                                      const hidl_string& name,
+                                                      const sp<IServiceNotification>& callback) {
     const uid_t uid = IPCThreadState::self()->getCallingUid();
     const auto count = std::count_if(mListeners.begin(), mListeners.end(),
                                      [&](const Listener& each) { return each.uid == uid; });
@@ -120,7 +115,7 @@ ServiceManager::Return<bool> ServiceManager::registerForNotifications(
         return false;
     }
     const sp<hidl_death_recipient> recipient =
-            new WhenDead([this, callback = wp<Notification>(callback)] {
+            new WhenDead([this, callback = wp<IServiceNotification>(callback)] {
                 removeListeners({}, callback.promote());
             });
     if (callback->isRemote() && !callback->linkToDeath(recipient, 0).withDefault(false)) {
@@ -135,12 +130,13 @@ ServiceManager::Return<bool> ServiceManager::registerForNotifications(
     return true;
 }
 
-ServiceManager::Return<bool> ServiceManager::unregisterForNotifications(
-        const Text& interface, const Text& name, const sp<Notification>& callback) {
+Return<bool> ServiceManager::unregisterForNotifications(const hidl_string& interface,
+                                                        const hidl_string& name,
+                                                        const sp<IServiceNotification>& callback) {
     return callback != nullptr && removeListeners({interface, name}, callback) > 0;
 }
 
-size_t ServiceManager::removeListeners(const Name& name, const sp<Notification>& callback) {
+size_t ServiceManager::removeListeners(const Name& name, const sp<IServiceNotification>& callback) {
     const size_t before = mListeners.size();
     const auto isMeant = [&](const Listener& each) {
         if (!(name.first.empty() || each.name == name) || callback == nullptr ||
@@ -155,8 +151,8 @@ size_t ServiceManager::removeListeners(const Name& name, const sp<Notification>&
     return before - mListeners.size();
 }
 
-ServiceManager::Return<bool> ServiceManager::tryUnregister(const Text& interface, const Text& name,
-                                                           const sp<Interface>& service) {
+Return<bool> ServiceManager::tryUnregister(const hidl_string& interface, const hidl_string& name,
+                                           const sp<IBase>& service) {
     const auto found = mServices.find({interface, name});
     if (found == mServices.end() || service == nullptr ||
         found->second->pid != IPCThreadState::self()->getCallingPid() ||
@@ -167,3 +163,5 @@ ServiceManager::Return<bool> ServiceManager::tryUnregister(const Text& interface
     removeService(last.get());
     return true;
 }
+
+}  // namespace android::hardware

@@ -11,6 +11,8 @@
 #include <string>
 #include <vector>
 
+namespace android::hardware {
+
 /**
  * Knows the services of the machine by the names of their interfaces and instances.
  *
@@ -18,28 +20,22 @@
  * the manager runs as may add them: whoever adds one receives the calls for it. The last one added
  * under a name has it. A service loses its names when its process ends.
  */
-class ServiceManager : public ::android::hardware::ServiceManagerBase {
+class ServiceManager : public ServiceManagerBase {
   public:
-    using Interface = ::android::hidl::base::V1_0::IBase;
-    using Notification = ::android::hidl::manager::V1_0::IServiceNotification;
-    template <typename T>
-    using Return = ::android::hardware::Return<T>;
-    using Text = ::android::hardware::hidl_string;
-
-    Return<::android::sp<Interface>> get(const Text& interface, const Text& name) override;
-    Return<bool> add(const Text& name, const ::android::sp<Interface>& service) override;
-    Return<bool> addWithChain(const Text& name, const ::android::sp<Interface>& service,
-                              const ::android::hardware::hidl_vec<Text>& chain) override;
+    Return<sp<IBase>> get(const hidl_string& interface, const hidl_string& name) override;
+    Return<bool> add(const hidl_string& name, const sp<IBase>& service) override;
+    Return<bool> addWithChain(const hidl_string& name, const sp<IBase>& service,
+                              const hidl_vec<hidl_string>& chain) override;
     /** @param name empty for every instance. @return false for too many from one user, or too long
      * a name. */
-    Return<bool> registerForNotifications(const Text& interface, const Text& name,
-                                          const ::android::sp<Notification>& callback) override;
+    Return<bool> registerForNotifications(const hidl_string& interface, const hidl_string& name,
+                                          const sp<IServiceNotification>& callback) override;
     /** @param interface empty for every one that the callback is registered for. */
-    Return<bool> unregisterForNotifications(const Text& interface, const Text& name,
-                                            const ::android::sp<Notification>& callback) override;
+    Return<bool> unregisterForNotifications(const hidl_string& interface, const hidl_string& name,
+                                            const sp<IServiceNotification>& callback) override;
     /** Only the process that has added a service may take it away. */
-    Return<bool> tryUnregister(const Text& interface, const Text& name,
-                               const ::android::sp<Interface>& service) override;
+    Return<bool> tryUnregister(const hidl_string& interface, const hidl_string& name,
+                               const sp<IBase>& service) override;
 
   private:
     /** An interface and an instance. */
@@ -47,9 +43,9 @@ class ServiceManager : public ::android::hardware::ServiceManagerBase {
 
     /** A service with all of its names. */
     struct Service {
-        ::android::sp<Interface> object;
+        sp<IBase> object;
         pid_t pid;
-        ::android::sp<::android::hardware::hidl_death_recipient> recipient;
+        sp<hidl_death_recipient> recipient;
 
         ~Service();
     };
@@ -57,15 +53,17 @@ class ServiceManager : public ::android::hardware::ServiceManagerBase {
     /** A request for notifications. */
     struct Listener {
         Name name;
-        ::android::sp<Notification> callback;
+        sp<IServiceNotification> callback;
         uid_t uid;
-        ::android::sp<::android::hardware::hidl_death_recipient> recipient;
+        sp<hidl_death_recipient> recipient;
     };
 
     std::vector<InstanceDebugInfo> services() override;
     void removeService(const Service* service);
-    size_t removeListeners(const Name& name, const ::android::sp<Notification>& callback);
+    size_t removeListeners(const Name& name, const sp<IServiceNotification>& callback);
 
     std::map<Name, std::shared_ptr<Service>> mServices;
     std::vector<Listener> mListeners;
 };
+
+}  // namespace android::hardware

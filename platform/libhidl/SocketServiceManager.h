@@ -18,23 +18,18 @@ class SocketServiceManager : public ServiceManagerBase {
 
     /** Finds a service. @return OK, or why it is not there. */
     static Error find(SocketDriver& driver, const std::string& interface,
-                      const std::string& instance, sp<::android::hidl::base::V1_0::IBase>* service);
+                      const std::string& instance, sp<IBase>* service);
 
-    Return<sp<::android::hidl::base::V1_0::IBase>> get(const hidl_string& interface,
-                                                       const hidl_string& name) override;
+    Return<sp<IBase>> get(const hidl_string& interface, const hidl_string& name) override;
     /** Has a thread look for the service ten times a second. */
-    Return<bool> registerForNotifications(
-            const hidl_string& interface, const hidl_string& name,
-            const sp<::android::hidl::manager::V1_0::IServiceNotification>& callback) override;
-    Return<bool> unregisterForNotifications(
-            const hidl_string& interface, const hidl_string& name,
-            const sp<::android::hidl::manager::V1_0::IServiceNotification>& callback) override;
-    Return<bool> addWithChain(const hidl_string& name,
-                              const sp<::android::hidl::base::V1_0::IBase>& service,
+    Return<bool> registerForNotifications(const hidl_string& interface, const hidl_string& name,
+                                          const sp<IServiceNotification>& callback) override;
+    Return<bool> unregisterForNotifications(const hidl_string& interface, const hidl_string& name,
+                                            const sp<IServiceNotification>& callback) override;
+    Return<bool> addWithChain(const hidl_string& name, const sp<IBase>& service,
                               const hidl_vec<hidl_string>& chain) override;
     /** Objects stay known until their process ends. */
-    Return<bool> tryUnregister(const hidl_string&, const hidl_string&,
-                               const sp<::android::hidl::base::V1_0::IBase>&) override {
+    Return<bool> tryUnregister(const hidl_string&, const hidl_string&, const sp<IBase>&) override {
         return false;
     }
 

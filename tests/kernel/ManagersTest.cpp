@@ -17,7 +17,7 @@ namespace hardware = ::android::hardware;
 
 /** Knows the operations of manager 1.0 alone, since only their stub receives its calls. */
 TEST(ManagersTest, DISABLED_OfVersion1_0) {
-    const sp<BnHwServiceManager> manager = new BnHwServiceManager(new ServiceManager);
+    const sp<BnHwServiceManager> manager = new BnHwServiceManager(new hardware::ServiceManager);
     ASSERT_EQ(hardware::ProcessState::self()->driver().becomeContextManager(manager), android::OK);
     hardware::configureRpcThreadpool(1, true);
     hardware::joinRpcThreadpool();

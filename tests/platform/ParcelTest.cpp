@@ -51,7 +51,7 @@ TEST(ParcelTest, WhatIsReadIsWhatWasWritten) {
 }
 
 TEST(ParcelTest, ObjectsAreReadAsWhatTheyAre) {
-    const sp<IBinder> objects[] = {getOrCreateCachedBinder(new ServiceManager),
+    const sp<IBinder> objects[] = {getOrCreateCachedBinder(new android::hardware::ServiceManager),
                                    ProcessState::self()->getStrongProxyForHandle(4'000'000'002),
                                    nullptr};
     Parcel parcel;

@@ -18,6 +18,7 @@ using ::android::hardware::getOrCreateCachedBinder;
 using ::android::hardware::hidl_death_recipient;
 using ::android::hardware::hidl_string;
 using ::android::hardware::Return;
+using ::android::hardware::ServiceManager;
 using Notification = ::android::hidl::manager::V1_0::IServiceNotification;
 using ::android::hidl::manager::V1_0::BpHwServiceNotification;
 
@@ -71,7 +72,7 @@ class ServiceManagerTest : public ::testing::Test {
         return result;
     }
     bool knows(const char* name) {
-        return sp<ServiceManager::Interface>(mManager->get(kInterface, name)) != nullptr;
+        return sp<ServiceManager::IBase>(mManager->get(kInterface, name)) != nullptr;
     }
 
     const sp<ServiceManager> mManager = new ServiceManager;
@@ -142,11 +143,11 @@ TEST_F(ServiceManagerTest, LastOneAddedHasTheNamesAndOnlyItsProcessTakesThemAway
     const Caller caller(0, 7);
     EXPECT_TRUE(mManager->addWithChain("default", mObject, {kInterface, "a@1.0::IA"}));
     EXPECT_TRUE(mManager->addWithChain("default", second,
-                                       {kInterface, ServiceManager::Interface::descriptor}));
+                                       {kInterface, ServiceManager::IBase::descriptor}));
     EXPECT_EQ(names(), (std::vector<std::string>{"a@1.0::IA/default",
                                                  std::string(kInterface) + "/default"}));
-    EXPECT_EQ(sp<ServiceManager::Interface>(mManager->get(kInterface, "default")), second);
-    EXPECT_EQ(sp<ServiceManager::Interface>(mManager->get("a@1.0::IA", "default")), mObject);
+    EXPECT_EQ(sp<ServiceManager::IBase>(mManager->get(kInterface, "default")), second);
+    EXPECT_EQ(sp<ServiceManager::IBase>(mManager->get("a@1.0::IA", "default")), mObject);
     EXPECT_FALSE(mManager->tryUnregister(kInterface, "default", mObject)) << "it has lost the name";
     EXPECT_FALSE(mManager->tryUnregister(kInterface, "default", nullptr));
     EXPECT_FALSE(mManager->tryUnregister(kInterface, "other", second));

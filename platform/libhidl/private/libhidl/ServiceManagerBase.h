@@ -10,9 +10,12 @@ namespace android::hardware {
 /** What both service managers of this platform answer in the same way. */
 class ServiceManagerBase : public ::android::hidl::manager::V1_2::IServiceManager {
   public:
+    using IBase = ::android::hidl::base::V1_0::IBase;
+    using IClientCallback = ::android::hidl::manager::V1_2::IClientCallback;
+    using IServiceNotification = ::android::hidl::manager::V1_0::IServiceNotification;
+
     /** Adds a service under the names of the interfaces that it says it has. */
-    Return<bool> add(const hidl_string& name,
-                     const sp<::android::hidl::base::V1_0::IBase>& service) override {
+    Return<bool> add(const hidl_string& name, const sp<IBase>& service) override {
         if (service == nullptr) return false;
         bool success = false;
         const Return<void> result = service->interfaceChain(
@@ -50,14 +53,11 @@ class ServiceManagerBase : public ::android::hidl::manager::V1_2::IServiceManage
     Return<void> registerPassthroughClient(const hidl_string&, const hidl_string&) override {
         return Void();
     }
-    Return<bool> registerClientCallback(
-            const hidl_string&, const hidl_string&, const sp<::android::hidl::base::V1_0::IBase>&,
-            const sp<::android::hidl::manager::V1_2::IClientCallback>&) override {
+    Return<bool> registerClientCallback(const hidl_string&, const hidl_string&, const sp<IBase>&,
+                                        const sp<IClientCallback>&) override {
         return false;
     }
-    Return<bool> unregisterClientCallback(
-            const sp<::android::hidl::base::V1_0::IBase>&,
-            const sp<::android::hidl::manager::V1_2::IClientCallback>&) override {
+    Return<bool> unregisterClientCallback(const sp<IBase>&, const sp<IClientCallback>&) override {
         return false;
     }
     Return<void> listManifestByInterface(const hidl_string& interface,
