@@ -38,9 +38,6 @@ class ServiceManager : public ServiceManagerBase {
                                const sp<IBase>& service) override;
 
   private:
-    /** An interface and an instance. */
-    using Name = std::pair<std::string, std::string>;
-
     /** A service with all of its names. */
     struct Service {
         sp<IBase> object;

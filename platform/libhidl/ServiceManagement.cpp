@@ -38,12 +38,18 @@ Error errorOf(const details::return_status& call) {
     return {error == OK ? UNKNOWN_ERROR : error, call.description()};
 }
 
+/** @return the service manager of this process; nullptr where another process is that. */
+SocketServiceManager* ownManager() {
+    SocketDriver* const sockets = driver().socketDriver();
+    if (sockets == nullptr) return nullptr;
+    static const auto& manager = *new sp<SocketServiceManager>(new SocketServiceManager(*sockets));
+    return manager.get();
+}
+
 /** Asks once for the service manager. @return OK, or why none answers. */
 Error askForManager(sp<Manager>* manager) {
-    if (SocketDriver* sockets = driver().socketDriver()) {
-        *manager = new SocketServiceManager(*sockets);
-        return {};
-    }
+    *manager = ownManager();
+    if (*manager != nullptr) return {};
     Error error = driver().check();
     if (!error.isOk()) return error;
     const sp<Manager> proxy =
@@ -57,9 +63,7 @@ Error askForManager(sp<Manager>* manager) {
 
 /** Looks a name up once. @return OK, or why nothing has it. */
 Error lookUp(const std::string& interface, const std::string& instance, sp<IBase>* service) {
-    if (SocketDriver* sockets = driver().socketDriver()) {
-        return SocketServiceManager::find(*sockets, interface, instance, service);
-    }
+    if (auto* own = ownManager()) return own->find(interface, instance, service);
     sp<Manager> manager;
     Error error = askForManager(&manager);
     if (!error.isOk()) return error;
@@ -223,7 +227,7 @@ status_t registerAsServiceInternal(const sp<IBase>& service, const std::string& 
     static auto* const registrations = new sp<Registrations>(new Registrations);
     const Error error = (*registrations)->add(service, instance);
     // Over sockets the server has said why, and goes on trying.
-    if (!error.isOk() && driver().socketDriver() == nullptr) {
+    if (!error.isOk() && ownManager() == nullptr) {
         __android_log_print(ANDROID_LOG_ERROR, kLogTag, "not registered: %s", error.text().c_str());
     }
     return error.code();
@@ -244,7 +248,7 @@ void setCallTimeout(milliseconds limit) {
 }
 
 ManagerState managerState(std::string* whyNot) {
-    if (driver().socketDriver() != nullptr) return ManagerState::NOT_NEEDED;
+    if (ownManager() != nullptr) return ManagerState::NOT_NEEDED;
     sp<Manager> manager;
     const Error error = askForManager(&manager);
     if (error.isOk()) return ManagerState::ANSWERS;

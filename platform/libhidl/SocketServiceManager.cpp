@@ -11,24 +11,14 @@
 
 #include <algorithm>
 #include <chrono>
-#include <map>
 #include <thread>
 #include <utility>
 
 namespace android::hardware {
-namespace {
 
 using ::android::hidl::base::V1_0::IBase;
-using ::android::hidl::manager::V1_0::IServiceNotification;
 
-/** An interface and an instance. */
-using Name = std::pair<std::string, std::string>;
-
-/** What tells a socket from another one of its name: it changes with every registration. */
-using Socket = std::pair<ino_t, time_t>;
-
-/** @return the sockets where this process looks for services, also by the links to them. */
-std::map<Name, Socket> listSockets() {
+auto SocketServiceManager::listSockets() -> std::map<Name, Socket> {
     std::map<Name, Socket> sockets;
     for (const std::string& path : clientDirectories()) {
         SocketDirectory directory;
@@ -54,72 +44,10 @@ std::map<Name, Socket> listSockets() {
     return sockets;
 }
 
-/** Who wants to hear of which service. */
-class Notifications {
-  public:
-    static Notifications& instance() {
-        static auto* const notifications = new Notifications;
-        return *notifications;
-    }
-
-    void add(const Name& name, const sp<IServiceNotification>& callback) {
-        const std::lock_guard<std::mutex> lock(mMutex);
-        if (!mIsWatching) std::thread([this] { watch(); }).detach();
-        mIsWatching = true;
-        mWatches.push_back({name, callback, {}, true});
-    }
-    bool remove(const Name& name, const sp<IServiceNotification>& callback) {
-        const std::lock_guard<std::mutex> lock(mMutex);
-        const auto first =
-                std::remove_if(mWatches.begin(), mWatches.end(), [&](const Watch& watch) {
-                    return watch.callback == callback && (name.first.empty() || watch.name == name);
-                });
-        const bool isFound = first != mWatches.end();
-        mWatches.erase(first, mWatches.end());
-        return isFound;
-    }
-
-  private:
-    struct Watch {
-        Name name;
-        sp<IServiceNotification> callback;
-        Socket socket;
-        bool isNew;
-    };
-
-    /** Runs as long as there is anybody to notify. */
-    void watch() {
-        for (;;) {
-            std::vector<Watch> news;
-            {
-                const std::lock_guard<std::mutex> lock(mMutex);
-                mIsWatching = !mWatches.empty();
-                if (!mIsWatching) return;
-                auto sockets = listSockets();
-                for (Watch& watch : mWatches) {
-                    const Socket socket = sockets[watch.name];
-                    if (socket != Socket() && socket != watch.socket) news.push_back(watch);
-                    watch.socket = socket;
-                    watch.isNew = false;
-                }
-            }
-            for (const Watch& watch : news)
-                watch.callback->onRegistration(watch.name.first, watch.name.second, watch.isNew);
-            std::this_thread::sleep_for(std::chrono::milliseconds(100));
-        }
-    }
-
-    std::mutex mMutex;
-    std::vector<Watch> mWatches;
-    bool mIsWatching = false;
-};
-
-}  // namespace
-
-Error SocketServiceManager::find(SocketDriver& driver, const std::string& interface,
-                                 const std::string& instance, sp<IBase>* service) {
+Error SocketServiceManager::find(const std::string& interface, const std::string& instance,
+                                 sp<IBase>* service) {
     uint32_t handle = 0;
-    Error error = driver.connect(interface, instance, &handle);
+    Error error = mDriver.connect(interface, instance, &handle);
     if (error.isOk()) {
         *service = new ::android::hidl::base::V1_0::BpHwBase(
                 ProcessState::self()->getStrongProxyForHandle(handle));
@@ -129,7 +57,7 @@ Error SocketServiceManager::find(SocketDriver& driver, const std::string& interf
 
 Return<sp<IBase>> SocketServiceManager::get(const hidl_string& interface, const hidl_string& name) {
     sp<IBase> service;
-    (void)find(mDriver, interface, name, &service);
+    (void)find(interface, name, &service);
     return service;
 }
 
@@ -144,14 +72,45 @@ Return<bool> SocketServiceManager::registerForNotifications(
         const hidl_string& interface, const hidl_string& name,
         const sp<IServiceNotification>& callback) {
     if (callback == nullptr) return false;
-    Notifications::instance().add({interface, name}, callback);
+    const std::lock_guard<std::mutex> lock(mMutex);
+    if (!std::exchange(mIsWatching, true)) std::thread([this] { watch(); }).detach();
+    mWatches.push_back({{interface, name}, callback, {}, true});
     return true;
 }
 
 Return<bool> SocketServiceManager::unregisterForNotifications(
         const hidl_string& interface, const hidl_string& name,
         const sp<IServiceNotification>& callback) {
-    return Notifications::instance().remove({interface, name}, callback);
+    const std::lock_guard<std::mutex> lock(mMutex);
+    const auto first = std::remove_if(mWatches.begin(), mWatches.end(), [&](const Watch& watch) {
+        return watch.callback == callback &&
+               (interface.empty() || watch.name == Name(interface, name));
+    });
+    const bool isFound = first != mWatches.end();
+    mWatches.erase(first, mWatches.end());
+    return isFound;
+}
+
+/** Tells of sockets as long as there is anybody to tell. */
+void SocketServiceManager::watch() {
+    for (;;) {
+        std::vector<Watch> news;
+        {
+            const std::lock_guard<std::mutex> lock(mMutex);
+            mIsWatching = !mWatches.empty();
+            if (!mIsWatching) return;
+            auto sockets = listSockets();
+            for (Watch& watch : mWatches) {
+                const Socket socket = sockets[watch.name];
+                if (socket != Socket() && socket != watch.socket) news.push_back(watch);
+                watch.socket = socket;
+                watch.isNew = false;
+            }
+        }
+        for (const Watch& watch : news)
+            watch.callback->onRegistration(watch.name.first, watch.name.second, watch.isNew);
+        std::this_thread::sleep_for(std::chrono::milliseconds(100));
+    }
 }
 
 Return<bool> SocketServiceManager::addWithChain(const hidl_string& name, const sp<IBase>& service,

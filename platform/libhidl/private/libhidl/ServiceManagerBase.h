@@ -3,6 +3,8 @@
 
 #include <android/hidl/manager/1.2/IServiceManager.h>
 
+#include <string>
+#include <utility>
 #include <vector>
 
 namespace android::hardware {
@@ -66,6 +68,9 @@ class ServiceManagerBase : public ::android::hidl::manager::V1_2::IServiceManage
     }
 
   protected:
+    /** An interface and an instance. */
+    using Name = std::pair<std::string, std::string>;
+
     /** @return what is known of each service, once for each of its names. */
     virtual std::vector<InstanceDebugInfo> services() = 0;
 };
