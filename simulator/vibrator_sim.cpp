@@ -32,7 +32,7 @@ void require(const std::string& word, const Names& known, const std::string& com
 
 /** @return the features that a list names. */
 Names featuresOf(const std::string& list) {
-    const Names all = model::featureNames();
+    Names all = model::featureNames();
     if (list == "all") return all;
     if (list == "none") return {};
     Names features;
