@@ -10,7 +10,6 @@
 #include <fcntl.h>
 #include <hidl/HidlBinderSupport.h>
 #include <hidl/HidlTransportSupport.h>
-#include <hidl/Host.h>
 #include <hidl/ServiceManagement.h>
 #include <hwbinder/BpHwBinder.h>
 #include <hwbinder/Parcel.h>
@@ -26,13 +25,11 @@
 #include <cstdlib>
 #include <filesystem>
 #include <thread>
-#include <vector>
 
 // What a program has of the runtime in its own process: its threads, and what it publishes.
 
 namespace {
 
-namespace host = ::android::hardware::host;
 using ::android::sp;
 using ::android::wp;
 using ::android::hardware::BpHwBinder;
@@ -42,7 +39,6 @@ using ::android::hardware::ProcessState;
 using ::android::hardware::Return;
 using ::android::hidl::manager::V1_0::IServiceNotification;
 using std::chrono::milliseconds;
-using namespace std::string_literals;
 
 /** Notes how many of its calls there are at once. */
 struct Slow : IServiceNotification {
@@ -238,27 +234,6 @@ TEST_F(RuntimeTest, WatchForServicesTakesOneThread) {
     android::hardware::configureRpcThreadpool(1, true);
     ProcessState::self()->startThreadPool();
     EXPECT_TRUE(eventually([&] { return threadCount() == before; }));
-}
-
-/** Makes a call when its thread ends. */
-struct Last {
-    sp<IDaxVibrator> vibrator;
-    bool* isOk;
-
-    ~Last() { *isOk = vibrator->ping().isOk(); }
-};
-
-TEST_F(RuntimeTest, CallsCanBeMadeWhileAThreadEnds) {
-    serve();
-    bool isOk = false;
-    std::thread([&] {
-        // Made before the runtime makes anything for this thread, so it ends after that.
-        static thread_local Last last{nullptr, nullptr};
-        last.isOk = &isOk;
-        last.vibrator = IDaxVibrator::tryGetService();
-        EXPECT_TRUE(last.vibrator->ping().isOk());
-    }).join();
-    EXPECT_TRUE(isOk);
 }
 
 }  // namespace
