@@ -60,18 +60,15 @@ class DriverTest : public ::testing::Test {
         ASSERT_TRUE(eventually([] { return !readFile(kEnvironment).empty(); })) << readFile(kLog);
         std::string directory = readFile(kEnvironment);
         directory.pop_back();
-        findService(directory);
+        setenv("HWBINDER_DIR", directory.c_str(), 1);
+        mVibrator = IDaxVibrator::getService();
+        ASSERT_NE(mVibrator, nullptr) << readFile(kLog);
+        mMotor->takeChanges();
     }
     void plugIn(const Kind& kind) {
         mMotor.reset();
         mKind = kind;
         mMotor = std::make_unique<RecordedMotor>(kind);
-    }
-    void findService(const std::string& directory) {
-        setenv("HWBINDER_DIR", directory.c_str(), 1);
-        mVibrator = IDaxVibrator::getService();
-        ASSERT_NE(mVibrator, nullptr) << readFile(kLog);
-        mMotor->takeChanges();
     }
     std::string call(const Call& made) const { return made(*mVibrator).inWords(); }
 

@@ -36,16 +36,13 @@ class Noting : public Vibrator {
 TEST_F(VibratorTest, InnerCallsAreVirtual) {
     start(Layout::kTimedOutput);
     const android::sp<Noting> vibrator = new Noting;
+    const Call click = CALL(perform)(0, 0);
     const struct {
         std::function<void()> call;
         std::string inner;
         std::string yes = {};
     } cases[] = {
-            {[&] {
-                 CALL(perform)
-                 (0, 0)(*vibrator);
-             },
-             "on 20; setAmplitude 36; "},
+            {[&] { click(*vibrator); }, "on 20; setAmplitude 36; "},
             {[&] { vibrator->supportsAmplitudeControl(); }, "intensity?; "},
             {[&] { vibrator->Vibrator::setAmplitude(1); }, "intensity?; "},
             {[&] { vibrator->daxPerformPrebakedHapticPattern(3, 1, false); }, "on 1000; "},
