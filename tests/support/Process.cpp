@@ -32,15 +32,13 @@ void becomeUser(uid_t uid) {
     if (setgroups(0, nullptr) != 0 || setgid(uid) != 0 || setuid(uid) != 0) _exit(kNotStarted);
 }
 
-/** Becomes a program, as another user, who need not be able to reach the folder that it lies in. */
-[[noreturn]] void execute(const std::vector<std::string>& command, uid_t uid = geteuid()) {
-    const int program = open(command[0].c_str(), O_PATH | O_CLOEXEC);
+/** Becomes a program. */
+[[noreturn]] void execute(const std::vector<std::string>& command) {
     std::vector<char*> arguments;
     for (const std::string& word : command)
         arguments.push_back(const_cast<char*>(word.c_str()));
     arguments.push_back(nullptr);
-    becomeUser(uid);
-    fexecve(program, arguments.data(), environ);
+    execv(arguments[0], arguments.data());
     _exit(kNotStarted);
 }
 
@@ -62,7 +60,8 @@ Outcome runProgram(const std::vector<std::string>& command, uid_t uid) {
         dup2(in, STDIN_FILENO);
         dup2(out, STDOUT_FILENO);
         dup2(err, STDERR_FILENO);
-        execute(command, uid);
+        becomeUser(uid);
+        execute(command);
     }
     const int code = exitCodeOf(pid);
     close(in);
@@ -94,8 +93,8 @@ bool ChildProcess::isAlive() const {
            info.si_pid == 0;
 }
 
-size_t ChildProcess::descriptors() const {
-    const std::filesystem::directory_iterator files("/proc/" + std::to_string(pid()) + "/fd");
+size_t descriptorsOf(pid_t pid) {
+    const std::filesystem::directory_iterator files("/proc/" + std::to_string(pid) + "/fd");
     return static_cast<size_t>(std::distance(begin(files), end(files)));
 }
 

@@ -21,6 +21,9 @@ Outcome runProgram(const std::vector<std::string>& command, uid_t uid = geteuid(
 /** Runs a function in a process of its own and another uid. @return its exit code. */
 int runAs(uid_t uid, const std::function<int()>& function);
 
+/** @return how many descriptors a process has open. */
+size_t descriptorsOf(pid_t pid);
+
 /** A child process with a look at what it uses. */
 class ChildProcess : public Child {
   public:
@@ -28,8 +31,7 @@ class ChildProcess : public Child {
     void startProgram(const std::vector<std::string>& command,
                       const std::string& logFile = "/dev/null");
     bool isAlive() const;
-    /** @return how many descriptors the process has open. */
-    size_t descriptors() const;
+    size_t descriptors() const { return descriptorsOf(pid()); }
     /** @return the memory that the process has, in KiB. */
     size_t residentKiB() const;
 };

@@ -28,7 +28,6 @@ namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 using ::android::hardware::CallerIdentity;
 using model::Layout;
 using namespace ::tests;
-using Lines = std::vector<std::string>;
 
 /** A service object on a simulated driver, with the driver's trace and the log to look at. */
 class VibratorTest : public ::testing::Test {

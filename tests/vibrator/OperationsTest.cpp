@@ -1,18 +1,18 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "support/Process.h"
 #include "support/VibratorTest.h"
 
 #include <unistd.h>
 
-#include <algorithm>
-#include <filesystem>
 #include <iostream>
 
 namespace vendor::velmora::hardware::vibrator::V2_1::implementation {
 namespace {
 
 /** What the kernel gives for a system call on a node; EINTR is a case of its own. */
-const Lines kErrors = {"EACCES", "EAGAIN", "EBADF",  "EBUSY",  "EINVAL", "EIO",   "EMFILE",
-                       "ENODEV", "ENOENT", "ENOMEM", "ENOSPC", "ENXIO",  "EPERM", "EROFS"};
+const std::vector<std::string> kErrors = {"EACCES", "EAGAIN", "EBADF",  "EBUSY",  "EINVAL",
+                                          "EIO",    "EMFILE", "ENODEV", "ENOENT", "ENOMEM",
+                                          "ENOSPC", "ENXIO",  "EPERM",  "EROFS"};
 
 /** A system call that goes wrong. */
 struct Trouble {
@@ -35,11 +35,6 @@ std::vector<Trouble> troublesOf(const Step& access) {
     // A short read is as good as a node that holds no more.
     if (access.kind == Step::kWrite) troubles.push_back({"write", "short=1", 1});
     return troubles;
-}
-
-size_t descriptors() {
-    const std::filesystem::directory_iterator files("/proc/self/fd");
-    return static_cast<size_t>(std::distance(begin(files), end(files)));
 }
 
 class OperationsTest : public BothLayoutsTest {};
@@ -75,7 +70,7 @@ TEST_P(OperationsTest, GateRefusesAllButSystemAndRoot) {
 }
 
 TEST_P(OperationsTest, EverySystemCallMayFail) {
-    const size_t open = descriptors();
+    const size_t open = descriptorsOf(getpid());
     size_t cases = 0;
     for (const Operation& operation : allOperations()) {
         Steps steps = parseSteps(mLayout, operation.steps);
@@ -88,7 +83,7 @@ TEST_P(OperationsTest, EverySystemCallMayFail) {
                 access->times = times;
                 expect(operation, steps);
                 *access = sound;
-                ASSERT_EQ(descriptors(), open);
+                ASSERT_EQ(descriptorsOf(getpid()), open);
                 ++cases;
                 if (HasFailure()) return;
             }
