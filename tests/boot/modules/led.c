@@ -2,9 +2,6 @@
 /* An LED named "vibrator", which stands for a motor that a GPIO switches. */
 #include <linux/leds.h>
 #include <linux/module.h>
-#include <linux/platform_device.h>
-
-static struct platform_device *device;
 
 static unsigned int lasted;
 module_param(lasted, uint, 0444);
@@ -30,22 +27,13 @@ static struct led_classdev motor = {
 
 static int __init motor_init(void)
 {
-	int error;
-
-	device = platform_device_register_simple("test-motor", -1, NULL, 0);
-	if (IS_ERR(device))
-		return PTR_ERR(device);
-	error = led_classdev_register(&device->dev, &motor);
-	if (error)
-		platform_device_unregister(device);
-	return error;
+	return led_classdev_register(NULL, &motor);
 }
 module_init(motor_init);
 
 static void __exit motor_exit(void)
 {
 	led_classdev_unregister(&motor);
-	platform_device_unregister(device);
 }
 module_exit(motor_exit);
 
