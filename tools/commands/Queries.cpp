@@ -4,9 +4,6 @@
 #include "Commands.h"
 #include "text/Text.h"
 
-#include <chrono>
-#include <thread>
-
 namespace vibratorctl {
 
 using nlohmann::ordered_json;
@@ -36,28 +33,12 @@ int supports(const Client& client) {
     return client.report().found(words, members);
 }
 
-/** @return the service, waited for up to some ms. @throw Unreachable */
-::android::sp<IDaxVibrator> await(const Client& client, uint32_t ms) {
-    using Clock = std::chrono::steady_clock;
-    const auto deadline = Clock::now() + std::chrono::milliseconds(ms);
-    for (;;) {
-        try {
-            return client.service();
-        } catch (const Unreachable&) {
-            if (Clock::now() >= deadline) throw;
-        }
-        std::this_thread::sleep_for(std::chrono::milliseconds(50));
-    }
-}
-
 int status(const Client& client, uint32_t waitMs) {
-    const auto vibrator = await(client, waitMs);
+    const auto vibrator = connect(client.instance(), std::chrono::milliseconds(waitMs));
     const Served served = describe(serverOf(*vibrator));
     std::vector<std::string> interfaces;
-    reached(vibrator->interfaceChain([&](const auto& chain) {
-        for (const auto& descriptor : chain)
-            interfaces.emplace_back(descriptor.c_str());
-    }));
+    reached(vibrator->interfaceChain(
+            [&](const auto& chain) { interfaces.assign(chain.begin(), chain.end()); }));
     const std::string indent = "\n            ";
     ordered_json members = {{"instance", client.instance()}, {"answers", true}};
     members.update(served.members);

@@ -3,18 +3,27 @@
 
 #include <hidl/Host.h>
 
+#include <thread>
+
 namespace host = ::android::hardware::host;
 
 namespace vibratorctl {
 
-::android::sp<IDaxVibrator> connect(const std::string& instance) {
-    ::android::sp<::android::hidl::base::V1_0::IBase> found;
-    std::string whyNot;
-    const auto status = host::findService(IDaxVibrator::descriptor, instance, &found, &whyNot);
-    if (status != ::android::OK) throw Unreachable(whyNot, status == ::android::TIMED_OUT);
-    ::android::sp<IDaxVibrator> vibrator = IDaxVibrator::castFrom(found).withDefault(nullptr);
-    if (vibrator == nullptr) throw Unreachable("the service has just ended");
-    return vibrator;
+::android::sp<IDaxVibrator> connect(const std::string& instance, std::chrono::milliseconds wait) {
+    using Clock = std::chrono::steady_clock;
+    for (const auto deadline = Clock::now() + wait;;) {
+        ::android::sp<::android::hidl::base::V1_0::IBase> found;
+        std::string whyNot;
+        const auto status = host::findService(IDaxVibrator::descriptor, instance, &found, &whyNot);
+        const bool isFound = status == ::android::OK;
+        if (isFound) {
+            if (auto vibrator = IDaxVibrator::castFrom(found).withDefault(nullptr)) return vibrator;
+            whyNot = "the service has just ended";
+        }
+        if (Clock::now() >= deadline)
+            throw Unreachable(whyNot, isFound || status == ::android::TIMED_OUT);
+        std::this_thread::sleep_for(std::chrono::milliseconds(50));
+    }
 }
 
 void setCallTimeout(std::chrono::milliseconds limit) {

@@ -25,8 +25,9 @@ class Unreachable : public std::runtime_error {
     const bool isFound;
 };
 
-/** Finds the service, without waiting for it. @throw Unreachable */
-::android::sp<IDaxVibrator> connect(const std::string& instance);
+/** Finds the service. @param wait the longest to wait for it. @throw Unreachable */
+::android::sp<IDaxVibrator> connect(const std::string& instance,
+                                    std::chrono::milliseconds wait = {});
 
 /** Limits the time that a call may take from now on. @param limit 0 for no limit. */
 void setCallTimeout(std::chrono::milliseconds limit);
