@@ -139,12 +139,13 @@ void Examination::examineSilence(const Unreachable& error) {
 
 void Examination::tellService() {
     const Served served = describe(mServer);
-    line("layout", mDriver.layout());
+    const std::string layout = mDriver.isThere() ? mDriver.layout().name : "none";
+    line("layout", layout);
     line("service", mAnswers ? "answers" : "cannot be reached");
     if (mAnswers) line("served by", served.server);
     line("transport", served.transport);
     line("manager", served.manager);
-    mMembers = {{"layout", mDriver.layout()}, {"answers", mAnswers}};
+    mMembers = {{"layout", layout}, {"answers", mAnswers}};
     mMembers.update(served.members);
 }
 
@@ -227,7 +228,7 @@ void Examination::tellNode(const std::string& leaf, const char* serves,
 void Examination::examineControl() {
     const LocalDriver::Node control = mDriver.look("ext_control");
     const bool isRunning = mDriver.isVibrating();
-    const std::string stop = howToStop(mDriver);
+    const std::string stop = mDriver.layout().howToStop;
     if (control.firstLine() == "1") {
         find("external control is on, so the motor may not follow the service",
              (isRunning ? stop + " and then " : std::string()) + "vibratorctl external off");

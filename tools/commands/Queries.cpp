@@ -71,12 +71,8 @@ int ladder(const Client& client, uint32_t type) {
 
 int motor(const Client& client) {
     const auto vibrator = client.service();
-    const bool isEnhanced = reached(vibrator->daxSupportsEnhancedVelmoraHapticPattern());
-    const auto ladder0 = askLadder(*vibrator, 0);
-    const auto ladder1 = askLadder(*vibrator, 1);
     if (!mayCallRestricted())
         return client.report().answer(kLadder, VibratorStatus::UNSUPPORTED_OPERATION);
-
     ordered_json members;
     std::string words = "not known, since the service has no driver";
     const LocalDriver driver = driverOf(*vibrator);
@@ -85,13 +81,15 @@ int motor(const Client& client) {
         words = motor.inWords();
         members = asJson(motor);
     }
-    members["ladders"] = {{"0", ladder0}, {"1", ladder1}};
+    for (const uint32_t type : {0U, 1U}) {
+        const auto steps = askLadder(*vibrator, type);
+        words += "\nladder " + std::to_string(type) + ": " + ladderInWords(steps);
+        members["ladders"][std::to_string(type)] = steps;
+    }
+    const bool isEnhanced = reached(vibrator->daxSupportsEnhancedVelmoraHapticPattern());
     members["enhancedPatterns"] = isEnhanced;
-    return client.report().found("motor:    " + words + "\nladder 0: " + ladderInWords(ladder0) +
-                                         "\nladder 1: " + ladderInWords(ladder1) +
-                                         "\nenhanced patterns: " + (isEnhanced ? "yes" : "no") +
-                                         "\n",
-                                 members);
+    words += std::string("\nenhanced patterns: ") + (isEnhanced ? "yes" : "no") + "\n";
+    return client.report().found("motor:    " + words, members);
 }
 
 }  // namespace

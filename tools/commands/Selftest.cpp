@@ -233,7 +233,7 @@ void Selftest::checkTime(const char* node) {
 
 void Selftest::checkMotor() {
     if (mIsQuiet) return tell("skipped", "on", "it moves the motor");
-    const char* const node = mDriver.mode() == product::kTimedOutputMode ? "enable" : "activate";
+    const char* const node = mDriver.layout().start;
     checkTime(node);
     ask<&I::on, 1000>(*mVibrator);
     expect("off", "OK", toString(ask<&I::off>(*mVibrator)));

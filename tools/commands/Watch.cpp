@@ -50,7 +50,7 @@ void print(const NodeAccess& access, bool isColoured) {
     line << std::left << std::setw(30)
          << (access.node.empty() ? "a call" : cli::printable(access.node)) << "  " << std::setw(7)
          << kKinds[access.kind].name << "  ";
-    if (access.kind != NodeAccess::kProbe) line << '"' << cli::printable(access.text) << "\"  ";
+    if (access.kind != NodeAccess::kProbe) line << cli::inQuotes(access.text) << "  ";
     line << (isGood ? "ok" : cli::printable(access.error));
     std::cout << (!isColoured ? ""
                   : isGood    ? kKinds[access.kind].colour

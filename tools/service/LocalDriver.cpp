@@ -21,19 +21,23 @@ using namespace ::vendor::velmora::hardware::vibrator::V2_1::implementation;
 
 namespace {
 
-/** @return the first bytes of a file; empty where it cannot be read. */
-std::string readStart(const std::string& path) {
+/** What is different in each layout, indexed by DriverMode. */
+constexpr LocalDriver::Layout kLayouts[] = {
+        {"timed output", "enable", "enable", "vibratorctl off"},
+        // Switching the LED trigger off does not reset its duration.
+        {"LED trigger", "activate", "duration", "vibratorctl on 0"},
+};
+
+/** @return what a node shows; empty where this process cannot read it. */
+std::string readNode(const std::string& path, const simulator::Node* simulated) {
+    if (simulated != nullptr) {
+        const ::android::UniqueFd file(simulator::openNode(*simulated, O_RDONLY));
+        return file.isValid() ? simulator::show(*simulated) : "";
+    }
     char text[512];
     const ::android::UniqueFd file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
     const ssize_t size = read(file.get(), text, sizeof(text));
     return {text, static_cast<size_t>(std::max<ssize_t>(size, 0))};
-}
-
-/** @return what a node shows; empty where this process cannot read it. */
-std::string readNode(const std::string& path, const simulator::Node* simulated) {
-    if (simulated == nullptr) return readStart(path);
-    const ::android::UniqueFd file(simulator::openNode(*simulated, O_RDONLY));
-    return file.isValid() ? simulator::show(*simulated) : "";
 }
 
 }  // namespace
@@ -66,8 +70,8 @@ LocalDriver::Node LocalDriver::look(const std::string& name) const {
     Node node;
     if (stat(((isSimulated ? simulation : "") + path).c_str(), &info) != 0) return node;
     node.exists = true;
-    node.reads = mOpener.mayOpen(info, true, false);
-    node.writes = mOpener.mayOpen(info, false, true);
+    node.reads = mOpener.mayOpen(info, S_IROTH);
+    node.writes = mOpener.mayOpen(info, S_IWOTH);
     node.value = readNode(path, isSimulated ? &simulated : nullptr);
     char mode[8];
     snprintf(mode, sizeof(mode), "%04o", info.st_mode & 07777);
@@ -82,17 +86,12 @@ bool LocalDriver::opens(const std::string& name) const {
     return node.reads && node.writes;
 }
 
-std::string LocalDriver::layout() const {
-    if (!mIsThere) return "none";
-    return mMode == kTimedOutputMode ? "timed output" : "LED trigger";
-}
-
-const char* LocalDriver::runningNode() const {
-    return mMode == kTimedOutputMode ? "enable" : "duration";
+const LocalDriver::Layout& LocalDriver::layout() const {
+    return kLayouts[mMode];
 }
 
 bool LocalDriver::isVibrating() const {
-    return atoi(look(runningNode()).value.c_str()) > 0;
+    return atoi(look(layout().running).value.c_str()) > 0;
 }
 
 bool LocalDriver::daxSupportsFolderStatusSetting() const {

@@ -47,10 +47,19 @@ class LocalDriver {
     bool isThere() const { return mIsThere; }
     /** @return the layout, a DriverMode; of what is there where the service finds none. */
     uint8_t mode() const { return mMode; }
-    /** @return "LED trigger", "timed output" or "none". */
-    std::string layout() const;
-    /** @return the node whose number tells whether the motor runs. */
-    const char* runningNode() const;
+
+    /** What is different in each layout. */
+    struct Layout {
+        const char* name;
+        /** The node that starts the motor, and holds 0 when it does not move. */
+        const char* start;
+        /** The node whose number tells whether the motor counts as running. */
+        const char* running;
+        /** The command after which it does not. */
+        const char* howToStop;
+    };
+    const Layout& layout() const;
+    /** @return whether the motor counts as running. */
     bool isVibrating() const;
 
     struct Motor {

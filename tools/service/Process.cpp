@@ -16,14 +16,13 @@ constexpr char kPackage[] = "vendor.velmora.hardware.vibrator@";
 
 }  // namespace
 
-bool Process::mayOpen(const struct stat& file, bool toRead, bool toWrite) const {
+bool Process::mayOpen(const struct stat& file, mode_t how) const {
     // The mode of a driver's attribute binds root, too: a bit that nobody has, root has not.
     mode_t mode = file.st_mode;
     const bool isOurs = std::find(groups.begin(), groups.end(), file.st_gid) != groups.end();
     const mode_t shift = overridesModes ? 0 : file.st_uid == uid ? 6 : isOurs ? 3 : 0;
     if (overridesModes) mode |= mode >> 6 | mode >> 3;
-    mode >>= shift;
-    return (!toRead || (mode & S_IROTH) != 0) && (!toWrite || (mode & S_IWOTH) != 0);
+    return (mode >> shift & how) != 0;
 }
 
 std::string Process::inWords() const {
@@ -65,11 +64,10 @@ std::vector<Process> findServers() {
     for (const auto& each : std::filesystem::directory_iterator("/proc", error)) {
         const std::string name = each.path().filename();
         if (name.find_first_not_of("0123456789") != std::string::npos) continue;
-        std::string program;
-        std::getline(std::ifstream(each.path() / "cmdline"), program, '\0');
-        program.erase(0, program.rfind('/') + 1);
-        if (program.rfind(kPackage, 0) != 0) continue;
-        if (auto process = readProcess(std::stoi(name))) servers.push_back(*process);
+        const auto process = readProcess(std::stoi(name));
+        if (!process) continue;
+        const std::string program = std::filesystem::path(process->program).filename();
+        if (program.rfind(kPackage, 0) == 0) servers.push_back(*process);
     }
     return servers;
 }

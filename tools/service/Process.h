@@ -23,8 +23,8 @@ struct Process {
     /** The program, as it was called. */
     std::string program = {};
 
-    /** @return whether it may open a file of a driver. */
-    bool mayOpen(const struct stat& file, bool toRead, bool toWrite) const;
+    /** @return whether it may open a file of a driver. @param how S_IROTH or S_IWOTH. */
+    bool mayOpen(const struct stat& file, mode_t how) const;
     /** @return "pid 812, uid 997". */
     std::string inWords() const;
 };

@@ -31,11 +31,6 @@ std::string notPermitted() {
            std::to_string(geteuid());
 }
 
-std::string howToStop(const LocalDriver& driver) {
-    // Switching the LED trigger off does not reset its duration.
-    return driver.mode() == kLedTriggerMode ? "vibratorctl on 0" : "vibratorctl off";
-}
-
 std::string reasonOf(const Operation& operation, VibratorStatus status, const Process& service) {
     if (operation.isRestricted && !mayCallRestricted()) return notPermitted();
     if (status == VibratorStatus::BAD_VALUE) return "the service does not take the value";
@@ -55,9 +50,9 @@ std::string reasonOf(const Operation& operation, VibratorStatus status, const Pr
         }
     }
     if (operation.name == "setExternalControl" && driver.isVibrating()) {
-        return std::string("refused while the motor counts as running (") + driver.runningNode() +
-               " is " + driver.look(driver.runningNode()).firstLine() +
-               "); first: " + howToStop(driver);
+        const auto& [name, start, running, howToStop] = driver.layout();
+        return std::string("refused while the motor counts as running (") + running + " is " +
+               driver.look(running).firstLine() + "); first: " + howToStop;
     }
     const std::string nodes = operation.nodes.empty() ? "its nodes for the motor"
                                                       : cli::join(operation.nodes, ", ", " or ");

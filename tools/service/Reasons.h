@@ -29,9 +29,6 @@ std::string permittedUsers();
 /** @return why a call was refused to this process's user. */
 std::string notPermitted();
 
-/** @return the command after which the motor does not count as running any more. */
-std::string howToStop(const LocalDriver& driver);
-
 /**
  * @param service the process that refused it.
  * @return why the service refused a call, judged by the driver, and what to do.
