@@ -5,30 +5,20 @@
 
 namespace vibratorctl {
 
+// The operation's name, and both ways to answer it.
+#define QUERY(name) #name, &IDaxVibrator::name, &LocalDriver::name
+
 const std::vector<Query> kQueries = {
-        {"supportsAmplitudeControl", "amplitudes of the platform",
-         &IDaxVibrator::supportsAmplitudeControl, &LocalDriver::daxSupportsAmplitudeControl},
-        {"supportsExternalControl", "external control", &IDaxVibrator::supportsExternalControl,
-         &LocalDriver::supportsExternalControl, "external-control", true},
-        {"daxSupportsAmplitudeControl", "intensities", &IDaxVibrator::daxSupportsAmplitudeControl,
-         &LocalDriver::daxSupportsAmplitudeControl, "intensity"},
-        {"daxSupportsForceTouchAmplitudeControl", "force-touch feedback",
-         &IDaxVibrator::daxSupportsForceTouchAmplitudeControl,
-         &LocalDriver::daxSupportsForceTouchAmplitudeControl, "force-touch"},
-        {"daxSupportsFrequencyControl", "frequency types",
-         &IDaxVibrator::daxSupportsFrequencyControl, &LocalDriver::daxSupportsFrequencyControl,
-         "frequency"},
-        {"daxSupportsHapticEngine", "haptic engine packets", &IDaxVibrator::daxSupportsHapticEngine,
-         &LocalDriver::daxSupportsHapticEngine, "haptic-engine"},
-        {"daxSupportsPrebakedHapticPattern", "stored patterns",
-         &IDaxVibrator::daxSupportsPrebakedHapticPattern,
-         &LocalDriver::daxSupportsPrebakedHapticPattern, "pattern"},
-        {"daxSupportsFolderStatusSetting", "fold state",
-         &IDaxVibrator::daxSupportsFolderStatusSetting,
-         &LocalDriver::daxSupportsFolderStatusSetting, "fold"},
-        {"daxSupportsEnhancedVelmoraHapticPattern", "enhanced patterns",
-         &IDaxVibrator::daxSupportsEnhancedVelmoraHapticPattern,
-         &LocalDriver::daxSupportsEnhancedVelmoraHapticPattern},
+        {"supportsAmplitudeControl", &IDaxVibrator::supportsAmplitudeControl,
+         &LocalDriver::daxSupportsAmplitudeControl, "amplitudes of the platform"},
+        {QUERY(supportsExternalControl), "external control", "external-control", true},
+        {QUERY(daxSupportsAmplitudeControl), "intensities", "intensity"},
+        {QUERY(daxSupportsForceTouchAmplitudeControl), "force-touch feedback", "force-touch"},
+        {QUERY(daxSupportsFrequencyControl), "frequency types", "frequency"},
+        {QUERY(daxSupportsHapticEngine), "haptic engine packets", "haptic-engine"},
+        {QUERY(daxSupportsPrebakedHapticPattern), "stored patterns", "pattern"},
+        {QUERY(daxSupportsFolderStatusSetting), "fold state", "fold"},
+        {QUERY(daxSupportsEnhancedVelmoraHapticPattern), "enhanced patterns"},
 };
 
 std::vector<Comparison> compareAnswers(IDaxVibrator& vibrator, const LocalDriver& driver) {

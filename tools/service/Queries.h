@@ -12,11 +12,11 @@ namespace vibratorctl {
 /** A query that the service answers with yes or no. */
 struct Query {
     const char* operation;
-    /** What it asks for, in words. */
-    const char* words;
     ::android::hardware::Return<bool> (IDaxVibrator::*ask)();
     /** What a permitted caller is answered, by the driver. */
     bool (LocalDriver::*expect)() const;
+    /** What it asks for, in words. */
+    const char* words;
     /** The driver's feature that it asks for; nullptr for none. */
     const char* feature = nullptr;
     /** Whether everybody may ask. */
