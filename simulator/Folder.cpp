@@ -90,8 +90,9 @@ int Folder::replace(const std::string& name, std::string_view text, mode_t mode)
     const UniqueFd file(openat(mFolder.get(), fresh.c_str(), kCreate, 0600));
     if (!file.isValid()) return errno;
     errno = ENOSPC;
-    if (write(file.get(), text.data(), text.size()) == static_cast<ssize_t>(text.size()) &&
-        fchmod(file.get(), mode) == 0 &&
+    for (ssize_t size; (size = write(file.get(), text.data(), text.size())) > 0;)
+        text.remove_prefix(static_cast<size_t>(size));
+    if (text.empty() && fchmod(file.get(), mode) == 0 &&
         renameat(mFolder.get(), fresh.c_str(), mFolder.get(), inside(name)) == 0) {
         return 0;
     }

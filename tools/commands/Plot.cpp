@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
+#include "Folder.h"
 #include "Input.h"
 #include "Traffic.h"
 #include "text/Text.h"
@@ -8,11 +9,9 @@
 #include "traffic/TextPlot.h"
 
 #include <sys/ioctl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
-#include <algorithm>
-#include <cerrno>
-#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
@@ -40,28 +39,15 @@ void checkTarget(const std::string& file, const std::string& input) {
 
 /** Writes a file whole or not at all; where its name is a link, what that leads to. */
 void writeWhole(const std::string& file, const std::string& bytes) {
-    std::error_code error;
-    const bool isNew = !fs::exists(file, error);
-    const fs::path target = isNew ? fs::path(file) : fs::canonical(file, error);
-    const std::string temporary = target.string() + "." + std::to_string(getpid());
-    // x: nobody else's file is followed or taken.
-    std::FILE* out = fopen(temporary.c_str(), "wxe");
-    bool isDone = out != nullptr && fwrite(bytes.data(), 1, bytes.size(), out) == bytes.size();
-    isDone = out != nullptr && fclose(out) == 0 && isDone;
-    if (isDone && !isNew) fs::permissions(temporary, fs::status(target).permissions());
-    if (isDone && rename(temporary.c_str(), target.c_str()) == 0) return;
-    const std::string reason = strerror(errno);
-    if (out != nullptr) unlink(temporary.c_str());
-    throw std::runtime_error(file + ": cannot be written: " + reason);
-}
-
-/** @return whether all that has times has times of day without a fraction. */
-bool hasWholeSeconds(const std::vector<NodeAccess>& accesses) {
-    return !accesses.empty() &&
-           std::all_of(accesses.begin(), accesses.end(), [](const NodeAccess& each) {
-               return each.clock.find(':') != std::string::npos &&
-                      each.clock.find('.') == std::string::npos;
-           });
+    std::error_code none;
+    const bool isNew = !fs::exists(file, none);
+    const fs::path target = isNew ? fs::absolute(file) : fs::canonical(file, none);
+    const mode_t mask = umask(0);
+    umask(mask);
+    const simulator::Folder folder(target.parent_path());
+    const mode_t mode = isNew ? 0666 & ~mask : folder.mode(target.filename()) & 07777;
+    const int error = folder.replace(target.filename(), bytes, mode);
+    if (error != 0) throw std::runtime_error(file + ": cannot be written: " + strerror(error));
 }
 
 /** @return whether the user's locale has only the characters of ASCII. */
@@ -81,7 +67,8 @@ Timeline readTimeline(const std::string& file) {
     for (std::string line; std::getline(lines, line);) {
         if (const auto access = reader.read(line)) accesses.push_back(*access);
     }
-    if (hasWholeSeconds(accesses)) {
+    const std::string clock = accesses.empty() ? "" : accesses[0].clock;
+    if (clock.find(':') < clock.size() && clock.find('.') > clock.size()) {
         throw cli::UsageError(file +
                               ": its times are whole seconds, in which calls cannot be told "
                               "apart; plot what this prints: journalctl -u vibrator -o "
