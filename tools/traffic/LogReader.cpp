@@ -59,10 +59,8 @@ double readClock(const std::string& line, std::string* clock) {
 std::string nodeName(std::string_view path) {
     constexpr std::string_view kClass = "/sys/class/";
     if (path.substr(0, kClass.size()) == kClass) path.remove_prefix(kClass.size());
-    const size_t directory = path.find('/');
-    const size_t leaf = path.rfind('/');
-    if (directory == std::string_view::npos) return std::string(path);
-    return std::string(path.substr(0, directory)) + std::string(path.substr(leaf));
+    std::string name(path.substr(0, path.find('/')));
+    return name.append(path.substr(std::min(path.rfind('/'), path.size())));
 }
 
 /** What a line of the log means. */

@@ -60,9 +60,7 @@ std::string plotText(const Timeline& timeline, size_t columns, bool isAscii) {
     const double length = std::max(timeline.end - timeline.start, 0.001);
     const double perColumn = length / static_cast<double>(width);
     const std::vector<double> strong = strengths(timeline, width, perColumn);
-    const auto& segments = timeline.segments;
-    const bool isBeyond = std::any_of(segments.begin(), segments.end(),
-                                      [](const auto& each) { return each.strength > 1; });
+    const bool isBeyond = *std::max_element(strong.begin(), strong.end()) > 1;
 
     std::string text = plotTitle(timeline) + '\n';
     char line[64];
