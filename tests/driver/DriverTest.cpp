@@ -99,7 +99,7 @@ class DriverTest : public ::testing::Test {
 
     Kind mKind;
     std::unique_ptr<RecordedMotor> mMotor;
-    ChildProcess mSession;
+    Child mSession;
     ::android::sp<IDaxVibrator> mVibrator;
 };
 

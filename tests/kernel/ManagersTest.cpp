@@ -27,12 +27,12 @@ TEST(ManagersTest, ServiceIsFoundWithEachManagerThatComes) {
     const auto onDevice = [](const std::string& command) -> std::vector<std::string> {
         return {"/bin/sh", "-c", "exec env HWBINDER_DEVICE=/dev/binder " + command};
     };
-    ChildProcess daemon;
+    Child daemon;
     daemon.startProgram(onDevice(SERVICE), "/tmp/daemon");
     const std::string older =
             "binder-tests --gtest_also_run_disabled_tests --gtest_filter=*DISABLED_OfVersion1_0";
     for (const std::string& command : {older, std::string("hwservicemanager"), older}) {
-        ChildProcess manager;
+        Child manager;
         manager.startProgram(onDevice(command), "/tmp/manager");
         EXPECT_TRUE(eventually([&] {
             return runProgram(onDevice(VIBRATORCTL " off")).exitCode == 0;

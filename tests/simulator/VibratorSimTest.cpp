@@ -42,7 +42,7 @@ TEST_F(VibratorSimTest, RunCleansUpWhateverEndsIt) {
                                    "; { grep -om1 '[0-9]*):' $VIBRATOR_SIM_DIR/log; dirname "
                                    "$HWBINDER_DIR; } >$0.new; (sleep 0.1; mv $0.new $0) & "
                                    "exec sleep 10";
-        ChildProcess session;
+        Child session;
         session.startProgram({VIBRATOR_SIM, "run", "bash", "-c", script, ready});
         ASSERT_TRUE(eventually([&] { return fs::exists(ready); }));
         std::ifstream file(ready);
@@ -69,7 +69,7 @@ TEST_F(VibratorSimTest, DirectoryIsLookedUpOnce) {
     std::ofstream(victim + "/log") << "precious";
     fs::create_symlink(victim, link);
     // Somebody exchanges the directory for a link while it is made a driver's.
-    ChildProcess other;
+    Child other;
     other.start([&] {
         for (;;)
             renameat2(AT_FDCWD, directory.c_str(), AT_FDCWD, link.c_str(), RENAME_EXCHANGE);

@@ -235,7 +235,7 @@ TEST_F(SocketDirectoryTest, ExchangeOfTheDirectoryLeadsNobodyElsewhere) {
     const std::string victim = make("victim", 0755);
     const std::string his = make("his", 0755, kStranger);
     const std::string link = make("link", 0, kStranger, "victim");
-    ChildProcess attacker;
+    Child attacker;
     attacker.start([&] {
         if (setuid(kStranger) != 0 || prctl(PR_SET_PDEATHSIG, SIGKILL) != 0) _exit(1);
         while (getppid() != 1) {

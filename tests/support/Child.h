@@ -6,6 +6,8 @@
 
 #include <cerrno>
 #include <csignal>
+#include <string>
+#include <vector>
 
 /** A child process, of tests and of benchmarks; the destructor kills it. */
 class Child {
@@ -35,6 +37,14 @@ class Child {
         mPid = -1;
     }
     pid_t pid() const { return mPid; }
+
+    // In Process.cpp, which benchmarks do without:
+    /** Runs a program with standard error in a file. */
+    void startProgram(const std::vector<std::string>& command,
+                      const std::string& logFile = "/dev/null");
+    bool isAlive() const;
+    /** @return the memory that the process has, in KiB. */
+    size_t residentKiB() const;
 
   private:
     pid_t mPid = -1;

@@ -77,8 +77,7 @@ int runAs(uid_t uid, const std::function<int()>& function) {
     return exitCodeOf(pid);
 }
 
-void ChildProcess::startProgram(const std::vector<std::string>& command,
-                                const std::string& logFile) {
+void Child::startProgram(const std::vector<std::string>& command, const std::string& logFile) {
     const int log = open(logFile.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0644);
     start([&] {
         dup2(log, STDERR_FILENO);
@@ -87,7 +86,7 @@ void ChildProcess::startProgram(const std::vector<std::string>& command,
     close(log);
 }
 
-bool ChildProcess::isAlive() const {
+bool Child::isAlive() const {
     siginfo_t info{};
     return waitid(P_PID, static_cast<id_t>(pid()), &info, WEXITED | WNOHANG | WNOWAIT) == 0 &&
            info.si_pid == 0;
@@ -98,7 +97,7 @@ size_t descriptorsOf(pid_t pid) {
     return static_cast<size_t>(std::distance(begin(files), end(files)));
 }
 
-size_t ChildProcess::residentKiB() const {
+size_t Child::residentKiB() const {
     std::ifstream sizes("/proc/" + std::to_string(pid()) + "/statm");
     size_t pages = 0;
     // The second number, after the size of all.

@@ -24,18 +24,6 @@ int runAs(uid_t uid, const std::function<int()>& function);
 /** @return how many descriptors a process has open. */
 size_t descriptorsOf(pid_t pid);
 
-/** A child process with a look at what it uses. */
-class ChildProcess : public Child {
-  public:
-    /** Runs a program with standard error in a file. */
-    void startProgram(const std::vector<std::string>& command,
-                      const std::string& logFile = "/dev/null");
-    bool isAlive() const;
-    size_t descriptors() const { return descriptorsOf(pid()); }
-    /** @return the memory that the process has, in KiB. */
-    size_t residentKiB() const;
-};
-
 /** Waits up to ten seconds for something to become true. @return whether it has. */
 bool eventually(const std::function<bool()>& condition);
 

@@ -31,7 +31,7 @@ class TransportTest : public ::testing::Test {
     static bool isKernel() { return getenv("HWBINDER_DEVICE") != nullptr; }
 
     /** Starts a daemon. @param limits shell commands that come first. */
-    void startDaemon(ChildProcess& daemon, const std::string& limits = "true") const {
+    void startDaemon(Child& daemon, const std::string& limits = "true") const {
         daemon.startProgram({"/bin/sh", "-c", limits + "; exec \"$0\"", SERVICE}, logFile());
     }
     /** Starts the daemon, and waits until it answers. */
@@ -64,5 +64,5 @@ class TransportTest : public ::testing::Test {
     std::string log() const { return readFile(logFile()); }
 
     TemporaryDirectory mDirectory;
-    ChildProcess mServer;
+    Child mServer;
 };

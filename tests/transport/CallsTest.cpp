@@ -174,10 +174,10 @@ TEST_F(CallsTest, ThreadsMayShareAnObject) {
 TEST_F(CallsTest, ClientsMayDieInACall) {
     // Until it answers, it may not have accepted the connection.
     EXPECT_TRUE(mClient->ping().isOk());
-    const size_t before = mServer.descriptors();
+    const size_t before = descriptorsOf(mServer.pid());
     stopServer();
     for (int i = 0; i < 50; ++i) {
-        ChildProcess client;
+        Child client;
         client.startProgram({VIBRATORCTL, "off"});
         const std::string state = "/proc/" + std::to_string(client.pid()) + "/stat";
         // Asleep, it waits for the answer.
@@ -186,7 +186,7 @@ TEST_F(CallsTest, ClientsMayDieInACall) {
     ::kill(mServer.pid(), SIGCONT);
     EXPECT_TRUE(answers());
     // The connections of the dead have gone, and that of the client that has just asked.
-    EXPECT_TRUE(eventually([&] { return mServer.descriptors() <= before; }));
+    EXPECT_TRUE(eventually([&] { return descriptorsOf(mServer.pid()) <= before; }));
 }
 
 /** Remembers the news of a death. */

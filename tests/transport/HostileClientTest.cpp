@@ -179,7 +179,7 @@ TEST_F(HostileClientTest, FloodOfConnectionsCostsNobodyACall) {
     serve();
     const RawClient polite = rawClient();
     const std::vector<RawClient> idle = connected(64);
-    const size_t descriptors = mServer.descriptors();
+    const size_t descriptors = descriptorsOf(mServer.pid());
     const auto connectAndClose = [this] {
         for (;;)
             rawClient();
@@ -193,7 +193,7 @@ TEST_F(HostileClientTest, FloodOfConnectionsCostsNobodyACall) {
         }
     }
     expectAllAnswer(idle);
-    EXPECT_TRUE(eventually([&] { return mServer.descriptors() <= descriptors; }));
+    EXPECT_TRUE(eventually([&] { return descriptorsOf(mServer.pid()) <= descriptors; }));
 }
 
 TEST_F(HostileClientTest, WhoeverComesWhenDescriptorsAreUsedUpIsTurnedAway) {

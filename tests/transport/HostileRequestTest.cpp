@@ -206,7 +206,7 @@ INSTANTIATE_TEST_SUITE_P(Of, HostileRequestTest,
 
 TEST_P(HostileRequestTest, WrongArgumentsAreRefused) {
     expectService();
-    const size_t before = mServer.descriptors();
+    const size_t before = descriptorsOf(mServer.pid());
     for (const auto& [name, change, status, onKernel] : kAttacks) {
         SCOPED_TRACE(name);
         RawMessage message = right();
@@ -215,7 +215,7 @@ TEST_P(HostileRequestTest, WrongArgumentsAreRefused) {
         expectService();
     }
     // The client's own connection counts.
-    EXPECT_TRUE(eventually([&] { return mServer.descriptors() <= before + 1; }));
+    EXPECT_TRUE(eventually([&] { return descriptorsOf(mServer.pid()) <= before + 1; }));
 }
 
 TEST_P(HostileRequestTest, WrongTokensAndCodesAreRefused) {
