@@ -11,13 +11,11 @@ using namespace vibratorctl;
 
 /** The input is a trace and a log, drawn in all ways, whole and in part. */
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-    TraceReader trace;
-    LogReader log;
+    AccessReader reader;
     std::vector<NodeAccess> accesses;
     std::istringstream lines(std::string(reinterpret_cast<const char*>(data), size));
     for (std::string line; std::getline(lines, line);) {
-        if (const auto access = trace.read(line)) accesses.push_back(*access);
-        if (const auto access = log.read(line)) accesses.push_back(*access);
+        if (const auto access = reader.read(line)) accesses.push_back(*access);
     }
     Timeline timeline = makeTimeline(accesses);
     for (const Timeline::Segment& segment : timeline.segments) {

@@ -23,19 +23,14 @@ namespace {
 /** The width that the time takes up, in pixels. */
 constexpr int kColumns = 796;
 
-struct Bar {
-    double start;
-    double end;
-    double bottom;
-    double top;
-};
+using Bars = std::vector<Timeline::Segment>;
 
 /** Adds a bar; bars narrower than a pixel are merged with their neighbours in it. */
-void add(Bar bar, double pixel, std::vector<Bar>* bars) {
+void add(Timeline::Segment bar, double pixel, Bars* bars) {
     bar.end = std::max(bar.end, bar.start + pixel);
     if (!bars->empty() && bar.end <= bars->back().start + 2 * pixel) {
         bars->back().end = std::max(bar.end, bars->back().end);
-        bars->back().top = std::max(bar.top, bars->back().top);
+        bars->back().strength = std::max(bar.strength, bars->back().strength);
     } else {
         bars->push_back(bar);
     }
@@ -129,11 +124,10 @@ std::string plotScript(const Timeline& timeline, PictureFormat format) {
     const double length = std::max((timeline.end - timeline.start) * 1.01, 0.001);
     const double pixel = length / kColumns;
     const auto percentOf = [](double strength) { return std::min(1.0, strength) * 100; };
-    std::vector<Bar> layers[4];
+    Bars layers[4];
     for (const Timeline::Segment& segment : timeline.segments) {
-        const double top = percentOf(segment.strength);
-        add({segment.start, segment.end, 0, top}, pixel, &layers[segment.kind]);
-        if (segment.strength > 1) add({segment.start, segment.end, 96, 100}, pixel, &layers[3]);
+        add(segment, pixel, &layers[segment.kind]);
+        if (segment.strength > 1) add(segment, pixel, &layers[3]);
     }
     std::ostringstream out;
     out << std::setprecision(9) << "terminal = '"
@@ -155,10 +149,10 @@ std::string plotScript(const Timeline& timeline, PictureFormat format) {
     const char* const names[] = {"$run", "$packet", "$pattern", "$beyond"};
     for (size_t i = 0; i < std::size(layers); ++i) {
         out << names[i] << " << END\n";
-        for (const auto& [start, end, bottom, top] : layers[i]) {
+        for (const auto& [start, end, strength, kind] : layers[i]) {
             // A thin gap separates neighbouring bars.
             const double gap = end - start > 4 * pixel ? pixel / 2 : 0;
-            out << start << ' ' << end - gap << ' ' << bottom << ' ' << top << '\n';
+            out << start << ' ' << end - gap << ' ' << percentOf(strength) << '\n';
         }
         out << "END\n";
     }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "traffic/TraceReader.h"
+#include "traffic/AccessReader.h"
 
 #include <cstdlib>
 

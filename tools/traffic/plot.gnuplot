@@ -7,7 +7,7 @@
 #   $calls                 times of the calls in s
 #   $labels                times in s, and the labels of the calls there
 #   $run, $packet, $pattern, $beyond
-#                          bars: start and end in s, bottom and top in %; empty where there are none
+#                          bars: start and end in s, and strength in %; empty where there are none
 
 left = 84
 right = 120
@@ -65,12 +65,13 @@ if (going_on >= 0) {
 }
 
 # A layer of bars; an empty one is not in the legend.
-layer(block, size, colour, name) = size == 0 ? '' : \
-    ', '.block.' using ($1 * unit):3:($1 * unit):($2 * unit):3:4 with boxxyerror fs solid noborder'. \
+layer(block, size, bottom, colour, name) = size == 0 ? '' : \
+    ', '.block.' using ($1 * unit):3:($1 * unit):($2 * unit):('.bottom.'):3 '. \
+    'with boxxyerror fs solid noborder'. \
     " lc rgb '".colour."' title '".name."'"
 calls = "$calls using ($1 * unit):(100) with impulses lc rgb '#999999' dt 3 notitle"
 eval 'plot '.calls. \
-    layer('$run', |$run|, '#0072b2', 'motor on'). \
-    layer('$packet', |$packet|, '#e69f00', 'haptic engine packets'). \
-    layer('$pattern', |$pattern|, '#009e73', 'stored pattern'). \
-    layer('$beyond', |$beyond|, '#d55e00', 'beyond full strength')
+    layer('$run', |$run|, 0, '#0072b2', 'motor on'). \
+    layer('$packet', |$packet|, 0, '#e69f00', 'haptic engine packets'). \
+    layer('$pattern', |$pattern|, 0, '#009e73', 'stored pattern'). \
+    layer('$beyond', |$beyond|, 96, '#d55e00', 'beyond full strength')
