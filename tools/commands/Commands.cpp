@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
+#include "SimulatedDriver.h"
+#include "TraceFile.h"
 
 namespace vibratorctl {
 
@@ -28,6 +30,19 @@ void addCall(Client& client, cli::Command& command, const OneArgument& argument,
         return client.report().answer(operation, call(*client.service(), number()), {shown()});
     });
     client.steps.push_back({command.name, &command});
+}
+
+std::function<std::string()> addTraffic(cli::Command& command) {
+    const auto named = command.file("FILE",
+                                    "trace of the simulated driver, or log of the daemon (default: "
+                                    "the trace in VIBRATOR_SIM_DIR); - for standard input",
+                                    "");
+    return [named] {
+        if (!named->empty()) return *named;
+        const std::string simulated = simulator::inheritedDirectory();
+        if (simulated.empty()) throw cli::UsageError("no FILE: name a trace, or the daemon's log");
+        return simulator::traceFile(simulated);
+    };
 }
 
 }  // namespace vibratorctl

@@ -56,4 +56,7 @@ void wait(uint32_t ms);
 void addCall(Client& client, cli::Command& command, const OneArgument& argument,
              const Operation& operation, const Call& call);
 
+/** Adds the argument of a command that reads node traffic. @return gives the name of the file. */
+std::function<std::string()> addTraffic(cli::Command& command);
+
 }  // namespace vibratorctl

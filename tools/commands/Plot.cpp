@@ -2,7 +2,6 @@
 #include "Commands.h"
 #include "Folder.h"
 #include "Input.h"
-#include "Traffic.h"
 #include "text/Text.h"
 #include "traffic/AccessReader.h"
 #include "traffic/Picture.h"

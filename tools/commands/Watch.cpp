@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Commands.h"
-#include "Traffic.h"
 #include "text/Text.h"
 #include "traffic/AccessReader.h"
 
