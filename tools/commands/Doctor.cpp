@@ -98,7 +98,6 @@ class Examination {
     void examineControl();
     void examineMotor();
     void examineAnswers();
-    bool canBeOff() const;
     void addNotes();
     int tellFindings(const Report& report);
 
@@ -179,8 +178,7 @@ void Examination::examineNodes() {
              "; the service may read and write as RW says\n"
              "NAME                  MODE OWNER    RW VALUE              FOR\n";
     // What is closed in the same way has one cause, and is said once.
-    using Way = std::pair<std::string, std::string>;
-    std::map<Way, std::pair<LocalDriver::Node, std::vector<std::string>>> closed;
+    std::map<std::pair<std::string, std::string>, std::vector<std::string>> closed;
     for (size_t i = 0; i < std::size(NodePathTable); ++i) {
         const NodeInfo& info = NodePathTable[i];
         if (!info.isIn(mDriver.mode())) continue;
@@ -189,16 +187,15 @@ void Examination::examineNodes() {
         // What somebody else may not open is no fault.
         if (!mServer && !mOpener.overridesModes) continue;
         if (!node.exists || (node.reads && (info.isOnlyRead || node.writes))) continue;
-        auto& [sample, leaves] = closed[{node.reads ? "write " : "read ",
-                                         " (owner " + node.owner + ", " + node.mode + ")"}];
-        sample = node;
-        leaves.emplace_back(info.leaf);
+        const std::string how = " (owner " + node.owner + ", " + node.mode + ")";
+        closed[{node.reads ? "write " : "read ", how}].emplace_back(info.leaf);
     }
-    for (const auto& [way, which] : closed) {
-        const auto& [sample, leaves] = which;
+    for (const auto& [way, leaves] : closed) {
+        const auto& [access, how] = way;
         const std::string names = cli::join(leaves, ",", ",");
         const std::string paths = mDriver.path(leaves.size() == 1 ? names : "{" + names + "}");
-        find(service() + " cannot " + way.first + paths + way.second, howToGive(paths, sample));
+        find(service() + " cannot " + access + paths + how,
+             howToGive(paths, mDriver.look(leaves[0])));
     }
     if (mDriver.mode() == kTimedOutputMode && mDriver.look(THE_DEVICE_ACTIVATE).exists) {
         find("the kernel has both layouts, and the service takes the timed output",
@@ -226,13 +223,12 @@ void Examination::tellNode(const std::string& leaf, const char* serves,
 
 /** Looks at who controls the motor. */
 void Examination::examineControl() {
-    const LocalDriver::Node control = mDriver.look("ext_control");
     const bool isRunning = mDriver.isVibrating();
     const std::string stop = mDriver.layout().howToStop;
-    if (control.firstLine() == "1") {
+    if (mDriver.isControlled()) {
         find("external control is on, so the motor may not follow the service",
-             (isRunning ? stop + " and then " : std::string()) + "vibratorctl external off");
-    } else if (isRunning && control.exists) {
+             (isRunning ? stop + " and then " : "") + "vibratorctl external off");
+    } else if (isRunning && mDriver.look("ext_control").exists) {
         note("the motor counts as running, so external control is refused until \"" + stop + "\"");
     }
 }
@@ -264,16 +260,13 @@ void Examination::examineMotor() {
                  cli::join(known, ", ", " or "));
 }
 
-/** @return whether "off" changes nothing. */
-bool Examination::canBeOff() const {
-    return !mDriver.isVibrating() && mDriver.look("ext_control").firstLine() != "1";
-}
-
 /** Compares what the service answers with what the nodes show. */
 void Examination::examineAnswers() {
     std::vector<std::string> wrong;
     try {
-        if (canBeOff() && reached(mVibrator->off()) != VibratorStatus::OK) wrong.push_back("off");
+        const bool changesNothing = !mDriver.isVibrating() && !mDriver.isControlled();
+        if (changesNothing && reached(mVibrator->off()) != VibratorStatus::OK)
+            wrong.push_back("off");
         for (const auto& [question, wanted, got] : compareAnswers(*mVibrator, mDriver)) {
             if (wanted != got) wrong.push_back(question);
         }

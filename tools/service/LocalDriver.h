@@ -61,6 +61,8 @@ class LocalDriver {
     const Layout& layout() const;
     /** @return whether the motor counts as running. */
     bool isVibrating() const;
+    /** @return whether external control is on. */
+    bool isControlled() const { return look("ext_control").firstLine() == "1"; }
 
     struct Motor {
         int32_t number = 0;

@@ -51,19 +51,6 @@ std::string labelOf(std::vector<Timeline::Mark> marks) {
     return label;
 }
 
-/** @return the labels of the calls; labels that would overlap are merged into one, with a count. */
-std::vector<Timeline::Mark> labelsOf(const std::vector<Timeline::Mark>& marks, double pixel) {
-    constexpr double kLineHeight = 21;
-    std::vector<Timeline::Mark> labels;
-    for (size_t end = 0; end < marks.size();) {
-        const size_t start = end;
-        while (end < marks.size() && marks[end].time - marks[start].time <= kLineHeight * pixel)
-            ++end;
-        labels.push_back({marks[start].time, labelOf({&marks[start], &marks[end]}), false});
-    }
-    return labels;
-}
-
 std::string runGnuplot(const std::string& script) {
     // Files without names, which are gone when they are closed.
     using File = std::unique_ptr<std::FILE, int (*)(std::FILE*)>;
@@ -143,8 +130,14 @@ std::string plotScript(const Timeline& timeline, PictureFormat format) {
         out << last << '\n';
     }
     out << "END\n$labels << END\n";
-    for (const Timeline::Mark& label : labelsOf(timeline.marks, pixel))
-        out << label.time << ' ' << label.label << '\n';
+    // Labels that would overlap are merged into one.
+    constexpr double kLineHeight = 21;
+    const auto& marks = timeline.marks;
+    for (auto first = marks.begin(), end = first; first != marks.end(); first = end) {
+        while (end != marks.end() && end->time - first->time <= kLineHeight * pixel)
+            ++end;
+        out << first->time << ' ' << labelOf({first, end}) << '\n';
+    }
     out << "END\n";
     const char* const names[] = {"$run", "$packet", "$pattern", "$beyond"};
     for (size_t i = 0; i < std::size(layers); ++i) {
