@@ -289,11 +289,11 @@ void Selftest::checkRestart() {
     if (mRestart.empty()) return tell("skipped", kName, "--restart COMMAND says how");
     if (system(mRestart.c_str()) != 0)
         return tell("failed", kName, "this failed: " + cli::printable(mRestart));
-    constexpr std::chrono::seconds kPatience(10);
+    constexpr std::chrono::seconds kRestartTime(10);
     expect("death notice of it", true,
-           mRecipient->notice.get_future().wait_for(kPatience) == std::future_status::ready);
+           mRecipient->notice.get_future().wait_for(kRestartTime) == std::future_status::ready);
     try {
-        const auto restarted = connect(mClient.instance(), kPatience);
+        const auto restarted = connect(mClient.instance(), kRestartTime);
         expect(kName, "OK", toString(ask<&I::off>(*restarted)));
     } catch (const Unreachable& error) {
         tell("failed", kName, error.what());

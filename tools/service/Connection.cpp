@@ -10,8 +10,8 @@ namespace host = ::android::hardware::host;
 namespace vibratorctl {
 
 ::android::sp<IDaxVibrator> connect(const std::string& instance, std::chrono::milliseconds wait) {
-    using Clock = std::chrono::steady_clock;
-    for (const auto deadline = Clock::now() + wait;;) {
+    using std::chrono::steady_clock;
+    for (const auto deadline = steady_clock::now() + wait;;) {
         ::android::sp<::android::hidl::base::V1_0::IBase> found;
         std::string whyNot;
         const auto status = host::findService(IDaxVibrator::descriptor, instance, &found, &whyNot);
@@ -20,7 +20,7 @@ namespace vibratorctl {
             if (auto vibrator = IDaxVibrator::castFrom(found).withDefault(nullptr)) return vibrator;
             whyNot = "the service has just ended";
         }
-        if (Clock::now() >= deadline)
+        if (steady_clock::now() >= deadline)
             throw Unreachable(whyNot, isFound || status == ::android::TIMED_OUT);
         std::this_thread::sleep_for(std::chrono::milliseconds(50));
     }
