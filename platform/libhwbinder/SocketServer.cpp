@@ -240,7 +240,6 @@ bool SocketServer::serveCall(SocketClient* client) {
         mResults.writeInt32(status);
         reply(mResults, TF_STATUS_CODE);
     }
-    mArguments.clear();
     mResults.clear();
     return isAlive;
 }
