@@ -266,7 +266,7 @@ void Examination::examineAnswers() {
     try {
         const bool changesNothing = !mDriver.isVibrating() && !mDriver.isControlled();
         if (changesNothing && reached(mVibrator->off()) != VibratorStatus::OK)
-            wrong.push_back("off");
+            wrong.emplace_back("off");
         for (const auto& [question, wanted, got] : compareAnswers(*mVibrator, mDriver)) {
             if (wanted != got) wrong.push_back(question);
         }
