@@ -132,8 +132,8 @@ void addPlot(Client& client) {
         const Timeline timeline = readPart(traffic(), *from, *to, *last);
         if (isText) {
             winsize window{};
-            const bool isKnown = ioctl(STDOUT_FILENO, TIOCGWINSZ, &window) == 0;
-            std::cout << plotText(timeline, isKnown && window.ws_col > 0 ? window.ws_col : 80U,
+            ioctl(STDOUT_FILENO, TIOCGWINSZ, &window);
+            std::cout << plotText(timeline, window.ws_col > 0 ? window.ws_col : 80U,
                                   *ascii || isAsciiLocale());
         } else if (*output == "-") {
             std::cout << drawPicture(timeline, kind);

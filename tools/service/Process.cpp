@@ -4,6 +4,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -62,9 +63,8 @@ std::vector<Process> findServers() {
     std::vector<Process> servers;
     std::error_code error;
     for (const auto& each : std::filesystem::directory_iterator("/proc", error)) {
-        const std::string name = each.path().filename();
-        if (name.find_first_not_of("0123456789") != std::string::npos) continue;
-        const auto process = readProcess(std::stoi(name));
+        // What is no number is 0, which no process has.
+        const auto process = readProcess(atoi(each.path().filename().c_str()));
         if (!process) continue;
         const std::string program = std::filesystem::path(process->program).filename();
         if (program.rfind(kPackage, 0) == 0) servers.push_back(*process);
