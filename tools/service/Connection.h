@@ -50,7 +50,7 @@ struct Served {
     nlohmann::ordered_json members;
 };
 
-/** @return how the last call to a server got there, or would have got. */
+/** Describes the process that serves, if it is known, and the way that the last call took. */
 Served describe(const std::optional<Process>& server);
 
 }  // namespace vibratorctl
