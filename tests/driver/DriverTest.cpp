@@ -259,6 +259,13 @@ TEST_F(DriverTest, SharesItsMotor) {
     EXPECT_EQ(call(CALL(on)(50)), "OK");
     expectRuns(start, {{10000, 50}});
     close(file);
+    // What takes the motor over at its node, past the service, finds it at rest.
+    mVibrator->on(60000);
+    EXPECT_TRUE(eventually([&] { return mMotor->isMoving(); }));
+    std::ofstream("/proc/" + std::to_string(mSession.pid()) +
+                  "/root/sys/class/timed_output/vibrator/ext_control")
+            << "1\n";
+    EXPECT_FALSE(mMotor->isMoving());
 }
 
 TEST_F(DriverTest, RunsForAnOrdinaryUser) {
