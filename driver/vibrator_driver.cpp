@@ -25,19 +25,20 @@ driver::Patterns readPatterns(const std::string& path) {
 
 /** Adds the options that say which motor, and how. @return what they say. */
 std::function<driver::Setup()> addOptions(cli::Command& command) {
-    const auto device = command.file("--device PATH", "the motor; not needed for the only one", "");
-    const auto layout = command.choice(
+    const auto* const device =
+            command.add("--device PATH", cli::kFile, "the motor; not needed for the only one");
+    const auto* const layout = command.add(
             "--layout LAYOUT",
             {{"timed", "the nodes of the timed output"}, {"led", "the nodes of the LED trigger"}},
-            "layout of the nodes", 0);
-    const auto patterns =
-            command.file("--patterns FILE", "stored patterns, instead of the usual ones", "");
+            "layout of the nodes", "timed");
+    const auto* const patterns = command.add("--patterns FILE", cli::kFile,
+                                             "stored patterns, instead of the usual ones");
     return [=] {
-        const bool isUsual = patterns->empty() && std::filesystem::exists(kPatternFile);
+        const bool isUsual = !patterns->isGiven() && std::filesystem::exists(kPatternFile);
         return driver::Setup{
-                driver::Motor::choose(*device),
-                *layout == 0 ? model::Layout::kTimedOutput : model::Layout::kLedTrigger,
-                readPatterns(isUsual ? kPatternFile : *patterns)};
+                driver::Motor::choose(device->text()),
+                layout->number() == 0 ? model::Layout::kTimedOutput : model::Layout::kLedTrigger,
+                readPatterns(isUsual ? kPatternFile : patterns->text())};
     };
 }
 
@@ -56,11 +57,11 @@ void addCommands(cli::Program& program) {
     cli::Command& run = add("run", "run the service on a motor, and a command or a shell beside it",
                             "vibratorctl click");
     const auto runOptions = addOptions(run);
-    const auto words =
-            run.rest("COMMAND", "the command and its arguments; without one, your shell");
+    const auto* const words = run.add("[COMMAND...]", cli::kCommand,
+                                      "the command and its arguments; without one, your shell");
     run.note(
             "VIBRATOR_SIM_DIR tells the command a directory with the trace and the service's log.");
-    run.run([=] { return driver::runSession(runOptions(), *words); });
+    run.run([=] { return driver::runSession(runOptions(), words->given); });
 
     cli::Command& serve = add("serve", "serve the nodes when they are mounted");
     serve.run([options = addOptions(serve)] {
@@ -69,11 +70,12 @@ void addCommands(cli::Program& program) {
     });
     cli::Command& mount = add("mount", "mount the nodes that a process serves",
                               "812 /run/vibrator-driver/class/timed_output/vibrator");
-    const auto process =
-            mount.number("PID", {"the number of a process", 1, 4'194'304}, "the process");
-    const auto directory = mount.file("DIRECTORY", "where to; has only the nodes then");
+    const auto* const process =
+            mount.add("PID", cli::Numbers{"the number of a process", 1, 4'194'304}, "the process");
+    const auto* const directory =
+            mount.add("DIRECTORY", cli::kFile, "where to; has only the nodes then");
     mount.run([=] {
-        driver::mountNodes(static_cast<pid_t>(*process), *directory);
+        driver::mountNodes(static_cast<pid_t>(process->number()), directory->text());
         return cli::kSuccess;
     });
     add("patterns", "print the shipped patterns, to be edited").run([] {

@@ -60,24 +60,25 @@ struct DriverKind {
 
 /** Adds the options that say what driver to make. @return what they say. */
 std::function<DriverKind()> addDriverOptions(cli::Command& command) {
-    const auto layout = command.choice(
+    const auto* const layout = command.add(
             "--layout LAYOUT",
             {{"led", "the nodes of the LED trigger"}, {"timed", "the nodes of the timed output"}},
-            "layout of the nodes", 0);
+            "layout of the nodes", "led");
     const Names motors(std::begin(product::MotorTypeNames), std::end(product::MotorTypeNames));
-    constexpr auto kUsual = static_cast<size_t>(product::kMotorLinear1040);
-    const auto motor =
-            command.choice("--motor NAME", choicesOf(motors), "name of the motor", kUsual);
-    const auto waves = command.number("--waves N", {"a number of stored patterns", 0, 65535},
-                                      "number of stored patterns", 12);
-    const auto features =
-            command.text("--features LIST",
-                         "features of the driver, separated by commas; all, none, or of " +
-                                 cli::join(model::featureNames(), ", ", " and "),
-                         "all", choicesOf(model::featureNames()));
+    const auto* const motor = command.add("--motor NAME", choicesOf(motors), "name of the motor",
+                                          motors[product::kMotorLinear1040]);
+    const auto* const waves =
+            command.add("--waves N", cli::Numbers{"a number of stored patterns", 0, 65535},
+                        "number of stored patterns", "12");
+    const auto* const features =
+            command.add("--features LIST", choicesOf(model::featureNames()),
+                        "features of the driver, separated by commas; all, none, or of " +
+                                cli::join(model::featureNames(), ", ", " and "),
+                        "all", cli::kText);
     return [=] {
-        return DriverKind{*layout == 0 ? Layout::kLedTrigger : Layout::kTimedOutput,
-                          {featuresOf(*features), motors[*motor], static_cast<int>(*waves)}};
+        return DriverKind{
+                layout->number() == 0 ? Layout::kLedTrigger : Layout::kTimedOutput,
+                {featuresOf(features->text()), motor->text(), static_cast<int>(waves->number())}};
     };
 }
 
@@ -87,10 +88,9 @@ class Simulator : public cli::Program {
         : Program("vibrator-sim", VERSION,
                   "Makes a simulated kernel vibrator driver, runs the service on it, and shows "
                   "what the driver was told.") {
-        mDirectory = shared().file("--dir DIRECTORY",
-                                   "directory of the driver, instead of the one in "
-                                   "VIBRATOR_SIM_DIR",
-                                   "");
+        mDirectory = shared().add("--dir DIRECTORY", cli::kFile,
+                                  "directory of the driver, instead of the one in "
+                                  "VIBRATOR_SIM_DIR");
         shared().note(
                 "Exit code: 0 done; 1 failed; 2 a mistake in the command line; run: that of its "
                 "command.");
@@ -104,7 +104,8 @@ class Simulator : public cli::Program {
 
   private:
     std::string directory() const {
-        std::string name = mDirectory->empty() ? simulator::inheritedDirectory() : *mDirectory;
+        std::string name =
+                mDirectory->text().empty() ? simulator::inheritedDirectory() : mDirectory->text();
         if (!name.empty()) return name;
         throw UsageError("no directory of a driver; name one with --dir or VIBRATOR_SIM_DIR");
     }
@@ -123,17 +124,18 @@ class Simulator : public cli::Program {
                 "make a driver, start the service on it, and run a command or a shell beside it",
                 "--layout timed vibratorctl click");
         const auto kind = addDriverOptions(run);
-        const auto kept = run.file("--dir DIRECTORY", "directory of the driver, which is kept", "");
-        const auto words =
-                run.rest("COMMAND", "the command and its arguments; without one, your shell");
+        const auto* const kept =
+                run.add("--dir DIRECTORY", cli::kFile, "directory of the driver, which is kept");
+        const auto* const words = run.add("[COMMAND...]", cli::kCommand,
+                                          "the command and its arguments; without one, your shell");
         run.note(
                 "VIBRATOR_SIM_DIR tells the command the driver's directory; in it are \"trace\", "
                 "all accesses of nodes, and \"log\", the log of the service. When the command "
                 "ends, the service is ended and the directory removed, unless --dir named it.");
         run.run([=] {
             const auto [layout, features] = kind();
-            return simulator::runSession(kept->empty() ? *mDirectory : *kept, layout, features,
-                                         *words);
+            return simulator::runSession(kept->text().empty() ? mDirectory->text() : kept->text(),
+                                         layout, features, words->given);
         });
     }
 
@@ -183,23 +185,28 @@ class Simulator : public cli::Program {
         Names leaves;
         for (const model::Attribute& each : model::attributes())
             leaves.push_back(each.leaf);
-        const auto leaf = fault.text("NODE", "the node, like intensity", "", choicesOf(leaves));
-        const auto operation =
-                fault.text("OPERATION", "open, read, write or close", "", choicesOf(kOperations));
-        const auto text = fault.text("FAULT", "an errno like EINVAL; short=BYTES; none", "",
-                                     choicesOf({"EACCES", "EINVAL", "EIO", "short=", "none"}));
+        const auto* const leaf =
+                fault.add("[NODE]", choicesOf(leaves), "the node, like intensity", "", cli::kText);
+        const auto* const operation = fault.add("[OPERATION]", choicesOf(kOperations),
+                                                "open, read, write or close", "", cli::kText);
+        const auto* const text =
+                fault.add("[FAULT]", choicesOf({"EACCES", "EINVAL", "EIO", "short=", "none"}),
+                          "an errno like EINVAL; short=BYTES; none", "", cli::kText);
         constexpr uint32_t kMax = 1'000'000;
-        const auto times = fault.number(
-                "--times N", {"a number of accesses", 1, kMax},
-                "how many accesses fail; without it, all until the fault is set to none");
-        const auto after = fault.number("--after N", {"a number of accesses", 0, kMax},
-                                        "how many accesses succeed first", 0);
-        const auto clear = fault.flag("--clear", "remove all faults");
+        const auto* const times =
+                fault.add("--times N", cli::Numbers{"a number of accesses", 1, kMax},
+                          "how many accesses fail; without it, all until the fault is set to none");
+        const auto* const after =
+                fault.add("--after N", cli::Numbers{"a number of accesses", 0, kMax},
+                          "how many accesses succeed first", "0");
+        const auto* const clear = fault.add("--clear", cli::kFlag, "remove all faults");
         fault.run([=] {
-            if (*clear && !leaf->empty()) throw UsageError("--clear takes no NODE");
-            if (*clear) return simulator::clearFaults(driver()) == 0 ? cli::kSuccess : cli::kFailed;
-            if (!leaf->empty()) {
-                setFault(*leaf, *operation, *text, *times, *after);
+            if (clear->isGiven() && leaf->isGiven()) throw UsageError("--clear takes no NODE");
+            if (clear->isGiven())
+                return simulator::clearFaults(driver()) == 0 ? cli::kSuccess : cli::kFailed;
+            if (leaf->isGiven()) {
+                setFault(leaf->text(), operation->text(), text->text(), times->number(),
+                         after->number());
             } else {
                 for (const std::string& line : simulator::listFaults(driver()))
                     std::cout << line << '\n';
@@ -248,7 +255,7 @@ class Simulator : public cli::Program {
     static constexpr char kAlone[] = "A driver alone";
     const Names kOperations = {"open", "read", "write", "close"};
 
-    cli::Value<std::string> mDirectory;
+    const cli::Argument* mDirectory;
 };
 
 }  // namespace

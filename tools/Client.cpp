@@ -13,12 +13,15 @@ constexpr int kUnreachable = 3;
 Client::Client()
     : Program("vibratorctl", VERSION,
               "Calls the vibrator service, and shows what the driver was told."),
-      mInstance(shared().text("--instance NAME", "name of the service's instance", "default")),
-      mTimeout(shared().number("--timeout SECONDS", {"a time like 10, 500ms or 2m", 0, 3600, "s"},
-                               "the longest that a call may take; 0: no limit", 10)),
+      mInstance(shared().add("--instance NAME", cli::kText, "name of the service's instance",
+                             "default")),
+      mTimeout(shared().add("--timeout SECONDS",
+                            cli::Numbers{"a time like 10, 500ms or 2m", 0, 3600, "s"},
+                            "the longest that a call may take; 0: no limit", "10")),
       // In braces, so that the options are added in this order.
-      mReport{shared().flag("--json", "print each answer as a line of JSON"),
-              shared().flag("-v, --verbose", "also print the interface's operation and its status"),
+      mReport{shared().add("--json", cli::kFlag, "print each answer as a line of JSON"),
+              shared().add("-v, --verbose", cli::kFlag,
+                           "also print the interface's operation and its status"),
               [this] { return serverOf(*service()).value_or(thisProcess()); }} {
     shared().note("Exit code: 0 done; 1 the service refused, doctor found a problem, or the output "
                   "could not be written; 2 a mistake in the command line or in a file; 3 the "
@@ -29,8 +32,10 @@ Client::Client()
 }
 
 int Client::perform(const cli::Command& command) {
-    setCallTimeout(std::chrono::milliseconds(*mTimeout));
+    setCallTimeout(std::chrono::milliseconds(mTimeout->number()));
     mReport.setSubject({command.name});
+    if (mReport.isJson() && !command.hasJson)
+        throw cli::UsageError("has no JSON answer; leave out --json");
     try {
         return Program::perform(command);
     } catch (const Unreachable& error) {
@@ -40,11 +45,15 @@ int Client::perform(const cli::Command& command) {
     }
 }
 
+void Client::warn(const std::string& text) const {
+    if (!mReport.isJson()) Program::warn(text);
+}
+
 void Client::complain(const std::string& status, const std::string& reason) const {
     Program::complain(status, reason);
-    if (!isJson()) return;
+    if (!mReport.isJson()) return;
     Report report = mReport;
-    report.setSubject({current()});
+    report.setSubject({mCurrent});
     report.found("", {{"status", status}, {"reason", reason}}, false);
 }
 

@@ -14,19 +14,19 @@ class Client : public cli::Program {
     const Report& report() const { return mReport; }
     Report& report() { return mReport; }
     /** @return the service. @throw Unreachable */
-    ::android::sp<IDaxVibrator> service() const { return connect(*mInstance); }
-    const std::string& instance() const { return *mInstance; }
+    ::android::sp<IDaxVibrator> service() const { return connect(instance()); }
+    std::string instance() const { return mInstance->text(); }
     /** The commands that are also steps of scores, under names of their own. */
     std::vector<StepKind> steps;
 
+    void warn(const std::string& text) const override;
     void complain(const std::string& status, const std::string& reason) const override;
 
   private:
-    bool isJson() const override { return mReport.isJson(); }
     int perform(const cli::Command& command) override;
 
-    cli::Value<std::string> mInstance;
-    cli::Value<uint32_t> mTimeout;
+    const cli::Argument* const mInstance;
+    const cli::Argument* const mTimeout;
     Report mReport;
 };
 

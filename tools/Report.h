@@ -40,8 +40,9 @@ nlohmann::ordered_json asJson(const LocalDriver::Motor& motor);
 class Report {
   public:
     /** @param service tells the process that has refused a call. */
-    Report(cli::Value<bool> asJson, cli::Value<bool> verbose, std::function<Process()> service)
-        : mAsJson(std::move(asJson)), mVerbose(std::move(verbose)), mService(std::move(service)) {}
+    Report(const cli::Argument* asJson, const cli::Argument* verbose,
+           std::function<Process()> service)
+        : mAsJson(asJson), mVerbose(verbose), mService(std::move(service)) {}
 
     /** Reports the answer to a call. @return the exit code. */
     int answer(const Operation& operation, VibratorStatus status, Answer answer = {}) const;
@@ -61,8 +62,8 @@ class Report {
     int found(const std::string& words, const nlohmann::ordered_json& members,
               bool ok = true) const;
 
-    bool isJson() const { return *mAsJson; }
-    bool isVerbose() const { return *mVerbose; }
+    bool isJson() const { return mAsJson->isGiven(); }
+    bool isVerbose() const { return mVerbose->isGiven(); }
     /** Sets what is reported on from now on. @return what was reported on before. */
     Subject setSubject(Subject subject) { return std::exchange(mSubject, std::move(subject)); }
 
@@ -71,8 +72,8 @@ class Report {
     int print(std::ostream& stream, const std::string& words,
               const nlohmann::ordered_json& members) const;
 
-    cli::Value<bool> mAsJson;
-    cli::Value<bool> mVerbose;
+    const cli::Argument* mAsJson;
+    const cli::Argument* mVerbose;
     std::function<Process()> mService;
     Subject mSubject;
 };

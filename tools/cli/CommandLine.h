@@ -7,7 +7,6 @@
 #include <deque>
 #include <functional>
 #include <map>
-#include <memory>
 #include <optional>
 #include <stdexcept>
 #include <string>
@@ -44,42 +43,53 @@ struct Choice {
 /** @return the values alone. */
 std::vector<std::string> valuesOf(const std::vector<Choice>& choices);
 
-/** What was given for an argument; there from the moment on that the command runs. */
-template <typename T>
-using Value = std::shared_ptr<const T>;
+/** What an argument may be; a command is one of another program, with all further words. */
+enum Kind { kFlag, kText, kNumber, kChoice, kFile, kCommand };
 
-/** An argument or an option. */
+/** An argument or an option: what it may be, and what was given for it. */
 struct Argument {
-    /** As helps show it: "MS", or "-o, --output FILE" for an option. */
+    /**
+     * As it stands in a call: "MS"; "[FILE]", which may be left out; "[PACKET...]", any number of
+     * them; "--once", a flag; "--wait SECONDS" or "-o, --output FILE", an option with a value.
+     */
     std::string title;
+    Kind kind;
+    std::string about;
+    /** What stands for it where it is left out; empty for 0, or no text. */
+    std::string initial;
     /** "MS", or "--output". */
-    std::string name;
+    std::string name = {};
     /** "-o", if the option has a letter. */
-    std::string letter;
-    bool isFlag = false;
-    std::string help;
-    std::vector<Choice> choices;
-    bool isFile = false;
-    bool isRequired = false;
-    /** Whether it takes any number of words, and whether options among them. */
-    bool isMany = false;
-    bool takesOptions = false;
-    /** The index of the first word that was given for it. */
-    std::optional<size_t> given;
-    /** Goes back to the initial value. */
-    std::function<void()> reset;
-    /** Reads a word. @throw UsageError */
-    std::function<void(const std::string& word)> read;
+    std::string letter = {};
+    Numbers numbers = {};
+    /** All that it may be. Of a text, what completions offer, behind a comma again. */
+    std::vector<Choice> choices = {};
+    /** Throws a UsageError for a wrong word. */
+    std::function<void(const std::string& word)> check = {};
+    /** The words that were given for it. */
+    std::vector<std::string> given = {};
 
-    bool isOption() const { return name[0] == '-'; }
+    bool isOption() const { return title[0] == '-'; }
+    bool isRequired() const { return !isOption() && title[0] != '['; }
+    bool isMany() const { return title.find("...") != std::string::npos; }
+    bool isGiven() const { return !given.empty(); }
+    std::string text() const { return isGiven() ? given.back() : initial; }
+    /** @return a number, a time in ms, or the index of a choice. */
+    uint32_t number() const { return text().empty() ? 0 : parse(text()); }
+
+    /** @return the range in words; empty for what has none. */
+    std::string range() const;
+    /** @return what it is about, the range, and what stands for it. */
+    std::string inHelp() const;
+    /** Takes a word that was given for it. @throw UsageError */
+    void take(const std::string& word);
+
+  private:
+    /** @return the number that a word stands for. @throw UsageError */
+    uint32_t parse(const std::string& word) const;
 };
 
-/**
- * A command with its arguments and options. An argument's name is in capitals, an option's begins
- * with dashes and is followed by what stands for its value: "MS", "--wait SECONDS",
- * "-o, --output FILE". An argument without an initial value must be given; an option without one
- * has the value 0, or no text.
- */
+/** A command with its arguments and options. */
 struct Command {
     std::string group = {};
     /** The words that call it, like "pattern play". */
@@ -89,43 +99,22 @@ struct Command {
     std::string example = {};
     /** What its help says besides. */
     std::vector<std::string> notes = {};
+    /** Whether its output may be JSON. */
     bool hasJson = true;
     std::deque<Argument> arguments = {};
-    /** Does what the command does, with what was read last. @return the exit code. */
+    /** Does what the command does, with what was given last. @return the exit code. */
     std::function<int()> perform = {};
 
-    /** A number, a time or a strength. @param initial in the unit of a number alone. */
-    Value<uint32_t> number(const std::string& title, const Numbers& numbers,
-                           const std::string& about, std::optional<uint32_t> initial = {});
-    /** @return the index of what was chosen. */
-    Value<size_t> choice(const std::string& title, const std::vector<Choice>& choices,
-                         const std::string& about, std::optional<size_t> initial = {});
-    /** @param offered what completions offer, behind a comma again. */
-    Value<std::string> text(const std::string& title, const std::string& about,
-                            const std::optional<std::string>& initial = {},
-                            std::vector<Choice> offered = {});
-    /** Like text, for the name of a file. */
-    Value<std::string> file(const std::string& title, const std::string& about,
-                            const std::optional<std::string>& initial = {}) {
-        auto value = text(title, about, initial);
-        arguments.back().isFile = true;
-        return value;
-    }
-    /** Any number of words. @param check throws a UsageError for a wrong one. */
-    Value<std::vector<std::string>> words(const std::string& title, const std::string& about,
-                                          std::function<void(const std::string&)> check = {});
-    /** All that stands behind the options, options of another command included. */
-    Value<std::vector<std::string>> rest(const std::string& title, const std::string& about) {
-        auto value = words(title, about);
-        arguments.back().takesOptions = true;
-        return value;
-    }
-    Value<bool> flag(const std::string& title, const std::string& about);
+    /** Adds an argument: its title, what it may be, what it is about, and what stands for it. */
+    Argument* add(const std::string& title, Kind kind, const std::string& about,
+                  const std::string& initial = "");
+    Argument* add(const std::string& title, const Numbers& numbers, const std::string& about,
+                  const std::string& initial = "");
+    Argument* add(const std::string& title, const std::vector<Choice>& choices,
+                  const std::string& about, const std::string& initial = "", Kind kind = kChoice);
 
     /** Says more in the command's help. */
     Command& note(const std::string& text) { return notes.push_back(text), *this; }
-    /** For a command whose output is no answer that could be JSON. */
-    Command& withoutJson() { return hasJson = false, *this; }
     /** Says what the command does; it returns the exit code. */
     void run(std::function<int()> action) { perform = std::move(action); }
 
@@ -136,20 +125,13 @@ struct Command {
      * @throw UsageError with the index of the word
      */
     void readStep(const std::vector<std::string>& words);
-
-  private:
-    /** @param read makes a value of a word, or adds the word to it. */
-    template <typename T, typename Read>
-    Value<T> add(const std::string& title, const std::string& about,
-                 const std::optional<T>& initial, const Read& read);
 };
 
 /** A program of many commands: reads its command line, helps, and completes for shells. */
 class Program {
   public:
+    /** @param about what the program does, like the help of a command. */
     Program(std::string name, std::string version, const std::string& about);
-    Program(const Program&) = delete;
-    Program& operator=(const Program&) = delete;
     virtual ~Program() = default;
 
     /** What stands before all commands: the options that they share, and the help's notes. */
@@ -162,26 +144,24 @@ class Program {
      */
     Command& command(const std::string& group, const std::string& name, const std::string& help,
                      const std::string& example) {
-        mCommands.push_back({group, name, help, example});
-        return mCommands.back();
+        return mCommands.emplace_back(Command{group, name, help, example});
     }
     /** Runs the command that a command line asks for. @return the program's exit code. */
     int run(int argc, char** argv);
-    /** Says something on standard error, unless answers are JSON. */
-    void warn(const std::string& text) const;
+    /** Says something on standard error. */
+    virtual void warn(const std::string& text) const;
 
     /** Names that no help shows, each for the first word of a command. */
     std::map<std::string, std::string> secondNames;
 
   protected:
-    /** @return the words of the command that was recognised; empty where none was. */
-    std::string current() const { return mCurrent == nullptr ? "" : mCurrent->name; }
-    /** @return whether answers must be JSON; also of a line with a mistake in it. */
-    virtual bool isJson() const { return false; }
     /** Runs a command whose arguments have been read. @return the exit code. */
     virtual int perform(const Command& command) { return command.perform(); }
     /** Says why the command was not done. @param status like "USAGE". */
     virtual void complain(const std::string& status, const std::string& reason) const;
+
+    /** The words of the command, as far as they were recognised. */
+    std::string mCurrent;
 
   private:
     friend class Line;
@@ -189,6 +169,8 @@ class Program {
     void addHelp();
     /** Does what a command line asks for. */
     int obey(const std::vector<std::string>& words);
+    /** Prints what the last of the words behind "--complete" may be, and what that means. */
+    int complete(const std::vector<std::string>& words);
     /** @return the command with a name, or all whose names begin with its words. */
     std::vector<Command*> named(const std::string& name);
     /** @return the words that may follow those of a command, with what they mean. */
@@ -201,12 +183,9 @@ class Program {
     std::string mName;
     std::string mVersion;
     Command mShared;
-    Value<bool> mWantsHelp;
-    Value<bool> mWantsVersion;
-    /** The words behind "help". */
-    Value<std::vector<std::string>> mTopic;
+    Argument* mWantsHelp;
+    Argument* mWantsVersion;
     std::deque<Command> mCommands;
-    const Command* mCurrent = nullptr;
 };
 
 }  // namespace cli

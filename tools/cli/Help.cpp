@@ -26,71 +26,62 @@ void printList(const std::string& heading, const std::vector<Choice>& list) {
     }
 }
 
-/** @return either the options or the other arguments, as a help shows them. */
-std::vector<Choice> titlesOf(const std::deque<Argument>& arguments, bool isOptions) {
+/** @return either the options or the other arguments. */
+std::vector<Choice> titlesOf(const Command& command, bool isOptions) {
     std::vector<Choice> list;
-    for (const Argument& each : arguments) {
-        if (each.isOption() == isOptions) list.push_back({each.title, each.help});
+    for (const Argument& each : command.arguments) {
+        if (each.isOption() == isOptions) list.push_back({each.title, each.inHelp()});
     }
     return list;
 }
 
-/** @return the arguments as they stand in a call, without the options: " PATTERN [FILE...]". */
-std::string inCall(const std::deque<Argument>& arguments) {
-    std::string words;
-    for (const Argument& each : arguments) {
-        if (each.isOption()) continue;
-        const std::string name = each.name + (each.isMany ? "..." : "");
-        words += each.isRequired ? " " + name : " [" + name + "]";
-    }
-    return words;
+/** @return a command as it stands in a call, without its options. */
+std::string inCall(const Command& command) {
+    return join({command.name, join(valuesOf(titlesOf(command, false)), " ", " ")}, " ", " ");
 }
 
 }  // namespace
 
 void Program::addHelp() {
     Command& first = command("Help", "help", "print the help of a command", mCommands[0].name);
-    mTopic = first.words("COMMAND", "a command, in one or two words");
-    first.withoutJson().run([this] {
-        help(join(*mTopic, " ", " "));
-        return kSuccess;
+    Argument* const topic = first.add("[COMMAND...]", kText, "a command, in one or two words");
+    first.hasJson = false;
+    first.run([this, topic] {
+        std::vector<std::string> words = topic->given;
+        words.emplace_back("--help");
+        return obey(words);
     });
     Command& second =
             command("Help", "completion", "print the completion script of a shell", "bash");
-    const auto shell =
-            second.choice("SHELL", {{"bash", ""}, {"zsh", ""}, {"fish", ""}}, "the shell");
+    Argument* const shell =
+            second.add("SHELL", {{"bash", ""}, {"zsh", ""}, {"fish", ""}}, "the shell");
     second.note("To load it: \"source <(" + mName +
                 " completion bash)\", the same for zsh, and \"" + mName +
                 " completion fish | source\".");
-    second.withoutJson().run([this, shell] {
-        std::cout << std::regex_replace(kScripts[*shell], std::regex("NAME"), mName);
+    second.hasJson = false;
+    second.run([this, shell] {
+        std::cout << std::regex_replace(kScripts[shell->number()], std::regex("NAME"), mName);
         return kSuccess;
     });
 }
 
 void Program::help(const std::string& name) {
-    const std::vector<Command*> commands = name.empty() ? std::vector{&mShared} : named(name);
-    if (commands.empty()) {
-        throw UsageError("no command " + inQuotes(name) +
-                         suggestion(name, valuesOf(commandsAfter(""))));
-    }
-    for (const Command* each : commands)
+    for (const Command* each : name.empty() ? std::vector{&mShared} : named(name))
         help(*each);
 }
 
 void Program::help(const Command& command) const {
     const bool isOfAll = &command == &mShared;
-    const std::vector<Choice> options = titlesOf(command.arguments, true);
-    std::string about = command.help + (isOfAll ? "" : ".");
+    const std::vector<Choice> options = titlesOf(command, true);
+    std::string about = command.help + ".";
     about[0] = static_cast<char>(toupper(about[0]));
-    std::cout << "Usage: " << mName
-              << (isOfAll ? " [OPTION...] COMMAND [ARGUMENT...]"
-                          : " " + command.name + inCall(command.arguments) +
-                                    (options.empty() ? "" : " [OPTION...]"))
+    std::cout << "Usage: " << mName << ' '
+              << (isOfAll ? "[OPTION...] COMMAND [ARGUMENT...]"
+                          : inCall(command) + (options.empty() ? "" : " [OPTION...]"))
               << '\n'
               << wrap(about, 0);
     if (isOfAll) printCommands();
-    printList("Arguments", titlesOf(command.arguments, false));
+    printList("Arguments", titlesOf(command, false));
     printList(isOfAll ? "Options of every command" : "Options", options);
     for (const std::string& note : command.notes)
         std::cout << '\n' << wrap(note, 0);
@@ -105,8 +96,7 @@ void Program::printCommands() const {
         if (!printed.insert(first.group).second) continue;
         std::vector<Choice> list;
         for (const Command& each : mCommands) {
-            if (each.group == first.group)
-                list.push_back({each.name + inCall(each.arguments), each.help});
+            if (each.group == first.group) list.push_back({inCall(each), each.help});
         }
         printList(first.group, list);
     }

@@ -29,25 +29,30 @@ class Line {
         }
     }
 
+    /** @throw UsageError for the first mistake */
+    void check() const {
+        if (mProblem) throw UsageError(*mProblem);
+    }
+
     /** Checks that there is no mistake, and that nothing is missing. @throw UsageError */
     void finish() const {
-        if (mProblem) throw UsageError(*mProblem);
+        check();
         if (mTaking != nullptr) throw UsageError(mTaking->name + ": the value is missing", mIndex);
-        if (mCommand == nullptr && mTyped.empty())
-            throw UsageError("no command; " + inQuotes(mProgram->mName + " help") + " lists them");
         if (mCommand == nullptr) {
-            throw UsageError(mTyped + ": no command; " +
-                             join(valuesOf(mProgram->commandsAfter(mTyped)), ", ", " or "));
+            throw UsageError("no command; " +
+                             (mTyped.empty() ? inQuotes(mProgram->mName + " help") + " lists them"
+                                             : join(valuesOf(mProgram->commandsAfter(mTyped)), ", ",
+                                                    " or ")));
         }
-        for (const Argument& each : mCommand->arguments) {
-            if (each.given || !(each.isRequired || (isStep() && each.isMany))) continue;
-            throw UsageError(each.name + " is missing: " + each.help, mIndex);
+        for (const Argument* each : mArguments) {
+            if (each->isRequired() && !each->isGiven())
+                throw UsageError(each->name + " is missing: " + each->inHelp(), mIndex);
         }
     }
 
     /**
-     * @return what a further word may be; alone, ":files" for the name of a file, or ":command N"
-     *     for a part of a command that begins with the word N.
+     * @return what a further word may be; alone, ":files" for the name of a file, or ":command"
+     *     for a part of a command that begins with the word of the number that it means.
      */
     std::vector<Choice> answers(const std::string& word) const {
         if (mProblem) return {};
@@ -56,17 +61,17 @@ class Line {
         size_t start = 0;
         if (next == nullptr && !mHaveOptionsEnded && word[0] == '-') {
             start = word.find('=') + 1;
-            if (start == 0) return optionsInWords();
+            if (start == 0) return options();
             next = optionOf(word.substr(0, start - 1));
         } else if (next == nullptr) {
             if (mCommand == nullptr) return mProgram->commandsAfter(mTyped);
-            if (mTyped == "help") return mProgram->commandsAfter(join(*mProgram->mTopic, " ", " "));
             next = argumentFor(word);
         }
         if (next == nullptr) return {};
-        if (next->isFile) return {{":files", ""}};
-        if (next->takesOptions)
-            return {{":command " + std::to_string(next->given.value_or(mIndex) + 1), ""}};
+        if (mTyped == "help") return mProgram->commandsAfter(join(next->given, " ", " "));
+        if (next->kind == kFile) return {{":files", ""}};
+        if (next->kind == kCommand)
+            return {{":command", std::to_string(mIndex + 1 - next->given.size())}};
         start = std::max(start, word.rfind(',') + 1);
         std::vector<Choice> list = next->choices;
         for (Choice& each : list)
@@ -79,13 +84,12 @@ class Line {
 
     /** Takes the arguments of a command from now on, too. */
     void begin(Command& command) {
-        std::vector<Argument*> options;
+        std::vector<Argument*> added;
         for (Argument& each : command.arguments) {
-            each.reset();
-            each.given.reset();
-            if (each.isOption() && !(isStep() && each.isFile)) options.push_back(&each);
+            each.given.clear();
+            if (!isStep() || each.kind != kFile) added.push_back(&each);
         }
-        mOptions.insert(mOptions.begin(), options.begin(), options.end());
+        mArguments.insert(mArguments.begin(), added.begin(), added.end());
     }
 
     void take(const std::string& word) {
@@ -93,7 +97,7 @@ class Line {
         const bool isOption = !mHaveOptionsEnded && word.size() > 1 && word[0] == '-' &&
                               isdigit(static_cast<unsigned char>(word[1])) == 0;
         if (mTaking != nullptr) {
-            give(*std::exchange(mTaking, nullptr), word);
+            std::exchange(mTaking, nullptr)->take(word);
         } else if (isOption && word == "--") {
             mHaveOptionsEnded = true;
         } else if (isOption) {
@@ -101,8 +105,8 @@ class Line {
         } else if (mCommand == nullptr) {
             takeName(word);
         } else if (Argument* argument = argumentFor(word)) {
-            mHaveOptionsEnded |= argument->takesOptions;
-            give(*argument, word);
+            mHaveOptionsEnded |= argument->kind == kCommand;
+            argument->take(word);
         } else {
             throw UsageError(inQuotes(word) + " is one argument too many");
         }
@@ -116,14 +120,12 @@ class Line {
         if (option == nullptr) {
             throw UsageError("no option " + inQuotes(name) +
                              (mCommand == nullptr ? " before the command" : "") +
-                             suggestion(name, valuesOf(optionsInWords())));
+                             suggestion(name, valuesOf(options())));
         }
         const bool hasValue = name != word;
-        if (option->isFlag && hasValue) throw UsageError(option->name + ": takes no value");
-        if (hasValue) {
-            give(*option, word.substr(name.size() + (isLong ? 1 : 0)));
-        } else if (option->isFlag) {
-            give(*option, "");
+        if (option->kind == kFlag && hasValue) throw UsageError(option->name + ": takes no value");
+        if (option->kind == kFlag || hasValue) {
+            option->take(word.substr(name.size() + (isLong && hasValue ? 1 : 0)));
         } else {
             mTaking = option;
         }
@@ -136,7 +138,7 @@ class Line {
         const std::string name = mTyped.empty() ? first : mTyped + " " + word;
         const std::vector<Command*> found = mProgram->named(name);
         if (found.empty()) {
-            throw UsageError("no command " + inQuotes(name) +
+            throw UsageError("no command " + inQuotes(word) +
                              suggestion(word, valuesOf(mProgram->commandsAfter(mTyped))));
         }
         mTyped = name;
@@ -145,16 +147,16 @@ class Line {
         begin(*mCommand);
     }
 
-    std::vector<Choice> optionsInWords() const {
+    std::vector<Choice> options() const {
         std::vector<Choice> list;
-        for (const Argument* each : mOptions)
-            list.push_back({each->name, each->help});
+        for (const Argument* each : mArguments)
+            if (each->isOption()) list.push_back({each->name, each->inHelp()});
         return list;
     }
 
     /** @return the option that has a name, or a letter like "-o"; or nullptr. */
     Argument* optionOf(const std::string& name) const {
-        for (Argument* each : mOptions) {
+        for (Argument* each : mArguments) {
             if (name == each->name || name == each->letter) return each;
         }
         return nullptr;
@@ -162,23 +164,13 @@ class Line {
 
     /** @return the argument that a word is for which is no option; nullptr for none. */
     Argument* argumentFor(const std::string& word) const {
-        Argument* found = nullptr;
-        for (Argument& each : mCommand->arguments) {
-            if (isStep() && each.isFlag && each.name == "--" + word) return &each;
-            const bool isNamed = isStep() ? each.isFlag || each.isFile : each.isOption();
-            if (found == nullptr && !isNamed && (each.isMany || !each.given)) found = &each;
+        Argument* const flag = isStep() ? optionOf("--" + word) : nullptr;
+        if (flag != nullptr && flag->kind == kFlag) return flag;
+        for (Argument* each : mArguments) {
+            const bool isNamed = isStep() ? each->kind == kFlag : each->isOption();
+            if (!isNamed && (each->isMany() || !each->isGiven())) return each;
         }
-        return found;
-    }
-
-    void give(Argument& argument, const std::string& word) const {
-        if (!argument.given) argument.given = mIndex;
-        try {
-            argument.read(word);
-        } catch (const UsageError& error) {
-            const bool isNamed = argument.isOption() && !isStep();
-            throw UsageError((isNamed ? argument.name + ": " : "") + error.what());
-        }
+        return nullptr;
     }
 
     Program* mProgram = nullptr;
@@ -190,8 +182,8 @@ class Line {
     std::optional<UsageError> mProblem;
     /** The index of the word that is read. */
     size_t mIndex = 0;
-    /** The options that may follow, those of the command first. */
-    std::vector<Argument*> mOptions;
+    /** All that may be given, the command's own before those of all commands. */
+    std::vector<Argument*> mArguments;
 };
 
 void Command::readStep(const std::vector<std::string>& words) {
@@ -202,28 +194,28 @@ void Command::readStep(const std::vector<std::string>& words) {
 
 int Program::obey(const std::vector<std::string>& words) {
     Line line(*this);
-    if (words.size() > 1 && words[0] == "--complete") {
-        const std::string& word = words.back();
-        line.read({words.begin() + 1, words.end() - 1});
-        for (const Choice& each : line.answers(word)) {
-            if (each.value[0] == ':') {
-                std::cout << each.value << '\n';
-            } else if (each.value.compare(0, word.size(), word) == 0) {
-                std::cout << each.value << '\t' << each.meaning << '\n';
-            }
-        }
-        return kSuccess;
-    }
     line.read(words);
-    mCurrent = line.command();
-    if (*mWantsHelp) {
-        help(line.typed());
-    } else if (*mWantsVersion) {
+    mCurrent = line.typed();
+    if (mWantsHelp->isGiven()) {
+        // Where the command is known, another mistake may be why somebody wants its help.
+        if (line.command() == nullptr) line.check();
+        help(mCurrent);
+    } else if (mWantsVersion->isGiven()) {
         std::cout << mName << ' ' << mVersion << '\n';
     } else {
         line.finish();
-        if (!isJson() || mCurrent->hasJson) return perform(*mCurrent);
-        throw UsageError("has no JSON answer; leave out --json");
+        return perform(*line.command());
+    }
+    return kSuccess;
+}
+
+int Program::complete(const std::vector<std::string>& words) {
+    Line line(*this);
+    const std::string& word = words.back();
+    line.read({words.begin() + 1, words.end() - 1});
+    for (const Choice& each : line.answers(word)) {
+        if (each.value[0] == ':' || each.value.compare(0, word.size(), word) == 0)
+            std::cout << each.value << '\t' << each.meaning << '\n';
     }
     return kSuccess;
 }

@@ -15,30 +15,24 @@ void addCommands(Client& client) {
 
 void addCall(Client& client, cli::Command& command, const OneArgument& argument,
              const Operation& operation, const Call& call) {
-    std::function<uint32_t()> number;
-    if (argument.choices.empty()) {
-        const auto value = command.number(argument.name, argument.numbers, argument.help);
-        number = [value] { return *value; };
-    } else {
-        const auto value = command.choice(argument.name, argument.choices, argument.help);
-        number = [value] { return static_cast<uint32_t>(*value); };
-    }
-    const auto shown = [number, choices = argument.choices] {
-        return choices.empty() ? std::to_string(number()) : choices[number()].value;
-    };
+    const bool isNumber = argument.choices.empty();
+    const auto* const given = isNumber
+                                      ? command.add(argument.name, argument.numbers, argument.help)
+                                      : command.add(argument.name, argument.choices, argument.help);
     command.run([=, &client] {
-        return client.report().answer(operation, call(*client.service(), number()), {shown()});
+        const std::string shown = isNumber ? std::to_string(given->number()) : given->text();
+        return client.report().answer(operation, call(*client.service(), given->number()), {shown});
     });
     client.steps.push_back({command.name, &command});
 }
 
 std::function<std::string()> addTraffic(cli::Command& command) {
-    const auto named = command.file("FILE",
-                                    "trace of the simulated driver, or log of the daemon (default: "
-                                    "the trace in VIBRATOR_SIM_DIR); - for standard input",
-                                    "");
-    return [named] {
-        if (!named->empty()) return *named;
+    const auto* const file = command.add(
+            "[FILE]", cli::kFile,
+            "trace of the simulated driver, or log of the daemon (default: the trace in "
+            "VIBRATOR_SIM_DIR); - for standard input");
+    return [file] {
+        if (file->isGiven()) return file->text();
         const std::string simulated = simulator::inheritedDirectory();
         if (simulated.empty()) throw cli::UsageError("no FILE: name a trace, or the daemon's log");
         return simulator::traceFile(simulated);

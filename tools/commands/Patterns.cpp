@@ -61,13 +61,17 @@ void addPattern(Client& client) {
     cli::Command& command =
             client.command(kRestricted, "pattern play", "play a pattern that the driver has stored",
                            "3 --intensity 5000");
-    const auto pattern = command.number("PATTERN", kPatterns, "0 selects without playing");
-    const auto intensity = command.number("--intensity N", kIntensities,
-                                          "how strong; 10000 is full", kIntensities.most);
-    const auto isRepeated = command.flag("--repeat", "play it through the driver's queue");
-    command.run([=, &client] { return playPattern(client, *pattern, *intensity, *isRepeated); });
+    const auto* const pattern = command.add("PATTERN", kPatterns, "0 selects without playing");
+    const auto* const intensity =
+            command.add("--intensity N", kIntensities, "how strong; 10000 is full",
+                        std::to_string(kIntensities.most));
+    const auto* const isRepeated =
+            command.add("--repeat", cli::kFlag, "play it through the driver's queue");
+    command.run([=, &client] {
+        return playPattern(client, pattern->number(), intensity->number(), isRepeated->isGiven());
+    });
     client.steps.push_back({"pattern", &command, [=]() -> std::optional<double> {
-                                if (*pattern == 0) return std::nullopt;
+                                if (pattern->number() == 0) return std::nullopt;
                                 return product::kPatternMs;
                             }});
 }
@@ -122,27 +126,28 @@ void addEngine(Client& client) {
     cli::Command& command =
             client.command(kRestricted, "engine", "play a waveform packet by packet",
                            "10,5000,150,0 20,10000,200,1 --intensity 5000");
-    const auto file =
-            command.file("--file FILE", "CSV or JSON file of packets; - is standard input", "");
-    const auto intensity =
-            command.number("--intensity N", kIntensities,
-                           "scales the intensities; 10000 leaves them", kIntensities.most);
-    const auto words = command.words("PACKET", "PARAM0,INTENSITY,PARAM2,PARAM3, whole numbers",
-                                     [](const std::string& word) { parsePacket(word); });
+    const auto* const file = command.add("--file FILE", cli::kFile,
+                                         "CSV or JSON file of packets; - is standard input");
+    const auto* const intensity =
+            command.add("--intensity N", kIntensities, "scales the intensities; 10000 leaves them",
+                        std::to_string(kIntensities.most));
+    cli::Argument* const words =
+            command.add("[PACKET...]", cli::kText, "PARAM0,INTENSITY,PARAM2,PARAM3, whole numbers");
+    words->check = [](const std::string& word) { parsePacket(word); };
     const auto packets = [=] {
-        Packets read = readPackets(*words, *file);
-        checkPackets(read, *intensity);
+        Packets read = readPackets(words->given, file->text());
+        checkPackets(read, intensity->number());
         return read;
     };
     command.run([=, &client] {
         const Packets read = packets();
         const Operation operation = {"daxPerformHapticEngine", true, {"haptic_engine"}};
         const std::string count = std::to_string(read.size());
-        return client.report().answer(operation,
-                                      client.service()->daxPerformHapticEngine(read, *intensity),
-                                      {"",
-                                       count + (read.size() == 1 ? " packet" : " packets"),
-                                       {{"packets", read.size()}}});
+        return client.report().answer(
+                operation, client.service()->daxPerformHapticEngine(read, intensity->number()),
+                {"",
+                 count + (read.size() == 1 ? " packet" : " packets"),
+                 {{"packets", read.size()}}});
     });
     client.steps.push_back({"engine", &command, [packets] { return lengthOf(packets()); }});
 }

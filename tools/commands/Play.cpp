@@ -140,17 +140,21 @@ void wait(uint32_t ms) {
 
 void addPlay(Client& client) {
     cli::Command& command = client.command(kTools, "play", "play a score", exampleScore());
-    const auto file = command.file("SCORE", "file with a step a line, - for standard input");
-    const auto check = command.flag("--check", "only check the score, and print how long it takes");
-    const auto keepsGoing =
-            command.flag("--keep-going", "pass over steps that fail, and name them at the end");
+    const auto* const file =
+            command.add("SCORE", cli::kFile, "file with a step a line, - for standard input");
+    const auto* const check =
+            command.add("--check", cli::kFlag, "only check the score, and print how long it takes");
+    const auto* const keepsGoing = command.add(
+            "--keep-going", cli::kFlag, "pass over steps that fail, and name them at the end");
     command.note(
             "Steps: click [light|medium|strong], on MS [STRENGTH] [wait], off, wait MS, amplitude "
             "N, intensity N, pattern N [INTENSITY] [repeat], engine INTENSITY PACKET..., external "
             "on|off, frequency N, force-touch N, fold open|close; the steps between repeat N and "
             "end are played N times; # begins a comment. The whole score is checked before the "
             "first call. The motor is stopped when a step fails or the play is interrupted.");
-    command.run([=, &client] { return play(client, *file, *check, *keepsGoing); });
+    command.run([=, &client] {
+        return play(client, file->text(), check->isGiven(), keepsGoing->isGiven());
+    });
 }
 
 }  // namespace vibratorctl

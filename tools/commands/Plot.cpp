@@ -108,37 +108,41 @@ void addPlot(Client& client) {
     cli::Command& command = client.command(kTools, "plot", "draw what the driver was told",
                                            "--last 10s -o plot.svg");
     const auto traffic = addTraffic(command);
-    const auto output = command.file("-o, --output FILE",
-                                     "picture to draw, .svg or .png, by gnuplot; - for standard "
-                                     "output; without it, text",
-                                     "");
-    const auto format = command.choice("--format FORMAT",
-                                       {{"auto", "as the file's name ends; SVG for -"},
-                                        {"svg", "lines that stay sharp"},
-                                        {"png", "pixels"}},
-                                       "format of the picture", 0);
+    const auto* const output =
+            command.add("-o, --output FILE", cli::kFile,
+                        "picture to draw, .svg or .png, by gnuplot; - for standard "
+                        "output; without it, text");
+    const auto* const format = command.add("--format FORMAT",
+                                           {{"auto", "as the file's name ends; SVG for -"},
+                                            {"svg", "lines that stay sharp"},
+                                            {"png", "pixels"}},
+                                           "format of the picture", "auto");
     constexpr cli::Numbers kTimes = {"a time like 500, 500ms or 2s", 1, UINT32_MAX, "ms"};
-    const auto from = command.number("--from TIME", kTimes, "start of the part to draw");
-    const auto to = command.number("--to TIME", kTimes, "end of the part to draw");
-    const auto last = command.number("--last TIME", kTimes, "draw only the end, of this length");
-    const auto ascii = command.flag("--ascii", "draw the text with the characters of ASCII alone");
+    const auto* const from = command.add("--from TIME", kTimes, "start of the part to draw");
+    const auto* const to = command.add("--to TIME", kTimes, "end of the part to draw");
+    const auto* const last =
+            command.add("--last TIME", kTimes, "draw only the end, of this length");
+    const auto* const ascii =
+            command.add("--ascii", cli::kFlag, "draw the text with the characters of ASCII alone");
     command.note("Times count from the first call on.");
-    command.withoutJson().run([=] {
-        const bool isText = output->empty();
-        if (isText && *format != 0)
+    command.hasJson = false;
+    command.run([=] {
+        const std::string file = output->text();
+        const bool isText = file.empty();
+        if (isText && format->number() != 0)
             throw cli::UsageError("--format is of a picture; name its file with -o");
-        const PictureFormat kind = isText ? PictureFormat::kSvg : formatOf(*output, *format);
-        if (!isText && *output != "-") checkTarget(*output, traffic());
-        const Timeline timeline = readPart(traffic(), *from, *to, *last);
+        const PictureFormat kind = isText ? PictureFormat::kSvg : formatOf(file, format->number());
+        if (!isText && file != "-") checkTarget(file, traffic());
+        const Timeline timeline = readPart(traffic(), from->number(), to->number(), last->number());
         if (isText) {
             winsize window{};
             ioctl(STDOUT_FILENO, TIOCGWINSZ, &window);
             std::cout << plotText(timeline, window.ws_col > 0 ? window.ws_col : 80U,
-                                  *ascii || isAsciiLocale());
-        } else if (*output == "-") {
+                                  ascii->isGiven() || isAsciiLocale());
+        } else if (file == "-") {
             std::cout << drawPicture(timeline, kind);
         } else {
-            writeWhole(*output, drawPicture(timeline, kind));
+            writeWhole(file, drawPicture(timeline, kind));
         }
         return cli::kSuccess;
     });

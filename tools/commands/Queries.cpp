@@ -102,16 +102,16 @@ void addQueries(Client& client) {
     constexpr cli::Numbers kWaits = {"a time like 10, 500ms or 2m", 0, 3600, "s"};
     cli::Command& waiting = client.command(
             kForAll, "status", "say whether the service answers, and who serves it", "--wait 10");
-    const auto wait =
-            waiting.number("--wait SECONDS", kWaits, "how long to wait for the service", 0);
-    waiting.run([&client, wait] { return status(client, *wait); });
+    const auto* const wait =
+            waiting.add("--wait SECONDS", kWaits, "how long to wait for the service", "0");
+    waiting.run([&client, wait] { return status(client, wait->number()); });
 
     constexpr cli::Numbers kTypes = {"the type of a ladder", 0, 1};
     cli::Command& typed =
             client.command(kRestricted, "ladder",
                            "print the ladder of intensities that suits the motor", "--type 1");
-    const auto type = typed.number("--type N", kTypes, "variant of the ladder", 0);
-    typed.run([&client, type] { return ladder(client, *type); });
+    const auto* const type = typed.add("--type N", kTypes, "variant of the ladder", "0");
+    typed.run([&client, type] { return ladder(client, type->number()); });
 
     client.command(kRestricted, "motor", "tell the name, number and ladders of the motor", "")
             .run([&client] { return motor(client); });

@@ -306,12 +306,16 @@ void addSelftest(Client& client) {
     cli::Command& command = client.command(
             kTools, "selftest", "check each operation on this board, and restore what was set",
             "--quiet");
-    const auto quiet = command.flag("--quiet", "do not move the motor; otherwise for 3 s at most");
-    const auto asks = command.flag("--ask", "ask whether the motor moved");
-    const auto restart = command.text(
-            "--restart COMMAND", "restarts the service with it, and checks that it comes back", "");
+    const auto* const quiet =
+            command.add("--quiet", cli::kFlag, "do not move the motor; otherwise for 3 s at most");
+    const auto* const asks = command.add("--ask", cli::kFlag, "ask whether the motor moved");
+    const auto* const restart =
+            command.add("--restart COMMAND", cli::kText,
+                        "restarts the service with it, and checks that it comes back");
     command.note("Root checks the most: it also calls as uid 1000 and uid 2000.");
-    command.run([=, &client] { return Selftest(client, *quiet, *asks, *restart).run(); });
+    command.run([=, &client] {
+        return Selftest(client, quiet->isGiven(), asks->isGiven(), restart->text()).run();
+    });
 }
 
 }  // namespace vibratorctl

@@ -17,13 +17,12 @@ namespace {
 const std::vector<cli::Choice> kVersions = {
         {"1.0", "perform"}, {"1.1", "perform_1_1"}, {"1.2", "perform_1_2"}, {"1.3", "perform_1_3"}};
 
-cli::Value<size_t> addStrength(cli::Command& command) {
-    constexpr size_t kMedium = 1;
-    return command.choice("--strength STRENGTH",
-                          {{kStrengths[0], "weak"},
-                           {kStrengths[1], "as usual"},
-                           {kStrengths[2], "full strength"}},
-                          "how strong", kMedium);
+const cli::Argument* addStrength(cli::Command& command) {
+    return command.add("--strength STRENGTH",
+                       {{kStrengths[0], "weak"},
+                        {kStrengths[1], "as usual"},
+                        {kStrengths[2], "full strength"}},
+                       "how strong", kStrengths[1]);
 }
 
 /** @return what a click that is answered with OK does without; empty if nothing. */
@@ -77,8 +76,8 @@ int performEffect(const Client& client, const std::string& argument, uint32_t ef
 void addClick(Client& client) {
     cli::Command& click =
             client.command(kForAll, "click", "play the predefined click", "--strength strong");
-    const auto strength = addStrength(click);
-    click.run([&client, strength] { return performEffect(client, "", 0, 0, *strength); });
+    const auto* const strength = addStrength(click);
+    click.run([&client, strength] { return performEffect(client, "", 0, 0, strength->number()); });
     client.steps.push_back({"click", &click, [] { return product::kClickMs; }});
 }
 
@@ -86,12 +85,14 @@ void addEffect(Client& client) {
     constexpr cli::Numbers kEffects = {"the number of an effect", 0, UINT32_MAX};
     cli::Command& effect = client.command(
             kForAll, "effect", "ask for a predefined effect by its number", "0 --strength light");
-    const auto number = effect.number("NUMBER", kEffects, "0 is the click");
-    const auto version = effect.choice("--version VERSION", kVersions,
-                                       "version of the interface that has the effect", 0);
-    const auto strength = addStrength(effect);
+    const auto* const number = effect.add("NUMBER", kEffects, "0 is the click");
+    const auto* const version =
+            effect.add("--version VERSION", kVersions,
+                       "version of the interface that has the effect", kVersions[0].value);
+    const auto* const strength = addStrength(effect);
     effect.run([=, &client] {
-        return performEffect(client, std::to_string(*number), *number, *version, *strength);
+        return performEffect(client, std::to_string(number->number()), number->number(),
+                             version->number(), strength->number());
     });
 }
 
@@ -116,17 +117,17 @@ int runMotor(const Client& client, uint32_t ms, uint32_t intensity) {
 void addVibration(Client& client) {
     constexpr cli::Numbers kTimes = {"a time like 500, 500ms or 2s", 0, INT32_MAX, "ms"};
     cli::Command& on = client.command(kForAll, "on", "run the motor", "500 --strength 50%");
-    const auto ms = on.number("MS", kTimes, "how long");
-    const auto strength = on.number("--strength N", kIntensities,
-                                    "sets the intensity first, for root and system");
-    const auto waits = on.flag("--wait", "wait until the motor has stopped");
+    const auto* const ms = on.add("MS", kTimes, "how long");
+    const auto* const strength =
+            on.add("--strength N", kIntensities, "sets the intensity first, for root and system");
+    const auto* const waits = on.add("--wait", cli::kFlag, "wait until the motor has stopped");
     on.run([=, &client] {
-        const int code = runMotor(client, *ms, *strength);
-        if (code == cli::kSuccess && *waits) wait(*ms);
+        const int code = runMotor(client, ms->number(), strength->number());
+        if (code == cli::kSuccess && waits->isGiven()) wait(ms->number());
         return code;
     });
-    client.steps.push_back(
-            {"on", &on, [ms] { return *ms; }, [ms, waits] { return *waits ? *ms : 0; }});
+    client.steps.push_back({"on", &on, [ms] { return ms->number(); },
+                            [ms, waits] { return waits->isGiven() ? ms->number() : 0; }});
 
     cli::Command& off = client.command(kForAll, "off", "stop the motor", "");
     off.run([&client] { return client.report().answer({"off"}, client.service()->off()); });

@@ -159,17 +159,20 @@ void addWatch(Client& client) {
     cli::Command& command = client.command(kTools, "watch",
                                            "show the service's node traffic as it comes", "--once");
     const auto traffic = addTraffic(command);
-    const auto fromStart = command.flag("--all", "also show what is there already");
-    const auto once = command.flag("--once", "show what is there, and end");
-    const auto colour = command.choice("--color WHEN",
-                                       {{"auto", "on a terminal that has colours"},
-                                        {"always", "also into a file or a pipe"},
-                                        {"never", "plain text"}},
-                                       "use colours", kAuto);
+    const auto* const fromStart =
+            command.add("--all", cli::kFlag, "also show what is there already");
+    const auto* const once = command.add("--once", cli::kFlag, "show what is there, and end");
+    const auto* const colour = command.add("--color WHEN",
+                                           {{"auto", "on a terminal that has colours"},
+                                            {"always", "also into a file or a pipe"},
+                                            {"never", "plain text"}},
+                                           "use colours", "auto");
     command.note(
             "A trace does not show the calls that the service refused; the daemon's log does.");
-    command.withoutJson().run([=, &client] {
-        return Watch(client, traffic(), wantsColour(*colour)).run(*fromStart, *once);
+    command.hasJson = false;
+    command.run([=, &client] {
+        return Watch(client, traffic(), wantsColour(colour->number()))
+                .run(fromStart->isGiven(), once->isGiven());
     });
 }
 

@@ -65,7 +65,7 @@ class ScoreParser {
         if (step.name == "repeat") {
             mBlocks.push_back({mScore.order.size(), 1, step.line, step.column});
             mRepeat.readStep(step.words);
-            mBlocks.back().times = *mTimes;
+            mBlocks.back().times = mTimes->number();
         } else if (step.name == "end") {
             endBlock(step);
         } else {
@@ -80,7 +80,7 @@ class ScoreParser {
     void readStep(ScoreStep* step) {
         if (step->name == "wait") {
             mWait.readStep(step->words);
-            step->pause = *mPause;
+            step->pause = mPause->number();
             return;
         }
         const auto kind = std::find_if(mKinds.begin(), mKinds.end(), [&](const StepKind& each) {
@@ -122,11 +122,11 @@ class ScoreParser {
     Score& mScore;
     std::vector<ScoreError>& mErrors;
     cli::Command mWait;
-    cli::Value<uint32_t> mPause =
-            mWait.number("MS", {"a time like 500, 500ms or 2s", 0, 3'600'000, "ms"}, "how long");
+    const cli::Argument* const mPause = mWait.add(
+            "MS", cli::Numbers{"a time like 500, 500ms or 2s", 0, 3'600'000, "ms"}, "how long");
     cli::Command mRepeat;
-    cli::Value<uint32_t> mTimes =
-            mRepeat.number("N", {"a number of times", 1, kMaxSteps}, "how often");
+    const cli::Argument* const mTimes =
+            mRepeat.add("N", cli::Numbers{"a number of times", 1, kMaxSteps}, "how often");
     std::vector<Block> mBlocks;
     size_t mLine = 0;
 };

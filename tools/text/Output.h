@@ -4,15 +4,19 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <iostream>
 #include <iterator>
 #include <streambuf>
 
 namespace cli {
 
-/** Standard output that remembers why it could not be written. */
+/** What std::cout writes to while this lives: standard output; it keeps why that failed. */
 class Output : public std::streambuf {
   public:
-    Output() { setp(mBuffer, std::end(mBuffer)); }
+    Output() : mBefore(std::cout.rdbuf(this)) { setp(mBuffer, std::end(mBuffer)); }
+    ~Output() override { std::cout.rdbuf(mBefore); }
+    Output(const Output&) = delete;
+    Output& operator=(const Output&) = delete;
     /** @return the errno of the first failure; 0 without one. */
     int error() const { return mError; }
 
@@ -32,6 +36,7 @@ class Output : public std::streambuf {
     }
 
   private:
+    std::streambuf* const mBefore;
     char mBuffer[16384];
     int mError = 0;
 };
