@@ -89,7 +89,7 @@ void addCommands(cli::Program& program) {
 int main(int argc, char** argv) {
     cli::Program program("vibrator-driver", VERSION,
                          "Offers a force-feedback motor, of a phone or a game controller, to the "
-                         "service as a vibrator driver of the kernel's would be.");
+                         "service as a vibrator driver of the kernel's would be");
     program.shared().note(
             "Exit code: 0 done; 1 failed; 2 a mistake in the command line; run: that of its "
             "command.");

@@ -87,7 +87,7 @@ class Simulator : public cli::Program {
     Simulator()
         : Program("vibrator-sim", VERSION,
                   "Makes a simulated kernel vibrator driver, runs the service on it, and shows "
-                  "what the driver was told.") {
+                  "what the driver was told") {
         mDirectory = shared().add("--dir DIRECTORY", cli::kFile,
                                   "directory of the driver, instead of the one in "
                                   "VIBRATOR_SIM_DIR");

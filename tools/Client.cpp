@@ -12,7 +12,7 @@ constexpr int kUnreachable = 3;
 
 Client::Client()
     : Program("vibratorctl", VERSION,
-              "Calls the vibrator service, and shows what the driver was told."),
+              "Calls the vibrator service, and shows what the driver was told"),
       mInstance(shared().add("--instance NAME", cli::kText, "name of the service's instance",
                              "default")),
       mTimeout(shared().add("--timeout SECONDS",

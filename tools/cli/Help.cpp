@@ -37,7 +37,9 @@ std::vector<Choice> titlesOf(const Command& command, bool isOptions) {
 
 /** @return a command as it stands in a call, without its options. */
 std::string inCall(const Command& command) {
-    return join({command.name, join(valuesOf(titlesOf(command, false)), " ", " ")}, " ", " ");
+    std::vector<std::string> words = valuesOf(titlesOf(command, false));
+    words.insert(words.begin(), command.name);
+    return join(words, " ", " ");
 }
 
 }  // namespace

@@ -39,10 +39,9 @@ class Line {
         check();
         if (mTaking != nullptr) throw UsageError(mTaking->name + ": the value is missing", mIndex);
         if (mCommand == nullptr) {
-            throw UsageError("no command; " +
-                             (mTyped.empty() ? inQuotes(mProgram->mName + " help") + " lists them"
-                                             : join(valuesOf(mProgram->commandsAfter(mTyped)), ", ",
-                                                    " or ")));
+            const std::string all = inQuotes(mProgram->mName + " help") + " lists them";
+            const auto next = valuesOf(mProgram->commandsAfter(mTyped));
+            throw UsageError("no command; " + (mTyped.empty() ? all : join(next, ", ", " or ")));
         }
         for (const Argument* each : mArguments) {
             if (each->isRequired() && !each->isGiven())
@@ -66,9 +65,9 @@ class Line {
         } else if (next == nullptr) {
             if (mCommand == nullptr) return mProgram->commandsAfter(mTyped);
             next = argumentFor(word);
+            if (mTyped == "help") return mProgram->commandsAfter(join(next->given, " ", " "));
         }
         if (next == nullptr) return {};
-        if (mTyped == "help") return mProgram->commandsAfter(join(next->given, " ", " "));
         if (next->kind == kFile) return {{":files", ""}};
         if (next->kind == kCommand)
             return {{":command", std::to_string(mIndex + 1 - next->given.size())}};
@@ -84,12 +83,11 @@ class Line {
 
     /** Takes the arguments of a command from now on, too. */
     void begin(Command& command) {
-        std::vector<Argument*> added;
+        auto place = mArguments.begin();
         for (Argument& each : command.arguments) {
             each.given.clear();
-            if (!isStep() || each.kind != kFile) added.push_back(&each);
+            if (!isStep() || each.kind != kFile) place = mArguments.insert(place, &each) + 1;
         }
-        mArguments.insert(mArguments.begin(), added.begin(), added.end());
     }
 
     void take(const std::string& word) {
