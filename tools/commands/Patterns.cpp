@@ -100,7 +100,7 @@ void checkPackets(const Packets& packets, uint32_t intensity) {
                               std::to_string(kMaxPackets));
     }
     // The service multiplies in 32 bits.
-    const uint32_t most = UINT32_MAX / intensity;
+    const uint32_t most = UINT32_MAX / std::max(intensity, kIntensities.least);
     for (const auto& packet : packets) {
         if (packet.intensity < 0 || static_cast<uint32_t>(packet.intensity) > most) {
             throw cli::UsageError("intensity " + std::to_string(packet.intensity) +
