@@ -52,7 +52,8 @@ uint32_t Argument::parse(const std::string& word) const {
 
 Argument* Command::add(const std::string& title, Kind kind, const std::string& about,
                        const std::string& initial) {
-    Argument& argument = arguments.emplace_back(Argument{title, kind, about, initial});
+    arguments.push_back({title, kind, about, initial});
+    Argument& argument = arguments.back();
     // In "-o, --output FILE" and "[FILE...]" the name stands in the middle.
     const size_t start = argument.isOption() ? title.find("--") : title.find_first_not_of('[');
     argument.name = title.substr(start, title.find_first_of(" .]", start) - start);
@@ -62,16 +63,14 @@ Argument* Command::add(const std::string& title, Kind kind, const std::string& a
 
 Argument* Command::add(const std::string& title, const Numbers& numbers, const std::string& about,
                        const std::string& initial) {
-    Argument* const argument = add(title, kNumber, about, initial);
-    argument->numbers = numbers;
-    return argument;
+    add(title, kNumber, about, initial)->numbers = numbers;
+    return &arguments.back();
 }
 
 Argument* Command::add(const std::string& title, const std::vector<Choice>& choices,
                        const std::string& about, const std::string& initial, Kind kind) {
-    Argument* const argument = add(title, kind, about, initial);
-    argument->choices = choices;
-    return argument;
+    add(title, kind, about, initial)->choices = choices;
+    return &arguments.back();
 }
 
 Program::Program(std::string name, std::string version, const std::string& about)

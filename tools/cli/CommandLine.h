@@ -144,7 +144,8 @@ class Program {
      */
     Command& command(const std::string& group, const std::string& name, const std::string& help,
                      const std::string& example) {
-        return mCommands.emplace_back(Command{group, name, help, example});
+        mCommands.push_back({group, name, help, example});
+        return mCommands.back();
     }
     /** Runs the command that a command line asks for. @return the program's exit code. */
     int run(int argc, char** argv);
